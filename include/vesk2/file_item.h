@@ -1,0 +1,20 @@
+// file_item.h: making and deleting FileItem records (vesk2.h).
+#ifndef VESK2_FILE_ITEM_H
+#define VESK2_FILE_ITEM_H
+
+#include <vesk2.h>
+
+namespace ZvVesk2 {
+
+using ::FileItem;
+
+// FileItemCreate makes a record that takes over `name` and `nameA` (arrays from new[]); whichever
+// is missing is derived from the other. Null without memory, the strings then still the caller's.
+VESK2_API FileItem* FileItemCreate(char* name, char* nameA);
+
+// FileItemDelete frees a chain and returns the number of records freed.
+VESK2_API unsigned int FileItemDelete(FileItem* chain);
+
+}  // namespace ZvVesk2
+
+#endif  // VESK2_FILE_ITEM_H

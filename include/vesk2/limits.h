@@ -1,0 +1,55 @@
+// limits.h: every bound that the library puts on its input, each with the attack that it stops.
+//
+// All limits are on by default and none can be switched off: the bytes that they guard against come
+// from whoever wrote the manifest, certificate or list that is being judged.
+#ifndef VESK2_LIMITS_H
+#define VESK2_LIMITS_H
+
+#include <cstddef>
+#include <cstdint>
+
+namespace ZvVesk2::Limits {
+
+// Nesting of lists, in every reader and in every walk that recurses: "((((..." must not spend the
+// stack. The outermost list is level 1; a list at level kMaxDepth + 1 is refused.
+inline constexpr unsigned kMaxDepth = 256;
+
+// Bytes of one byte string, on reading from a buffer and in ByteString::Set.
+inline constexpr uint32_t kMaxByteString = 8192;
+// Digits of a byte string's length, on reading from a buffer.
+inline constexpr unsigned kMaxLengthDigits = 4;
+// Characters of a display hint between "[" and "]".
+inline constexpr size_t kMaxHint = 10;
+
+// Bytes of a file read whole into memory: everything that is parsed is.
+inline constexpr uint64_t kMaxFile = uint64_t{256} << 20;
+// Bytes of one exported expression; keeps the 32-bit lengths from wrapping.
+inline constexpr uint64_t kMaxExport = uint64_t{1} << 31;
+
+// A path, with its terminator. A path that had to be cut is never used.
+inline constexpr size_t kPathBuffer = 4097;
+// A path inside a manifest body; longer ones could not be opened, and deep trees cost their square.
+inline constexpr size_t kMaxBodyPath = 4096;
+// The text of a revocation tag that names a stored file: a file name holds 255 bytes.
+inline constexpr size_t kMaxStoreName = 250;
+
+// Work that one reduction (or one tag comparison) may do. Certificates that an attacker signs for
+// keys of his own multiply tuples and set members exponentially; a spent budget is a refusal.
+inline constexpr uint32_t kMaxTuples = 100'000;
+inline constexpr uint32_t kMaxCombinations = 1'000'000;
+inline constexpr uint32_t kMaxComparisons = 50'000'000;
+inline constexpr uint32_t kMaxRecords = 4'000'000;
+// Members of one accumulated (* set ...).
+inline constexpr uint32_t kMaxSetMembers = 4096;
+// Names still to resolve below one subject: (name K N N N ...) definitions can feed themselves.
+inline constexpr uint32_t kMaxNameRest = 64;
+
+// Keys and signatures, tested when a signature is checked and not when a key is read: a key is an
+// identity first. Outside these a signature is simply not valid.
+inline constexpr int kMaxRsaModulusBits = 16384;
+inline constexpr int kMaxRsaExponentBits = 64;
+inline constexpr int kMaxDsaPrimeBits = 10000;
+
+}  // namespace ZvVesk2::Limits
+
+#endif  // VESK2_LIMITS_H

@@ -1,0 +1,172 @@
+// platform.h: what a caller of the exported classes needs of the layer beneath them: the buffer
+// that every Import reads from, and crypto key objects for PublicKey::SetRSA and SetDSA.
+//
+// Ownership: what a function returns or stores through a pointer belongs to the caller, who
+// releases it with the function named there.
+#ifndef VESK2_PLATFORM_H
+#define VESK2_PLATFORM_H
+
+#include <vesk2.h>
+
+#include <cstddef>
+#include <cstdint>
+
+namespace ZVsysutil {
+
+// ZvBuffer is a reader over a block of bytes that it owns. It knows no white space and no escapes:
+// it matches literals byte by byte. Nothing is consumed by a match that fails or by a look.
+class VESK2_API ZvBuffer {
+ public:
+  // Expect matches the 0-terminated `text` (required mode). Returns 0 with the text consumed, or
+  // VESK2_ERR_PARSE_FILE.
+  [[nodiscard]] int Expect(const char* text);
+  // Accept matches `text` in the optional mode: consumed and true, or untouched and false.
+  [[nodiscard]] bool Accept(const char* text);
+  // LooksAt matches `text` in the look-ahead mode: whether the next bytes are `text`.
+  [[nodiscard]] bool LooksAt(const char* text) const;
+
+  // Peek returns the next byte (0 to 255) without consuming it, Next consumes it. -1 at the end.
+  int Peek() const;
+  int Next();
+
+  // Read copies up to `length` bytes to `out` and returns how many there were.
+  size_t Read(void* out, size_t length);
+  // Skip passes over up to `length` bytes and returns how many there were.
+  size_t Skip(size_t length);
+
+  // Remaining is the number of bytes not yet consumed, Position that of those consumed: after a
+  // failed Import, the byte at which the text stopped making sense.
+  size_t Remaining() const { return size_ - position_; }
+  size_t Position() const { return position_; }
+  // The next Remaining() bytes, borrowed until the buffer is freed.
+  const unsigned char* Data() const { return data_ + position_; }
+
+  ZvBuffer(const ZvBuffer&) = delete;
+  ZvBuffer& operator=(const ZvBuffer&) = delete;
+
+ private:
+  friend VESK2_API ZvBuffer* zv_buffer_wrap(const void* data, size_t size);
+  friend VESK2_API ZvBuffer* zv_buffer_wrap_file(const char* path);
+  friend VESK2_API void zv_buffer_free(ZvBuffer* buffer);
+  ZvBuffer(unsigned char* data, size_t size) : data_(data), size_(size) {}
+  ~ZvBuffer();
+
+  unsigned char* data_;
+  size_t size_;
+  size_t position_ = 0;
+};
+
+// zv_buffer_wrap copies `size` bytes at `data` into a new buffer (`data` may be null when `size` is
+// 0). Null when memory runs out. Free with zv_buffer_free.
+VESK2_API ZvBuffer* zv_buffer_wrap(const void* data, size_t size);
+
+// zv_buffer_wrap_file reads a whole regular file into a new buffer. Null on any failure: no such
+// file, not a regular file, over 256 MiB, a read error, no memory. Free with zv_buffer_free.
+VESK2_API ZvBuffer* zv_buffer_wrap_file(const char* path);
+
+// zv_buffer_free releases a buffer and its bytes; null is allowed.
+VESK2_API void zv_buffer_free(ZvBuffer* buffer);
+
+}  // namespace ZVsysutil
+
+namespace ZvVesk2 {
+using ZVsysutil::ZvBuffer;
+}
+
+// ---- Crypto keys -------------------------------------------------------------------------------
+
+// Hash algorithms. Every other value is refused.
+enum ZvclmHashID : int32_t {
+  ZVCLM_HASH_NONE = -1,
+  ZVCLM_HASH_SHA1 = 0,    // "sha1", 20 bytes
+  ZVCLM_HASH_SHA256 = 2,  // "sha256", 32 bytes
+  ZVCLM_HASH_RMD160 = 3,  // "rmd160", 20 bytes
+};
+
+// Results of the crypto functions, which no other table holds. 0 is success.
+enum ZvclmStatus : int {
+  ZVCLM_ERR_NULL_PARAM = 1001,
+  ZVCLM_ERR_UNKNOWN_HASH = 1003,
+  ZVCLM_ERR_NO_MEM = 1007,
+  ZVCLM_ERR_KEY = 1009,       // key data that libcrypto will not take
+  ZVCLM_ERR_KEY_TYPE = 1014,  // a key type, key-data id or record size that does not fit
+  ZVCLM_ERR_FORMAT = 1015,    // an export format other than 0 and 3
+  ZVCLM_ERR_FAILURE = 1017,   // any other failure
+  ZVCLM_ERR_BUFFER_TOO_SMALL = 1070,
+};
+
+// A key and a number, opaque.
+struct ZVCLMPublicKeyData;
+struct ZVCLMBigInt;
+
+// Key types and key-data ids of zvclm_PublicKeyDefine and zvclm_PublicKeyGetData.
+enum : int { ZVCLM_KEY_DSA = 0, ZVCLM_KEY_RSA = 1 };
+enum : int { ZVCLM_DATA_DSA = 6, ZVCLM_DATA_RSA = 8 };
+
+// An RSA key's numbers. `size` is the mark 20, not a sizeof; the Init function sets it.
+struct ZVCLMRSAKeyData {
+  uint32_t size;
+  uint32_t reserved;
+  uint32_t keyLength;  // bits of n
+  ZVCLMBigInt* n;
+  ZVCLMBigInt* e;
+};
+
+// A DSA key's numbers. `size` is the mark 60 and `parameterSize` the mark 48.
+struct ZVCLMDSSKeyData {
+  uint32_t size;
+  uint32_t reserved1;
+  uint32_t parameterSize;
+  uint32_t reserved3;
+  uint32_t reserved4;
+  uint32_t keyLength;  // bits of p
+  uint32_t reserved6;
+  uint32_t reserved7;
+  ZVCLMBigInt* p;
+  ZVCLMBigInt* q;
+  ZVCLMBigInt* g;
+  uint32_t reserved11;
+  uint32_t reserved12;
+  uint32_t reserved13;
+  ZVCLMBigInt* y;
+};
+
+extern "C" {
+
+// zvclm_RSAKeyStructInit clears a record and sets its marks; `id` is ZVCLM_DATA_RSA. The zeroize
+// form frees and clears the record's numbers. zvclm_DSSKeyStructInit likewise, `id` ZVCLM_DATA_DSA
+// and `parameterSize` 48. Return 0, ZVCLM_ERR_NULL_PARAM or ZVCLM_ERR_KEY_TYPE.
+VESK2_API int zvclm_RSAKeyStructInit(int id, ZVCLMRSAKeyData* record);
+VESK2_API int zvclm_RSAKeyStructZeroize(int id, ZVCLMRSAKeyData* record);
+VESK2_API int zvclm_DSSKeyStructInit(int id, ZVCLMDSSKeyData* record, uint32_t parameterSize);
+VESK2_API int zvclm_DSSKeyStructZeroize(int id, ZVCLMDSSKeyData* record);
+
+// zvclm_BigIntFromBuffer makes *number from `length` bytes, unsigned and big-endian; leading zeros
+// are ignored, no bytes are the number 0. *number must be null. The record's zeroize form frees it.
+// Returns 0, ZVCLM_ERR_NULL_PARAM or ZVCLM_ERR_NO_MEM.
+VESK2_API int zvclm_BigIntFromBuffer(ZVCLMBigInt** number, const unsigned char* data,
+                                     uint32_t length);
+// zvclm_BigIntGetBufferSize returns the bytes that zvclm_BigIntToBuffer writes: 1 for 0; -1 for
+// null.
+VESK2_API int zvclm_BigIntGetBufferSize(const ZVCLMBigInt* number);
+// zvclm_BigIntToBuffer writes the number, big-endian without leading zeros (0 as one 0 byte), into
+// *size bytes at `out` and sets *size to the bytes written. Returns 0, ZVCLM_ERR_NULL_PARAM or
+// ZVCLM_ERR_BUFFER_TOO_SMALL.
+VESK2_API int zvclm_BigIntToBuffer(const ZVCLMBigInt* number, unsigned char* out, uint32_t* size);
+
+// zvclm_PublicKeyDefine makes *key, of `type` ZVCLM_KEY_*, from a record of `id` ZVCLM_DATA_*. The
+// numbers are copied and not judged. `parameters` is 0, `handle` a context's cryptoHandle or 0.
+// Returns 0, ZVCLM_ERR_NULL_PARAM, ZVCLM_ERR_KEY_TYPE or ZVCLM_ERR_NO_MEM.
+VESK2_API int zvclm_PublicKeyDefine(ZVCLMPublicKeyData** key, int type, int id, const void* record,
+                                    uint32_t parameters, uint32_t handle);
+// zvclm_PublicKeyGetData fills an initialised record with copies of the key's numbers, which the
+// record's zeroize form frees. Returns as zvclm_PublicKeyDefine does.
+VESK2_API int zvclm_PublicKeyGetData(const ZVCLMPublicKeyData* key, int id, void* record,
+                                     uint32_t handle);
+// zvclm_PublicKeyFree frees a key; null is allowed. A key given to SetRSA or SetDSA is no longer
+// the caller's to free.
+VESK2_API void zvclm_PublicKeyFree(ZVCLMPublicKeyData* key, uint32_t handle);
+
+}  // extern "C"
+
+#endif  // VESK2_PLATFORM_H

@@ -1,0 +1,50 @@
+// pointer_array.h: PointerArray<T>, a growable array of owned pointers with a cursor.
+#ifndef VESK2_POINTER_ARRAY_H
+#define VESK2_POINTER_ARRAY_H
+
+#include <vesk2.h>
+
+#include <cstdint>
+
+namespace ZvVesk2 {
+
+// Instantiated in the library for BodyObject and char.
+template <typename T>
+class VESK2_API PointerArray {
+ public:
+  PointerArray() = default;
+  // With ownsArrays, clear frees every element as an array. (char elements always are.)
+  explicit PointerArray(bool elementsAreArrays) : ownsArrays(elementsAreArrays) {}
+  ~PointerArray() { clear(); }
+  PointerArray(const PointerArray&) = delete;
+  PointerArray& operator=(const PointerArray&) = delete;
+
+  // push appends and takes ownership; grows by 32 slots. 1, or 0 without memory (the element is
+  // then still the caller's).
+  int push(T* element);
+  // get(0): the element at the cursor. Negative: that element, then the cursor moves on. Positive:
+  // the cursor moves on, then its element. Null at and past the end.
+  T* get(int mode);
+  T* begin();
+  T* next() { return get(-1); }
+  void reset() { cursor = 0; }
+  // sort orders the pointers; the comparator gets pointers to two elements of type T*.
+  void sort(int (*compare)(const void*, const void*));
+  // clear frees every element and the array.
+  void clear();
+
+  uint32_t GetCount() const { return count; }
+  uint32_t GetCapacity() const { return capacity; }
+  uint32_t GetCursor() const { return cursor; }
+
+ private:
+  T** items = nullptr;
+  uint32_t count = 0;
+  uint32_t capacity = 0;
+  uint32_t cursor = 0;
+  bool ownsArrays = false;
+};
+
+}  // namespace ZvVesk2
+
+#endif  // VESK2_POINTER_ARRAY_H

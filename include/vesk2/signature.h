@@ -1,0 +1,56 @@
+// signature.h: Signature, (signature <hash> <principal> (<algorithm> <value>)): what was signed, by
+// whom, and the signature itself.
+#ifndef VESK2_SIGNATURE_H
+#define VESK2_SIGNATURE_H
+
+#include <vesk2/hash.h>
+
+namespace ZvVesk2 {
+
+class Cert;
+
+class VESK2_API Signature : public SExpression {
+ public:
+  explicit Signature(Vesk2ContextStruct* context);
+
+ protected:
+  ~Signature() override;
+
+ public:
+  // Import reads the canonical form into an empty object. After a failure the object is partly
+  // built.
+  [[nodiscard]] int Import(ZvBuffer* buffer);
+  using SExpression::Import;
+
+  // Create makes a signature from its parts. `value` (1 to 8192 bytes) is copied; the references to
+  // `hash` and `principal` are taken over on success only. `signature` must be null and nothing
+  // else null or empty (VESK2_ERR_INVALID_PARAM). After a later failure the half-built object is in
+  // `signature`, for the caller to free: it then holds what was appended, and `hash` and
+  // `principal` stay the caller's unless they were.
+  [[nodiscard]] static int Create(Signature*& signature, Hash* hash, Principal* principal,
+                                  const char* algorithm, unsigned char* value, unsigned int length,
+                                  Vesk2ContextStruct* context);
+  using SExpression::Create;
+
+  // Verify checks the signature over `object` with the signing principal: see Principal::Verify.
+  // For a certificate the issuer must be the signer (VESK2_ERR_SIGNATURE). VESK2_ERR_PARAM_NULL for
+  // null.
+  [[nodiscard]] int Verify(Cert* cert);
+  [[nodiscard]] int Verify(SExpression* object);
+
+  // The parts, borrowed from the list; null until imported or created.
+  Hash* GetHash() const { return hash; }
+  Principal* GetPrincipal() const { return principal; }
+  ByteString* GetAlgorithm() const { return algorithm; }
+  ByteString* GetValue() const { return value; }
+
+ private:
+  Hash* hash = nullptr;
+  Principal* principal = nullptr;
+  ByteString* algorithm = nullptr;
+  ByteString* value = nullptr;
+};
+
+}  // namespace ZvVesk2
+
+#endif  // VESK2_SIGNATURE_H

@@ -1,0 +1,47 @@
+// time_stamp.h: TimeStamp, a moment as the text "YYYY-MM-DD_hh:mm:ss" in UTC, 19 characters. Stamps
+// are compared as text.
+#ifndef VESK2_TIME_STAMP_H
+#define VESK2_TIME_STAMP_H
+
+#include <vesk2/expression.h>
+
+namespace ZvVesk2 {
+
+class VESK2_API TimeStamp : public ByteString {
+ public:
+  explicit TimeStamp(Vesk2ContextStruct* context);
+
+ protected:
+  ~TimeStamp() override;
+
+ public:
+  // Set writes the text of `seconds` since the epoch. Returns 0, VESK2_ERR_MEM_ALLOC, or -1 (not a
+  // library code) for a year outside 0 to 9999, the stamp then untouched.
+  [[nodiscard]] int Set(long seconds);
+  // Set reads a stamp that may stop after any whole field ("2005", "2005-06", "2005-06-30_12",
+  // ...), years 1970 to 3900. The missing fields are the period's first second, or with
+  // `endOfPeriod` its last. VESK2_ERR_PARAM_NULL, VESK2_ERR_TIME_STAMP; after an impossible date
+  // the stamp keeps the normalised text.
+  [[nodiscard]] int Set(const char* text, bool endOfPeriod);
+  using ByteString::Set;
+
+  // ToTime returns seconds since the epoch. 19 bytes are read by place, without any test; a text of
+  // another length gives 0.
+  long ToTime() const;
+  // The first second of the UTC day of `seconds`; 0 on failure.
+  static long DayBegin(long seconds);
+
+  // Each is false when `other` is null, the forms that accept equality too. 19 bytes are compared;
+  // bytes past a shorter text count as 0.
+  bool IsBefore(const TimeStamp* other) const;
+  bool IsBeforeOrEqual(const TimeStamp* other) const;
+  bool IsAfter(const TimeStamp* other) const;
+  bool IsAfterOrEqual(const TimeStamp* other) const;
+
+ private:
+  bool ownStorage = false;  // `data` was allocated here and holds 20 bytes
+};
+
+}  // namespace ZvVesk2
+
+#endif  // VESK2_TIME_STAMP_H

@@ -1,0 +1,208 @@
+// The engine's own expression model: reference-counted nodes parsed from canonical bytes, keywords
+// known by number, and the pools that nodes are taken from and returned to.
+//
+// The engine never sees the object model. What crosses into it are canonical bytes
+// (src/engine/interface.h), and atoms point into those bytes: a buffer outlives every node made
+// from it.
+//
+// Counting: a new record has one reference. Storing a record into a slot (spki_*_assign) takes a
+// reference on it and releases what the slot held. A released record goes back to its free list,
+// zeroed.
+#ifndef VESK2_SRC_ENGINE_MODEL_H
+#define VESK2_SRC_ENGINE_MODEL_H
+
+#include <vesk2.h>
+#include <vesk2/limits.h>
+
+#include <cstddef>
+#include <cstdint>
+
+namespace ZvVesk2::Engine {
+
+using spki_status = int;
+
+// The allocator that a caller hands to spki_engine_start.
+struct spki_allocator {
+  void* (*allocate)(size_t size, void* user);
+  void (*release)(void* memory, void* user);
+  void* user;
+};
+
+// One byte string.
+struct spki_atom {
+  spki_atom* link;    // next in the free list while released
+  uint32_t refcount;  // saturating: a count that reaches the top stays there
+  bool owns;          // hint and data belong to the atom
+  int32_t keyword;    // keyword id; -1 with a display hint or for any other word
+  uint32_t hint_length;
+  const unsigned char* hint;
+  uint32_t length;
+  const unsigned char* data;
+};
+
+enum spki_elem_kind : int32_t {
+  SPKI_ELEM_KEYWORD = 1,  // a head that is a keyword
+  SPKI_ELEM_HEAD = 2,     // a head that is not
+  SPKI_ELEM_STRING = 3,   // a later byte string
+  SPKI_ELEM_LIST = 4,     // a nested list
+};
+
+// One element of a list; a list is the chain of its elements and known by its head.
+struct spki_elem {
+  spki_elem* link;
+  uint32_t refcount;
+  spki_elem_kind kind;
+  spki_elem* next;            // counted
+  const unsigned char* text;  // on a head: the "(" in the input; null for lists made from templates
+  uint32_t text_length;       // on a head: bytes up to just behind the ")"
+  union {
+    int32_t keyword;  // SPKI_ELEM_KEYWORD
+    spki_atom* atom;  // SPKI_ELEM_HEAD, SPKI_ELEM_STRING; counted
+    spki_elem* list;  // SPKI_ELEM_LIST; counted
+  } value;
+};
+
+struct spki_tuple;  // src/engine/reduce.h
+struct spki_principal;
+struct spki_bucket_entry;
+
+// Work done so far by this engine; see the limits. When `spent` is set the operation that set it
+// failed, and the reduction ends with `spent`.
+struct spki_budget {
+  uint32_t tuples;
+  uint32_t combinations;
+  uint32_t comparisons;
+  uint32_t live_records;
+  spki_status spent;  // 0, SPKI_ERR_NO_MEM or SPKI_ERR_THRESHOLD
+};
+
+inline constexpr size_t kSpkiBuckets = 256;
+
+// The state of one call. Zero-filled before use, held in the caller's frame.
+struct spki_engine {
+  spki_bucket_entry* principals[kSpkiBuckets];  // by the first byte of a digest
+  spki_bucket_entry* name_definitions[kSpkiBuckets];
+  spki_bucket_entry* name_users[kSpkiBuckets];
+  spki_bucket_entry* acl_tuples;  // issued by the ACL itself, newest first
+  spki_atom* free_atoms;
+  spki_elem* free_elems;
+  spki_tuple* free_tuples;
+  void* pool;              // made by the memory callbacks at start
+  uint32_t hash_provider;  // the context's crypto handle
+  spki_budget budget;
+};
+
+// ---- Start and stop ----
+
+// What spki_engine_start returns when the allocator yields nothing; the one positive failure.
+inline constexpr spki_status kSpkiNoPool = 16386;
+
+spki_status spki_engine_start(spki_engine* engine, const spki_allocator* allocator);
+void spki_engine_stop(spki_engine* engine, const spki_allocator* allocator);
+
+// Allocation from the engine's pool, counted against the budget of live records; null when there is
+// none or the budget is spent.
+void* spki_allocate(spki_engine* engine, size_t size);
+void spki_free(spki_engine* engine, void* memory);
+
+// ---- Records ----
+
+spki_elem* spki_elem_new(spki_engine* engine);
+spki_atom* spki_atom_new(spki_engine* engine);
+// Null is allowed.
+void spki_elem_release(spki_engine* engine, spki_elem* elem);
+void spki_atom_release(spki_engine* engine, spki_atom* atom);
+// Counted store; a null slot releases the record given.
+void spki_elem_assign(spki_engine* engine, spki_elem** slot, spki_elem* elem);
+void spki_atom_assign(spki_engine* engine, spki_atom** slot, spki_atom* atom);
+// Frees the export buffer at the list's `text` (delete[]) and releases the list. For the outermost
+// lists that the interface makes only.
+void spki_list_dispose(spki_engine* engine, spki_elem* list);
+
+// ---- Keywords ----
+
+// Ids that the engine tests for.
+enum spki_keyword : int32_t {
+  SPKI_KW_STAR = 1,
+  SPKI_KW_ACL = 3,
+  SPKI_KW_ALPHA = 4,
+  SPKI_KW_BINARY = 7,
+  SPKI_KW_CERT = 11,
+  SPKI_KW_DATE = 16,
+  SPKI_KW_ENTRY = 36,
+  SPKI_KW_G = 39,
+  SPKI_KW_GE = 40,
+  SPKI_KW_HASH = 42,
+  SPKI_KW_ISSUER = 48,
+  SPKI_KW_K_OF_N = 50,
+  SPKI_KW_L = 53,
+  SPKI_KW_LE = 54,
+  SPKI_KW_NAME = 64,
+  SPKI_KW_NOT_AFTER = 67,
+  SPKI_KW_NOT_BEFORE = 68,
+  SPKI_KW_NUMERIC = 70,
+  SPKI_KW_PREFIX = 79,
+  SPKI_KW_PROPAGATE = 82,
+  SPKI_KW_PUBLIC_KEY = 86,
+  SPKI_KW_RANGE = 89,
+  SPKI_KW_SEQUENCE = 105,
+  SPKI_KW_SET = 106,
+  SPKI_KW_SHA1 = 108,
+  SPKI_KW_SUBJECT = 117,
+  SPKI_KW_TAG = 119,
+  SPKI_KW_TIME = 121,
+  SPKI_KW_SHA256 = 129,  // recognised, but without a row of its own
+  SPKI_KW_VALID = 0x10003,
+};
+
+struct spki_keyword_entry {
+  uint32_t length;
+  char name[24];
+};
+
+int32_t spki_keyword_id(const unsigned char* data, size_t length);
+const spki_keyword_entry* spki_keyword_row(int32_t id);
+
+// ---- Comparison of byte strings ----
+
+// 0 equal, 1 the first is less, 2 the first is greater, 3 a null argument.
+enum spki_order : int {
+  SPKI_ORDER_EQUAL = 0,
+  SPKI_ORDER_LESS = 1,
+  SPKI_ORDER_GREATER = 2,
+  SPKI_ORDER_NONE = 3
+};
+
+int spki_cmp_cstr(const unsigned char* data, size_t length, const char* text);
+int spki_cmp_bytes(const unsigned char* a, size_t a_length, const unsigned char* b,
+                   size_t b_length);
+int spki_cmp_padded(const unsigned char* a, size_t a_length, const unsigned char* b,
+                    size_t b_length, unsigned char pad);
+// Same hint and equal by spki_cmp_bytes. Null equals null only.
+bool spki_atom_equal(const spki_atom* a, const spki_atom* b);
+// Whether two chains have the same canonical bytes. Null equals null only.
+bool spki_chain_equal(const spki_elem* a, const spki_elem* b);
+
+// ---- Canonical text ----
+
+struct spki_input {
+  const unsigned char* start;
+  const unsigned char* position;
+  const unsigned char* end;
+};
+
+spki_status spki_parse_list(spki_engine* engine, spki_elem** slot, spki_input* input);
+spki_status spki_parse_atom(spki_engine* engine, spki_atom** slot, spki_input* input);
+spki_status spki_parse_length(uint32_t* length, spki_input* input);
+
+// Feeds the canonical form of a chain to up to two digests (either may be null).
+struct spki_digest;  // src/engine/digest.h
+spki_status spki_write_canonical(spki_engine* engine, const spki_elem* chain, spki_digest* first,
+                                 spki_digest* second);
+
+// Folds a crypto result into an engine code; every unlisted value is success, deliberately.
+spki_status spki_map_crypto_status(int status);
+
+}  // namespace ZvVesk2::Engine
+
+#endif  // VESK2_SRC_ENGINE_MODEL_H

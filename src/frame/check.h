@@ -1,0 +1,38 @@
+// Propagation of error codes. Every operation of the library returns an int code, 0 for success;
+// these two helpers and a plain `return code` are the only ways a failure travels.
+#ifndef VESK2_SRC_FRAME_CHECK_H
+#define VESK2_SRC_FRAME_CHECK_H
+
+#include <new>
+#include <utility>
+
+#include <vesk2.h>
+
+// Returns the code of `expression` from the enclosing function unless it is 0.
+#define VESK2_TRY(expression)                                               \
+  do {                                                                      \
+    if (const int vesk2_code = (expression); vesk2_code) return vesk2_code; \
+  } while (false)
+
+// Returns `code` from the enclosing function unless `condition` holds.
+#define VESK2_REQUIRE(condition, code) \
+  do {                                 \
+    if (!(condition)) return (code);   \
+  } while (false)
+
+namespace ZvVesk2 {
+
+// The library is built without exceptions: memory that cannot be had is a null pointer, tested
+// where it is asked for.
+template <typename T, typename... Args>
+[[nodiscard]] T* TryNew(Args&&... args) {
+  return new (std::nothrow) T(std::forward<Args>(args)...);
+}
+template <typename T>
+[[nodiscard]] T* TryNewArray(std::size_t count) {
+  return new (std::nothrow) T[count];
+}
+
+}  // namespace ZvVesk2
+
+#endif  // VESK2_SRC_FRAME_CHECK_H

@@ -1,0 +1,84 @@
+// Hashes, keys and signature checks over libcrypto's EVP interfaces: the functions of the crypto
+// layer that callers of the library do not need. The others are in vesk2/platform.h.
+//
+// Results are the ZVCLM_* codes only: the engine's mapping reads any other value as success.
+#ifndef VESK2_SRC_PLATFORM_CRYPTO_H
+#define VESK2_SRC_PLATFORM_CRYPTO_H
+
+#include <cstddef>
+#include <cstdint>
+#include <cstring>
+
+#include <vesk2/platform.h>
+
+// A running hash. Small updates are gathered in `block`, inline, so that callers may feed single
+// bytes at the speed of libcrypto over whole blocks. (Opaque to callers of the library.)
+struct ZVCLMHashContextData {
+  static constexpr size_t kBlock = 16384;
+  size_t fill = 0;
+  void* digest = nullptr;  // libcrypto's state
+  unsigned char block[kBlock];
+};
+
+// Eight words; the caller sets `size` to 32 before the call. Word 6 is the digest's length in
+// bytes.
+struct ZVCLMHashInfo {
+  uint32_t size;
+  uint32_t reserved[5];
+  uint32_t digestLength;
+  uint32_t reserved7;
+};
+
+// Signature schemes and export formats.
+enum : int { ZVCLM_SCHEME_DSA = 1, ZVCLM_SCHEME_RSA_PKCS1 = 2, ZVCLM_SCHEME_RSA_PSS = 4 };
+enum : int { ZVCLM_FORMAT_X509 = 0, ZVCLM_FORMAT_SSH = 3 };
+
+// Parameters of a signature check, as words; word 3 of the RSA record is the hash algorithm.
+struct ZVCLMRSAParameters {
+  uint32_t words[10];
+};
+struct ZVCLMDSAParameters {
+  uint32_t words[5];
+};
+
+extern "C" {
+
+// zvclm_HashAlloc starts a hash in *context, which must be null. 0, ZVCLM_ERR_NULL_PARAM,
+// ZVCLM_ERR_UNKNOWN_HASH or ZVCLM_ERR_NO_MEM.
+int zvclm_HashAlloc(ZVCLMHashContextData** context, ZvclmHashID id, uint32_t handle);
+int zvclm_HashInfo(ZvclmHashID id, ZVCLMHashInfo* info);
+// Writes the digest; the context can then only be freed.
+int zvclm_HashFinal(ZVCLMHashContextData* context, unsigned char* digest, uint32_t handle);
+void zvclm_HashFree(ZVCLMHashContextData* context, uint32_t handle);
+int zvclm_HashUpdateSlow(ZVCLMHashContextData* context, const unsigned char* data, size_t length);
+
+// zvclm_PublicKeyExport writes the key as DER SubjectPublicKeyInfo (format 0) or as a binary SSH
+// key blob (format 3) into *length bytes at `out`, and sets *length. With a null `out` it only sets
+// *length and returns ZVCLM_ERR_BUFFER_TOO_SMALL. *length is left alone on any other failure.
+int zvclm_PublicKeyExport(const ZVCLMPublicKeyData* key, int format, uint32_t parameters,
+                          unsigned char* out, uint32_t* length, uint32_t handle);
+
+// zvclm_PublicKeyVerifySignature checks `signature` over `digest`. *valid is 0 from the start and 1
+// only for a good signature; a malformed one, or a key outside the limits, is 0 with *valid 0.
+// Returns other codes only for null arguments and lack of memory. `parameters` is the record of the
+// scheme. A DSA signature is r and s, in two equal halves of q's length.
+int zvclm_PublicKeyVerifySignature(const ZVCLMPublicKeyData* key, int scheme,
+                                   const void* parameters, const unsigned char* digest,
+                                   uint32_t digestLength, const unsigned char* signature,
+                                   uint32_t signatureLength, int* valid, uint32_t handle);
+
+}  // extern "C"
+
+// zvclm_HashUpdate feeds `length` bytes. 0, ZVCLM_ERR_NULL_PARAM or ZVCLM_ERR_FAILURE.
+inline int zvclm_HashUpdate(ZVCLMHashContextData* context, const unsigned char* data, size_t length,
+                            uint32_t /*handle*/) {
+  if (context != nullptr && data != nullptr &&
+      length <= ZVCLMHashContextData::kBlock - context->fill) [[likely]] {
+    std::memcpy(context->block + context->fill, data, length);
+    context->fill += length;
+    return 0;
+  }
+  return zvclm_HashUpdateSlow(context, data, length);
+}
+
+#endif  // VESK2_SRC_PLATFORM_CRYPTO_H

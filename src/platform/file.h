@@ -1,0 +1,98 @@
+// Files and directories over POSIX. Only regular files are opened for reading: a FIFO, socket or
+// device in a tree that is being judged must neither block nor feed us without end.
+#ifndef VESK2_SRC_PLATFORM_FILE_H
+#define VESK2_SRC_PLATFORM_FILE_H
+
+#include <sys/stat.h>
+
+#include <cstddef>
+#include <cstdint>
+#include <cstdio>
+#include <cstring>
+
+#include <vesk2/platform.h>
+
+namespace ZVsysutil {
+
+// A file opened by zv_open. Readers copy out of `block`; writers go through the stream.
+struct ZvFile {
+  const unsigned char* next = nullptr;  // unread bytes of `block`
+  const unsigned char* end = nullptr;
+  unsigned char* block = nullptr;
+  int fd = -1;
+  bool failed = false;     // a read error happened
+  FILE* stream = nullptr;  // writing only
+  struct stat opened {};   // reading only: the file as it was when it was opened
+};
+
+enum ZvOpenMode : int { ZV_WRITE = 1, ZV_READ = 2 };
+
+// zv_open opens for writing (create or truncate) or for reading. Null for a null path, for anything
+// but a regular file, and on failure.
+ZvFile* zv_open(const char* path, int mode);
+// zv_create_new opens for writing a file that must not exist yet and is no link. Null on failure.
+ZvFile* zv_create_new(const char* path);
+// zv_close closes, flushing first. 0, or VESK2_ERR_WRITE_FILE when written bytes could not be kept.
+int zv_close(ZvFile* file);
+// zv_sync flushes a written file down to the disk. 0 or VESK2_ERR_WRITE_FILE.
+int zv_sync(ZvFile* file);
+// The stream behind a file opened for writing, for PrintCanonical.
+inline FILE* zv_stream(ZvFile* file) { return file->stream; }
+
+// zv_read copies up to `length` bytes and returns how many; 0 at the end and on an error, which
+// zv_failed then tells. Small reads stay inline: callers ask for as little as 4 bytes a call.
+size_t zv_read_slow(ZvFile* file, unsigned char* out, size_t length);
+inline size_t zv_read(ZvFile* file, unsigned char* out, size_t length) {
+  if (static_cast<size_t>(file->end - file->next) >= length) [[likely]] {
+    std::memcpy(out, file->next, length);
+    file->next += length;
+    return length;
+  }
+  return zv_read_slow(file, out, length);
+}
+inline bool zv_failed(const ZvFile* file) { return file->failed; }
+// Whether a file opened for reading is still the one that was opened: same inode, size and time.
+bool zv_unchanged(const ZvFile* file);
+
+// zv_write writes to a stream and returns the bytes written (short on an error).
+size_t zv_write(FILE* stream, const void* data, size_t length);
+
+// zv_stat fills *out, following links. 0, or VESK2_ERR_STAT_FILE.
+int zv_stat(const char* path, struct stat* out);
+// zv_mkdir makes one directory (mode `mode` less the umask). 0 when it is there already, else
+// VESK2_ERR_CREATE_DIR.
+int zv_mkdir(const char* path, mode_t mode = 0777);
+
+// ZvDir reads the names of a directory that match a pattern ("*" or "*.ext"), sorted bytewise,
+// never
+// "." or "..". The order decides which store file is found first, so it must not depend on the
+// disk.
+class ZvDir {
+ public:
+  ZvDir() = default;
+  ~ZvDir() { close(); }
+  ZvDir(const ZvDir&) = delete;
+  ZvDir& operator=(const ZvDir&) = delete;
+
+  // 0; VESK2_ERR_FIND_DIR for a null, absent or unreadable directory; VESK2_ERR_MEM_ALLOC.
+  int open(const char* directory, const char* pattern);
+  // The next name (or "directory/name" with fullPath), borrowed until the next call; null at the
+  // end or when memory runs out (see failed()).
+  const char* read(bool fullPath);
+  void close();
+  // Whether the last null of read() was for lack of memory.
+  bool failed() const { return failed_; }
+
+ private:
+  char* directory_ = nullptr;
+  char** names_ = nullptr;
+  size_t count_ = 0;
+  size_t capacity_ = 0;
+  size_t cursor_ = 0;
+  char* path_ = nullptr;
+  bool failed_ = false;
+};
+
+}  // namespace ZVsysutil
+
+#endif  // VESK2_SRC_PLATFORM_FILE_H
