@@ -1,0 +1,33 @@
+// A running hash that canonical text is fed to piece by piece: principals and names are known by
+// the digests of their canonical forms.
+#ifndef VESK2_SRC_ENGINE_DIGEST_H
+#define VESK2_SRC_ENGINE_DIGEST_H
+
+#include "src/engine/model.h"
+#include "src/platform/crypto.h"
+
+namespace ZvVesk2::Engine {
+
+// Digests are kept in 32 bytes; a shorter one is padded with zeros.
+inline constexpr size_t kSpkiDigestSize = 32;
+
+struct spki_digest {
+  ZVCLMHashContextData* context = nullptr;
+  uint32_t handle = 0;
+
+  spki_digest() = default;
+  spki_digest(const spki_digest&) = delete;
+  spki_digest& operator=(const spki_digest&) = delete;
+  ~spki_digest();
+};
+
+// Starts a hash with the engine's provider; `digest` is fresh.
+spki_status spki_digest_start(spki_engine* engine, spki_digest* digest, ZvclmHashID id);
+// Feeds one piece; a null digest, a null piece and an empty one are skipped.
+spki_status spki_digest_update(spki_digest* digest, const void* data, size_t length);
+// Writes the digest, zero-padded. Nothing more can be fed.
+spki_status spki_digest_finish(spki_digest* digest, unsigned char (&out)[kSpkiDigestSize]);
+
+}  // namespace ZvVesk2::Engine
+
+#endif  // VESK2_SRC_ENGINE_DIGEST_H
