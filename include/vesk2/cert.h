@@ -12,6 +12,8 @@
 #include <vesk2/subject.h>
 #include <vesk2/time_stamp.h>
 
+#include <cstddef>
+
 namespace ZvVesk2 {
 
 class AclEntry;
@@ -27,6 +29,8 @@ class VESK2_API Cert : public SExpression {
   };
 
   explicit Cert(Vesk2ContextStruct* context);
+  // No context. (A bare nullptr would not tell the other two constructors apart.)
+  explicit Cert(std::nullptr_t) : Cert(static_cast<Vesk2ContextStruct*>(nullptr)) {}
   // A certificate view of a trust root: the fields borrow the entry's objects and no list is built.
   // The entry must outlive it.
   explicit Cert(AclEntry* entry);

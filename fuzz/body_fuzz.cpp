@@ -1,0 +1,17 @@
+// The manifest body: parsed, and compared with itself, every entry must come out valid.
+#include "fuzz/fuzz_support.h"
+
+using namespace ZvVesk2;
+using namespace vesk2fuzz;
+
+extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
+  const std::string text(reinterpret_cast<const char*>(data), size);
+  BodyDirectory root(nullptr);
+  const int parsed = root.ParseBody(Wrap(text).get(), nullptr);
+  Manifest manifest(nullptr);
+  const int compared = manifest.Compare(Wrap(text).get(), Wrap(text).get());
+  FUZZ_CHECK((parsed == 0) == (compared == 0));
+  FUZZ_CHECK(manifest.GetInvalid() == nullptr && manifest.GetMissing() == nullptr &&
+             manifest.GetExtra() == nullptr);
+  return 0;
+}
