@@ -1,0 +1,42 @@
+// Keys and signatures for tests, made by libcrypto alone.
+#ifndef VESK2_TESTS_SUPPORT_TEST_KEY_H
+#define VESK2_TESTS_SUPPORT_TEST_KEY_H
+
+#include <memory>
+#include <string>
+
+#include <openssl/evp.h>
+
+namespace vesk2test {
+
+class TestKey {
+ public:
+  // RSA-2048 and DSA-1024 (q of 160 bits) keys, made once a process for each index.
+  static const TestKey& Rsa(unsigned index);
+  static const TestKey& Dsa(unsigned index);
+
+  // The canonical public key.
+  std::string Public() const;
+  // The canonical signature over the bytes of `canonicalObject`. Null stands for "rsa-1.5" and
+  // "sha256", or "dsa-sha1" and "sha1" for a DSA key. `hash` names the hash element; a DSA value is
+  // over SHA-1 whatever it says.
+  std::string Sign(const std::string& canonicalObject, const char* algorithm = nullptr,
+                   const char* hash = nullptr) const;
+  // The raw signature bytes over a digest made by `hash`; r and s (20 bytes each) for DSA.
+  std::string SignDigest(const std::string& digest, const char* algorithm, const char* hash) const;
+  std::string PrivatePem() const;
+  EVP_PKEY* Pkey() const { return key_.get(); }
+
+ private:
+  struct Delete {
+    void operator()(EVP_PKEY* key) const { EVP_PKEY_free(key); }
+  };
+  explicit TestKey(EVP_PKEY* key) : key_(key) {}
+  bool IsDsa() const { return EVP_PKEY_is_a(key_.get(), "DSA") == 1; }
+
+  std::unique_ptr<EVP_PKEY, Delete> key_;
+};
+
+}  // namespace vesk2test
+
+#endif  // VESK2_TESTS_SUPPORT_TEST_KEY_H
