@@ -9,6 +9,7 @@
 #include <cstdint>
 #include <cstdio>
 #include <cstring>
+#include <memory>
 
 #include <vesk2/platform.h>
 
@@ -20,6 +21,7 @@ struct ZvFile {
   const unsigned char* end = nullptr;
   unsigned char* block = nullptr;
   int fd = -1;
+  uint64_t taken = 0;      // bytes read from the file so far
   bool failed = false;     // a read error happened
   FILE* stream = nullptr;  // writing only
   struct stat opened {};   // reading only: the file as it was when it was opened
@@ -34,13 +36,19 @@ ZvFile* zv_open(const char* path, int mode);
 ZvFile* zv_create_new(const char* path);
 // zv_close closes, flushing first. 0, or VESK2_ERR_WRITE_FILE when written bytes could not be kept.
 int zv_close(ZvFile* file);
+struct ZvFileCloser {
+  void operator()(ZvFile* file) const { zv_close(file); }
+};
+// Owns an open file on the paths where the result of closing does not matter.
+using ZvFileOwner = std::unique_ptr<ZvFile, ZvFileCloser>;
 // zv_sync flushes a written file down to the disk. 0 or VESK2_ERR_WRITE_FILE.
 int zv_sync(ZvFile* file);
 // The stream behind a file opened for writing, for PrintCanonical.
 inline FILE* zv_stream(ZvFile* file) { return file->stream; }
 
 // zv_read copies up to `length` bytes and returns how many; 0 at the end and on an error, which
-// zv_failed then tells. Small reads stay inline: callers ask for as little as 4 bytes a call.
+// zv_failed then tells. A file that yields more bytes than it held when it was opened is an error:
+// it could grow as fast as we read. Small reads stay inline: callers ask for as little as 4 bytes.
 size_t zv_read_slow(ZvFile* file, unsigned char* out, size_t length);
 inline size_t zv_read(ZvFile* file, unsigned char* out, size_t length) {
   if (static_cast<size_t>(file->end - file->next) >= length) [[likely]] {
@@ -64,9 +72,8 @@ int zv_stat(const char* path, struct stat* out);
 int zv_mkdir(const char* path, mode_t mode = 0777);
 
 // ZvDir reads the names of a directory that match a pattern ("*" or "*.ext"), sorted bytewise,
-// never
-// "." or "..". The order decides which store file is found first, so it must not depend on the
-// disk.
+// never "." or "..". The order decides which store file is found first, so it must not depend on
+// the disk.
 class ZvDir {
  public:
   ZvDir() = default;
@@ -84,6 +91,9 @@ class ZvDir {
   bool failed() const { return failed_; }
 
  private:
+  int Load(const char* directory, const char* pattern);
+  int Add(const char* name);
+
   char* directory_ = nullptr;
   char** names_ = nullptr;
   size_t count_ = 0;

@@ -1,0 +1,75 @@
+// ZvBuffer: the one bounded cursor that every reader of canonical text is built on. Nothing else
+// moves a read position.
+#include <algorithm>
+#include <cstring>
+#include <memory>
+#include <new>
+#include <string_view>
+
+#include <vesk2/limits.h>
+#include <vesk2/platform.h>
+
+#include "src/platform/file.h"
+
+namespace ZVsysutil {
+
+ZvBuffer::~ZvBuffer() { delete[] data_; }
+
+bool ZvBuffer::LooksAt(const char* text) const {
+  const std::string_view wanted = text;
+  return Remaining() >= wanted.size() && std::memcmp(Data(), wanted.data(), wanted.size()) == 0;
+}
+
+bool ZvBuffer::Accept(const char* text) {
+  if (!LooksAt(text)) return false;
+  position_ += std::strlen(text);
+  return true;
+}
+
+int ZvBuffer::Expect(const char* text) { return Accept(text) ? 0 : VESK2_ERR_PARSE_FILE; }
+
+int ZvBuffer::Peek() const { return Remaining() > 0 ? data_[position_] : -1; }
+int ZvBuffer::Next() { return Remaining() > 0 ? data_[position_++] : -1; }
+
+size_t ZvBuffer::Read(void* out, size_t length) {
+  const unsigned char* const from = Data();
+  const size_t count = Skip(length);
+  if (count > 0) std::memcpy(out, from, count);
+  return count;
+}
+
+size_t ZvBuffer::Skip(size_t length) {
+  const size_t count = std::min(length, Remaining());
+  position_ += count;
+  return count;
+}
+
+ZvBuffer* zv_buffer_wrap(const void* data, size_t size) {
+  if (data == nullptr && size > 0) return nullptr;
+  std::unique_ptr<unsigned char[]> copy(new (std::nothrow) unsigned char[size]);
+  if (copy == nullptr) return nullptr;
+  if (size > 0) std::memcpy(copy.get(), data, size);
+  ZvBuffer* buffer = new (std::nothrow) ZvBuffer(copy.get(), size);
+  if (buffer != nullptr) copy.release();
+  return buffer;
+}
+
+// The bytes are read, not mapped: a file that shrinks under a map kills the process that reads it.
+ZvBuffer* zv_buffer_wrap_file(const char* path) {
+  const ZvFileOwner file(zv_open(path, ZV_READ));
+  if (file == nullptr) return nullptr;
+  const auto size = static_cast<uint64_t>(file->opened.st_size);
+  if (size > ZvVesk2::Limits::kMaxFile) return nullptr;
+  std::unique_ptr<unsigned char[]> bytes(new (std::nothrow) unsigned char[size]);
+  if (bytes == nullptr) return nullptr;
+  if (zv_read(file.get(), bytes.get(), size) != size) return nullptr;
+  unsigned char more = 0;
+  if (zv_read(file.get(), &more, 1) != 0 || zv_failed(file.get())) return nullptr;
+  ZvBuffer* buffer = new (std::nothrow) ZvBuffer(bytes.get(), size);
+  if (buffer != nullptr) bytes.release();
+  return buffer;
+}
+
+void zv_buffer_free(ZvBuffer* buffer) { delete buffer; }
+
+}  // namespace ZVsysutil

@@ -1,0 +1,96 @@
+// ZvDir: the names of one directory, all read and sorted when it is opened.
+#include <dirent.h>
+#include <cerrno>
+#include <cstring>
+#include <memory>
+#include <new>
+#include <string_view>
+
+#include "src/platform/file.h"
+#include "src/platform/text.h"
+
+namespace ZVsysutil {
+namespace {
+
+struct DirCloser {
+  void operator()(DIR* dir) const { closedir(dir); }
+};
+
+// "*" and what follows it: a suffix. Anything else is a name.
+bool Matches(std::string_view pattern, std::string_view name) {
+  if (name == "." || name == "..") return false;
+  if (!pattern.starts_with('*')) return name == pattern;
+  return name.ends_with(pattern.substr(1));
+}
+
+int CompareNames(const void* a, const void* b) {
+  return std::strcmp(*static_cast<char* const*>(a), *static_cast<char* const*>(b));
+}
+
+}  // namespace
+
+int ZvDir::open(const char* directory, const char* pattern) {
+  close();
+  const int code = Load(directory, pattern);
+  if (code != 0) close();
+  return code;
+}
+
+int ZvDir::Load(const char* directory, const char* pattern) {
+  if (directory == nullptr || pattern == nullptr) return VESK2_ERR_FIND_DIR;
+  const std::unique_ptr<DIR, DirCloser> dir(opendir(directory));
+  if (dir == nullptr) return VESK2_ERR_FIND_DIR;
+  directory_ = zv_fstrdup(directory);
+  if (directory_ == nullptr) return VESK2_ERR_MEM_ALLOC;
+  errno = 0;
+  while (const dirent* entry = readdir(dir.get())) {
+    if (Matches(pattern, entry->d_name)) {
+      if (const int code = Add(entry->d_name)) return code;
+    }
+    errno = 0;
+  }
+  if (errno != 0) return VESK2_ERR_FIND_DIR;  // a list cut short would hide files
+  zv_sort(names_, count_, sizeof(char*), CompareNames);
+  return 0;
+}
+
+int ZvDir::Add(const char* name) {
+  if (count_ == capacity_) {
+    const size_t larger = capacity_ > 0 ? 2 * capacity_ : 32;
+    char** names = new (std::nothrow) char*[larger];
+    if (names == nullptr) return VESK2_ERR_MEM_ALLOC;
+    if (count_ > 0) std::memcpy(names, names_, count_ * sizeof(char*));
+    delete[] names_;
+    names_ = names;
+    capacity_ = larger;
+  }
+  char* copy = zv_fstrdup(name);
+  if (copy == nullptr) return VESK2_ERR_MEM_ALLOC;
+  names_[count_++] = copy;
+  return 0;
+}
+
+const char* ZvDir::read(bool fullPath) {
+  failed_ = false;
+  if (cursor_ == count_) return nullptr;
+  const char* name = names_[cursor_++];
+  if (!fullPath) return name;
+  delete[] path_;
+  path_ = zv_concat_path(directory_, name);
+  failed_ = path_ == nullptr;
+  return path_;
+}
+
+void ZvDir::close() {
+  for (size_t i = 0; i < count_; ++i) delete[] names_[i];
+  delete[] names_;
+  delete[] directory_;
+  delete[] path_;
+  names_ = nullptr;
+  directory_ = nullptr;
+  path_ = nullptr;
+  count_ = capacity_ = cursor_ = 0;
+  failed_ = false;
+}
+
+}  // namespace ZVsysutil
