@@ -11,12 +11,15 @@
 
 #include <vesk2/platform.h>
 
+struct evp_md_ctx_st;
+
 // A running hash. Small updates are gathered in `block`, inline, so that callers may feed single
-// bytes at the speed of libcrypto over whole blocks. (Opaque to callers of the library.)
+// bytes at nearly the speed of libcrypto over whole blocks. (Opaque to callers of the library.)
 struct ZVCLMHashContextData {
   static constexpr size_t kBlock = 16384;
-  size_t fill = 0;
-  void* digest = nullptr;  // libcrypto's state
+  unsigned char* next = block;  // where the next byte goes
+  unsigned char* end = block + kBlock;
+  evp_md_ctx_st* digest = nullptr;  // libcrypto's state
   unsigned char block[kBlock];
 };
 
@@ -73,9 +76,9 @@ int zvclm_PublicKeyVerifySignature(const ZVCLMPublicKeyData* key, int scheme,
 inline int zvclm_HashUpdate(ZVCLMHashContextData* context, const unsigned char* data, size_t length,
                             uint32_t /*handle*/) {
   if (context != nullptr && data != nullptr &&
-      length <= ZVCLMHashContextData::kBlock - context->fill) [[likely]] {
-    std::memcpy(context->block + context->fill, data, length);
-    context->fill += length;
+      static_cast<size_t>(context->end - context->next) >= length) [[likely]] {
+    std::memcpy(context->next, data, length);
+    context->next += length;
     return 0;
   }
   return zvclm_HashUpdateSlow(context, data, length);

@@ -1,0 +1,39 @@
+// Owners of libcrypto's objects, and what the files over libcrypto share.
+#ifndef VESK2_SRC_PLATFORM_OPENSSL_H
+#define VESK2_SRC_PLATFORM_OPENSSL_H
+
+#include <openssl/err.h>
+
+#include <cstdint>
+#include <memory>
+
+namespace ZVsysutil {
+
+template <auto Free>
+struct EvpDeleter {
+  template <typename T>
+  void operator()(T* object) const {
+    Free(object);
+  }
+};
+// An owned libcrypto object with the function that frees it: Evp<EVP_PKEY, EVP_PKEY_free>.
+template <typename T, auto Free>
+using Evp = std::unique_ptr<T, EvpDeleter<Free>>;
+
+// Takes back the entries that a failing call left in libcrypto's error queue, and only those: the
+// queue belongs to the thread, and the caller may be reading it.
+class ErrorMark {
+ public:
+  ErrorMark() { ERR_set_mark(); }
+  ~ErrorMark() { ERR_pop_to_mark(); }
+  ErrorMark(const ErrorMark&) = delete;
+  ErrorMark& operator=(const ErrorMark&) = delete;
+};
+
+// libcrypto's name of a ZvclmHashID, null for an unknown one, and the bytes of its digests, 0.
+const char* HashName(int64_t id);
+uint32_t HashLength(int64_t id);
+
+}  // namespace ZVsysutil
+
+#endif  // VESK2_SRC_PLATFORM_OPENSSL_H
