@@ -64,7 +64,7 @@ int zvclm_PublicKeyExport(const ZVCLMPublicKeyData* key, int format, uint32_t pa
 // zvclm_PublicKeyVerifySignature checks `signature` over `digest`. *valid is 0 from the start and 1
 // only for a good signature; a malformed one, or a key outside the limits, is 0 with *valid 0.
 // Returns other codes only for null arguments and lack of memory. `parameters` is the record of the
-// scheme. A DSA signature is r and s, in two equal halves of q's length.
+// scheme. A DSA signature is over a SHA-1 digest: r and s, in two equal halves of q's length.
 int zvclm_PublicKeyVerifySignature(const ZVCLMPublicKeyData* key, int scheme,
                                    const void* parameters, const unsigned char* digest,
                                    uint32_t digestLength, const unsigned char* signature,

@@ -1,0 +1,167 @@
+// Key records and keys. Both kinds go the same road: a record is a row of numbers behind two marks.
+#include "src/platform/key.h"
+
+#include <openssl/core_names.h>
+#include <openssl/crypto.h>
+#include <openssl/param_build.h>
+#include <new>
+#include <span>
+
+using namespace ZVsysutil;
+
+namespace {
+
+// The marks that callers put into, and expect in, the size words of the records.
+constexpr uint32_t kRsaMark = 20;
+constexpr uint32_t kDsaMark = 60;
+constexpr uint32_t kDsaParameterMark = 48;
+
+// The changeable fields of a record, in the order of a key's numbers.
+struct Fields {
+  std::span<ZVCLMBigInt** const> used() const { return {numbers.data(), count}; }
+
+  int type = -1;
+  size_t count = 0;
+  uint32_t* keyLength = nullptr;
+  std::array<ZVCLMBigInt**, ZVCLMPublicKeyData::kMaxNumbers> numbers{};
+};
+
+Fields FieldsOf(ZVCLMRSAKeyData* record) {
+  return {ZVCLM_KEY_RSA, 2, &record->keyLength, {&record->n, &record->e}};
+}
+
+Fields FieldsOf(ZVCLMDSSKeyData* record) {
+  return {ZVCLM_KEY_DSA, 4, &record->keyLength, {&record->p, &record->q, &record->g, &record->y}};
+}
+
+// The fields of an initialised record of `id`; no fields for anything else.
+Fields FieldsOf(int id, void* record) {
+  if (id == ZVCLM_DATA_RSA) {
+    auto* rsa = static_cast<ZVCLMRSAKeyData*>(record);
+    if (rsa->size == kRsaMark) return FieldsOf(rsa);
+  }
+  if (id == ZVCLM_DATA_DSA) {
+    auto* dsa = static_cast<ZVCLMDSSKeyData*>(record);
+    if (dsa->size == kDsaMark && dsa->parameterSize == kDsaParameterMark) return FieldsOf(dsa);
+  }
+  return {};
+}
+
+int Zeroize(int id, void* record) {
+  if (record == nullptr) return ZVCLM_ERR_NULL_PARAM;
+  const Fields fields = FieldsOf(id, record);
+  if (fields.count == 0) return ZVCLM_ERR_KEY_TYPE;
+  for (ZVCLMBigInt** number : fields.used()) {
+    delete *number;
+    *number = nullptr;
+  }
+  OPENSSL_cleanse(fields.keyLength, sizeof *fields.keyLength);
+  return 0;
+}
+
+ZVCLMBigInt* CopyNumber(const BIGNUM* number) {
+  std::unique_ptr<ZVCLMBigInt> copy(new (std::nothrow) ZVCLMBigInt);
+  if (copy == nullptr) return nullptr;
+  copy->value.reset(BN_dup(number));
+  return copy->value != nullptr ? copy.release() : nullptr;
+}
+
+bool PushNumbers(OSSL_PARAM_BLD* builder, const ZVCLMPublicKeyData& key) {
+  static constexpr const char* kRsaNames[] = {OSSL_PKEY_PARAM_RSA_N, OSSL_PKEY_PARAM_RSA_E};
+  static constexpr const char* kDsaNames[] = {OSSL_PKEY_PARAM_FFC_P, OSSL_PKEY_PARAM_FFC_Q,
+                                              OSSL_PKEY_PARAM_FFC_G, OSSL_PKEY_PARAM_PUB_KEY};
+  const std::span<const char* const> names =
+      key.type == ZVCLM_KEY_RSA ? std::span<const char* const>(kRsaNames) : kDsaNames;
+  for (size_t i = 0; i < names.size(); ++i) {
+    if (OSSL_PARAM_BLD_push_BN(builder, names[i], key.number(i)) != 1) return false;
+  }
+  return true;
+}
+
+}  // namespace
+
+namespace ZVsysutil {
+
+PkeyOwner MakePkey(const ZVCLMPublicKeyData& key) {
+  const Evp<OSSL_PARAM_BLD, OSSL_PARAM_BLD_free> builder(OSSL_PARAM_BLD_new());
+  if (builder == nullptr || !PushNumbers(builder.get(), key)) return nullptr;
+  const Evp<OSSL_PARAM, OSSL_PARAM_free> numbers(OSSL_PARAM_BLD_to_param(builder.get()));
+  const char* name = key.type == ZVCLM_KEY_RSA ? "RSA" : "DSA";
+  const Evp<EVP_PKEY_CTX, EVP_PKEY_CTX_free> context(
+      EVP_PKEY_CTX_new_from_name(nullptr, name, nullptr));
+  if (numbers == nullptr || context == nullptr) return nullptr;
+  EVP_PKEY* made = nullptr;
+  if (EVP_PKEY_fromdata_init(context.get()) != 1 ||
+      EVP_PKEY_fromdata(context.get(), &made, EVP_PKEY_PUBLIC_KEY, numbers.get()) != 1) {
+    return nullptr;
+  }
+  return PkeyOwner(made);
+}
+
+}  // namespace ZVsysutil
+
+int zvclm_RSAKeyStructInit(int id, ZVCLMRSAKeyData* record) {
+  if (record == nullptr) return ZVCLM_ERR_NULL_PARAM;
+  if (id != ZVCLM_DATA_RSA) return ZVCLM_ERR_KEY_TYPE;
+  *record = {};
+  record->size = kRsaMark;
+  return 0;
+}
+
+int zvclm_DSSKeyStructInit(int id, ZVCLMDSSKeyData* record, uint32_t parameterSize) {
+  if (record == nullptr) return ZVCLM_ERR_NULL_PARAM;
+  if (id != ZVCLM_DATA_DSA || parameterSize != kDsaParameterMark) return ZVCLM_ERR_KEY_TYPE;
+  *record = {};
+  record->size = kDsaMark;
+  record->parameterSize = kDsaParameterMark;
+  return 0;
+}
+
+int zvclm_RSAKeyStructZeroize(int id, ZVCLMRSAKeyData* record) {
+  return id == ZVCLM_DATA_RSA ? Zeroize(id, record) : ZVCLM_ERR_KEY_TYPE;
+}
+
+int zvclm_DSSKeyStructZeroize(int id, ZVCLMDSSKeyData* record) {
+  return id == ZVCLM_DATA_DSA ? Zeroize(id, record) : ZVCLM_ERR_KEY_TYPE;
+}
+
+int zvclm_PublicKeyDefine(ZVCLMPublicKeyData** key, int type, int id, const void* record,
+                          uint32_t /*parameters*/, uint32_t /*handle*/) {
+  if (key == nullptr || *key != nullptr || record == nullptr) return ZVCLM_ERR_NULL_PARAM;
+  const Fields fields = FieldsOf(id, const_cast<void*>(record));
+  if (fields.count == 0 || fields.type != type) return ZVCLM_ERR_KEY_TYPE;
+  const ErrorMark mark;
+  std::unique_ptr<ZVCLMPublicKeyData> made(new (std::nothrow) ZVCLMPublicKeyData);
+  if (made == nullptr) return ZVCLM_ERR_NO_MEM;
+  made->type = type;
+  for (size_t i = 0; i < fields.count; ++i) {
+    const ZVCLMBigInt* number = *fields.numbers[i];
+    if (number == nullptr) return ZVCLM_ERR_NULL_PARAM;
+    made->numbers[i].reset(BN_dup(number->value.get()));
+    if (made->numbers[i] == nullptr) return ZVCLM_ERR_NO_MEM;
+  }
+  *key = made.release();
+  return 0;
+}
+
+int zvclm_PublicKeyGetData(const ZVCLMPublicKeyData* key, int id, void* record,
+                           uint32_t /*handle*/) {
+  if (key == nullptr || record == nullptr) return ZVCLM_ERR_NULL_PARAM;
+  const Fields fields = FieldsOf(id, record);
+  if (fields.count == 0 || fields.type != key->type) return ZVCLM_ERR_KEY_TYPE;
+  const ErrorMark mark;
+  std::array<std::unique_ptr<ZVCLMBigInt>, ZVCLMPublicKeyData::kMaxNumbers> copies;
+  for (size_t i = 0; i < fields.count; ++i) {
+    copies[i].reset(CopyNumber(key->number(i)));
+    if (copies[i] == nullptr) return ZVCLM_ERR_NO_MEM;
+  }
+  for (size_t i = 0; i < fields.count; ++i) {
+    delete *fields.numbers[i];
+    *fields.numbers[i] = copies[i].release();
+  }
+  // The length of n or of p, each the first of its key's numbers.
+  *fields.keyLength = static_cast<uint32_t>(BN_num_bits(key->number(0)));
+  return 0;
+}
+
+void zvclm_PublicKeyFree(ZVCLMPublicKeyData* key, uint32_t /*handle*/) { delete key; }
