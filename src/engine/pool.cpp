@@ -1,0 +1,106 @@
+// The pool: blocks of the caller's allocator on a ring, and the state's start and stop.
+#include "src/engine/pool.h"
+
+#include <cstring>
+#include <new>
+
+namespace ZvVesk2::Engine {
+namespace {
+
+// What a block costs of the budget of live records: one, and one more for each of these bytes, so
+// that the budget bounds bytes as well.
+constexpr size_t kRecordBytes = 256;
+
+// In front of each block's memory. The cost is kept for spki_free.
+struct Header {
+  spki_block link;
+  size_t cost;
+};
+
+void* Allocate(size_t size, void* pool) {
+  auto* self = static_cast<spki_pool*>(pool);
+  if (size > SIZE_MAX - sizeof(Header)) return nullptr;
+  const spki_allocator* allocator = self->allocator;
+  void* memory = allocator->allocate(sizeof(Header) + size, allocator->user);
+  if (memory == nullptr) return nullptr;
+  std::memset(memory, 0, sizeof(Header) + size);
+  auto* header = new (memory) Header{{self->ring.next, &self->ring}, 1 + size / kRecordBytes};
+  self->ring.next->previous = &header->link;
+  self->ring.next = &header->link;
+  return header + 1;
+}
+
+void Free(void* memory, void* pool) {
+  Header* header = static_cast<Header*>(memory) - 1;
+  header->link.previous->next = header->link.next;
+  header->link.next->previous = header->link.previous;
+  const spki_allocator* allocator = static_cast<spki_pool*>(pool)->allocator;
+  allocator->release(header, allocator->user);
+}
+
+spki_status Create(void* record, const spki_allocator* allocator, void** pool) {
+  // Callers' allocators are their own; a record that a pool cannot live in is refused.
+  if (reinterpret_cast<uintptr_t>(record) % alignof(spki_pool) != 0) return SPKI_ERR_NO_MEM;
+  auto* self = new (record) spki_pool{{nullptr, nullptr}, allocator};
+  self->ring = {&self->ring, &self->ring};
+  *pool = self;
+  return 0;
+}
+
+void Destroy(void* pool) {
+  auto* self = static_cast<spki_pool*>(pool);
+  while (self->ring.next != &self->ring) {
+    Free(reinterpret_cast<Header*>(self->ring.next) + 1, pool);
+  }
+}
+
+}  // namespace
+
+const spki_memory_ops kSpkiMemoryOps = {Allocate, Free, Create, Destroy};
+
+spki_status spki_engine_start(spki_engine* engine, const spki_allocator* allocator) {
+  if (engine == nullptr || allocator == nullptr) return SPKI_ERR_NULL_PARAM;
+  *engine = {};
+  void* record = allocator->allocate(kSpkiPoolRecord, allocator->user);
+  if (record == nullptr) return kSpkiNoPool;
+  const spki_status status = kSpkiMemoryOps.create(record, allocator, &engine->pool);
+  if (status != 0) {
+    allocator->release(record, allocator->user);
+    engine->pool = nullptr;
+  }
+  return status;
+}
+
+void spki_engine_stop(spki_engine* engine, const spki_allocator* allocator) {
+  if (engine == nullptr || allocator == nullptr) return;
+  if (engine->pool != nullptr) {
+    kSpkiMemoryOps.destroy(engine->pool);
+    allocator->release(engine->pool, allocator->user);
+  }
+  *engine = {};
+}
+
+void* spki_allocate(spki_engine* engine, size_t size) {
+  if (engine->budget.spent != 0) return nullptr;
+  const size_t cost = 1 + size / kRecordBytes;
+  void* memory = nullptr;
+  if (cost <= Limits::kMaxRecords - engine->budget.live_records) {
+    memory = kSpkiMemoryOps.allocate(size, engine->pool);
+  }
+  // Whoever asked may have to answer without the record; the failure must not be forgotten, or a
+  // grant could be reported that was only half worked out.
+  if (memory == nullptr) {
+    engine->budget.spent = SPKI_ERR_NO_MEM;
+    return nullptr;
+  }
+  engine->budget.live_records += static_cast<uint32_t>(cost);
+  return memory;
+}
+
+void spki_free(spki_engine* engine, void* memory) {
+  if (memory == nullptr) return;
+  engine->budget.live_records -= static_cast<uint32_t>((static_cast<Header*>(memory) - 1)->cost);
+  kSpkiMemoryOps.free(memory, engine->pool);
+}
+
+}  // namespace ZvVesk2::Engine

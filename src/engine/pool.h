@@ -1,0 +1,36 @@
+// Where the engine's memory comes from: one pool for each engine, made in a record that the
+// caller's allocator gives. Destroying the pool frees whatever is still allocated from it, so no
+// path through the engine can leak.
+#ifndef VESK2_SRC_ENGINE_POOL_H
+#define VESK2_SRC_ENGINE_POOL_H
+
+#include "src/engine/model.h"
+
+namespace ZvVesk2::Engine {
+
+// Links of a ring of blocks. The pool's record is the ring's anchor.
+struct spki_block {
+  spki_block* next;
+  spki_block* previous;
+};
+
+struct spki_pool {
+  spki_block ring;
+  const spki_allocator* allocator;
+};
+// The size that callers' allocators are asked for.
+inline constexpr size_t kSpkiPoolRecord = 24;
+static_assert(sizeof(spki_pool) == kSpkiPoolRecord);
+
+// The memory callbacks, fixed at build time.
+struct spki_memory_ops {
+  void* (*allocate)(size_t size, void* pool);  // zero-filled, or null
+  void (*free)(void* memory, void* pool);
+  spki_status (*create)(void* record, const spki_allocator* allocator, void** pool);
+  void (*destroy)(void* pool);
+};
+extern const spki_memory_ops kSpkiMemoryOps;
+
+}  // namespace ZvVesk2::Engine
+
+#endif  // VESK2_SRC_ENGINE_POOL_H

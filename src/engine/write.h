@@ -1,0 +1,24 @@
+// The canonical form of a chain, given out in pieces. Principals are identified by its digest and
+// results leave the engine in it, so there is one writer for both.
+#ifndef VESK2_SRC_ENGINE_WRITE_H
+#define VESK2_SRC_ENGINE_WRITE_H
+
+#include "src/engine/model.h"
+
+namespace ZvVesk2::Engine {
+
+// Takes one piece; empty pieces are never given. The first failure ends the walk.
+struct spki_sink {
+  virtual spki_status Put(const void* data, size_t length) = 0;
+
+ protected:
+  ~spki_sink() = default;
+};
+
+spki_status spki_write_pieces(const spki_elem* chain, spki_sink* sink);
+// One byte string with its display hint, as it stands in a list.
+spki_status spki_write_atom(const spki_atom* atom, spki_sink* sink);
+
+}  // namespace ZvVesk2::Engine
+
+#endif  // VESK2_SRC_ENGINE_WRITE_H
