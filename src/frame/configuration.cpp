@@ -1,0 +1,25 @@
+// The two store roots. They are process-wide because every object of a process lives in the same
+// stores.
+#include <vesk2/context.h>
+
+#include "src/platform/text.h"
+
+namespace ZvVesk2 {
+
+char VeskConf::home_dir[Limits::kPathBuffer];
+char VeskConf::global_dir[Limits::kPathBuffer];
+
+// A root that is too long is kept cut, as callers read it back; no such path can be opened.
+void VeskConf::SetHomeDirectory(const char* directory) {
+  ZVsysutil::zv_fstrcpy(home_dir, sizeof home_dir, directory);
+}
+
+void VeskConf::SetGlobalDirectory(const char* directory) {
+  ZVsysutil::zv_fstrcpy(global_dir, sizeof global_dir, directory);
+}
+
+const char* VeskConf::GetHomeDirectory() { return home_dir; }
+
+const char* VeskConf::GetGlobalDirectory() { return global_dir; }
+
+}  // namespace ZvVesk2

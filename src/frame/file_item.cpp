@@ -1,0 +1,48 @@
+// Records of file names. Each holds its name in both string forms, because callers of the ASCII
+// functions and of the others read the same lists.
+#include <vesk2/file_item.h>
+
+#include <memory>
+#include <utility>
+
+#include "src/frame/check.h"
+#include "src/platform/text.h"
+
+namespace ZvVesk2 {
+namespace {
+
+constexpr uint32_t kRecordMark = 28;  // what callers test; not the size of the record here
+
+}  // namespace
+
+FileItem* FileItemCreate(char* name, char* nameA) {
+  std::unique_ptr<FileItem> item(TryNew<FileItem>());
+  if (item == nullptr) return nullptr;
+  item->size = kRecordMark;
+  item->name = name;
+  item->nameA = nameA;
+  if (name != nullptr && nameA == nullptr) {
+    item->nameA = ZVsysutil::zv_ftoa(name);
+    if (item->nameA == nullptr) return nullptr;
+  } else if (nameA != nullptr && name == nullptr) {
+    item->name = ZVsysutil::zv_atof(nameA);
+    if (item->name == nullptr) return nullptr;
+  }
+  return item.release();
+}
+
+unsigned int FileItemDelete(FileItem* chain) {
+  unsigned int count = 0;
+  while (chain != nullptr) {
+    const std::unique_ptr<FileItem> item(std::exchange(chain, chain->next));
+    // The ASCII forms go first: they are released by comparing them with the names.
+    ZVsysutil::zv_ftoa_free(item->name, item->nameA);
+    ZVsysutil::zv_ftoa_free(item->name2, item->name2A);
+    delete[] item->name;
+    delete[] item->name2;
+    ++count;
+  }
+  return count;
+}
+
+}  // namespace ZvVesk2
