@@ -13,7 +13,8 @@
 // quoting, so what is written need not read back.
 //
 // Factories are static and take a reference to a null pointer; it is null again after a failure,
-// with everything half-built released. Lists nest at most Limits::kMaxDepth levels in every reader.
+// with everything half-built released. Lists nest at most Limits::kMaxDepth levels in every reader;
+// one that a caller builds deeper can be freed, and is refused by whatever walks it.
 #ifndef VESK2_EXPRESSION_H
 #define VESK2_EXPRESSION_H
 
@@ -49,12 +50,14 @@ class VESK2_API DExpression {
 
  public:
   // UpdateHash feeds the canonical bytes to a running hash, display hints in their short form first
-  // unless `ignoreHints`. Returns 0 or the crypto layer's code (1001 to 1070).
+  // unless `ignoreHints`. Returns 0, the crypto layer's code (1001 to 1070), or
+  // VESK2_ERR_BUFFER_OVERFLOW for lists nested too deeply.
   [[nodiscard]] virtual int UpdateHash(ZVCLMHashContextData* hash, bool ignoreHints) = 0;
-  // CanonicalLength is the number of bytes of the canonical encoding without hints.
+  // CanonicalLength is the number of bytes of the canonical encoding without hints; UINT_MAX when
+  // that is more, and for lists nested too deeply.
   virtual unsigned int CanonicalLength() = 0;
   // AdvancedLength is a buffer size, terminator included, that ExportAdvanced surely fits in; it is
-  // larger than the text.
+  // larger than the text. UINT_MAX as above.
   virtual unsigned int AdvancedLength() = 0;
   // Export appends the canonical encoding, without hints, to `buf` of `size` bytes at `pos`, which
   // moves on. A list needs one byte of room beyond its ")" and does not report its elements'
@@ -68,12 +71,13 @@ class VESK2_API DExpression {
   // PrintAdvanced passes the text, piece by piece, to `write`, whose results are ignored. At depth
   // 0 or below the outermost parentheses are left out. Byte strings print by hint: none, the bytes
   // if all are printable, else nothing; bin nothing; utf-8 the bytes; num the first byte in
-  // decimal. Always 0.
+  // decimal. Always 0; the text ends where lists nest too deeply.
   virtual int PrintAdvanced(int (*write)(const char* text, unsigned int length, void* user),
                             void* user, int depth) = 0;
-  // PrintCanonical writes the canonical encoding with hints to a stream. A short write or flush
-  // gives VESK2_ERR_WRITE_FILE; a null stream VESK2_ERR_PARAM_NULL for a byte string and
-  // VESK2_ERR_INVALID_PARAM for a list.
+  // PrintCanonical writes the canonical encoding with hints to a stream, which a list flushes at
+  // its end. A short write or a failing flush gives VESK2_ERR_WRITE_FILE; a null stream
+  // VESK2_ERR_PARAM_NULL for a byte string and VESK2_ERR_INVALID_PARAM for a list; lists nested too
+  // deeply VESK2_ERR_BUFFER_OVERFLOW.
   [[nodiscard]] virtual int PrintCanonical(FILE* stream) = 0;
   virtual bool IsSExpression() const = 0;
 
@@ -158,7 +162,7 @@ class VESK2_API ByteString : public DExpression {
 
   BsType GetType() const { return type; }
   unsigned int GetLength() const { return length; }
-  // The bytes, not terminated; null while empty.
+  // The bytes, not terminated; null until there were any.
   const unsigned char* GetData() const { return data; }
 
  protected:
@@ -314,7 +318,7 @@ class VESK2_API SExpression : public DExpression {
   // VESK2_ERR_MEM_ALLOC when there is no such path. Set the storage type first.
   [[nodiscard]] int SetFileName(const char* name);
   // CreateFileDirectory makes the object's store directory. VESK2_ERR_FIND_DIR for a storage type
-  // that is none, VESK2_ERR_MEM_ALLOC, VESK2_ERR_CREATE_DIR.
+  // that is none and when the root is not set, VESK2_ERR_MEM_ALLOC, VESK2_ERR_CREATE_DIR.
   [[nodiscard]] int CreateFileDirectory();
   // Export writes the object, with hints, to its file: to SetFileName(name) when a name is given.
   // VESK2_ERR_FILE_OPEN, VESK2_ERR_WRITE_FILE (the file is left as far as it was written) and those

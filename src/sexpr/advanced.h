@@ -1,0 +1,23 @@
+// Steps shared by the readers of the advanced form. The text ends with a 0 byte, which no step
+// passes.
+#ifndef VESK2_SRC_SEXPR_ADVANCED_H
+#define VESK2_SRC_SEXPR_ADVANCED_H
+
+#include "src/frame/check.h"
+#include "src/sexpr/chars.h"
+
+namespace ZvVesk2 {
+
+inline void SkipSpace(const char* text, unsigned& pos) {
+  while (IsSpace(text[pos])) ++pos;
+}
+
+[[nodiscard]] inline int ExpectChar(char wanted, const char* text, unsigned& pos) {
+  VESK2_REQUIRE(text[pos] == wanted, VESK2_ERR_UNEXPECTED_CHAR);
+  ++pos;
+  return 0;
+}
+
+}  // namespace ZvVesk2
+
+#endif  // VESK2_SRC_SEXPR_ADVANCED_H

@@ -1,0 +1,77 @@
+// ByteString, an atom: bytes with a display hint, and the rule by which its array is reused.
+#include <vesk2/expression.h>
+
+#include <cstring>
+#include <memory>
+#include <string_view>
+#include <utility>
+
+#include "src/frame/check.h"
+#include "src/platform/text.h"
+
+namespace ZvVesk2 {
+namespace {
+
+// An array may be this much larger than what it is reused for: an object that is read again mostly
+// gets values of nearly the same length.
+constexpr unsigned kReuseSlack = 8;
+
+bool IsReusable(const unsigned char* data, unsigned length, unsigned wanted) {
+  return data != nullptr && length >= wanted && length - wanted < kReuseSlack;
+}
+
+}  // namespace
+
+ByteString::ByteString(Vesk2ContextStruct* owner) : DExpression(owner) {}
+
+ByteString::ByteString(unsigned char* adopted, unsigned int size, BsType hint,
+                       Vesk2ContextStruct* owner)
+    : DExpression(owner), type(hint), length(adopted != nullptr ? size : 0), data(adopted) {}
+
+ByteString::~ByteString() { delete[] data; }
+
+int ByteString::Set(const unsigned char* bytes, unsigned int size, BsType hint) {
+  VESK2_REQUIRE(bytes != nullptr && size != 0, VESK2_ERR_INVALID_PARAM);
+  VESK2_REQUIRE(size <= Limits::kMaxByteString, VESK2_ERR_MAX_BYTE_STRING);
+  // `bytes` may lie within the array that is replaced, so that one outlives the copy.
+  std::unique_ptr<unsigned char[]> replaced;
+  if (!IsReusable(data, length, size)) replaced.reset(std::exchange(data, nullptr));
+  VESK2_TRY(Reserve(size));
+  std::memmove(data, bytes, size);
+  type = hint;
+  return 0;
+}
+
+int ByteString::Set(const char* text, BsType hint) {
+  VESK2_REQUIRE(text != nullptr, VESK2_ERR_INVALID_PARAM);
+  const size_t size = std::strlen(text);
+  VESK2_REQUIRE(size <= Limits::kMaxByteString, VESK2_ERR_MAX_BYTE_STRING);
+  return Set(reinterpret_cast<const unsigned char*>(text), static_cast<unsigned>(size), hint);
+}
+
+int ByteString::Reserve(unsigned int size) {
+  if (!IsReusable(data, length, size)) {
+    Clear();
+    data = TryNewArray<unsigned char>(size);
+    VESK2_REQUIRE(data != nullptr, VESK2_ERR_MEM_ALLOC);
+  }
+  length = size;
+  return 0;
+}
+
+void ByteString::Clear() {
+  delete[] std::exchange(data, nullptr);
+  length = 0;
+}
+
+bool ByteString::IsEqual(const char* text) const {
+  if (text == nullptr) return false;
+  const std::string_view wanted(text);
+  return wanted.size() == length && (length == 0 || std::memcmp(wanted.data(), data, length) == 0);
+}
+
+char* ByteString::ToString() {
+  return ZVsysutil::zv_atof_copy_n(data != nullptr ? static_cast<const void*>(data) : "", length);
+}
+
+}  // namespace ZvVesk2

@@ -1,0 +1,75 @@
+// The advanced form of a byte string: a bare run of bytes without white space or parentheses. What
+// is written is the bytes as they are, so it need not read back.
+#include <vesk2/expression.h>
+#include <vesk2/ref.h>
+
+#include <algorithm>
+#include <charconv>
+#include <climits>
+#include <cstring>
+
+#include "src/frame/check.h"
+#include "src/sexpr/advanced.h"
+
+namespace ZvVesk2 {
+namespace {
+
+bool EndsToken(char c) { return c == '\0' || c == '(' || c == ')' || IsSpace(c); }
+
+}  // namespace
+
+int ByteString::ParseAdvanced(DExpression*& out, const char* text, unsigned int& pos,
+                              Vesk2ContextStruct* context) {
+  VESK2_REQUIRE(out == nullptr && text != nullptr, VESK2_ERR_INVALID_PARAM);
+  SkipSpace(text, pos);
+  size_t size = 0;
+  while (!EndsToken(text[pos + size])) ++size;
+  VESK2_REQUIRE(size <= UINT_MAX - pos, VESK2_ERR_INVALID_S_EXPRESSION);
+
+  Ref<ByteString> token(TryNew<ByteString>(context));
+  VESK2_REQUIRE(token, VESK2_ERR_MEM_ALLOC);
+  VESK2_TRY(token->Reserve(static_cast<unsigned>(size)));
+  std::memcpy(token->data, text + pos, size);
+  pos += static_cast<unsigned>(size);
+  out = token.Release();
+  return 0;
+}
+
+unsigned int ByteString::AdvancedLength() { return length + 1; }
+
+int ByteString::ExportAdvanced(unsigned char* buf, unsigned int& pos, unsigned int size) {
+  VESK2_REQUIRE(buf != nullptr, VESK2_ERR_INVALID_PARAM);
+  VESK2_REQUIRE(uint64_t{pos} + length + 1 < size, VESK2_ERR_BUFFER_OVERFLOW);
+  if (length != 0) std::memcpy(buf + pos, data, length);
+  pos += length;
+  buf[pos] = '\0';
+  return 0;
+}
+
+int ByteString::PrintAdvanced(int (*write)(const char* text, unsigned int length, void* user),
+                              void* user, int /*depth*/) {
+  if (write == nullptr) return 0;
+  const char* text = data != nullptr ? reinterpret_cast<const char*>(data) : "";
+  switch (type) {
+    case BsNone:
+      if (std::all_of(data, data + length, IsPrintable)) write(text, length, user);
+      break;
+    case BsUtf8:
+      write(text, length, user);
+      break;
+    case BsNum:
+      // One byte is all that a count is written with, whatever follows it.
+      if (length != 0) {
+        char number[32];
+        const char* end = std::to_chars(number, number + sizeof number, unsigned{data[0]}).ptr;
+        write(number, static_cast<unsigned>(end - number), user);
+      }
+      break;
+    case BsBin:
+    default:
+      break;
+  }
+  return 0;
+}
+
+}  // namespace ZvVesk2

@@ -1,0 +1,14 @@
+// Character classes of the encodings. They are those of the C locale whatever locale the host has
+// set: what a stored text means must not depend on it.
+#ifndef VESK2_SRC_SEXPR_CHARS_H
+#define VESK2_SRC_SEXPR_CHARS_H
+
+namespace ZvVesk2 {
+
+constexpr bool IsSpace(int c) { return c == ' ' || (c >= '\t' && c <= '\r'); }
+constexpr bool IsDigit(int c) { return c >= '0' && c <= '9'; }
+constexpr bool IsPrintable(int c) { return c >= 0x20 && c <= 0x7e; }
+
+}  // namespace ZvVesk2
+
+#endif  // VESK2_SRC_SEXPR_CHARS_H

@@ -1,0 +1,142 @@
+// SExpression as a list: nodes, and who owns the elements. A list takes over the reference of what
+// is inserted and hands it back with what is removed.
+#include <vesk2/expression.h>
+#include <vesk2/ref.h>
+
+#include <memory>
+#include <utility>
+
+#include "src/frame/check.h"
+#include "src/sexpr/node.h"
+
+namespace ZvVesk2 {
+
+SExpression::SExpression(Vesk2ContextStruct* owner) : DExpression(owner) {}
+
+SExpression::~SExpression() {
+  DeleteNodes();
+  delete[] fileName;
+}
+
+const char* SExpression::DirectoryName() const { return ""; }
+
+const char* SExpression::ExtensionName() const { return ""; }
+
+bool SExpression::IsHash() const { return false; }
+
+// ---- Building ----
+
+int SExpression::Create(SExpression*& out, const char* tag, ByteString* value,
+                        Vesk2ContextStruct* context) {
+  out = nullptr;
+  Ref<SExpression> list(TryNew<SExpression>(context));
+  VESK2_REQUIRE(list, VESK2_ERR_MEM_ALLOC);
+  VESK2_TRY(list->Insert(tag));
+  if (value != nullptr) VESK2_TRY(list->Insert(value));
+  out = list.Release();
+  return 0;
+}
+
+int SExpression::Create(SExpression*& out, const char* tag, const char* value,
+                        Vesk2ContextStruct* context) {
+  out = nullptr;
+  Ref<SExpression> list;
+  VESK2_TRY(Create(list.Out(), tag, context));
+  VESK2_TRY(list->Insert(value));
+  out = list.Release();
+  return 0;
+}
+
+int SExpression::Create(SExpression*& out, const char* tag, Vesk2ContextStruct* context) {
+  return Create(out, tag, static_cast<ByteString*>(nullptr), context);
+}
+
+int SExpression::Insert(DExpression* value) {
+  VESK2_REQUIRE(value != nullptr, VESK2_ERR_PARAM_NULL);
+  Node* node = TryNew<Node>();
+  VESK2_REQUIRE(node != nullptr, VESK2_ERR_MEM_ALLOC);
+  node->value = value;
+  node->prev = last;
+  (first != nullptr ? last->next : first) = node;
+  last = node;
+  return 0;
+}
+
+int SExpression::Insert(const char* text) {
+  VESK2_REQUIRE(text != nullptr, VESK2_ERR_INVALID_PARAM);
+  Ref<ByteString> value(TryNew<ByteString>(GetContext()));
+  VESK2_REQUIRE(value, VESK2_ERR_MEM_ALLOC);
+  VESK2_TRY(value->Set(text, ByteString::BsNone));
+  VESK2_TRY(Insert(value.get()));
+  (void)value.Release();  // the list's now
+  return 0;
+}
+
+int SExpression::Remove(DExpression* value) {
+  VESK2_REQUIRE(value != nullptr, VESK2_ERR_PARAM_NULL);
+  Node* node = first;
+  while (node != nullptr && node->value != value) node = node->next;
+  VESK2_REQUIRE(node != nullptr, VESK2_ERR_NOT_IN_LIST);
+  const std::unique_ptr<Node> unlinked(node);
+  (node->prev != nullptr ? node->prev->next : first) = node->next;
+  (node->next != nullptr ? node->next->prev : last) = node->prev;
+  return 0;
+}
+
+// A list that only its parent holds gives its nodes to the chain before it is freed, so that no
+// destructor nests, however deeply the lists do.
+void SExpression::DeleteNodes() {
+  Node* chain = std::exchange(first, nullptr);
+  last = nullptr;
+  while (chain != nullptr) {
+    const std::unique_ptr<Node> node(chain);
+    chain = node->next;
+    DExpression* value = node->value;
+    if (value->IsSExpression() && value->GetRefCount() <= 1) {
+      auto* list = static_cast<SExpression*>(value);
+      if (list->last != nullptr) {
+        list->last->next = chain;
+        chain = std::exchange(list->first, nullptr);
+        list->last = nullptr;
+      }
+    }
+    value->Free();
+  }
+}
+
+// ---- Reading ----
+
+DExpression* SExpression::First() const { return first != nullptr ? first->value : nullptr; }
+
+DExpression* SExpression::Last() const { return last != nullptr ? last->value : nullptr; }
+
+unsigned int SExpression::Count() const {
+  unsigned int count = 0;
+  for (Iterator it = Begin(); it; it.Next()) ++count;
+  return count;
+}
+
+SExpression* SExpression::Rest() {
+  Ref<SExpression> rest(TryNew<SExpression>(GetContext()));
+  if (!rest || first == nullptr) return rest.Release();
+  for (const Node* node = first->next; node != nullptr; node = node->next) {
+    Ref<DExpression> shared = Ref<DExpression>::Share(node->value);
+    if (rest->Insert(shared.get())) return nullptr;
+    (void)shared.Release();  // the list's now
+  }
+  return rest.Release();
+}
+
+bool SExpression::Contains(SExpression* x) {
+  if (x == nullptr) return false;
+  for (Iterator it = Begin(); it; it.Next()) {
+    if (x->IsEqual(it.Value())) return true;
+  }
+  return false;
+}
+
+DExpression* SExpression::Iterator::Value() const { return node_->value; }
+
+void SExpression::Iterator::Next() { node_ = node_->next; }
+
+}  // namespace ZvVesk2

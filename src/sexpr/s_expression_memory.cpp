@@ -1,0 +1,129 @@
+// Lists read from canonical bytes in memory:
+//
+//   "(" <byte string> { <white space> ( <byte string> | <list> ) } <white space> ")"
+//
+// with white space also before the "(". The first element is always read as a byte string: a "(" in
+// its place is taken for the separator of an empty one. An empty list ends before its ")". Stored
+// texts rely on both.
+#include <vesk2/expression.h>
+#include <vesk2/ref.h>
+
+#include "src/frame/check.h"
+#include "src/sexpr/chars.h"
+
+namespace ZvVesk2 {
+namespace {
+
+// Looks for the last list, in the order in which they close, that is headed by `tag`.
+struct Search {
+  const char* tag;
+  SExpression* found = nullptr;
+
+  void Test(DExpression* list) {
+    auto* closed = static_cast<SExpression*>(list);
+    const auto* head = dynamic_cast<ByteString*>(closed->First());
+    if (head != nullptr && head->IsEqual(tag)) found = closed;
+  }
+};
+
+class MemoryReader {
+ public:
+  MemoryReader(unsigned char* buf, unsigned size, unsigned& pos, Vesk2ContextStruct* context,
+               Search* search)
+      : buf_(buf), size_(size), pos_(pos), context_(context), search_(search) {}
+
+  // Reads a list of nesting `level`.
+  int ReadList(Ref<DExpression>& out, unsigned level) {
+    VESK2_REQUIRE(level <= Limits::kMaxDepth, VESK2_ERR_INVALID_S_EXPRESSION);
+    SkipSpace();
+    VESK2_TRY(DExpression::Expect("(", buf_, size_, pos_));
+    Ref<SExpression> list(TryNew<SExpression>(context_));
+    VESK2_REQUIRE(list, VESK2_ERR_MEM_ALLOC);
+    VESK2_TRY(Look());
+    if (buf_[pos_] != ')') VESK2_TRY(ReadElements(*list, level));
+    out.Reset(list.Release());
+    return 0;
+  }
+
+ private:
+  void SkipSpace() {
+    while (pos_ < size_ && IsSpace(buf_[pos_])) ++pos_;
+  }
+
+  // Whether there is a byte that an element or a ")" can begin with.
+  int Look() const {
+    VESK2_REQUIRE(pos_ < size_, VESK2_ERR_BUFFER_OVERFLOW);
+    VESK2_REQUIRE(buf_[pos_] != '\0', VESK2_ERR_INVALID_S_EXPRESSION);
+    return 0;
+  }
+
+  int ReadString(Ref<DExpression>& out) {
+    return ByteString::ParseCanonical(out.Out(), buf_, size_, pos_, context_);
+  }
+
+  // Reads the elements of a list that has some, and its ")".
+  int ReadElements(SExpression& list, unsigned level) {
+    Ref<DExpression> element;
+    VESK2_TRY(ReadString(element));
+    VESK2_TRY(list.Insert(element.get()));
+    (void)element.Release();
+    while (true) {
+      SkipSpace();
+      VESK2_TRY(Look());
+      if (buf_[pos_] == ')') return DExpression::Expect(")", buf_, size_, pos_);
+      const bool nested = buf_[pos_] == '(';
+      VESK2_TRY(nested ? ReadList(element, level + 1) : ReadString(element));
+      const int code = list.Insert(element.get());
+      if (code) {
+        // A search goes on without an element that could not be kept.
+        if (search_ == nullptr) return code;
+        continue;
+      }
+      if (nested && search_ != nullptr) search_->Test(element.get());
+      (void)element.Release();
+    }
+  }
+
+  unsigned char* buf_;
+  unsigned size_;
+  unsigned& pos_;
+  Vesk2ContextStruct* context_;
+  Search* search_;
+};
+
+}  // namespace
+
+int SExpression::ParseCanonical(DExpression*& out, unsigned char* buf, unsigned int size,
+                                unsigned int& pos, Vesk2ContextStruct* context) {
+  VESK2_REQUIRE(out == nullptr && buf != nullptr, VESK2_ERR_INVALID_PARAM);
+  Ref<DExpression> list;
+  VESK2_TRY(MemoryReader(buf, size, pos, context, nullptr).ReadList(list, 1));
+  out = list.Release();
+  return 0;
+}
+
+int SExpression::ParseCanonical2(DExpression*& out, unsigned char* buf, unsigned int size,
+                                 unsigned int& pos, const char* tag, SExpression*& found,
+                                 Vesk2ContextStruct* context) {
+  VESK2_REQUIRE(out == nullptr && buf != nullptr, VESK2_ERR_INVALID_PARAM);
+  Ref<DExpression> list;
+  Search search{tag};
+  VESK2_TRY(MemoryReader(buf, size, pos, context, &search).ReadList(list, 1));
+  if (search.found != nullptr) found = search.found;
+  out = list.Release();
+  return 0;
+}
+
+int SExpression::FindSubExpression(SExpression*& found, unsigned char* buf, unsigned int size,
+                                   const char* tag, Vesk2ContextStruct* context) {
+  VESK2_REQUIRE(found == nullptr, VESK2_ERR_PARAM_NOT_NULL);
+  VESK2_REQUIRE(buf != nullptr && tag != nullptr, VESK2_ERR_PARAM_NULL);
+  Ref<DExpression> root;
+  SExpression* match = nullptr;
+  unsigned int pos = 0;
+  VESK2_TRY(ParseCanonical2(root.Out(), buf, size, pos, tag, match, context));
+  found = Ref<SExpression>::Share(match).Release();  // outlives the rest of the tree
+  return 0;
+}
+
+}  // namespace ZvVesk2
