@@ -1,0 +1,128 @@
+// Objects as files: where an object of a class lies, and writing it there.
+//
+//   <root>/<directory>/<base name><extension>    in a store
+//   <name><extension>                            as a path of its own
+//
+// The extension is appended unless the name ends in it already.
+#include <vesk2/context.h>
+#include <vesk2/expression.h>
+
+#include <cstring>
+#include <initializer_list>
+#include <memory>
+
+#include "src/frame/check.h"
+#include "src/platform/file.h"
+#include "src/platform/text.h"
+
+namespace ZvVesk2 {
+namespace {
+
+// The joined directory leaves room for the separator behind it.
+constexpr size_t kStoreDirectoryBuffer = Limits::kPathBuffer - 2;
+
+bool IsEmpty(const char* text) {
+  return text == nullptr || ZVsysutil::zv_filenamecmp(text, "") == 0;
+}
+
+const char* Root(StorageType type) {
+  return type == StorageGlobal ? VeskConf::GetGlobalDirectory() : VeskConf::GetHomeDirectory();
+}
+
+// What lies in the home store is its user's alone.
+int MakeDirectory(const char* path, StorageType type) {
+  return type == StorageGlobal ? ZVsysutil::zv_mkdir(path) : ZVsysutil::zv_mkdir(path, 0700);
+}
+
+// Whether the last component of a name names a file; the others would lead out of the store.
+bool IsFileName(const char* name) {
+  for (const char* refused : {"", ".", "..", "/"}) {
+    if (ZVsysutil::zv_filenamecmp(name, refused) == 0) return false;
+  }
+  return true;
+}
+
+// Writes the path of `name` in a store, without extension, and makes the store's directory. False
+// when there is no such path, or it would have to be cut: a cut path is another file's.
+bool StorePath(char (&path)[Limits::kPathBuffer], const char* dirName, const char* name,
+               StorageType type) {
+  char base[Limits::kPathBuffer];
+  if (!ZVsysutil::zv_basename(name, base, sizeof base) || !IsFileName(base)) return false;
+  const char* root = Root(type);
+  if (IsEmpty(root)) return false;  // never the current directory instead
+  if (!ZVsysutil::zv_concat_path_to(path, kStoreDirectoryBuffer, root, dirName)) return false;
+  (void)MakeDirectory(path, type);  // where it cannot be made, opening the file tells
+  size_t length = std::strlen(path);
+  path[length++] = '/';
+  return ZVsysutil::zv_fstrcpy(path + length, sizeof path - length, base);
+}
+
+}  // namespace
+
+char* SExpression::CalcDir(const char* dirName, StorageType type) {
+  if (type == StoragePath || IsEmpty(dirName)) return ZVsysutil::zv_fstrdup(".");
+  const char* root = Root(type);
+  if (IsEmpty(root)) return nullptr;
+  return ZVsysutil::zv_concat_path(root, dirName);
+}
+
+char* SExpression::CalcPath(const char* dirName, const char* extension, const char* name,
+                            StorageType type) {
+  if (name == nullptr || extension == nullptr) return nullptr;
+  char path[Limits::kPathBuffer];
+  const bool isOwnPath = type == StoragePath || IsEmpty(dirName);
+  const bool whole = isOwnPath ? ZVsysutil::zv_fstrcpy(path, sizeof path, name)
+                               : StorePath(path, dirName, name, type);
+  if (!whole) return nullptr;
+  const char* present = ZVsysutil::zv_extname(path);
+  if (present != nullptr && ZVsysutil::zv_filenamecmp(present, extension) == 0) {
+    return ZVsysutil::zv_fstrdup(path);
+  }
+  return ZVsysutil::zv_concat_string(path, extension);
+}
+
+void SExpression::SetStorageType(StorageType type) { storageType = type; }
+
+int SExpression::SetFileName(const char* name) {
+  VESK2_REQUIRE(name != nullptr, VESK2_ERR_INVALID_PARAM);
+  // `name` may be the file name that is replaced.
+  const std::unique_ptr<char[]> replaced(fileName);
+  fileName = CalcPath(DirectoryName(), ExtensionName(), name, storageType);
+  return fileName != nullptr ? 0 : VESK2_ERR_MEM_ALLOC;
+}
+
+int SExpression::SetFilePath(const char* path) {
+  VESK2_REQUIRE(path != nullptr, VESK2_ERR_INVALID_PARAM);
+  const std::unique_ptr<char[]> replaced(fileName);
+  fileName = ZVsysutil::zv_fstrdup(path);
+  return fileName != nullptr ? 0 : VESK2_ERR_MEM_ALLOC;
+}
+
+int SExpression::CreateFileDirectory() {
+  if (storageType == StoragePath) return 0;
+  VESK2_REQUIRE(storageType == StorageGlobal || storageType == StorageHome, VESK2_ERR_FIND_DIR);
+  if (IsEmpty(DirectoryName())) return 0;
+  VESK2_REQUIRE(!IsEmpty(Root(storageType)), VESK2_ERR_FIND_DIR);
+  const std::unique_ptr<char[]> directory(CalcDir(DirectoryName(), storageType));
+  VESK2_REQUIRE(directory != nullptr, VESK2_ERR_MEM_ALLOC);
+  return MakeDirectory(directory.get(), storageType);
+}
+
+int SExpression::Export(const char* name) {
+  VESK2_TRY(CreateFileDirectory());
+  if (name != nullptr) VESK2_TRY(SetFileName(name));
+  ZVsysutil::ZvFile* file = ZVsysutil::zv_open(fileName, ZVsysutil::ZV_WRITE);
+  VESK2_REQUIRE(file != nullptr, VESK2_ERR_FILE_OPEN);
+  const int printed = PrintCanonical(ZVsysutil::zv_stream(file));
+  const int closed = ZVsysutil::zv_close(file);
+  return printed ? printed : closed;
+}
+
+bool SExpression::Exists() {
+  struct stat ignored {};
+  return fileName != nullptr && ZVsysutil::zv_stat(fileName, &ignored) == 0;
+}
+
+char* SExpression::BaseName() { return ZVsysutil::zv_basename(fileName); }
+
+}  // namespace ZvVesk2
