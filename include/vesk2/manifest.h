@@ -13,9 +13,20 @@
 
 #include <vesk2/expression.h>
 #include <vesk2/file_item.h>
+#include <vesk2/pointer_array.h>
+#include <vesk2/ref.h>
 #include <vesk2/time_stamp.h>
 
+#include <memory>
+
 namespace ZvVesk2 {
+
+class Findings;
+
+struct FileItemDeleter {
+  void operator()(FileItem* chain) const { FileItemDelete(chain); }
+};
+using FileItemList = std::unique_ptr<FileItem, FileItemDeleter>;
 
 class VESK2_API Manifest {
  public:
@@ -45,48 +56,54 @@ class VESK2_API Manifest {
 
   // ---- Settings; see vesk2.h ----
   void SetFailOnExtraEntries(bool value) { failOnExtraEntries = value; }
-  void SetExtraAclDirectory(char* owned);
+  // Takes over `owned`, an array from new[], or null.
+  void SetExtraAclDirectory(char* owned) { extraAclDirectory.reset(owned); }
   // Replaces the ignored entries by copies, in reverse order. VESK2_ERR_MEM_ALLOC leaves none.
   [[nodiscard]] int SetIgnoredEntries(const FileItem* list);
 
   // ---- What the object holds, borrowed ----
   Vesk2ContextStruct* GetContext() const { return context; }
-  const char* GetDirectory() const { return directory; }
-  const char* GetManifestPath() const { return manifestPath; }
-  SExpression* GetTag() const { return tag; }
+  const char* GetDirectory() const { return directory.get(); }
+  const char* GetManifestPath() const { return manifestPath.get(); }
+  SExpression* GetTag() const { return tag.get(); }
   bool GetFailOnExtraEntries() const { return failOnExtraEntries; }
-  const char* GetExtraAclDirectory() const { return extraAclDirectory; }
-  FileItem* GetValid() const { return valid; }
-  FileItem* GetInvalid() const { return invalid; }
-  FileItem* GetMissing() const { return missing; }
-  FileItem* GetExtra() const { return extra; }
-  FileItem* GetIgnoredEntries() const { return ignoredEntries; }
+  const char* GetExtraAclDirectory() const { return extraAclDirectory.get(); }
+  FileItem* GetValid() const { return valid.get(); }
+  FileItem* GetInvalid() const { return invalid.get(); }
+  FileItem* GetMissing() const { return missing.get(); }
+  FileItem* GetExtra() const { return extra.get(); }
+  FileItem* GetIgnoredEntries() const { return ignoredEntries.get(); }
   // Null before and after a failed read.
-  SExpression* GetVersion() const { return version; }
-  SExpression* GetType() const { return type; }
-  TimeStamp* GetSigningTime() const { return signingTime; }
+  SExpression* GetVersion() const { return version.get(); }
+  SExpression* GetType() const { return type.get(); }
+  TimeStamp* GetSigningTime() const { return signingTime.get(); }
   // The byte of the manifest file that the last read had come to: after an error of a reader, where
   // the text stopped making sense.
   size_t GetReadPosition() const { return readPosition; }
 
  private:
   friend class ManifestReader;
+  void ClearRead();
   void ClearResults();
+  [[nodiscard]] int BuildIgnoreList(const char* base, PointerArray<char>& list) const;
+  // Moves the records of a comparison to the front of the four lists.
+  [[nodiscard]] int Publish(Findings& findings);
+  FileItemList& ListOf(uint32_t status);
 
   Vesk2ContextStruct* context;
-  char* directory = nullptr;
-  char* manifestPath = nullptr;
-  SExpression* tag = nullptr;
+  std::unique_ptr<char[]> directory;
+  std::unique_ptr<char[]> manifestPath;
+  Ref<SExpression> tag;
   bool failOnExtraEntries = false;
-  char* extraAclDirectory = nullptr;
-  FileItem* valid = nullptr;
-  FileItem* invalid = nullptr;
-  FileItem* missing = nullptr;
-  FileItem* extra = nullptr;
-  FileItem* ignoredEntries = nullptr;
-  SExpression* version = nullptr;
-  SExpression* type = nullptr;
-  TimeStamp* signingTime = nullptr;
+  std::unique_ptr<char[]> extraAclDirectory;
+  FileItemList valid;
+  FileItemList invalid;
+  FileItemList missing;
+  FileItemList extra;
+  FileItemList ignoredEntries;
+  Ref<SExpression> version;
+  Ref<SExpression> type;
+  Ref<TimeStamp> signingTime;
   size_t readPosition = 0;
 };
 

@@ -11,6 +11,8 @@
 #include <vesk2/platform.h>
 #include <vesk2/pointer_array.h>
 
+#include <memory>
+
 namespace ZvVesk2 {
 
 class VESK2_API BodyObject {
@@ -26,21 +28,21 @@ class VESK2_API BodyObject {
   // Cmp orders two BodyObject* (given by address) by name, bytewise; one without a name comes last.
   static int Cmp(const void* a, const void* b);
 
-  const char* GetName() const { return name; }
+  const char* GetName() const { return name.get(); }
   uint32_t GetStatus() const { return status; }
   bool GetIsDirectory() const { return isDirectory; }
   Vesk2ContextStruct* GetContext() const { return context; }
 
   // Takes over `owned`, an array from new[].
-  void SetName(char* owned);
+  void SetName(char* owned) { name.reset(owned); }
   void SetStatus(uint32_t value) { status = value; }
   void SetIsDirectory(bool value) { isDirectory = value; }
   // Hands the name to the caller.
-  char* TakeName();
+  [[nodiscard]] char* TakeName() { return name.release(); }
 
  private:
   Vesk2ContextStruct* context;
-  char* name = nullptr;
+  std::unique_ptr<char[]> name;
   uint32_t status = StatusNone;
   bool isDirectory = false;
 };
@@ -84,6 +86,8 @@ class VESK2_API BodyDirectory : public BodyObject {
 
  private:
   [[nodiscard]] int ParseEntries(ZvBuffer* buffer, PointerArray<char>* ignoreList, unsigned depth);
+  [[nodiscard]] int ParseEntry(ZvBuffer* buffer, PointerArray<char>* ignoreList, unsigned depth);
+  [[nodiscard]] int ParseName(ZvBuffer* buffer, std::unique_ptr<char[]>& bare);
   [[nodiscard]] int ParseFile(ZvBuffer* buffer);
   [[nodiscard]] int ParseSubdirectory(ZvBuffer* buffer, PointerArray<char>* ignoreList,
                                       unsigned depth);

@@ -28,6 +28,8 @@ class VESK2_API PointerArray {
   T* begin();
   T* next() { return get(-1); }
   void reset() { cursor = 0; }
+  // at gives an element by its place and leaves the cursor alone; null past the end.
+  T* at(uint32_t index) const { return index < count ? items[index] : nullptr; }
   // sort orders the pointers; the comparator gets pointers to two elements of type T*.
   void sort(int (*compare)(const void*, const void*));
   // clear frees every element and the array.

@@ -1,0 +1,152 @@
+// The reader of manifest bodies:
+//
+//   (4:body(12:random-token<4 bytes>)<entry>...)
+//   (4:file<name><ignored><digest of 32 bytes>)      (3:dir<name><ignored><entry>...)
+//
+// The text comes from whoever signed the manifest, and every name in it becomes a path that is
+// opened: names that are not one plain component are refused.
+#include <cstring>
+#include <string_view>
+
+#include <vesk2/expression.h>
+#include <vesk2/manifest_body.h>
+#include <vesk2/ref.h>
+
+#include "src/frame/check.h"
+#include "src/objects/build.h"
+#include "src/platform/text.h"
+
+namespace ZvVesk2 {
+namespace {
+
+using ZVsysutil::zv_concat_path;
+using ZVsysutil::zv_filenamencmp;
+
+constexpr unsigned kTokenLength = 4;
+constexpr unsigned kDigestLength = 32;
+constexpr char kSeparator = '/';
+
+std::string_view Text(const ByteString& string) {
+  if (string.GetLength() == 0) return {};
+  return {reinterpret_cast<const char*>(string.GetData()), string.GetLength()};
+}
+
+bool IsBareName(std::string_view name) {
+  return !name.empty() && name != "." && name != ".." &&
+         name.find(kSeparator) == std::string_view::npos &&
+         name.find('\0') == std::string_view::npos;
+}
+
+size_t JoinedLength(const char* directory, size_t name) {
+  const std::string_view head = directory != nullptr ? directory : "";
+  const bool separator = !head.empty() && head.back() != kSeparator;
+  return head.size() + (separator ? 1 : 0) + name;
+}
+
+// The part of an ignored path that names something directly inside `directory` or below it; null
+// when the path lies elsewhere. `directory` may end in a separator: callers pass what they were
+// given.
+const char* RestInside(const char* directory, const char* path) {
+  const size_t length = directory != nullptr ? std::strlen(directory) : 0;
+  if (length == 0) return path;
+  if (zv_filenamencmp(path, directory, length) != 0) return nullptr;
+  const char* rest = path + length;
+  if (directory[length - 1] != kSeparator && *rest++ != kSeparator) return nullptr;
+  return *rest != '\0' ? rest : nullptr;
+}
+
+}  // namespace
+
+int BodyDirectory::ParseBody(ZvBuffer* buffer, PointerArray<char>* ignoreList) {
+  VESK2_REQUIRE(buffer != nullptr, VESK2_ERR_PARAM_NULL);
+  VESK2_TRY(buffer->Expect("(4:body(12:random-token"));
+  Ref<ByteString> token;
+  VESK2_TRY(ImportNew(token, buffer, GetContext()));
+  VESK2_REQUIRE(token->GetLength() == kTokenLength, VESK2_ERR_RANDOM_TOKEN);
+  VESK2_TRY(buffer->Expect(")"));
+  return ParseDir(buffer, ignoreList);
+}
+
+int BodyDirectory::ParseDir(ZvBuffer* buffer, PointerArray<char>* ignoreList) {
+  VESK2_REQUIRE(buffer != nullptr, VESK2_ERR_PARAM_NULL);
+  return ParseEntries(buffer, ignoreList, 1);
+}
+
+int BodyDirectory::ParseEntries(ZvBuffer* buffer, PointerArray<char>* ignoreList, unsigned depth) {
+  VESK2_REQUIRE(depth <= Limits::kMaxDepth, VESK2_ERR_PARSE_FILE);
+  while (buffer->Peek() != ')' && buffer->Peek() >= 0) {
+    VESK2_TRY(ParseEntry(buffer, ignoreList, depth));
+  }
+  VESK2_TRY(buffer->Expect(")"));
+  subdirectories.sort(BodyObject::Cmp);
+  files.sort(BodyObject::Cmp);
+  return ignoreList != nullptr ? CollectIgnored(ignoreList) : 0;
+}
+
+int BodyDirectory::ParseEntry(ZvBuffer* buffer, PointerArray<char>* ignoreList, unsigned depth) {
+  if (buffer->Accept("(3:dir")) return ParseSubdirectory(buffer, ignoreList, depth + 1);
+  VESK2_TRY(buffer->Expect("(4:file"));
+  return ParseFile(buffer);
+}
+
+// Reads an entry's name and the byte string after it, whose meaning is the signer's.
+int BodyDirectory::ParseName(ZvBuffer* buffer, std::unique_ptr<char[]>& bare) {
+  Ref<ByteString> text;
+  VESK2_TRY(ImportNew(text, buffer, GetContext()));
+  VESK2_REQUIRE(IsBareName(Text(*text)), VESK2_ERR_PARSE_FILE);
+  VESK2_REQUIRE(JoinedLength(GetName(), text->GetLength()) <= Limits::kMaxBodyPath,
+                VESK2_ERR_PARSE_FILE);
+  bare.reset(text->ToString());
+  VESK2_REQUIRE(bare, VESK2_ERR_MEM_ALLOC);
+  Ref<ByteString> ignoredString;
+  return ImportNew(ignoredString, buffer, GetContext());
+}
+
+int BodyDirectory::ParseFile(ZvBuffer* buffer) {
+  std::unique_ptr<char[]> bare;
+  VESK2_TRY(ParseName(buffer, bare));
+  Ref<ByteString> digest;
+  VESK2_TRY(ImportNew(digest, buffer, GetContext()));
+  std::unique_ptr<BodyFile> file(TryNew<BodyFile>(GetContext()));
+  VESK2_REQUIRE(file, VESK2_ERR_MEM_ALLOC);
+  file->SetName(bare.release());
+  VESK2_REQUIRE(digest->GetLength() == kDigestLength, VESK2_ERR_UNKNOWN_HASH_ID);
+  file->SetHash(digest->GetData());
+  VESK2_TRY(buffer->Expect(")"));
+  VESK2_REQUIRE(files.push(file.get()), VESK2_ERR_MEM_ALLOC);
+  static_cast<void>(file.release());
+  return 0;
+}
+
+int BodyDirectory::ParseSubdirectory(ZvBuffer* buffer, PointerArray<char>* ignoreList,
+                                     unsigned depth) {
+  std::unique_ptr<char[]> bare;
+  VESK2_TRY(ParseName(buffer, bare));
+  std::unique_ptr<BodyDirectory> directory(TryNew<BodyDirectory>(GetContext()));
+  VESK2_REQUIRE(directory, VESK2_ERR_MEM_ALLOC);
+  directory->SetName(zv_concat_path(GetName(), bare.get()));
+  VESK2_REQUIRE(directory->GetName() != nullptr, VESK2_ERR_MEM_ALLOC);
+  VESK2_TRY(directory->ParseEntries(buffer, ignoreList, depth));
+  VESK2_REQUIRE(subdirectories.push(directory.get()), VESK2_ERR_MEM_ALLOC);
+  static_cast<void>(directory.release());
+  return 0;
+}
+
+// Picks the names to ignore inside this directory out of the sorted list, where the paths below one
+// directory stand together.
+int BodyDirectory::CollectIgnored(PointerArray<char>* ignoreList) {
+  bool found = false;
+  for (const char* path = ignoreList->begin(); path != nullptr; path = ignoreList->next()) {
+    const char* const rest = RestInside(GetName(), path);
+    if (rest == nullptr && found) break;
+    if (rest == nullptr) continue;
+    found = true;
+    if (std::strchr(rest, kSeparator) != nullptr) continue;
+    std::unique_ptr<char[]> copy(ZVsysutil::zv_fstrdup(rest));
+    VESK2_REQUIRE(copy && ignored.push(copy.get()), VESK2_ERR_MEM_ALLOC);
+    static_cast<void>(copy.release());
+  }
+  return 0;
+}
+
+}  // namespace ZvVesk2

@@ -1,0 +1,70 @@
+// PointerArray: the growable arrays of a manifest body. Growth is by a fixed step, not by doubling:
+// the capacity is visible to callers.
+#include <vesk2/pointer_array.h>
+
+#include <algorithm>
+#include <type_traits>
+
+#include <vesk2/manifest_body.h>
+
+#include "src/frame/check.h"
+#include "src/platform/text.h"
+
+namespace ZvVesk2 {
+namespace {
+
+constexpr uint32_t kGrowth = 32;
+
+}  // namespace
+
+template <typename T>
+int PointerArray<T>::push(T* element) {
+  if (count == capacity) {
+    T** const grown = TryNewArray<T*>(size_t{capacity} + kGrowth);
+    if (grown == nullptr) return 0;
+    std::copy_n(items, count, grown);
+    delete[] items;
+    items = grown;
+    capacity += kGrowth;
+  }
+  items[count++] = element;
+  return 1;
+}
+
+template <typename T>
+T* PointerArray<T>::get(int mode) {
+  if (mode > 0) ++cursor;
+  T* const element = at(cursor);
+  if (mode < 0 && element != nullptr) ++cursor;
+  return element;
+}
+
+template <typename T>
+T* PointerArray<T>::begin() {
+  reset();
+  return next();
+}
+
+template <typename T>
+void PointerArray<T>::sort(int (*compare)(const void*, const void*)) {
+  if (count != 0) ZVsysutil::zv_sort(items, count, sizeof(T*), compare);
+}
+
+template <typename T>
+void PointerArray<T>::clear() {
+  for (uint32_t i = 0; i < count; ++i) {
+    if (ownsArrays || std::is_same_v<T, char>) {
+      delete[] items[i];
+    } else {
+      delete items[i];
+    }
+  }
+  delete[] items;
+  items = nullptr;
+  count = capacity = cursor = 0;
+}
+
+template class PointerArray<BodyObject>;
+template class PointerArray<char>;
+
+}  // namespace ZvVesk2
