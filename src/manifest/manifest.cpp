@@ -1,0 +1,127 @@
+// The manifest object: its settings, and the order of work of the two verifications.
+#include <vesk2/manifest.h>
+
+#include <utility>
+
+#include "src/frame/check.h"
+#include "src/frame/handles.h"
+#include "src/manifest/manifest_reader.h"
+#include "src/platform/text.h"
+
+namespace ZvVesk2 {
+namespace {
+
+using ZVsysutil::zv_concat_path;
+using ZVsysutil::zv_filenamecmp;
+using ZVsysutil::zv_fstrdup;
+using ZVsysutil::zv_strdup;
+
+int ComparePaths(const void* a, const void* b) {
+  return zv_filenamecmp(*static_cast<const char* const*>(a), *static_cast<const char* const*>(b));
+}
+
+// Copies the names of a record, to the front of `list`.
+int PushCopy(const FileItem& item, FileItemList& list) {
+  std::unique_ptr<char[]> name(zv_fstrdup(item.name));
+  std::unique_ptr<char[]> nameA(zv_strdup(item.nameA));
+  VESK2_REQUIRE((name || item.name == nullptr) && (nameA || item.nameA == nullptr),
+                VESK2_ERR_MEM_ALLOC);
+  FileItem* const copy = FileItemCreate(name.get(), nameA.get());
+  VESK2_REQUIRE(copy != nullptr, VESK2_ERR_MEM_ALLOC);
+  static_cast<void>(name.release());
+  static_cast<void>(nameA.release());
+  copy->next = list.release();
+  list.reset(copy);
+  return 0;
+}
+
+int ReadBody(Manifest& manifest, bool verifyChain, long notBefore, long notAfter,
+             BufferOwner& body) {
+  ZvBuffer* read = nullptr;
+  const int code = manifest.ReadManifest(verifyChain, notBefore, notAfter, &read);
+  body.reset(read);
+  return code;
+}
+
+}  // namespace
+
+Manifest::Manifest(Vesk2ContextStruct* ctx) : context(ctx) {}
+Manifest::~Manifest() = default;
+
+int Manifest::Initialize(const char* directoryPath, const char* path, const char* tagText) {
+  VESK2_REQUIRE(directoryPath != nullptr && path != nullptr && tagText != nullptr,
+                VESK2_ERR_INVALID_PARAM);
+  directory.reset(zv_fstrdup(directoryPath));
+  manifestPath.reset(zv_fstrdup(path));
+  VESK2_REQUIRE(directory && manifestPath, VESK2_ERR_MEM_ALLOC);
+  return SExpression::ParseTagAdvanced(tag.Out(), tagText, "tag", context);
+}
+
+int Manifest::SetIgnoredEntries(const FileItem* list) {
+  FileItemList copies;
+  const FileItem* item = list;
+  int code = 0;
+  for (; item != nullptr && code == 0; item = item->next) {
+    if (item->name != nullptr || item->nameA != nullptr) code = PushCopy(*item, copies);
+  }
+  if (code != 0) copies.reset();
+  ignoredEntries = std::move(copies);
+  return code;
+}
+
+int Manifest::BuildIgnoreList(const char* base, PointerArray<char>& list) const {
+  for (const FileItem* item = ignoredEntries.get(); item != nullptr; item = item->next) {
+    std::unique_ptr<char[]> path(zv_concat_path(base, item->name));
+    VESK2_REQUIRE(path && list.push(path.get()), VESK2_ERR_MEM_ALLOC);
+    static_cast<void>(path.release());
+  }
+  list.sort(ComparePaths);
+  return 0;
+}
+
+void Manifest::ClearRead() {
+  version.Reset();
+  type.Reset();
+  signingTime.Reset();
+  readPosition = 0;
+}
+
+void Manifest::ClearResults() {
+  valid.reset();
+  invalid.reset();
+  missing.reset();
+  extra.reset();
+}
+
+int Manifest::ReadManifest(bool verifyChain, long notBefore, long notAfter, ZvBuffer** body) {
+  return ManifestReader(*this, verifyChain, notBefore, notAfter).Read(body);
+}
+
+int Manifest::VerifyManifest(long notBefore, long notAfter) {
+  // A failure on the way must not leave the findings of an earlier verification to be read.
+  ClearResults();
+  BufferOwner body;
+  VESK2_TRY(ReadBody(*this, true, notBefore, notAfter, body));
+  // From here on the position tells how far the body made sense; it lies before the final ")".
+  const size_t bodyStart = readPosition - 1 - body->Remaining();
+  const int code = Verify(body.get(), directory.get());
+  readPosition = bodyStart + body->Position();
+  if (code == VESK2_ERR_EXTRA_FILES && !failOnExtraEntries) return 0;
+  return code;
+}
+
+int Manifest::CompareManifest(const char* otherManifestPath) {
+  BufferOwner body1;
+  VESK2_TRY(ReadBody(*this, false, 0, 0, body1));
+  BufferOwner body2;
+  {
+    // No chain is verified here, so any tag will do.
+    Manifest other(context);
+    VESK2_TRY(other.Initialize(directory.get(), otherManifestPath, "(null)"));
+    VESK2_TRY(ReadBody(other, false, 0, 0, body2));
+  }
+  ClearResults();
+  return Compare(body1.get(), body2.get());
+}
+
+}  // namespace ZvVesk2

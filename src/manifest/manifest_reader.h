@@ -1,0 +1,57 @@
+// ManifestReader: one reading of one manifest file. It works on its own references and touches the
+// manifest's version, type and signing time only when everything held: what callers read from those
+// is always what was proved.
+#ifndef VESK2_SRC_MANIFEST_MANIFEST_READER_H
+#define VESK2_SRC_MANIFEST_MANIFEST_READER_H
+
+#include <vesk2/cert.h>
+#include <vesk2/manifest.h>
+#include <vesk2/ref.h>
+
+#include "src/frame/handles.h"
+
+namespace ZvVesk2 {
+
+class ManifestReader {
+ public:
+  ManifestReader(Manifest& manifest, bool verifyChain, long notBefore, long notAfter)
+      : manifest_(manifest),
+        verifyChain_(verifyChain),
+        notBefore_(notBefore),
+        notAfter_(notAfter) {}
+
+  // See Manifest::ReadManifest.
+  int Read(ZvBuffer** body);
+
+ private:
+  int ReadFile(ZvBuffer** body);
+  int ReadHead();
+  int ReadVersion();
+  int ReadType();
+  int ReadSigningTime();
+  int ReadSignatureBlock();
+  int ReadSigner();
+  int ReadSignature(Cert& cert);
+  int ReadRevocationLists(SExpression* lists);
+  int ProveAuthority();
+  int ProveBody(ZvBuffer** body);
+  int CheckDigest(const unsigned char* body, unsigned int length);
+
+  Vesk2ContextStruct* Context() const { return manifest_.context; }
+
+  Manifest& manifest_;
+  const bool verifyChain_;
+  const long notBefore_;
+  const long notAfter_;
+  BufferOwner buffer_;
+  Ref<SExpression> version_;
+  Ref<SExpression> type_;
+  Ref<TimeStamp> signingTime_;
+  Ref<SExpression> timeElement_;   // (time-of-signing <stamp>)
+  Ref<Cert> signer_;               // held for the whole reading, whatever happens to the list
+  Ref<SExpression> certificates_;  // (sequence <signer> <certificate>...)
+};
+
+}  // namespace ZvVesk2
+
+#endif  // VESK2_SRC_MANIFEST_MANIFEST_READER_H
