@@ -1,0 +1,86 @@
+// Flat functions: manifest contexts and the records of their results. A manifest context is a
+// Manifest; the getters and setters trust its pointer, the way callers have always used them.
+#include <vesk2/file_item.h>
+#include <vesk2/manifest.h>
+
+#include <memory>
+
+#include "src/frame/check.h"
+#include "src/frame/flat/ascii_text.h"
+#include "src/platform/text.h"
+
+using ZvVesk2::AsciiText;
+using ZvVesk2::TryNew;
+
+unsigned int FreeFileItemList(FileItem* chain) { return ZvVesk2::FileItemDelete(chain); }
+
+// ---- Making and configuring ----
+
+int CreateManifestContext(Manifest** out, const char* directory, const char* manifestPath,
+                          const char* tagText) {
+  VESK2_REQUIRE(
+      out != nullptr && *out == nullptr && directory != nullptr && manifestPath != nullptr,
+      VESK2_ERR_INVALID_PARAM);
+  std::unique_ptr<Manifest> manifest(TryNew<Manifest>(nullptr));
+  VESK2_REQUIRE(manifest, VESK2_ERR_MEM_ALLOC);
+  VESK2_TRY(manifest->Initialize(directory, manifestPath, tagText));
+  *out = manifest.release();
+  return 0;
+}
+
+int CreateManifestContextA(Manifest** out, const char* directory, const char* manifestPath,
+                           const char* tagText) {
+  const AsciiText directoryName(directory);
+  const AsciiText manifestName(manifestPath);
+  VESK2_REQUIRE(!directoryName.OutOfMemory() && !manifestName.OutOfMemory(), VESK2_ERR_MEM_ALLOC);
+  // The tag's text stays as it is: it is parsed, not used as a name.
+  return CreateManifestContext(out, directoryName.get(), manifestName.get(), tagText);
+}
+
+void DeleteManifestContext(Manifest* manifest) { delete manifest; }
+
+void FailOnExtraEntries(Manifest* manifest) { manifest->SetFailOnExtraEntries(true); }
+
+void SetExtraAclDirectory(Manifest* manifest, const char* directory) {
+  manifest->SetExtraAclDirectory(ZVsysutil::zv_fstrdup(directory));
+}
+
+void SetExtraAclDirectoryA(Manifest* manifest, const char* directory) {
+  manifest->SetExtraAclDirectory(ZVsysutil::zv_atof_copy(directory));
+}
+
+void SetIgnoredEntries(Manifest* manifest, const FileItem* list) {
+  // Without memory nothing is ignored, and the verification can only find more.
+  static_cast<void>(manifest->SetIgnoredEntries(list));
+}
+
+// ---- Verifying ----
+
+int VerifyManifest(Manifest* manifest, time_t notBefore, time_t notAfter) {
+  return manifest->VerifyManifest(notBefore, notAfter);
+}
+
+int CompareManifest(Manifest* manifest, const char* otherManifestPath) {
+  return manifest->CompareManifest(otherManifestPath);
+}
+
+int CompareManifestA(Manifest* manifest, const char* otherManifestPath) {
+  const AsciiText path(otherManifestPath);
+  VESK2_REQUIRE(!path.OutOfMemory(), VESK2_ERR_MEM_ALLOC);
+  return CompareManifest(manifest, path.get());
+}
+
+// ---- Results ----
+
+time_t GetTimeOfSigning(Manifest* manifest) {
+  const ZvVesk2::TimeStamp* const stamp = manifest->GetSigningTime();
+  return stamp != nullptr ? stamp->ToTime() : 0;
+}
+
+FileItem* GetValidEntries(Manifest* manifest) { return manifest->GetValid(); }
+
+FileItem* GetInvalidEntries(Manifest* manifest) { return manifest->GetInvalid(); }
+
+FileItem* GetMissingEntries(Manifest* manifest) { return manifest->GetMissing(); }
+
+FileItem* GetExtraEntries(Manifest* manifest) { return manifest->GetExtra(); }
