@@ -31,13 +31,13 @@ enum spki_tag_class : int {
 };
 
 struct spki_range_bounds {
-  spki_atom* low;  // counted
-  int32_t low_op;
-  int32_t low_source;  // 0, 1 or 2
-  spki_atom* high;     // counted
-  int32_t high_op;
-  int32_t high_source;  // 0, 1 or 2; 3 marks the record invalid
-  int32_t ordering;     // -1 until the first bound
+  spki_atom* low = nullptr;  // counted
+  int32_t low_op = 0;
+  int32_t low_source = 0;     // 0, 1 or 2
+  spki_atom* high = nullptr;  // counted
+  int32_t high_op = 0;
+  int32_t high_source = 0;  // 0, 1 or 2; 3 marks the record invalid
+  int32_t ordering = -1;    // that of the first range or bound added; others do not mix with it
 };
 
 spki_tag_class spki_classify(const spki_elem* elem);

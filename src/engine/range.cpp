@@ -1,0 +1,70 @@
+// Ranges: whether a string lies in one, and how they relate to prefixes and to each other.
+#include "src/engine/tag_forms.h"
+
+namespace ZvVesk2::Engine {
+namespace {
+
+spki_relation RelationOf(spki_engine* engine, spki_range_bounds* bounds) {
+  const spki_relation relation = spki_range_relation(bounds);
+  spki_range_clear(engine, bounds);
+  return relation;
+}
+
+}  // namespace
+
+bool spki_bound_holds(const spki_atom* value, const spki_elem* bound, int32_t ordering) {
+  const spki_bound limit = spki_read_bound(bound);
+  if (limit.value == nullptr || !limit.exact) return false;
+  if (!spki_valid_value(limit.value, ordering)) return false;
+  const int order = spki_cmp_ordered(value, limit.value, ordering);
+  switch (limit.op) {
+    case SPKI_KW_G:
+      return order == SPKI_ORDER_GREATER;
+    case SPKI_KW_GE:
+      return order == SPKI_ORDER_GREATER || order == SPKI_ORDER_EQUAL;
+    case SPKI_KW_L:
+      return order == SPKI_ORDER_LESS;
+    case SPKI_KW_LE:
+      return order == SPKI_ORDER_LESS || order == SPKI_ORDER_EQUAL;
+    default:
+      return false;
+  }
+}
+
+bool spki_in_range_charged(spki_engine* engine, const spki_elem* string, const spki_elem* range) {
+  if (string == nullptr || string->kind != SPKI_ELEM_STRING) return false;
+  const spki_tag_class range_class = spki_classify(range);
+  if (range_class == SPKI_TAG_ALL) return true;
+  if (range_class != SPKI_TAG_RANGE) return false;
+  const spki_elem* order = spki_form_arguments(range);
+  if (order == nullptr || order->kind != SPKI_ELEM_STRING) return false;
+  const int32_t ordering = order->value.atom->keyword;
+  const spki_atom* value = string->value.atom;
+  if (!spki_valid_value(value, ordering)) return false;
+  for (const spki_elem* bound = order->next; bound != nullptr; bound = bound->next) {
+    if (engine != nullptr && !spki_spend(engine, value)) return false;
+    if (!spki_bound_holds(value, bound, ordering)) return false;
+  }
+  return true;
+}
+
+bool spki_in_range(const spki_elem* string, const spki_elem* range) {
+  return spki_in_range_charged(nullptr, string, range);
+}
+
+spki_relation spki_prefix_to_range(spki_engine* engine, const spki_elem* prefix,
+                                   const spki_elem* range) {
+  spki_range_bounds bounds;
+  spki_range_add_tag(engine, &bounds, range, 2);
+  spki_range_add_prefix(engine, &bounds, prefix, 1);
+  return RelationOf(engine, &bounds);
+}
+
+spki_relation spki_range_to_range(spki_engine* engine, const spki_elem* a, const spki_elem* b) {
+  spki_range_bounds bounds;
+  spki_range_add_tag(engine, &bounds, a, 1);
+  spki_range_add_tag(engine, &bounds, b, 2);
+  return RelationOf(engine, &bounds);
+}
+
+}  // namespace ZvVesk2::Engine

@@ -1,0 +1,81 @@
+// Intersection of a set with anything: what each member has in common with it.
+#include "src/engine/tag_forms.h"
+
+#include <utility>
+
+namespace ZvVesk2::Engine {
+namespace {
+
+// What one member and the other tag have in common; null for nothing.
+spki_elem_owner InCommon(spki_engine* engine, spki_elem* member, spki_elem* other) {
+  switch (spki_cmp_elem(engine, member, other)) {
+    case SPKI_REL_EQUAL:
+    case SPKI_REL_NARROWER:
+      return spki_copy(engine, member);
+    case SPKI_REL_WIDER:
+      return spki_copy(engine, other);
+    case SPKI_REL_OVERLAP:
+      return Own(engine, spki_intersect_elem(engine, member, other));
+    default:
+      return Own(engine, static_cast<spki_elem*>(nullptr));
+  }
+}
+
+// The members found so far, the newest in front: granted sets have always come out in the reverse
+// order of discovery.
+class Members {
+ public:
+  explicit Members(spki_engine* engine)
+      : engine_(engine), first_(Own(engine, static_cast<spki_elem*>(nullptr))) {}
+
+  // A set is taken apart, what is there already is dropped. False when there is no room or memory.
+  bool Add(spki_elem_owner found) {
+    if (found == nullptr) return engine_->budget.spent == 0;
+    if (spki_classify(found.get()) == SPKI_TAG_SET) return AddMembersOf(found.get());
+    for (const spki_elem* present = first_.get(); present != nullptr; present = present->next) {
+      if (spki_cmp_elem(engine_, found.get(), present) == SPKI_REL_EQUAL) return true;
+    }
+    if (count_ == Limits::kMaxSetMembers) engine_->budget.spent = SPKI_ERR_NO_MEM;
+    if (engine_->budget.spent != 0) return false;
+    ++count_;
+    found->next = first_.release();
+    first_ = std::move(found);
+    return true;
+  }
+
+  // No member is no tag, one is that member, several are a new set.
+  spki_elem* Finish() {
+    if (count_ <= 1) return first_.release();
+    spki_elem* list = nullptr;
+    if (spki_parse_template(engine_, &list, "(1:*3:set)") != 0) return nullptr;
+    const spki_elem_owner set = Own(engine_, list);
+    set->next->next = first_.release();
+    return spki_new_list(engine_, set.get()).release();
+  }
+
+ private:
+  bool AddMembersOf(const spki_elem* set) {
+    for (const spki_elem* m = spki_form_arguments(set); m != nullptr; m = m->next) {
+      if (!Add(spki_copy(engine_, m))) return false;
+    }
+    return true;
+  }
+
+  spki_engine* engine_;
+  spki_elem_owner first_;
+  uint32_t count_ = 0;
+};
+
+}  // namespace
+
+spki_elem* spki_intersect_set(spki_engine* engine, spki_elem* set, spki_elem* other) {
+  if (spki_classify(set) != SPKI_TAG_SET) return nullptr;
+  Members members(engine);
+  const spki_elem* head = spki_form_head(set);
+  for (spki_elem* m = head->next->next; m != nullptr; m = m->next) {
+    if (!members.Add(InCommon(engine, m, other))) return nullptr;
+  }
+  return members.Finish();
+}
+
+}  // namespace ZvVesk2::Engine
