@@ -1,0 +1,48 @@
+// issue.h: making certificates: what `cert issue` and `manifest sign` share.
+#ifndef VESK2_TOOLS_ISSUE_H
+#define VESK2_TOOLS_ISSUE_H
+
+#include <CLI/CLI.hpp>
+#include <string>
+
+#include "tools/vesk2/keys.h"
+#include "tools/vesk2/times.h"
+
+#include <vesk2/cert.h>
+#include <vesk2/cert_sequence.h>
+
+namespace vesk2_command {
+
+// The private key that signs, and how.
+struct SignerOptions {
+  std::string key;
+  std::string algorithm = "rsa-pss";
+  PassphraseOptions passphrase;
+};
+void AddSignerOptions(CLI::App& app, SignerOptions& options);
+
+// What a certificate says, beside its issuer. Only the subject is required; without a tag it passes
+// on all that the issuer was granted.
+struct Grant {
+  ZvVesk2::Subject* subject = nullptr;
+  bool propagate = false;
+  SExpression* tag = nullptr;
+  Period period = {};
+  ByteString* comment = nullptr;
+};
+
+struct SignedCert {
+  Ref<ZvVesk2::Cert> cert;
+  Ref<ZvVesk2::Signature> signature;
+};
+SignedCert IssueCert(const PrivateKey& key, const Grant& grant, const std::string& algorithm);
+
+// A certificate sequence file, in the order of the file: the end-entity certificate first.
+using CertChain = Ref<ZvVesk2::CertSequence>;
+CertChain ReadCertChain(const std::string& path);
+// Trouble unless the first certificate of a chain is for `key`, which is about to sign below it.
+void RequireCertFor(const CertChain& chain, const std::string& path, PublicKey& key);
+
+}  // namespace vesk2_command
+
+#endif  // VESK2_TOOLS_ISSUE_H

@@ -1,0 +1,33 @@
+// manifest_file.h: manifest files as the command sees them: reading one back without judging its
+// authority, and taking it apart to explain a refusal.
+#ifndef VESK2_TOOLS_MANIFEST_FILE_H
+#define VESK2_TOOLS_MANIFEST_FILE_H
+
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "tools/vesk2/issue.h"
+
+#include <vesk2/crl.h>
+#include <vesk2/manifest_body.h>
+
+namespace vesk2_command {
+
+// ReadListing checks a manifest file's form, its signatures and its signed digest, and returns the
+// tree that it lists, its root named `directory`. Malformed text is Trouble that names the byte.
+std::unique_ptr<ZvVesk2::BodyDirectory> ReadListing(const std::string& path,
+                                                    const std::string& directory);
+
+// The parts of a manifest file that authority comes from. Nothing of it has been checked.
+struct SignatureBlock {
+  Ref<TimeStamp> signedAt;
+  std::vector<SignedCert> certs;  // the signer certificate first
+  std::vector<Ref<ZvVesk2::CrlSequence>> crls;
+};
+// ReadSignatureBlock reads as far as it can; what could not be read is missing.
+SignatureBlock ReadSignatureBlock(const std::string& path);
+
+}  // namespace vesk2_command
+
+#endif  // VESK2_TOOLS_MANIFEST_FILE_H

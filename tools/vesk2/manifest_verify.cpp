@@ -1,0 +1,238 @@
+// manifest_verify.cpp: vesk2 manifest verify.
+#include <algorithm>
+#include <cerrno>
+#include <cstring>
+
+#include "tools/vesk2/command.h"
+#include "tools/vesk2/explain.h"
+#include "tools/vesk2/files.h"
+#include "tools/vesk2/manifest_file.h"
+#include "tools/vesk2/report.h"
+#include "tools/vesk2/stores.h"
+#include "tools/vesk2/tree.h"
+
+#include <vesk2/manifest.h>
+
+namespace vesk2_command {
+namespace {
+
+using ZvVesk2::Manifest;
+
+struct Options {
+  std::string directory;
+  std::string manifest;
+  std::string tag;
+  PeriodOptions period;
+  std::string at;
+  bool allowExtra = false;
+  bool allowLinks = false;
+  std::string aclDirectory;
+  std::vector<std::string> ignored;
+  StoreOptions stores;
+};
+
+Period AskedPeriod(const Options& options) {
+  if (options.at.empty()) return ParsePeriod(options.period);
+  return {ParseTime(options.at, false), ParseTime(options.at, false)};
+}
+
+void Configure(Manifest& manifest, const Options& options, const std::set<std::string>& ignored) {
+  Check(
+      manifest.Initialize(options.directory.c_str(), options.manifest.c_str(), options.tag.c_str()),
+      "preparing");
+  manifest.SetFailOnExtraEntries(!options.allowExtra);
+  if (!options.aclDirectory.empty()) manifest.SetExtraAclDirectory(NewText(options.aclDirectory));
+  FileItem* list = nullptr;
+  for (const std::string& name : ignored) {
+    FileItem* item = ZvVesk2::FileItemCreate(NewText(name), nullptr);
+    if (item == nullptr) throw std::bad_alloc();
+    item->next = list;
+    list = item;
+  }
+  const std::unique_ptr<FileItem, decltype(&ZvVesk2::FileItemDelete)> owner(
+      list, &ZvVesk2::FileItemDelete);
+  Check(manifest.SetIgnoredEntries(list), "preparing");
+}
+
+// ---- Findings about the tree ----
+
+// One kind of finding: what it is called, and the entries, sorted.
+struct Finding {
+  const char* kind;
+  std::vector<std::string> entries;
+};
+
+// The names of a result list. Directories are recorded for what is inside them too: those with a
+// recorded entry below them are left out.
+std::vector<std::string> Names(const FileItem* list, const std::set<std::string>& parents) {
+  std::set<std::string> names;  // an unreadable directory is recorded twice
+  for (; list != nullptr; list = list->next) {
+    if (list->isDirectory == 0 || parents.count(list->name) == 0) names.insert(list->name);
+  }
+  return {names.begin(), names.end()};
+}
+
+// Every directory that has a finding below it.
+std::set<std::string> Parents(const Manifest& manifest) {
+  std::set<std::string> parents;
+  for (const FileItem* list : {manifest.GetInvalid(), manifest.GetMissing(), manifest.GetExtra()}) {
+    for (; list != nullptr; list = list->next) {
+      std::string path = list->name;
+      for (size_t at = path.rfind('/'); at != std::string::npos; at = path.rfind('/')) {
+        path.resize(at);
+        if (!parents.insert(path).second) break;
+      }
+    }
+  }
+  return parents;
+}
+
+std::vector<Finding> TreeFindings(const Manifest& manifest, const std::vector<std::string>& leaving,
+                                  bool allowExtra) {
+  const std::set<std::string> parents = Parents(manifest);
+  std::vector<Finding> findings = {
+      {"changed", Names(manifest.GetInvalid(), parents)},
+      {"missing", Names(manifest.GetMissing(), parents)},
+      {"link out of the tree", leaving},
+  };
+  if (!allowExtra) findings.push_back({"not listed", Names(manifest.GetExtra(), parents)});
+  return findings;
+}
+
+// "missing" covers all that could not be opened; a look at the disk tells more.
+std::string Detail(const std::string& path) {
+  const std::string why = WhyUnreadable(path);
+  return why == std::strerror(ENOENT) || why == "cannot be read" ? "" : " (" + why + ")";
+}
+
+void PrintFindings(const std::vector<Finding>& findings) {
+  for (const Finding& finding : findings) {
+    const bool unreadable = std::string(finding.kind) == "missing";
+    for (const std::string& entry : finding.entries) {
+      Note(std::string(finding.kind) + ": " + Escape(entry) + (unreadable ? Detail(entry) : ""));
+    }
+  }
+}
+
+std::string Summary(const std::vector<Finding>& findings) {
+  std::string text;
+  for (const Finding& finding : findings) {
+    if (finding.entries.empty()) continue;
+    text +=
+        (text.empty() ? "" : ", ") + std::to_string(finding.entries.size()) + " " + finding.kind;
+  }
+  return text;
+}
+
+// ---- Verdicts ----
+
+// The answers that are a no: the question was understood, and the answer is not yes.
+bool IsRefusal(int code) {
+  constexpr int kRefusals[] = {
+      VESK2_ERR_SIGNATURE_ID,       VESK2_ERR_NOT_IMPLEMENTED, VESK2_ERR_SIGNATURE,
+      VESK2_ERR_HASH_MISMATCH,      VESK2_ERR_NOT_AUTHORIZED,  VESK2_ERR_HASH_MATCH,
+      VESK2_ERR_SIGNING_CERT_ORDER, VESK2_ERR_CERT_REVOKED,    VESK2_ERR_PACKAGE_NOT_GRANTED,
+      VESK2_ERR_KEY_REVOKED,        VESK2_ERR_NOT_OBJECT_CERT, VESK2_ERR_CRL_NOT_FOUND,
+  };
+  return std::find(std::begin(kRefusals), std::end(kRefusals), code) != std::end(kRefusals);
+}
+
+bool JudgedTree(const Manifest& manifest, int code) {
+  return code == 0 || manifest.GetInvalid() != nullptr || manifest.GetMissing() != nullptr ||
+         (code == VESK2_ERR_EXTRA_FILES && manifest.GetExtra() != nullptr);
+}
+
+[[noreturn]] void ThrowTrouble(const Options& options, const Manifest& manifest, int code) {
+  if (code == VESK2_ERR_OPEN_MANIFEST_FILE) {
+    throw Trouble(Escape(options.manifest) + ": " + WhyUnreadable(options.manifest));
+  }
+  if (code == VESK2_ERR_FILE_NOT_FOUND || code == VESK2_ERR_FIND_DIR) {
+    for (const std::string& reason : ExplainStore()) Note(reason);
+    throw Trouble("the ACL store cannot be loaded; nothing is trusted (" + CodeName(code) + ")");
+  }
+  if (code < 0 || code == VESK2_ERR_MEM_ALLOC) throw Trouble(Reason(code));
+  // A body that does not parse has been read to the end of the file: this tells the byte.
+  ReadListing(options.manifest, options.directory);
+  Malformed(options.manifest, manifest.GetReadPosition(), "manifest", code);
+}
+
+ExitCode AnswerAuthority(const Options& options, const Manifest& manifest, Question question,
+                         int code) {
+  const std::vector<std::string> reasons = ExplainAuthority(question, code);
+  if (!IsRefusal(code)) {
+    for (const std::string& reason : reasons) Note(reason);
+    ThrowTrouble(options, manifest, code);
+  }
+  Say("no: " + Reason(code));
+  for (const std::string& reason : reasons) Note(reason);
+  if (reasons.empty() && code != VESK2_ERR_HASH_MATCH) {
+    Note("the certificates and the ACL entries do not combine to what was asked, " +
+         TagText(question.tag));
+  }
+  return kNo;
+}
+
+ExitCode AnswerTree(const Options& options, const Manifest& manifest,
+                    const std::set<std::string>& ignored, int code) {
+  const auto root = ReadListing(options.manifest, options.directory);
+  const TreeNotes notes = InspectTree(*root, ignored);
+  const std::vector<std::string> none;
+  const std::vector<Finding> findings =
+      TreeFindings(manifest, options.allowLinks ? none : notes.leaving, options.allowExtra);
+  const std::string summary = Summary(findings);
+  if (code == 0 && summary.empty()) {
+    const SignatureBlock block = ReadSignatureBlock(options.manifest);
+    Say("yes: " + Escape(options.directory) + " is as signed at " + StampText(*block.signedAt) +
+        " by " + Fingerprint(*block.certs.front().cert->GetIssuer()));
+  } else {
+    Say("no: " + summary + (code != 0 ? " (" + CodeName(code) + ")" : ""));
+    PrintFindings(findings);
+  }
+  if (!options.allowExtra) {
+    for (const std::string& name : notes.unlisted) {
+      Note("note: " + Escape(name) + " is not listed; the top directory may hold more");
+    }
+  }
+  return code == 0 && summary.empty() ? kYes : kNo;
+}
+
+ExitCode Run(const Options& options) {
+  UseStores(options.stores);
+  RealDirectory(options.directory);
+  const Ref<SExpression> tag = ParseTag(options.tag);
+  Period period = AskedPeriod(options);
+  const long notBefore = period.notBefore ? period.notBefore->ToTime() : 0;
+  const long notAfter = period.notAfter ? period.notAfter->ToTime() : 0;
+  std::set<std::string> ignored;
+  for (const std::string& name : options.ignored) ignored.insert(PlainRelative(name));
+
+  Manifest manifest(nullptr);
+  Configure(manifest, options, ignored);
+  const int code = manifest.VerifyManifest(notBefore, notAfter);
+  if (JudgedTree(manifest, code)) return AnswerTree(options, manifest, ignored, code);
+  return AnswerAuthority(options, manifest,
+                         {options.manifest, tag.get(), std::move(period), options.aclDirectory},
+                         code);
+}
+
+}  // namespace
+
+Action DefineManifestVerify(CLI::App& app) {
+  auto options = std::make_shared<Options>();
+  app.add_option("directory", options->directory, "The tree to check")->required();
+  app.add_option("manifest", options->manifest, "The manifest file")->required();
+  app.add_option("--tag", options->tag, "What the signer must be authorized for")->required();
+  AddPeriodOptions(app, options->period);
+  app.add_option("--at", options->at, "Authorized at this moment [at the time of signing]")
+      ->excludes("--not-before")
+      ->excludes("--not-after");
+  app.add_flag("--allow-extra", options->allowExtra, "Accept entries that are not listed");
+  app.add_flag("--allow-links", options->allowLinks, "Accept links that lead out of the tree");
+  app.add_option("--acl-dir", options->aclDirectory, "Trust the entries of this directory too");
+  app.add_option("--ignore", options->ignored, "Leave this entry out (a path below the directory)")
+      ->allow_extra_args(false);
+  AddStoreOptions(app, options->stores);
+  return [options] { return Run(*options); };
+}
+
+}  // namespace vesk2_command

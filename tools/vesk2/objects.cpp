@@ -1,0 +1,105 @@
+// objects.cpp: reading, building and printing the library's objects.
+#include "tools/vesk2/objects.h"
+
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+
+#include "tools/vesk2/files.h"
+#include "tools/vesk2/report.h"
+
+namespace vesk2_command {
+namespace {
+
+bool HasEmptyWord(const SExpression& list) {
+  for (auto it = list.Begin(); it; it.Next()) {
+    if (const auto* word = dynamic_cast<ByteString*>(it.Value())) {
+      if (word->GetLength() == 0) return true;
+    } else if (const auto* nested = dynamic_cast<SExpression*>(it.Value())) {
+      if (HasEmptyWord(*nested)) return true;
+    }
+  }
+  return false;
+}
+
+}  // namespace
+
+Buffer OpenBuffer(const std::string& path) {
+  Buffer buffer(ZVsysutil::zv_buffer_wrap_file(path.c_str()));
+  if (!buffer) throw Trouble(Escape(path) + ": " + WhyUnreadable(path));
+  return buffer;
+}
+
+Buffer WrapBytes(std::string_view bytes) {
+  Buffer buffer(ZVsysutil::zv_buffer_wrap(bytes.data(), bytes.size()));
+  if (!buffer) throw std::bad_alloc();
+  return buffer;
+}
+
+void Check(int code, const std::string& what) {
+  if (code != 0) throw Trouble(what + ": " + Reason(code));
+}
+
+void Malformed(const std::string& path, size_t offset, const std::string& kind, int code) {
+  throw Trouble(Escape(path) + ": byte " + std::to_string(offset) + ": malformed " + kind + ": " +
+                Reason(code));
+}
+
+char* NewText(const std::string& text) {
+  char* copy = new char[text.size() + 1];
+  std::memcpy(copy, text.c_str(), text.size() + 1);
+  return copy;
+}
+
+std::string Atom(std::string_view bytes) {
+  return std::to_string(bytes.size()).append(":").append(bytes);
+}
+
+std::string Canonical(DExpression& expression) {
+  char* data = nullptr;
+  size_t size = 0;
+  FILE* stream = open_memstream(&data, &size);
+  if (stream == nullptr) throw std::bad_alloc();
+  const int code = expression.PrintCanonical(stream);
+  const bool closed = std::fclose(stream) == 0;
+  const std::unique_ptr<char, decltype(&std::free)> owner(data, &std::free);
+  Check(code, "writing an object");
+  if (!closed) throw std::bad_alloc();
+  return std::string(data, size);
+}
+
+std::string Fingerprint(DExpression& expression) {
+  unsigned char* digest = nullptr;
+  unsigned int length = 0;
+  Check(expression.ComputeHash(digest, length, ZVCLM_HASH_SHA256, true), "digest of a key");
+  const std::unique_ptr<unsigned char[]> owner(digest);
+  return "sha256:" + Hex({reinterpret_cast<char*>(digest), length});
+}
+
+std::string TagText(SExpression* tag) {
+  if (tag == nullptr) return "everything";
+  const Text text(tag->ExportTag("tag"));
+  return text ? Escape(text.get()) : "()";
+}
+
+Ref<SExpression> ParseTag(const std::string& text) {
+  const std::string what = "tag \"" + Escape(text) + "\"";
+  Ref<SExpression> tag;
+  Check(SExpression::ParseTagAdvanced(tag.Out(), text.c_str(), "tag", nullptr), what);
+  if (tag->Count() < 2) throw Trouble(what + ": empty; a tag names what is granted");
+  if (HasEmptyWord(*tag)) throw Trouble(what + ": every list must begin with a word");
+  // What is typed may be longer than what can be read back from a file.
+  Ref<SExpression> again;
+  const Buffer buffer = WrapBytes(Canonical(*tag));
+  Check(SExpression::Import(again.Out(), buffer.get(), nullptr), what);
+  return tag;
+}
+
+Ref<ByteString> MakeText(const std::string& text) {
+  if (text.empty()) return {};
+  Ref<ByteString> bytes(new ByteString(nullptr));
+  Check(bytes->Set(text.c_str(), ByteString::BsNone), "text \"" + Escape(text) + "\"");
+  return bytes;
+}
+
+}  // namespace vesk2_command

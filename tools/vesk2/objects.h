@@ -1,0 +1,65 @@
+// objects.h: the library's objects as the command handles them: read from files with an error line
+// that names file and byte, built from arguments, turned into text.
+//
+// Every object is made without a context (null), which the library accepts everywhere.
+#ifndef VESK2_TOOLS_OBJECTS_H
+#define VESK2_TOOLS_OBJECTS_H
+
+#include <memory>
+#include <string>
+#include <string_view>
+
+#include <vesk2/public_key.h>
+#include <vesk2/ref.h>
+
+namespace vesk2_command {
+
+using ZvVesk2::ByteString;
+using ZvVesk2::DExpression;
+using ZvVesk2::PublicKey;
+using ZvVesk2::Ref;
+using ZvVesk2::SExpression;
+using ZvVesk2::ZvBuffer;
+
+struct FreeBuffer {
+  void operator()(ZvBuffer* buffer) const { ZVsysutil::zv_buffer_free(buffer); }
+};
+using Buffer = std::unique_ptr<ZvBuffer, FreeBuffer>;
+
+struct FreeText {
+  void operator()(char* text) const { Vesk2Free(text); }
+};
+using Text = std::unique_ptr<char, FreeText>;
+
+// OpenBuffer reads a file for the library's readers. Trouble says why it cannot be read.
+Buffer OpenBuffer(const std::string& path);
+Buffer WrapBytes(std::string_view bytes);
+
+// Check throws Trouble "what: reason" unless `code` is 0.
+void Check(int code, const std::string& what);
+// Malformed throws the line for a file that a reader refused at a byte.
+[[noreturn]] void Malformed(const std::string& path, size_t offset, const std::string& kind,
+                            int code);
+
+// A new string from new[], for the setters that adopt one.
+char* NewText(const std::string& text);
+
+// One atom of the canonical encoding.
+std::string Atom(std::string_view bytes);
+// The canonical encoding with display hints, as a file holds it.
+std::string Canonical(DExpression& expression);
+// "sha256:" and the digest of the canonical form without hints: the identity of a key.
+std::string Fingerprint(DExpression& expression);
+// The advanced text of a tag's body, escaped: "(install (app calc))".
+std::string TagText(SExpression* tag);
+
+// ParseTag reads the body of a tag in advanced form. Trouble for what the library's reader refuses,
+// for an empty tag, and for empty words: the reduction cannot read those, and one such entry in the
+// ACL store would stop every verification.
+Ref<SExpression> ParseTag(const std::string& text);
+// A byte string, null for an empty text.
+Ref<ByteString> MakeText(const std::string& text);
+
+}  // namespace vesk2_command
+
+#endif  // VESK2_TOOLS_OBJECTS_H

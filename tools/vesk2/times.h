@@ -1,0 +1,38 @@
+// times.h: moments and periods from the command line.
+#ifndef VESK2_TOOLS_TIMES_H
+#define VESK2_TOOLS_TIMES_H
+
+#include <CLI/CLI.hpp>
+#include <string>
+
+#include <vesk2/ref.h>
+#include <vesk2/time_stamp.h>
+
+namespace vesk2_command {
+
+using ZvVesk2::Ref;
+using ZvVesk2::TimeStamp;
+
+// ParseTime reads "now" or a stamp that may stop after any whole field (2026, 2026-11, ...,
+// 2026-11-22_18:30:00, UTC): the first second of what it names, or with `endOfPeriod` the last.
+Ref<TimeStamp> ParseTime(const std::string& text, bool endOfPeriod);
+
+struct PeriodOptions {
+  std::string notBefore;
+  std::string notAfter;
+};
+void AddPeriodOptions(CLI::App& app, PeriodOptions& options);
+
+// Null where nothing was given.
+struct Period {
+  Ref<TimeStamp> notBefore;
+  Ref<TimeStamp> notAfter;
+};
+Period ParsePeriod(const PeriodOptions& options);
+
+// A stamp's text, escaped: stamps in files hold whatever their writer put there.
+std::string StampText(const TimeStamp& stamp);
+
+}  // namespace vesk2_command
+
+#endif  // VESK2_TOOLS_TIMES_H
