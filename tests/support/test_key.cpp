@@ -52,22 +52,6 @@ std::string Number(EVP_PKEY* key, const char* name, const char* parameter) {
   return List({Str(name), Str(bytes)});
 }
 
-// libcrypto's DER signature as r and s of 20 bytes each.
-std::string RawDsa(const std::string& der) {
-  const auto* in = reinterpret_cast<const unsigned char*>(der.data());
-  const std::unique_ptr<DSA_SIG, decltype(&DSA_SIG_free)> signature(
-      d2i_DSA_SIG(nullptr, &in, static_cast<long>(der.size())), DSA_SIG_free);
-  Check(signature != nullptr, "DSA signature");
-  const BIGNUM* r = nullptr;
-  const BIGNUM* s = nullptr;
-  DSA_SIG_get0(signature.get(), &r, &s);
-  std::string raw(40, '\0');
-  auto* out = reinterpret_cast<unsigned char*>(raw.data());
-  Check(BN_bn2binpad(r, out, 20) == 20 && BN_bn2binpad(s, out + 20, 20) == 20,
-        "DSA signature size");
-  return raw;
-}
-
 }  // namespace
 
 const TestKey& TestKey::Rsa(unsigned index) {
@@ -94,6 +78,21 @@ std::string TestKey::Public() const {
                 Number(key, "q", OSSL_PKEY_PARAM_FFC_Q) + Number(key, "y", OSSL_PKEY_PARAM_PUB_KEY)
           : Number(key, "e", OSSL_PKEY_PARAM_RSA_E) + Number(key, "n", OSSL_PKEY_PARAM_RSA_N);
   return List({Str("public-key"), List({Str(IsDsa() ? "dsa" : "rsa"), numbers})});
+}
+
+std::string TestKey::RawDsa(const std::string& der) {
+  const auto* in = reinterpret_cast<const unsigned char*>(der.data());
+  const std::unique_ptr<DSA_SIG, decltype(&DSA_SIG_free)> signature(
+      d2i_DSA_SIG(nullptr, &in, static_cast<long>(der.size())), DSA_SIG_free);
+  Check(signature != nullptr, "DSA signature");
+  const BIGNUM* r = nullptr;
+  const BIGNUM* s = nullptr;
+  DSA_SIG_get0(signature.get(), &r, &s);
+  std::string raw(40, '\0');
+  auto* out = reinterpret_cast<unsigned char*>(raw.data());
+  Check(BN_bn2binpad(r, out, 20) == 20 && BN_bn2binpad(s, out + 20, 20) == 20,
+        "DSA signature size");
+  return raw;
 }
 
 std::string TestKey::SignDigest(const std::string& digest, const char* algorithm,

@@ -24,6 +24,8 @@ class TestKey {
                    const char* hash = nullptr) const;
   // The raw signature bytes over a digest made by `hash`; r and s (20 bytes each) for DSA.
   std::string SignDigest(const std::string& digest, const char* algorithm, const char* hash) const;
+  // A DSA signature from libcrypto's DER form to r and s of 20 bytes each.
+  static std::string RawDsa(const std::string& der);
   std::string PrivatePem() const;
   EVP_PKEY* Pkey() const { return key_.get(); }
 

@@ -25,9 +25,9 @@ std::string HashOf(std::string_view canonical, const char* name = "sha256");
 // A certificate. Subjects, tag and revocation are canonical text; the others are bytes. Empty
 // members are left out.
 struct CertText {
-  std::string issuer, subject, tag;
+  std::string issuer = {}, subject = {}, tag = {};
   bool propagate = false;
-  std::string notBefore, notAfter, comment, revocation;
+  std::string notBefore = {}, notAfter = {}, comment = {}, revocation = {};
   bool version = false;
 };
 std::string Cert(const CertText& parts);
