@@ -37,9 +37,6 @@ class VESK2_API TimeStamp : public ByteString {
   bool IsBeforeOrEqual(const TimeStamp* other) const;
   bool IsAfter(const TimeStamp* other) const;
   bool IsAfterOrEqual(const TimeStamp* other) const;
-
- private:
-  bool ownStorage = false;  // `data` was allocated here and holds 20 bytes
 };
 
 }  // namespace ZvVesk2
