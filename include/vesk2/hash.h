@@ -44,8 +44,7 @@ class VESK2_API Hash : public Principal {
 
   // DumpFingerprint turns "(hash NAME BYTES)" of `length` bytes into "NAME HEX", terminated, in
   // `out`, which must hold 2 * length + 8 bytes. A name outside the three gives the name alone; any
-  // other text
-  // "(null)". Returns `out`.
+  // other text "(null)". Returns `out`.
   static char* DumpFingerprint(char* out, const unsigned char* text, unsigned int length);
 
   // HashFile writes the SHA-256 of a regular file to `digest` and 32 to *digestLength, which on

@@ -72,6 +72,12 @@ class VESK2_API PublicKey : public Principal {
   ZVCLMPublicKeyData* GetKey() const { return key; }
 
  private:
+  bool IsEmpty() const;
+  template <typename Form>
+  [[nodiscard]] int ImportNumbers(ZvBuffer* buffer);
+  template <typename Form>
+  [[nodiscard]] int SetNumbers(ZVCLMPublicKeyData* newKey);
+
   int32_t keyType = -1;
   ZVCLMPublicKeyData* key = nullptr;
   const char* algorithmName = nullptr;

@@ -23,8 +23,7 @@ class VESK2_API Subject : public SExpression {
   virtual bool IsThresholdSubject() const;
 
   // Import reads any subject and picks the class by the next two characters: "(1" a key, "(4" a
-  // hash,
-  // "(6" a k-of-n; anything else is VESK2_ERR_PRINCIPAL. Names are never read from text.
+  // hash, "(6" a k-of-n; anything else is VESK2_ERR_PRINCIPAL. Names are never read from text.
   [[nodiscard]] static int Import(Subject*& subject, ZvBuffer* buffer, Vesk2ContextStruct* context);
 };
 
@@ -104,6 +103,9 @@ class VESK2_API ThresholdSubject : public Subject {
   unsigned int GetN() const { return n; }
 
  private:
+  [[nodiscard]] int SetHead(unsigned int newK, ByteString::BsType hintK, unsigned int newN,
+                            ByteString::BsType hintN);
+
   unsigned int k = 0;
   unsigned int n = 0;
 };

@@ -1,0 +1,61 @@
+// What every reader and builder of a typed object does: read a part into a new value, and hand it
+// to a list. References travel as Ref, so that a part that was not appended is freed on every path.
+#ifndef VESK2_SRC_OBJECTS_BUILD_H
+#define VESK2_SRC_OBJECTS_BUILD_H
+
+#include <utility>
+
+#include <vesk2/expression.h>
+#include <vesk2/ref.h>
+
+#include "src/frame/check.h"
+#include "src/frame/handles.h"
+
+namespace ZvVesk2 {
+
+using BufferPtr = BufferOwner;
+
+// ImportNew makes a T and reads it from the buffer with T::Import. `out` is untouched on failure.
+template <typename T>
+[[nodiscard]] int ImportNew(Ref<T>& out, ZvBuffer* buffer, Vesk2ContextStruct* context) {
+  Ref<T> made(TryNew<T>(context));
+  VESK2_REQUIRE(made, VESK2_ERR_MEM_ALLOC);
+  VESK2_TRY(made->Import(buffer));
+  out = std::move(made);
+  return 0;
+}
+
+// Append gives the list the reference to `value`; on failure the value is freed. The second form
+// then points `field` at it, borrowed: a field is only ever set to what the list holds.
+template <typename T>
+[[nodiscard]] int Append(SExpression* list, Ref<T> value) {
+  VESK2_TRY(list->Insert(value.get()));
+  (void)value.Release();
+  return 0;
+}
+template <typename T>
+[[nodiscard]] int Append(SExpression* list, Ref<T> value, T*& field) {
+  T* const borrowed = value.get();
+  VESK2_TRY(Append(list, std::move(value)));
+  field = borrowed;
+  return 0;
+}
+
+// AppendHead appends the new list (name) and points `head` at it, borrowed, for more elements.
+[[nodiscard]] inline int AppendHead(SExpression* list, const char* name, SExpression*& head) {
+  Ref<SExpression> made;
+  VESK2_TRY(SExpression::Create(made.Out(), name, list->GetContext()));
+  return Append(list, std::move(made), head);
+}
+
+// AppendPair appends (name value) and points `field` at the value, borrowed.
+template <typename T>
+[[nodiscard]] int AppendPair(SExpression* list, const char* name, Ref<T> value, T*& field) {
+  SExpression* pair = nullptr;
+  VESK2_TRY(AppendHead(list, name, pair));
+  return Append(pair, std::move(value), field);
+}
+
+}  // namespace ZvVesk2
+
+#endif  // VESK2_SRC_OBJECTS_BUILD_H

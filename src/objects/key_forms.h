@@ -1,0 +1,66 @@
+// The two kinds of key, as tables: which numbers a key has, how they are called and ordered in
+// expressions, and where the crypto layer's records hold them.
+#ifndef VESK2_SRC_OBJECTS_KEY_FORMS_H
+#define VESK2_SRC_OBJECTS_KEY_FORMS_H
+
+#include <array>
+
+#include <vesk2/platform.h>
+
+namespace ZvVesk2 {
+
+template <typename Record>
+struct KeyNumber {
+  const char* name;
+  ZVCLMBigInt* Record::*field;
+};
+
+struct RsaForm {
+  using Record = ZVCLMRSAKeyData;
+  static constexpr const char* kName = "rsa";
+  static constexpr int kType = ZVCLM_KEY_RSA;
+  static constexpr int kDataId = ZVCLM_DATA_RSA;
+  static constexpr std::array<KeyNumber<Record>, 2> kNumbers{
+      {{"e", &Record::e}, {"n", &Record::n}}};
+  static int Init(Record* record) { return zvclm_RSAKeyStructInit(kDataId, record); }
+  static void Wipe(Record* record) { zvclm_RSAKeyStructZeroize(kDataId, record); }
+};
+
+struct DsaForm {
+  using Record = ZVCLMDSSKeyData;
+  static constexpr const char* kName = "dsa";
+  static constexpr int kType = ZVCLM_KEY_DSA;
+  static constexpr int kDataId = ZVCLM_DATA_DSA;
+  // g before q: stored keys and their digests rely on this order.
+  static constexpr std::array<KeyNumber<Record>, 4> kNumbers{
+      {{"p", &Record::p}, {"g", &Record::g}, {"q", &Record::q}, {"y", &Record::y}}};
+  static constexpr uint32_t kParameterSize = 48;
+  static int Init(Record* record) {
+    return zvclm_DSSKeyStructInit(kDataId, record, kParameterSize);
+  }
+  static void Wipe(Record* record) { zvclm_DSSKeyStructZeroize(kDataId, record); }
+};
+
+// A record whose numbers are wiped when it goes.
+template <typename Form>
+class KeyRecord {
+ public:
+  KeyRecord() = default;
+  ~KeyRecord() { Form::Wipe(&data_); }
+  KeyRecord(const KeyRecord&) = delete;
+  KeyRecord& operator=(const KeyRecord&) = delete;
+
+  [[nodiscard]] int Init() { return Form::Init(&data_); }
+  typename Form::Record* get() { return &data_; }
+  typename Form::Record* operator->() { return &data_; }
+  ZVCLMBigInt*& Number(const KeyNumber<typename Form::Record>& number) {
+    return data_.*number.field;
+  }
+
+ private:
+  typename Form::Record data_{};
+};
+
+}  // namespace ZvVesk2
+
+#endif  // VESK2_SRC_OBJECTS_KEY_FORMS_H

@@ -1,0 +1,129 @@
+// PublicKey: a key as an expression and as a key object of the crypto layer; reading and building
+// it.
+#include <vesk2/public_key.h>
+
+#include "src/objects/build.h"
+#include "src/objects/key_forms.h"
+
+namespace ZvVesk2 {
+namespace {
+
+// A number of the crypto layer as a byte string, without leading zeros.
+int NumberText(Ref<ByteString>& out, const ZVCLMBigInt* number, Vesk2ContextStruct* context) {
+  const int size = zvclm_BigIntGetBufferSize(number);
+  VESK2_REQUIRE(size >= 0, VESK2_ERR_BIG_INT_BUFFER_SIZE);
+  auto length = static_cast<uint32_t>(size);
+  std::unique_ptr<unsigned char[]> bytes(TryNewArray<unsigned char>(length));
+  VESK2_REQUIRE(bytes, VESK2_ERR_MEM_ALLOC);
+  VESK2_TRY(zvclm_BigIntToBuffer(number, bytes.get(), &length));
+  out.Reset(TryNew<ByteString>(bytes.get(), length, ByteString::BsBin, context));
+  VESK2_REQUIRE(out, VESK2_ERR_MEM_ALLOC);
+  (void)bytes.release();
+  return 0;
+}
+
+}  // namespace
+
+PublicKey::PublicKey(Vesk2ContextStruct* ctx) : Principal(ctx) {}
+
+PublicKey::~PublicKey() {
+  if (key != nullptr) zvclm_PublicKeyFree(key, CryptoHandle());
+}
+
+const char* PublicKey::DirectoryName() const { return ""; }
+
+const char* PublicKey::ExtensionName() const { return ".pub"; }
+
+int PublicKey::IsRevoked(bool&) { return 0; }
+
+// "(10:public-key(3:" and, by the next character, the RSA or the DSA half, "))".
+int PublicKey::Import(ZvBuffer* buffer) {
+  VESK2_REQUIRE(buffer != nullptr && IsEmpty(), VESK2_ERR_INVALID_PARAM);
+  VESK2_TRY(buffer->Expect("(10:public-key(3:"));
+  switch (buffer->Peek()) {
+    case 'r':
+      VESK2_TRY(ImportRSA(buffer));
+      break;
+    case 'd':
+      VESK2_TRY(ImportDSA(buffer));
+      break;
+    default:
+      return VESK2_ERR_PARSE_FILE;
+  }
+  return buffer->Expect("))");
+}
+
+int PublicKey::Import(const char* name) {
+  VESK2_REQUIRE(name != nullptr, VESK2_ERR_INVALID_PARAM);
+  const std::unique_ptr<char[]> path(CalcPath(DirectoryName(), ExtensionName(), name, StoragePath));
+  const BufferPtr buffer(ZVsysutil::zv_buffer_wrap_file(path.get()));
+  VESK2_REQUIRE(buffer, VESK2_ERR_FILE_OPEN);
+  VESK2_TRY(Import(buffer.get()));
+  return SetFilePath(path.get());
+}
+
+// "rsa(1:e" <e> ")(1:n" <n> ")"
+int PublicKey::ImportRSA(ZvBuffer* buffer) { return ImportNumbers<RsaForm>(buffer); }
+
+// "dsa(1:p" <p> ")(1:g" <g> ")(1:q" <q> ")(1:y" <y> ")"
+int PublicKey::ImportDSA(ZvBuffer* buffer) { return ImportNumbers<DsaForm>(buffer); }
+
+int PublicKey::SetRSA(ZVCLMPublicKeyData* newKey) { return SetNumbers<RsaForm>(newKey); }
+
+int PublicKey::SetDSA(ZVCLMPublicKeyData* newKey) { return SetNumbers<DsaForm>(newKey); }
+
+bool PublicKey::IsEmpty() const { return key == nullptr && First() == nullptr; }
+
+template <typename Form>
+int PublicKey::ImportNumbers(ZvBuffer* buffer) {
+  VESK2_REQUIRE(buffer != nullptr && IsEmpty(), VESK2_ERR_INVALID_PARAM);
+  algorithmName = Form::kName;
+  keyType = Form::kType;
+  VESK2_TRY(buffer->Expect(Form::kName));
+  KeyRecord<Form> record;
+  VESK2_TRY(record.Init());
+  VESK2_TRY(Insert("public-key"));
+  SExpression* numbers = nullptr;
+  VESK2_TRY(AppendHead(this, Form::kName, numbers));
+  for (const auto& number : Form::kNumbers) {
+    VESK2_TRY(buffer->Expect("(1:"));
+    VESK2_TRY(buffer->Expect(number.name));
+    Ref<ByteString> text;
+    VESK2_TRY(ImportNew(text, buffer, GetContext()));
+    VESK2_TRY(buffer->Expect(")"));
+    VESK2_TRY(zvclm_BigIntFromBuffer(&record.Number(number), text->GetData(), text->GetLength()));
+    ByteString* listed = nullptr;
+    VESK2_TRY(AppendPair(numbers, number.name, std::move(text), listed));
+  }
+  VESK2_TRY(
+      zvclm_PublicKeyDefine(&key, Form::kType, Form::kDataId, record.get(), 0, CryptoHandle()));
+  KeyRecord<Form> stored;
+  VESK2_TRY(stored.Init());
+  VESK2_TRY(zvclm_PublicKeyGetData(key, Form::kDataId, stored.get(), CryptoHandle()));
+  keyLength = stored->keyLength;
+  return 0;
+}
+
+template <typename Form>
+int PublicKey::SetNumbers(ZVCLMPublicKeyData* newKey) {
+  VESK2_REQUIRE(newKey != nullptr && IsEmpty(), VESK2_ERR_INVALID_PARAM);
+  key = newKey;
+  KeyRecord<Form> record;
+  VESK2_TRY(record.Init());
+  VESK2_TRY(zvclm_PublicKeyGetData(key, Form::kDataId, record.get(), CryptoHandle()));
+  keyType = Form::kType;
+  algorithmName = Form::kName;
+  keyLength = record->keyLength;
+  VESK2_TRY(Insert("public-key"));
+  SExpression* numbers = nullptr;
+  VESK2_TRY(AppendHead(this, Form::kName, numbers));
+  for (const auto& number : Form::kNumbers) {
+    Ref<ByteString> text;
+    ByteString* listed = nullptr;
+    VESK2_TRY(NumberText(text, record.Number(number), GetContext()));
+    VESK2_TRY(AppendPair(numbers, number.name, std::move(text), listed));
+  }
+  return 0;
+}
+
+}  // namespace ZvVesk2

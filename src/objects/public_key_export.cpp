@@ -1,0 +1,33 @@
+// PublicKey: the key in the encodings of other programs.
+#include <memory>
+
+#include <vesk2/public_key.h>
+
+#include "src/frame/check.h"
+#include "src/platform/crypto.h"
+
+namespace ZvVesk2 {
+namespace {
+
+int ExportKey(const ZVCLMPublicKeyData* key, int format, unsigned char*& out, unsigned int& length,
+              uint32_t handle) {
+  out = nullptr;
+  // Asking for the size is answered with "too small".
+  const int asked = zvclm_PublicKeyExport(key, format, 0, nullptr, &length, handle);
+  VESK2_REQUIRE(asked == 0 || asked == ZVCLM_ERR_BUFFER_TOO_SMALL, asked);
+  out = TryNewArray<unsigned char>(length);
+  VESK2_REQUIRE(out != nullptr, VESK2_ERR_MEM_ALLOC);
+  return zvclm_PublicKeyExport(key, format, 0, out, &length, handle);
+}
+
+}  // namespace
+
+int PublicKey::SshExport(unsigned char*& out, unsigned int& length) {
+  return ExportKey(key, ZVCLM_FORMAT_SSH, out, length, CryptoHandle());
+}
+
+int PublicKey::X509Export(unsigned char*& out, unsigned int& length) {
+  return ExportKey(key, ZVCLM_FORMAT_X509, out, length, CryptoHandle());
+}
+
+}  // namespace ZvVesk2

@@ -1,0 +1,99 @@
+// ThresholdSubject: any k of n keys.
+#include <vesk2/public_key.h>
+
+#include "src/objects/build.h"
+
+namespace ZvVesk2 {
+namespace {
+
+// The elements before the members: keyword, k and n.
+constexpr int kHeadElements = 3;
+
+SExpression::Iterator Members(const SExpression& list) {
+  SExpression::Iterator element = list.Begin();
+  for (int i = 0; i < kHeadElements && element; ++i) element.Next();
+  return element;
+}
+
+// One count: a raw byte, with whatever display hint its text has.
+struct RawCount {
+  unsigned char value;
+  ByteString::BsType hint;
+};
+
+int ReadCount(RawCount& count, ZvBuffer* buffer, ByteString* text) {
+  VESK2_TRY(text->Import(buffer));
+  VESK2_REQUIRE(text->GetLength() > 0, VESK2_ERR_PARSE_FILE);
+  count = {text->GetData()[0], text->GetType()};
+  return 0;
+}
+
+}  // namespace
+
+ThresholdSubject::ThresholdSubject(Vesk2ContextStruct* ctx) : Subject(ctx) {}
+
+ThresholdSubject::~ThresholdSubject() = default;
+
+bool ThresholdSubject::IsThresholdSubject() const { return true; }
+
+int ThresholdSubject::Set(unsigned int newK, unsigned int newN) {
+  return SetHead(newK, ByteString::BsNum, newN, ByteString::BsNum);
+}
+
+int ThresholdSubject::SetHead(unsigned int newK, ByteString::BsType hintK, unsigned int newN,
+                              ByteString::BsType hintN) {
+  VESK2_REQUIRE(First() == nullptr, VESK2_ERR_INVALID_PARAM);
+  const auto byteK = static_cast<unsigned char>(newK);
+  const auto byteN = static_cast<unsigned char>(newN);
+  Ref<ByteString> textK(TryNew<ByteString>(GetContext()));
+  Ref<ByteString> textN(TryNew<ByteString>(GetContext()));
+  VESK2_REQUIRE(textK && textN, VESK2_ERR_MEM_ALLOC);
+  VESK2_TRY(textK->Set(&byteK, 1, hintK));
+  VESK2_TRY(textN->Set(&byteN, 1, hintN));
+  VESK2_TRY(Insert("k-of-n"));
+  VESK2_TRY(Append(this, std::move(textK)));
+  VESK2_TRY(Append(this, std::move(textN)));
+  k = newK;
+  n = newN;
+  return 0;
+}
+
+// (k-of-n <k> <n> <key>...): "(6:k-of-n" <k> <n> n public keys ")". Only the first byte of each
+// count is read. The hints are kept, since they are part of what was signed.
+int ThresholdSubject::Import(ZvBuffer* buffer) {
+  VESK2_REQUIRE(buffer != nullptr && First() == nullptr, VESK2_ERR_INVALID_PARAM);
+  VESK2_TRY(buffer->Expect("(6:k-of-n"));
+  Ref<ByteString> text(TryNew<ByteString>(GetContext()));
+  VESK2_REQUIRE(text, VESK2_ERR_MEM_ALLOC);
+  RawCount countK{};
+  RawCount countN{};
+  VESK2_TRY(ReadCount(countK, buffer, text.get()));
+  VESK2_TRY(ReadCount(countN, buffer, text.get()));
+  VESK2_TRY(SetHead(countK.value, countK.hint, countN.value, countN.hint));
+  for (unsigned int i = 0; i < n; ++i) {
+    Ref<PublicKey> member;
+    VESK2_TRY(ImportNew(member, buffer, GetContext()));
+    VESK2_TRY(Append(this, std::move(member)));
+  }
+  return buffer->Expect(")");
+}
+
+bool ThresholdSubject::HasMember(Principal* principal) {
+  for (Iterator element = Members(*this); element; element.Next()) {
+    if (element.Value()->IsEqual(principal)) return true;
+  }
+  return false;
+}
+
+int ThresholdSubject::GetSubjects(SExpression*& members) {
+  VESK2_REQUIRE(members == nullptr, VESK2_ERR_INVALID_PARAM);
+  Ref<SExpression> list(TryNew<SExpression>(GetContext()));
+  VESK2_REQUIRE(list, VESK2_ERR_MEM_ALLOC);
+  for (Iterator element = Members(*this); element; element.Next()) {
+    VESK2_TRY(Append(list.get(), Ref<DExpression>::Share(element.Value())));
+  }
+  members = list.Release();
+  return 0;
+}
+
+}  // namespace ZvVesk2
