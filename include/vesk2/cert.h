@@ -78,8 +78,13 @@ class VESK2_API Cert : public SExpression {
   void SetRevocationElement(SExpression* borrowed) { revocationElement = borrowed; }
 
  private:
-  // Appends (name value) to `list`, sharing `value`.
-  [[nodiscard]] int InsertPair(SExpression* list, const char* name, DExpression* shared);
+  // The elements that Import reads and Set builds, in order.
+  [[nodiscard]] int AppendVersion();
+  [[nodiscard]] int AppendPropagate();
+  [[nodiscard]] int ImportParties(ZvBuffer* buffer);
+  [[nodiscard]] int ImportValidity(ZvBuffer* buffer);
+  [[nodiscard]] int ImportElement(ZvBuffer* buffer, SExpression*& field);
+  [[nodiscard]] int SetValidity(TimeStamp* newNotBefore, TimeStamp* newNotAfter);
 
   SExpression* version = nullptr;
   Principal* issuer = nullptr;
