@@ -4,6 +4,7 @@
 #define VESK2_SIGNATURE_H
 
 #include <vesk2/hash.h>
+#include <vesk2/ref.h>
 
 namespace ZvVesk2 {
 
@@ -25,8 +26,8 @@ class VESK2_API Signature : public SExpression {
   // Create makes a signature from its parts. `value` (1 to 8192 bytes) is copied; the references to
   // `hash` and `principal` are taken over on success only. `signature` must be null and nothing
   // else null or empty (VESK2_ERR_INVALID_PARAM). After a later failure the half-built object is in
-  // `signature`, for the caller to free: it then holds what was appended, and `hash` and
-  // `principal` stay the caller's unless they were.
+  // `signature`, for the caller to free, with references of its own: `hash` and `principal` are
+  // then still the caller's to free.
   [[nodiscard]] static int Create(Signature*& signature, Hash* hash, Principal* principal,
                                   const char* algorithm, unsigned char* value, unsigned int length,
                                   Vesk2ContextStruct* context);
@@ -45,6 +46,8 @@ class VESK2_API Signature : public SExpression {
   ByteString* GetValue() const { return value; }
 
  private:
+  [[nodiscard]] int AppendValue(Ref<ByteString> newAlgorithm, Ref<ByteString> newValue);
+
   Hash* hash = nullptr;
   Principal* principal = nullptr;
   ByteString* algorithm = nullptr;

@@ -1,0 +1,82 @@
+// Signature: what was signed, by whom, and the signature bytes.
+#include <vesk2/cert.h>
+#include <vesk2/signature.h>
+
+#include "src/objects/build.h"
+
+namespace ZvVesk2 {
+
+Signature::Signature(Vesk2ContextStruct* ctx) : SExpression(ctx) {}
+
+Signature::~Signature() = default;
+
+// (signature <hash> <principal> (<algorithm> <value>)):
+//   "(9:signature" <hash> <principal> "(" <algorithm> <value> "))"
+int Signature::Import(ZvBuffer* buffer) {
+  VESK2_REQUIRE(buffer != nullptr && First() == nullptr, VESK2_ERR_INVALID_PARAM);
+  VESK2_TRY(buffer->Expect("(9:signature"));
+  VESK2_TRY(Insert("signature"));
+
+  Ref<Hash> newHash;
+  VESK2_TRY(ImportNew(newHash, buffer, GetContext()));
+  VESK2_TRY(Append(this, std::move(newHash), hash));
+  Ref<Principal> newPrincipal;
+  VESK2_TRY(Principal::Import(newPrincipal.Out(), buffer, GetContext()));
+  VESK2_TRY(Append(this, std::move(newPrincipal), principal));
+
+  VESK2_TRY(buffer->Expect("("));
+  Ref<ByteString> newAlgorithm;
+  Ref<ByteString> newValue;
+  VESK2_TRY(ImportNew(newAlgorithm, buffer, GetContext()));
+  VESK2_TRY(ImportNew(newValue, buffer, GetContext()));
+  VESK2_TRY(AppendValue(std::move(newAlgorithm), std::move(newValue)));
+  return buffer->Expect("))");
+}
+
+int Signature::Create(Signature*& signature, Hash* hash, Principal* principal,
+                      const char* algorithm, unsigned char* value, unsigned int length,
+                      Vesk2ContextStruct* context) {
+  VESK2_REQUIRE(signature == nullptr && hash != nullptr && principal != nullptr &&
+                    algorithm != nullptr && value != nullptr && length != 0,
+                VESK2_ERR_INVALID_PARAM);
+  signature = TryNew<Signature>(context);
+  VESK2_REQUIRE(signature != nullptr, VESK2_ERR_MEM_ALLOC);
+  // The list takes references of its own: until all is done the caller's stay the caller's.
+  VESK2_TRY(signature->Insert("signature"));
+  VESK2_TRY(Append(signature, Ref<Hash>::Share(hash), signature->hash));
+  VESK2_TRY(Append(signature, Ref<Principal>::Share(principal), signature->principal));
+
+  Ref<ByteString> newAlgorithm(TryNew<ByteString>(context));
+  Ref<ByteString> newValue(TryNew<ByteString>(context));
+  VESK2_REQUIRE(newAlgorithm && newValue, VESK2_ERR_MEM_ALLOC);
+  VESK2_TRY(newAlgorithm->Set(algorithm, ByteString::BsNone));
+  VESK2_TRY(newValue->Set(value, length, ByteString::BsBin));
+  VESK2_TRY(signature->AppendValue(std::move(newAlgorithm), std::move(newValue)));
+  hash->Free();
+  principal->Free();
+  return 0;
+}
+
+int Signature::AppendValue(Ref<ByteString> newAlgorithm, Ref<ByteString> newValue) {
+  Ref<SExpression> made(TryNew<SExpression>(GetContext()));
+  VESK2_REQUIRE(made, VESK2_ERR_MEM_ALLOC);
+  SExpression* pair = nullptr;
+  VESK2_TRY(Append(this, std::move(made), pair));
+  VESK2_TRY(Append(pair, std::move(newAlgorithm), algorithm));
+  return Append(pair, std::move(newValue), value);
+}
+
+int Signature::Verify(Cert* cert) {
+  VESK2_REQUIRE(cert != nullptr, VESK2_ERR_PARAM_NULL);
+  Principal* const issuer = cert->GetIssuer();
+  VESK2_REQUIRE(issuer != nullptr && issuer->IsEqual(principal), VESK2_ERR_SIGNATURE);
+  return Verify(static_cast<SExpression*>(cert));
+}
+
+int Signature::Verify(SExpression* object) {
+  VESK2_REQUIRE(object != nullptr, VESK2_ERR_PARAM_NULL);
+  VESK2_REQUIRE(principal != nullptr, VESK2_ERR_SIGNATURE);
+  return principal->Verify(algorithm, value, hash, object);
+}
+
+}  // namespace ZvVesk2
