@@ -13,8 +13,8 @@
 
 struct evp_md_ctx_st;
 
-// A running hash. Small updates are gathered in `block`, inline, so that callers may feed single
-// bytes at nearly the speed of libcrypto over whole blocks. (Opaque to callers of the library.)
+// A running hash. Small updates are gathered in `block`, inline, so that libcrypto sees whole
+// blocks. A loop of them goes through a ZVCLMHashFeed. (Opaque to callers of the library.)
 struct ZVCLMHashContextData {
   static constexpr size_t kBlock = 16384;
   unsigned char* next = block;  // where the next byte goes
@@ -82,6 +82,42 @@ inline int zvclm_HashUpdate(ZVCLMHashContextData* context, const unsigned char* 
     return 0;
   }
   return zvclm_HashUpdateSlow(context, data, length);
+}
+
+// The place where a running hash takes its next byte, held by value: a loop of 4-byte updates keeps
+// it in registers, which the processor's store unit could not keep up with otherwise. Nothing else
+// may use the context until the feed is gone.
+class ZVCLMHashFeed {
+ public:
+  explicit ZVCLMHashFeed(ZVCLMHashContextData* context)
+      : context_(context), next_(context->next), end_(context->end) {}
+  ~ZVCLMHashFeed() { context_->next = next_; }
+  ZVCLMHashFeed(const ZVCLMHashFeed&) = delete;
+  ZVCLMHashFeed& operator=(const ZVCLMHashFeed&) = delete;
+
+  int Update(const unsigned char* data, size_t length) {
+    constexpr size_t kWord = 4;
+    if (length == kWord && static_cast<size_t>(end_ - next_) >= kWord) [[likely]] {
+      std::memcpy(next_, data, kWord);
+      next_ += kWord;
+      return 0;
+    }
+    context_->next = next_;
+    const int code = zvclm_HashUpdateSlow(context_, data, length);
+    next_ = context_->next;
+    end_ = context_->end;
+    return code;
+  }
+
+ private:
+  ZVCLMHashContextData* context_;
+  unsigned char* next_;
+  unsigned char* end_;
+};
+
+inline int zvclm_HashUpdate(ZVCLMHashFeed& feed, const unsigned char* data, size_t length,
+                            uint32_t /*handle*/) {
+  return feed.Update(data, length);
 }
 
 #endif  // VESK2_SRC_PLATFORM_CRYPTO_H
