@@ -1,0 +1,79 @@
+// Narrowing of periods:
+//
+//   constraint = (not-before d) / (not-after d) / (valid *(d / constraint))
+#include "src/engine/validity.h"
+
+#include "src/engine/chain.h"
+#include "src/frame/check.h"
+
+namespace ZvVesk2::Engine {
+namespace {
+
+bool Later(const spki_atom* a, const spki_atom* b) {
+  return spki_cmp_bytes(a->data, a->length, b->data, b->length) == SPKI_ORDER_GREATER;
+}
+
+void Raise(spki_engine* engine, spki_tuple* tuple, spki_atom* date) {
+  if (date == nullptr) return;
+  if (tuple->not_before == nullptr || Later(date, tuple->not_before)) {
+    spki_atom_assign(engine, &tuple->not_before, date);
+  }
+}
+
+void Lower(spki_engine* engine, spki_tuple* tuple, spki_atom* date) {
+  if (date == nullptr) return;
+  if (tuple->not_after == nullptr || Later(tuple->not_after, date)) {
+    spki_atom_assign(engine, &tuple->not_after, date);
+  }
+}
+
+bool IsEmpty(const spki_tuple* tuple) {
+  return tuple->not_before != nullptr && tuple->not_after != nullptr &&
+         Later(tuple->not_before, tuple->not_after);
+}
+
+spki_status Apply(spki_engine* engine, spki_tuple* tuple, const spki_elem* constraint);
+
+spki_status ApplyParts(spki_engine* engine, spki_tuple* tuple, const spki_elem* part) {
+  for (; part != nullptr; part = part->next) {
+    if (const spki_elem* nested = ListOf(part)) VESK2_TRY(Apply(engine, tuple, nested));
+    Raise(engine, tuple, StringOf(part));
+    Lower(engine, tuple, StringOf(part));
+  }
+  return 0;
+}
+
+spki_status Apply(spki_engine* engine, spki_tuple* tuple, const spki_elem* constraint) {
+  const int32_t keyword = HeadKeyword(constraint);
+  if (keyword == SPKI_KW_VALID) return ApplyParts(engine, tuple, constraint->next);
+  if (keyword != SPKI_KW_NOT_BEFORE && keyword != SPKI_KW_NOT_AFTER) return 0;
+  spki_atom* date = nullptr;
+  VESK2_TRY(spki_validity_date(constraint, &date));
+  if (keyword == SPKI_KW_NOT_BEFORE) {
+    Raise(engine, tuple, date);
+  } else {
+    Lower(engine, tuple, date);
+  }
+  return 0;
+}
+
+}  // namespace
+
+bool spki_validity_meet(spki_engine* engine, spki_tuple* tuple, const spki_tuple* other) {
+  Raise(engine, tuple, other->not_before);
+  Lower(engine, tuple, other->not_after);
+  return !IsEmpty(tuple);
+}
+
+spki_status spki_validity_narrow(spki_engine* engine, spki_tuple* tuple,
+                                 const spki_elem* constraint) {
+  VESK2_TRY(Apply(engine, tuple, constraint));
+  return IsEmpty(tuple) ? SPKI_ERR_DATE_INTERSECTION : 0;
+}
+
+spki_status spki_validity_date(const spki_elem* list, spki_atom** date) {
+  *date = StringOf(list->next);
+  return *date != nullptr ? 0 : SPKI_ERR_BAD_SEXP;
+}
+
+}  // namespace ZvVesk2::Engine
