@@ -11,6 +11,8 @@
 #ifndef VESK2_ACL_ENTRY_H
 #define VESK2_ACL_ENTRY_H
 
+#include <cstddef>
+
 #include <vesk2/subject.h>
 #include <vesk2/time_stamp.h>
 
@@ -45,12 +47,16 @@ class VESK2_API AclEntry : public SExpression {
   // store. VESK2_ERR_INVALID_PARAM, VESK2_ERR_FILE_OPEN and the buffer form's.
   [[nodiscard]] int Import(const char* name);
   // Import reads one entry from a buffer into an empty object. An entry that ends right after its
-  // tag leaves its ")" unread. After a failure the object is partly built: free it.
+  // tag leaves its ")" unread. After a failure the object is of no use: free it.
   [[nodiscard]] int Import(ZvBuffer* buffer);
   // Import loads every entry of the store and then of `extraDir` (may be null) into a new list
   // (acl <entry>...). VESK2_ERR_INVALID_PARAM; VESK2_ERR_FILE_NOT_FOUND when nothing was loaded, or
   // when the last file of the store could not be read and there is no `extraDir`.
   [[nodiscard]] static int Import(SExpression*& out, Vesk2ContextStruct* ctx, const char* extraDir);
+  // No context. (A bare nullptr would not tell this from the readers of plain expressions.)
+  [[nodiscard]] static int Import(SExpression*& out, std::nullptr_t, const char* extraDir) {
+    return Import(out, static_cast<Vesk2ContextStruct*>(nullptr), extraDir);
+  }
   using SExpression::Import;
 
   // ParseTagCanonical returns the tag of the first entry of the canonical text (acl (entry ...))
@@ -96,6 +102,13 @@ class VESK2_API AclEntry : public SExpression {
   ByteString* GetComment() const { return comment; }
 
  private:
+  struct Parts;
+  // Writes the list of an empty object and sets the fields.
+  [[nodiscard]] int Build(Parts&& parts);
+  // The two halves of Import: up to the tag, and what follows it.
+  [[nodiscard]] int ImportGrant(Parts& parts, ZvBuffer* buffer) const;
+  [[nodiscard]] int ImportRest(Parts& parts, ZvBuffer* buffer) const;
+
   SExpression* version = nullptr;
   Subject* subject = nullptr;
   bool propagate = false;

@@ -1,0 +1,186 @@
+// AclEntry: building one entry, reading it from canonical text, and the reader of the reduction's
+// answer, which is a list of entries.
+#include <vesk2/acl_entry.h>
+
+#include "src/trust/lists.h"
+
+namespace ZvVesk2 {
+
+AclEntry::AclEntry(Vesk2ContextStruct* ctx) : SExpression(ctx) {}
+
+AclEntry::~AclEntry() = default;
+
+const char* AclEntry::DirectoryName() const { return DirectoryName(true); }
+
+const char* AclEntry::ExtensionName() const { return ExtensionName(true); }
+
+const char* AclEntry::DirectoryName(bool) { return "acl"; }
+
+const char* AclEntry::ExtensionName(bool) { return ".acl"; }
+
+char* AclEntry::CalcDir(StorageType type) {
+  return SExpression::CalcDir(DirectoryName(true), type);
+}
+
+char* AclEntry::CalcPath(const char* name, StorageType type) {
+  return SExpression::CalcPath(DirectoryName(true), ExtensionName(true), name, type);
+}
+
+// What an entry is made of. A reader fills one from text, Create from its arguments.
+struct AclEntry::Parts {
+  bool version = false;
+  Ref<Subject> subject;
+  bool propagate = false;
+  Ref<SExpression> tag;
+  bool valid = false;  // the list may be there without a date
+  Ref<TimeStamp> notBefore;
+  Ref<TimeStamp> notAfter;
+  Ref<ByteString> generation;
+  Ref<ByteString> comment;
+};
+
+namespace {
+
+// [OPENING BYTES ")"], OPENING being for instance "(7:comment"; null when it is not there.
+template <typename Atom>
+int ImportOptional(Ref<Atom>& out, const char* opening, ZvBuffer* buffer, Vesk2ContextStruct* ctx) {
+  if (!buffer->Accept(opening)) return 0;
+  VESK2_TRY(ImportNew(out, buffer, ctx));
+  return buffer->Expect(")");
+}
+
+}  // namespace
+
+// ---- Building ----
+
+int AclEntry::Build(Parts&& parts) {
+  VESK2_TRY(Insert("entry"));
+  if (parts.version) {
+    Ref<SExpression> pair;
+    VESK2_TRY(SExpression::Create(pair.Out(), "version", "1", GetContext()));
+    VESK2_TRY(Append(this, std::move(pair), version));
+  }
+  VESK2_TRY(AppendPair(this, "subject", std::move(parts.subject), subject));
+  if (parts.propagate) {
+    SExpression* flag = nullptr;
+    VESK2_TRY(AppendHead(this, "propagate", flag));
+    propagate = true;
+  }
+  VESK2_TRY(Append(this, std::move(parts.tag), tag));
+  if (parts.valid) {
+    SExpression* valid = nullptr;
+    VESK2_TRY(AppendHead(this, "valid", valid));
+    if (parts.notBefore) {
+      VESK2_TRY(AppendPair(valid, "not-before", std::move(parts.notBefore), notBefore));
+    }
+    if (parts.notAfter) {
+      VESK2_TRY(AppendPair(valid, "not-after", std::move(parts.notAfter), notAfter));
+    }
+  }
+  if (parts.generation) {
+    ByteString* number = nullptr;
+    VESK2_TRY(AppendPair(this, "generation", std::move(parts.generation), number));
+    generation = number->GetData()[0];
+  }
+  if (!parts.comment) return 0;
+  return AppendPair(this, "comment", std::move(parts.comment), comment);
+}
+
+int AclEntry::Create(AclEntry*& out, Subject* subject, bool propagate, SExpression* tag,
+                     TimeStamp* notBefore, TimeStamp* notAfter, unsigned int generation,
+                     ByteString* comment) {
+  VESK2_REQUIRE(out == nullptr && subject != nullptr && tag != nullptr, VESK2_ERR_INVALID_PARAM);
+  Ref<AclEntry> entry(TryNew<AclEntry>(subject->GetContext()));
+  VESK2_REQUIRE(entry, VESK2_ERR_MEM_ALLOC);
+
+  // The list takes references of its own: after a failure everything is still the caller's.
+  Parts parts;
+  parts.version = true;
+  parts.subject = Ref<Subject>::Share(subject);
+  parts.propagate = propagate;
+  parts.tag = Ref<SExpression>::Share(tag);
+  parts.valid = notBefore != nullptr || notAfter != nullptr;
+  parts.notBefore = Ref<TimeStamp>::Share(notBefore);
+  parts.notAfter = Ref<TimeStamp>::Share(notAfter);
+  if (generation != 0) {
+    const auto lowByte = static_cast<unsigned char>(generation);
+    parts.generation.Reset(TryNew<ByteString>(subject->GetContext()));
+    VESK2_REQUIRE(parts.generation, VESK2_ERR_MEM_ALLOC);
+    VESK2_TRY(parts.generation->Set(&lowByte, 1, ByteString::BsNone));
+  }
+  parts.comment = Ref<ByteString>::Share(comment);
+  VESK2_TRY(entry->Build(std::move(parts)));
+
+  DExpression* const handedOver[] = {subject, tag, notBefore, notAfter, comment};
+  for (DExpression* value : handedOver) {
+    if (value != nullptr) value->Free();
+  }
+  out = entry.Release();
+  return 0;
+}
+
+// ---- Reading ----
+
+// (5:entry [(7:version1:1)] (7:subject SUBJECT) [(9:propagate)] TAG
+//   [(5:valid [(10:not-before STAMP)] [(9:not-after STAMP)])]
+//   [(10:generation BYTE)] [(7:comment TEXT)])
+int AclEntry::Import(ZvBuffer* buffer) {
+  VESK2_REQUIRE(buffer != nullptr && First() == nullptr, VESK2_ERR_INVALID_PARAM);
+  Parts parts;
+  VESK2_TRY(ImportGrant(parts, buffer));
+  // Entries in stores may end here: their ")" is left unread, and nothing optional follows.
+  if (buffer->Peek() != ')') VESK2_TRY(ImportRest(parts, buffer));
+  return Build(std::move(parts));
+}
+
+int AclEntry::ImportGrant(Parts& parts, ZvBuffer* buffer) const {
+  VESK2_TRY(buffer->Expect("(5:entry"));
+  // Version and subject both begin "(7:".
+  VESK2_TRY(buffer->Expect("(7:"));
+  parts.version = buffer->Peek() == 'v';
+  if (parts.version) VESK2_TRY(buffer->Expect("version1:1)(7:"));
+  VESK2_TRY(buffer->Expect("subject"));
+  VESK2_TRY(Subject::Import(parts.subject.Out(), buffer, GetContext()));
+  VESK2_TRY(buffer->Expect(")"));
+  parts.propagate = buffer->Accept("(9:propagate)");
+  return SExpression::Import(parts.tag.Out(), buffer, GetContext());
+}
+
+int AclEntry::ImportRest(Parts& parts, ZvBuffer* buffer) const {
+  Vesk2ContextStruct* const ctx = GetContext();
+  parts.valid = buffer->Accept("(5:valid");
+  if (parts.valid) {
+    VESK2_TRY(ImportOptional(parts.notBefore, "(10:not-before", buffer, ctx));
+    VESK2_TRY(ImportOptional(parts.notAfter, "(9:not-after", buffer, ctx));
+    VESK2_TRY(buffer->Expect(")"));
+  }
+  VESK2_TRY(ImportOptional(parts.generation, "(10:generation", buffer, ctx));
+  VESK2_REQUIRE(!parts.generation || parts.generation->GetLength() > 0, VESK2_ERR_PARSE_FILE);
+  VESK2_TRY(ImportOptional(parts.comment, "(7:comment", buffer, ctx));
+  return buffer->Expect(")");
+}
+
+// ---- The reduction's answer ----
+
+// (3:acl(5:entry SUBJECT [(9:propagate)] TAG ...)...). The reduction writes no version; where there
+// is one it is taken for the subject and the subject for the tag, and callers rely on that form
+// only.
+int AclEntry::ParseTagCanonical(SExpression*& out, unsigned char* data, unsigned int length,
+                                Vesk2ContextStruct* ctx) {
+  VESK2_REQUIRE(out == nullptr && data != nullptr && length != 0, VESK2_ERR_INVALID_PARAM);
+  unsigned int pos = 0;
+  VESK2_TRY(DExpression::Expect("(3:acl(5:entry", data, length, pos));
+  Ref<DExpression> subject;
+  VESK2_TRY(SExpression::ParseCanonical(subject.Out(), data, length, pos, ctx));
+  // One digit tells (9:propagate) from a tag.
+  if (length - pos > 1 && data[pos + 1] == '9') {
+    Ref<DExpression> flag;
+    VESK2_TRY(SExpression::ParseCanonical(flag.Out(), data, length, pos, ctx));
+  }
+  Ref<DExpression> tag;
+  VESK2_TRY(SExpression::ParseCanonical(tag.Out(), data, length, pos, ctx));
+  out = static_cast<SExpression*>(tag.Release());
+  return 0;
+}
+
+}  // namespace ZvVesk2

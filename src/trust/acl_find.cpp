@@ -1,0 +1,175 @@
+// The questions that are put to the ACL store. All of them walk its files in the same way, hold one
+// entry at a time, and let the first accepted one decide; they differ in what they accept.
+#include <vesk2/acl_entry.h>
+#include <vesk2/cert.h>
+
+#include "src/platform/file.h"
+#include "src/trust/lists.h"
+
+namespace ZvVesk2 {
+namespace {
+
+// Scan hands out the readable entries of the store, one at a time, in byte order of their names.
+class Scan {
+ public:
+  explicit Scan(Vesk2ContextStruct* ctx) : context_(ctx) {}
+
+  int Open() {
+    const TextPtr path(AclEntry::CalcDir(StorageGlobal));
+    VESK2_REQUIRE(path, VESK2_ERR_FIND_DIR);
+    return directory_.open(path.get(), "*.acl");
+  }
+
+  // Next moves on to another entry; false at the end, and when memory runs out, see Result.
+  bool Next() {
+    while (const char* name = directory_.read(false)) {
+      entry_.Reset(TryNew<AclEntry>(context_));
+      if (!entry_) {
+        failed_ = true;
+        return false;
+      }
+      if (entry_->Import(name) == 0) return true;
+    }
+    return false;
+  }
+
+  AclEntry* Entry() const { return entry_.get(); }
+
+  // The result of a scan that came to its end: `notFound`, unless it was cut short.
+  int Result(int notFound) const {
+    return failed_ || directory_.failed() ? VESK2_ERR_MEM_ALLOC : notFound;
+  }
+
+ private:
+  Vesk2ContextStruct* context_;
+  ZVsysutil::ZvDir directory_;
+  Ref<AclEntry> entry_;
+  bool failed_ = false;
+};
+
+bool IsGrantee(AclEntry* entry, Principal* principal) {
+  auto* threshold = dynamic_cast<ThresholdSubject*>(entry->GetSubject());
+  return threshold != nullptr ? threshold->HasMember(principal)
+                              : entry->GetSubject()->IsEqual(principal);
+}
+
+// Whether an entry holds at `from` (may be null: not asked) and now. The two look-ups differ at the
+// very ends of the period, and callers rely on both forms: here an entry has ended at its
+// not-after, and not begun at its not-before when that is now. Both ends are compared with the
+// start of the caller's period; its end plays no part.
+bool HoldsStrictly(const AclEntry* entry, const TimeStamp* from, const TimeStamp* now) {
+  const TimeStamp* const begin = entry->GetNotBefore();
+  const TimeStamp* const end = entry->GetNotAfter();
+  if (begin != nullptr && from != nullptr && !begin->IsBeforeOrEqual(from)) return false;
+  if (end != nullptr && from != nullptr && !from->IsBefore(end)) return false;
+  if (begin != nullptr && begin->IsAfterOrEqual(now)) return false;
+  return end == nullptr || !end->IsBeforeOrEqual(now);
+}
+
+// The same with the ends included.
+bool HoldsInclusively(const AclEntry* entry, const TimeStamp* from, const TimeStamp* now) {
+  const TimeStamp* const begin = entry->GetNotBefore();
+  const TimeStamp* const end = entry->GetNotAfter();
+  if (begin != nullptr && from != nullptr && from->IsBefore(begin)) return false;
+  if (end != nullptr && from != nullptr && !from->IsBefore(end)) return false;
+  if (begin != nullptr && begin->IsAfter(now)) return false;
+  return end == nullptr || !end->IsBefore(now);
+}
+
+// The answer for an accepted entry: both values are successes.
+int Granted(SExpression* tag, AclEntry* entry) {
+  return tag->IsEqual(entry->GetTag()) ? VESK2_ERR_AUTH_TAGS_ARE_EQUAL : 0;
+}
+
+// Asks whether each signer is a member too. The answers do not count.
+void WalkSigners(ThresholdSubject* threshold, SExpression* signers) {
+  for (auto it = signers->Begin(); it; it.Next()) {
+    auto* cert = dynamic_cast<Cert*>(it.Value());
+    auto* signer = cert != nullptr ? dynamic_cast<Principal*>(cert->GetSubject()) : nullptr;
+    if (signer != nullptr) static_cast<void>(threshold->HasMember(signer));
+  }
+}
+
+}  // namespace
+
+int AclEntry::Find(Principal* principal, SExpression* tag, TimeStamp* notBefore, TimeStamp*,
+                   unsigned int& k) {
+  k = 0;
+  VESK2_REQUIRE(tag != nullptr, VESK2_ERR_PARAM_NULL);
+  Scan scan(tag->GetContext());
+  VESK2_TRY(scan.Open());
+  Ref<TimeStamp> now;
+  VESK2_TRY(MakeNow(now, tag->GetContext()));
+
+  bool principalSeen = false;
+  while (scan.Next()) {
+    AclEntry* const entry = scan.Entry();
+    if (principal != nullptr) {
+      if (!IsGrantee(entry, principal)) continue;
+      principalSeen = true;
+    }
+    if (!entry->GetPropagate() || !tag->IsSubset(entry->GetTag())) continue;
+    if (!HoldsStrictly(entry, notBefore, now.get())) continue;
+
+    auto* threshold = dynamic_cast<ThresholdSubject*>(entry->GetSubject());
+    if (threshold != nullptr) k = threshold->GetK();
+    return Granted(tag, entry);
+  }
+  return scan.Result(principalSeen ? VESK2_ERR_ACL_ENTRY_NOT_FOUND : VESK2_ERR_ACL_KEY_NOT_FOUND);
+}
+
+int AclEntry::FindThresholdEntry(Principal* principal, SExpression* signers, SExpression* tag,
+                                 TimeStamp* notBefore, TimeStamp*, unsigned int& k) {
+  k = 0;
+  VESK2_REQUIRE(principal != nullptr && tag != nullptr, VESK2_ERR_PARAM_NULL);
+  Scan scan(tag->GetContext());
+  VESK2_TRY(scan.Open());
+  Ref<TimeStamp> now;
+  VESK2_TRY(MakeNow(now, tag->GetContext()));
+
+  bool principalSeen = false;
+  while (scan.Next()) {
+    AclEntry* const entry = scan.Entry();
+    auto* threshold = dynamic_cast<ThresholdSubject*>(entry->GetSubject());
+    if (threshold == nullptr || !threshold->HasMember(principal)) continue;
+    principalSeen = true;
+    if (signers != nullptr) WalkSigners(threshold, signers);
+    if (!entry->GetPropagate() || !tag->IsSubset(entry->GetTag())) continue;
+    if (!HoldsInclusively(entry, notBefore, now.get())) continue;
+
+    k = threshold->GetK();
+    return Granted(tag, entry);
+  }
+  return scan.Result(principalSeen ? VESK2_ERR_ACL_ENTRY_NOT_FOUND : VESK2_ERR_ACL_KEY_NOT_FOUND);
+}
+
+int AclEntry::Find(SExpression* tag) {
+  VESK2_REQUIRE(tag != nullptr, VESK2_ERR_PARAM_NULL);
+  Scan scan(tag->GetContext());
+  VESK2_TRY(scan.Open());
+  while (scan.Next()) {
+    if (scan.Entry()->GetPropagate() && tag->IsEqual(scan.Entry()->GetTag())) return 0;
+  }
+  return scan.Result(VESK2_ERR_ACL_ENTRY_NOT_FOUND);
+}
+
+int AclEntry::FindSuperSet(SExpression* tag, bool needPropagate) {
+  VESK2_REQUIRE(tag != nullptr, VESK2_ERR_INVALID_PARAM);
+  Scan scan(tag->GetContext());
+  VESK2_TRY(scan.Open());
+  while (scan.Next()) {
+    if (needPropagate && !scan.Entry()->GetPropagate()) continue;
+    if (tag->IsSubset(scan.Entry()->GetTag())) return 0;
+  }
+  return scan.Result(VESK2_ERR_ACL_ENTRY_NOT_FOUND);
+}
+
+int AclEntry::FindRevocationEntry(SExpression* revocationTag) {
+  VESK2_REQUIRE(revocationTag != nullptr, VESK2_ERR_INVALID_PARAM);
+  VESK2_REQUIRE(EndsInRevoke(revocationTag), VESK2_ERR_INVALID_REVOCATION_TAG);
+  Ref<SExpression> tag;
+  VESK2_TRY(MakeTag(tag, revocationTag, true));
+  return Find(tag.get());
+}
+
+}  // namespace ZvVesk2

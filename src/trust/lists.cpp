@@ -1,0 +1,37 @@
+// See lists.h.
+#include "src/trust/lists.h"
+
+#include "src/platform/clock.h"
+
+namespace ZvVesk2 {
+
+int MakeTag(Ref<SExpression>& out, SExpression* source, bool dropLast) {
+  Ref<SExpression> tag;
+  VESK2_TRY(SExpression::Create(tag.Out(), "tag", source->GetContext()));
+  const unsigned int end = source->Count() - (dropLast && source->Count() > 0 ? 1 : 0);
+  unsigned int index = 0;
+  for (auto it = source->Begin(); it && index < end; it.Next(), ++index) {
+    if (index > 0) VESK2_TRY(AppendShared(tag.get(), it.Value()));
+  }
+  out = std::move(tag);
+  return 0;
+}
+
+bool EndsInRevoke(SExpression* tag) {
+  auto* last = tag != nullptr ? dynamic_cast<SExpression*>(tag->Last()) : nullptr;
+  auto* keyword = last != nullptr ? dynamic_cast<ByteString*>(last->First()) : nullptr;
+  return keyword != nullptr && keyword->IsEqual("revoke");
+}
+
+int MakeNow(Ref<TimeStamp>& out, Vesk2ContextStruct* ctx) {
+  Ref<TimeStamp> now(TryNew<TimeStamp>(ctx));
+  VESK2_REQUIRE(now, VESK2_ERR_MEM_ALLOC);
+  const int code = now->Set(ZVsysutil::zv_time(nullptr));
+  // -1, a clock out of range, is no code of the library.
+  VESK2_REQUIRE(code != -1, VESK2_ERR_TIME_STAMP);
+  VESK2_TRY(code);
+  out = std::move(now);
+  return 0;
+}
+
+}  // namespace ZvVesk2

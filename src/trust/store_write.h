@@ -1,0 +1,17 @@
+// Writing a file of a store: whole or not at all. A list that is lost half-way through its
+// replacement would bring every key back that it revoked.
+#ifndef VESK2_SRC_TRUST_STORE_WRITE_H
+#define VESK2_SRC_TRUST_STORE_WRITE_H
+
+#include <vesk2/expression.h>
+
+namespace ZvVesk2 {
+
+// Writes the object, with hints, to a new file beside `path`, flushes it to the disk and moves it
+// into the place of `path` (of the link, if that is one). After a failure `path` is as it was.
+// VESK2_ERR_MEM_ALLOC, VESK2_ERR_FILE_OPEN, VESK2_ERR_WRITE_FILE.
+[[nodiscard]] int WriteStored(SExpression* object, const char* path);
+
+}  // namespace ZvVesk2
+
+#endif  // VESK2_SRC_TRUST_STORE_WRITE_H
