@@ -1,0 +1,146 @@
+// CrlSequence: reading one, and proving it against the trust roots.
+#include <vesk2/crl.h>
+
+#include <vesk2/acl_entry.h>
+
+#include "src/trust/lists.h"
+
+namespace ZvVesk2 {
+
+CrlSequence::CrlSequence(Vesk2ContextStruct* ctx) : SExpression(ctx) {}
+
+CrlSequence::~CrlSequence() {
+  // The fields hold references of their own beside those of the list.
+  const std::initializer_list<DExpression*> fields = {crl, signature, reserved, cert};
+  for (DExpression* field : fields) {
+    if (field != nullptr) field->Free();
+  }
+}
+
+const char* CrlSequence::DirectoryName() const { return DirectoryName(true); }
+
+const char* CrlSequence::ExtensionName() const { return ExtensionName(true); }
+
+const char* CrlSequence::DirectoryName(bool) { return "cert"; }
+
+const char* CrlSequence::ExtensionName(bool) { return ".crl"; }
+
+char* CrlSequence::CalcDir(StorageType type) {
+  return SExpression::CalcDir(DirectoryName(true), type);
+}
+
+char* CrlSequence::CalcPath(const char* name, StorageType type) {
+  return SExpression::CalcPath(DirectoryName(true), ExtensionName(true), name, type);
+}
+
+// ---- Reading ----
+
+int CrlSequence::Import(const char* path) {
+  VESK2_REQUIRE(First() == nullptr && crl == nullptr, VESK2_ERR_INVALID_PARAM);
+  VESK2_REQUIRE(path != nullptr, VESK2_ERR_FILE_NOT_FOUND);
+  SetStorageType(StoragePath);
+  VESK2_TRY(SetFilePath(path));
+  const BufferPtr buffer(ZVsysutil::zv_buffer_wrap_file(path));
+  VESK2_REQUIRE(buffer, VESK2_ERR_FILE_NOT_FOUND);
+  return Import(buffer.get());
+}
+
+namespace {
+
+// Makes a part and reads it. The field is set first: a part that fails stays with its owner.
+template <typename T>
+int ImportPart(T*& field, ZvBuffer* buffer, Vesk2ContextStruct* ctx) {
+  field = TryNew<T>(ctx);
+  VESK2_REQUIRE(field != nullptr, VESK2_ERR_MEM_ALLOC);
+  return field->Import(buffer);
+}
+
+}  // namespace
+
+// (8:sequence CRL CERT SIGNATURE)
+int CrlSequence::Import(ZvBuffer* buffer) {
+  VESK2_REQUIRE(buffer != nullptr, VESK2_ERR_INVALID_PARAM);
+  VESK2_REQUIRE(First() == nullptr && crl == nullptr, VESK2_ERR_INVALID_PARAM);
+  // Stored files may lack the opening, and the end: neither is insisted on.
+  static_cast<void>(buffer->Accept("(8:sequence"));
+  VESK2_TRY(ImportPart(crl, buffer, GetContext()));
+  VESK2_TRY(ImportPart(cert, buffer, GetContext()));
+  VESK2_TRY(ImportPart(signature, buffer, GetContext()));
+  static_cast<void>(buffer->Accept(")"));
+  return BuildSExpression();
+}
+
+int CrlSequence::BuildSExpression() {
+  DeleteNodes();
+  VESK2_TRY(Insert("sequence"));
+  VESK2_TRY(AppendShared(this, crl));
+  VESK2_TRY(AppendShared(this, cert));
+  return AppendShared(this, signature);
+}
+
+// ---- Checking ----
+
+int CrlSequence::VerifyValidity(long* notBefore, long* notAfter) {
+  VESK2_REQUIRE(notBefore != nullptr && notAfter != nullptr && cert != nullptr,
+                VESK2_ERR_PARAM_NULL);
+  const long begin = cert->GetNotBefore() != nullptr ? cert->GetNotBefore()->ToTime() : 0;
+  const long end = cert->GetNotAfter() != nullptr ? cert->GetNotAfter()->ToTime() : 0;
+  int code = 0;
+  if (*notBefore != 0 && *notAfter != 0) {
+    // The names of the two codes are crossed; callers know them so.
+    if (begin > *notAfter) {
+      code = VESK2_ERR_NOT_AFTER;
+    } else if (end < *notBefore) {
+      code = VESK2_ERR_NOT_BEFORE;
+    }
+  }
+  *notBefore = begin;
+  *notAfter = end;
+  return code;
+}
+
+namespace {
+
+// The last entry with the tag decides; null when there is none.
+AclEntry* LastWithTag(SExpression* entries, SExpression* tag) {
+  AclEntry* found = nullptr;
+  for (auto it = entries->Begin(); it; it.Next()) {
+    auto* entry = dynamic_cast<AclEntry*>(it.Value());
+    if (entry != nullptr && entry->GetTag() != nullptr && entry->GetTag()->IsEqual(tag)) {
+      found = entry;
+    }
+  }
+  return found;
+}
+
+// Whether `subject` is the hash of the list.
+int VerifyHash(Crl* crl, Subject* subject) {
+  auto* const expected = dynamic_cast<Hash*>(subject);
+  VESK2_REQUIRE(expected != nullptr, VESK2_ERR_HASH_ID);
+  Ref<Hash> computed(TryNew<Hash>(crl->GetContext()));
+  VESK2_REQUIRE(computed, VESK2_ERR_MEM_ALLOC);
+  // An algorithm that is none of the three is VESK2_ERR_HASH_ID.
+  VESK2_TRY(computed->Init(expected->GetAlgorithm()));
+  VESK2_TRY(computed->Update(crl));
+  VESK2_TRY(computed->Finalize());
+  return computed->IsEqual(expected) ? 0 : VESK2_ERR_SIGNATURE;
+}
+
+}  // namespace
+
+int CrlSequence::VerifySelf(SExpression* aclEntries) {
+  VESK2_REQUIRE(aclEntries != nullptr && aclEntries->First() != nullptr, VESK2_ERR_INVALID_PARAM);
+  VESK2_REQUIRE(First() != nullptr, VESK2_ERR_INVALID_PARAM);
+
+  AclEntry* const root = LastWithTag(aclEntries, cert->GetTag());
+  VESK2_REQUIRE(root != nullptr, VESK2_ERR_ACL_ENTRY_NOT_FOUND);
+  VESK2_REQUIRE(root->GetSubject()->IsEqual(cert->GetIssuer()), VESK2_ERR_ACL_ENTRY_NOT_FOUND);
+  VESK2_TRY(VerifyHash(crl, cert->GetSubject()));
+  VESK2_TRY(signature->Verify(cert));
+
+  if (crl->issuerTag != nullptr) crl->issuerTag->Free();
+  crl->issuerTag = Ref<SExpression>::Share(cert->GetTag()).Release();
+  return 0;
+}
+
+}  // namespace ZvVesk2
