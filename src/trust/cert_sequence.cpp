@@ -1,0 +1,119 @@
+// CertSequence: reading a chain of certificates, whole or only its first triple.
+#include <vesk2/cert_sequence.h>
+
+#include "src/trust/lists.h"
+
+namespace ZvVesk2 {
+
+CertSequence::CertSequence(Vesk2ContextStruct* ctx) : SExpression(ctx) {}
+
+CertSequence::~CertSequence() = default;
+
+const char* CertSequence::DirectoryName() const { return DirectoryName(true); }
+
+const char* CertSequence::ExtensionName() const { return ExtensionName(true); }
+
+const char* CertSequence::DirectoryName(bool) { return "cert"; }
+
+const char* CertSequence::ExtensionName(bool) { return ".cert"; }
+
+char* CertSequence::CalcDir(StorageType type) {
+  return SExpression::CalcDir(DirectoryName(true), type);
+}
+
+char* CertSequence::CalcPath(const char* name, StorageType type) {
+  return SExpression::CalcPath(DirectoryName(true), ExtensionName(true), name, type);
+}
+
+int CertSequence::Init() {
+  VESK2_REQUIRE(First() == nullptr, VESK2_ERR_INVALID_PARAM);
+  return Insert("sequence");
+}
+
+namespace {
+
+constexpr const char* kOpening = "(8:sequence";
+
+// CERT SIGNATURE EXPRESSION
+struct Triple {
+  Ref<Cert> cert;
+  Ref<Signature> signature;
+  Ref<SExpression> extra;
+
+  int Import(ZvBuffer* buffer, Vesk2ContextStruct* ctx) {
+    VESK2_TRY(ImportNew(cert, buffer, ctx));
+    VESK2_TRY(ImportNew(signature, buffer, ctx));
+    return SExpression::Import(extra.Out(), buffer, ctx);
+  }
+};
+
+// Finds and reads the file of a sequence.
+int OpenFile(BufferPtr& buffer, TextPtr& path, const char* name, bool usePath) {
+  path.reset(CertSequence::CalcPath(name, usePath ? StoragePath : StorageHome));
+  VESK2_REQUIRE(path, VESK2_ERR_MEM_ALLOC);
+  buffer.reset(ZVsysutil::zv_buffer_wrap_file(path.get()));
+  VESK2_REQUIRE(buffer, VESK2_ERR_FILE_OPEN);
+  return 0;
+}
+
+}  // namespace
+
+// (8:sequence (CERT SIGNATURE EXPRESSION)...)
+int CertSequence::Import(CertSequence*& out, ZvBuffer* buffer, Vesk2ContextStruct* ctx) {
+  VESK2_REQUIRE(out == nullptr && buffer != nullptr, VESK2_ERR_INVALID_PARAM);
+  VESK2_TRY(buffer->Expect(kOpening));
+  Ref<CertSequence> sequence(TryNew<CertSequence>(ctx));
+  VESK2_REQUIRE(sequence, VESK2_ERR_MEM_ALLOC);
+  VESK2_TRY(sequence->Init());
+  while (buffer->Peek() == '(') {
+    Triple triple;
+    VESK2_TRY(triple.Import(buffer, ctx));
+    VESK2_TRY(Append(sequence.get(), std::move(triple.cert)));
+    VESK2_TRY(Append(sequence.get(), std::move(triple.signature)));
+    VESK2_TRY(Append(sequence.get(), std::move(triple.extra)));
+  }
+  VESK2_TRY(buffer->Expect(")"));
+  out = sequence.Release();
+  return 0;
+}
+
+int CertSequence::Import(CertSequence*& out, const char* name, bool usePath,
+                         Vesk2ContextStruct* ctx) {
+  VESK2_REQUIRE(out == nullptr && name != nullptr && *name != '\0', VESK2_ERR_INVALID_PARAM);
+  BufferPtr buffer;
+  TextPtr path;
+  VESK2_TRY(OpenFile(buffer, path, name, usePath));
+  Ref<CertSequence> sequence;
+  VESK2_TRY(Import(sequence.Out(), buffer.get(), ctx));
+  sequence->SetStorageType(usePath ? StoragePath : StorageHome);
+  VESK2_TRY(sequence->SetFilePath(path.get()));
+  out = sequence.Release();
+  return 0;
+}
+
+int CertSequence::Import(Cert*& cert, Signature*& signature, SExpression*& extra, ZvBuffer* buffer,
+                         Vesk2ContextStruct* ctx) {
+  // `extra` may be left over from an earlier read; it is overwritten.
+  VESK2_REQUIRE(cert == nullptr && signature == nullptr && buffer != nullptr,
+                VESK2_ERR_INVALID_PARAM);
+  extra = nullptr;
+  VESK2_TRY(buffer->Expect(kOpening));
+  Triple triple;
+  VESK2_TRY(triple.Import(buffer, ctx));
+  cert = triple.cert.Release();
+  signature = triple.signature.Release();
+  extra = triple.extra.Release();
+  return 0;
+}
+
+int CertSequence::Import(Cert*& cert, Signature*& signature, SExpression*& extra, const char* name,
+                         bool usePath, Vesk2ContextStruct* ctx) {
+  VESK2_REQUIRE(cert == nullptr && signature == nullptr && extra == nullptr && name != nullptr,
+                VESK2_ERR_INVALID_PARAM);
+  BufferPtr buffer;
+  TextPtr path;
+  VESK2_TRY(OpenFile(buffer, path, name, usePath));
+  return Import(cert, signature, extra, buffer.get(), ctx);
+}
+
+}  // namespace ZvVesk2
