@@ -281,10 +281,10 @@ VESK2_API void SetExtraAclDirectoryA(Manifest* manifest, const char* directory);
  * clears the list. The caller keeps `list`. */
 VESK2_API void SetIgnoredEntries(Manifest* manifest, const FileItem* list);
 
-/* VerifyManifest proves the manifest's signatures, that its chain grants the tag for the whole
- * period from `notBefore` to `notAfter` (both 0: at the moment of signing), that the body is the
- * one that was signed, and compares the directory with it. Unlisted entries are looked for below
- * the root only, not in `directory` itself. Fills the four result lists.
+/* VerifyManifest proves the manifest's signatures, that its chain grants the tag within the period
+ * from `notBefore` to `notAfter` (the periods must meet; both times 0: at the moment of signing),
+ * that the body is the one that was signed, and compares the directory with it. Unlisted entries
+ * are looked for below the root only, not in `directory` itself. Fills the four result lists.
  *   0                             the directory is as signed, by an authorized signer
  *   VESK2_ERR_HASH_MISMATCH       an entry differs; VESK2_ERR_FILE_NOT_FOUND one is missing;
  *   VESK2_ERR_EXTRA_FILES         one is unlisted (see FailOnExtraEntries); in this priority

@@ -1,0 +1,342 @@
+// Whole manifests: what is read, what is proved, and which refusal each defect meets.
+#include <gtest/gtest.h>
+
+#include <filesystem>
+#include <functional>
+#include <string>
+#include <vector>
+
+#include <vesk2/context.h>
+#include <vesk2/manifest.h>
+
+#include "src/platform/text.h"
+#include "tests/manifest/result_text.h"
+#include "tests/support/temp_dir.h"
+#include "tests/support/test_manifest.h"
+#include "tests/support/test_object.h"
+
+using namespace vesk2test;
+using ZvVesk2::Manifest;
+using ZvVesk2::VeskConf;
+
+namespace {
+
+constexpr const char* kTag = "(install (app calc))";
+constexpr const char* kFrom = "2024-01-01_00:00:00";
+constexpr const char* kTo = "2024-12-31_23:59:59";
+constexpr long kInside = 1717243200;   // 2024-06-01_12:00:00
+constexpr long kOutside = 1750000000;  // 2025-06-15
+constexpr long kSigned = 1714564800;   // the writer's time of signing, 2024-05-01_12:00:00
+constexpr const char* kAllValid = "V:sub/ sub/f a I: M: X:";
+
+std::string Flip(std::string text, size_t bit) {
+  text[bit / 8] = static_cast<char>(text[bit / 8] ^ (1 << bit % 8));
+  return text;
+}
+
+// A machine that trusts key 0 (the vendor) to install and to revoke; a manifest of a small tree,
+// signed by key 1, whom the vendor certified for a year.
+class ManifestTest : public testing::Test {
+ protected:
+  ManifestTest() {
+    VeskConf::SetGlobalDirectory(store.Path().c_str());
+    store.Write("acl/vendor.acl", AclEntryText(vendor.Public(), Tag(kTag)));
+    store.Write("acl/revoke.acl", AclEntryText(vendor.Public(), Tag(kRevoke)));
+    for (const char* name : {"a", "sub/f"}) tree.Write(name, name);
+    parts.body = BodyOf(tree.Path());
+    parts.signer.tag = Tag(kTag);
+    own.issuer = vendor.Public();
+    own.subject = signer.Public();
+    own.tag = Tag("(install)");
+    own.notBefore = kFrom;
+    own.notAfter = kTo;
+    parts.chain = Signed(own, vendor);
+  }
+  ~ManifestTest() override { VeskConf::SetGlobalDirectory(nullptr); }
+
+  std::string Write(const std::string& text, const char* name = "m") {
+    // A file that is truncated and written again may go to the disk at once; a new one does not.
+    std::filesystem::remove(files.File(name));
+    return files.Write(name, text);
+  }
+  void Open(Manifest& manifest, const std::string& text, const char* tag = kTag) {
+    ASSERT_EQ(manifest.Initialize(tree.Path().c_str(), Write(text).c_str(), tag), 0);
+  }
+  int Verify(const std::string& text, const char* tag = kTag, long from = 0, long to = 0) {
+    Manifest manifest(nullptr);
+    Open(manifest, text, tag);
+    const int code = manifest.VerifyManifest(from, to);
+    EXPECT_EQ(Findings(manifest, tree.Path()), code == 0 ? kAllValid : "V: I: M: X:");
+    EXPECT_EQ(manifest.GetSigningTime() == nullptr, code != 0);
+    return code;
+  }
+  // A revocation list of the vendor: canonical objects revoked as certificates and as keys.
+  std::string RevocationList(const std::string& cert, const std::string& key,
+                             const char* date = kFrom) {
+    const auto item = [&](const std::string& object) {
+      return object.empty() ? "" : List({Str("item"), HashOf(object), Str(date)});
+    };
+    const std::string list =
+        List({Str("crl"), "(7:version1:1)", List({Str("list1"), item("nobody"), item(cert)}),
+              List({Str("list2"), item(key)})});
+    CertText voucher;
+    voucher.issuer = vendor.Public();
+    voucher.subject = HashOf(list);
+    voucher.tag = Tag(kRevoke);
+    voucher.notBefore = kFrom;
+    voucher.notAfter = "2039-01-01_00:00:00";
+    return List({Str("sequence"), list, Signed(voucher, vendor)});
+  }
+
+  static constexpr const char* kRevoke = "app (revoke all)";
+  const std::string revocation = "(10:revocation3:app(6:revoke3:all))";
+  const TestKey& vendor = TestKey::Rsa(0);
+  const TestKey& signer = TestKey::Rsa(1);
+  const TestKey& stranger = TestKey::Rsa(2);
+  TempDir store, tree, files;
+  CertText own;  // the signer's certificate from the vendor
+  ManifestText parts;
+};
+
+TEST_F(ManifestTest, VerifiesATreeAndKeepsWhatItRead) {
+  Manifest manifest(nullptr);
+  Open(manifest, ManifestFile(parts));
+  EXPECT_EQ(manifest.VerifyManifest(0, 0), 0);
+  EXPECT_EQ(Findings(manifest, tree.Path()), kAllValid);
+  ASSERT_NE(manifest.GetSigningTime(), nullptr);
+  EXPECT_EQ(manifest.GetSigningTime()->ToTime(), kSigned);
+  EXPECT_EQ(Canonical(*manifest.GetVersion()), "(7:version1:14:text)");
+  EXPECT_EQ(Canonical(*manifest.GetType()), "(4:type5:plain)");
+
+  // Once more, on a tree with an unlisted entry: nothing accumulates.
+  tree.Write("sub/x", "");
+  EXPECT_EQ(manifest.VerifyManifest(0, 0), 0);
+  EXPECT_EQ(Findings(manifest, tree.Path()), "V:sub/f a I: M: X:sub/ sub/x");
+  manifest.SetFailOnExtraEntries(true);
+  EXPECT_EQ(manifest.VerifyManifest(0, 0), VESK2_ERR_EXTRA_FILES);
+
+  // A failed reading leaves nothing of the one before.
+  Write("(8:manifest(7:version1:2");
+  EXPECT_EQ(manifest.VerifyManifest(0, 0), VESK2_ERR_MANIFEST_VERSION);
+  EXPECT_EQ(Findings(manifest), "V: I: M: X:");
+  EXPECT_EQ(manifest.GetSigningTime(), nullptr);
+  EXPECT_EQ(manifest.GetVersion(), nullptr);
+  EXPECT_EQ(manifest.GetReadPosition(), 24u);
+}
+
+TEST_F(ManifestTest, RefusesEachDefectWithItsCode) {
+  struct Case {
+    const char* what;
+    std::function<void(ManifestText&)> change;
+    int code;
+  };
+  const std::vector<Case> cases = {
+      {"as it is", [](ManifestText&) {}, 0},
+      {"digest by SHA-1", [](ManifestText& m) { m.hash = "sha1"; }, 0},
+      {"version 2", [](ManifestText& m) { m.version = "2"; }, VESK2_ERR_MANIFEST_VERSION},
+      {"another type", [](ManifestText& m) { m.type = "plane"; }, VESK2_ERR_MANIFEST_TYPE},
+      {"short stamp", [](ManifestText& m) { m.signingTime.pop_back(); }, VESK2_ERR_TIME_STAMP},
+      {"long stamp", [](ManifestText& m) { m.signingTime += "0"; }, VESK2_ERR_TIME_STAMP},
+      {"no stamp", [](ManifestText& m) { m.signingTime.clear(); }, VESK2_ERR_TIME_STAMP},
+      {"signed before the certificate",
+       [](ManifestText& m) { m.signingTime = "2023-05-01_12:00:00"; }, VESK2_ERR_NOT_AUTHORIZED},
+      {"signer certificate only", [](ManifestText& m) { m.chain.clear(); }, VESK2_ERR_PARSE_FILE},
+      {"signer certificate for a key", [&](ManifestText& m) { m.signer.subject = signer.Public(); },
+       VESK2_ERR_NOT_OBJECT_CERT},
+      {"signer certificate for something else",
+       [](ManifestText& m) { m.signer.subject = HashOf("other"); }, VESK2_ERR_HASH_MATCH},
+      {"signed by another key than the issuer",
+       [&](ManifestText& m) { m.key = &stranger, m.signer.issuer = signer.Public(); },
+       VESK2_ERR_SIGNATURE},
+      {"second certificate not the signer's",
+       [&](ManifestText& m) {
+         CertText other = own;
+         other.subject = stranger.Public();
+         m.chain = Signed(other, vendor) + m.chain;
+       },
+       VESK2_ERR_SIGNING_CERT_ORDER},
+      {"not the vendor's",
+       [&](ManifestText& m) {
+         CertText forged = own;
+         forged.issuer = stranger.Public();
+         m.chain = Signed(forged, stranger);
+       },
+       VESK2_ERR_NOT_AUTHORIZED},
+  };
+  for (const Case& row : cases) {
+    ManifestText changed = parts;
+    row.change(changed);
+    EXPECT_EQ(Verify(ManifestFile(changed)), row.code) << row.what;
+  }
+  const std::string text = ManifestFile(parts);
+  EXPECT_EQ(Verify(text + " "), VESK2_ERR_HASH_MATCH);
+  EXPECT_EQ(Verify(text.substr(0, text.size() - parts.body.size() - 1)), VESK2_ERR_PARSE_FILE);
+}
+
+TEST_F(ManifestTest, PropagationIsForcedForTheSignersCertificateOnly) {
+  CertText upper = own;
+  upper.subject = stranger.Public();
+  CertText lower = own;
+  lower.issuer = stranger.Public();
+  parts.chain = Signed(lower, stranger) + Signed(upper, vendor);
+  EXPECT_EQ(Verify(ManifestFile(parts)), VESK2_ERR_NOT_AUTHORIZED);
+  upper.propagate = true;
+  parts.chain = Signed(lower, stranger) + Signed(upper, vendor);
+  EXPECT_EQ(Verify(ManifestFile(parts)), 0);
+}
+
+TEST_F(ManifestTest, GrantsTheTagWithinThePeriod) {
+  struct Case {
+    const char* tag;
+    long from, to;
+    int code;
+  };
+  const std::vector<Case> cases = {
+      {kTag, kInside, kInside + 60, 0},
+      {kTag, 0, kInside, 0},
+      {"(install (app calc) quiet)", 0, 0, 0},
+      {"(install)", 0, 0, VESK2_ERR_PACKAGE_NOT_GRANTED},
+      {"(remove)", 0, 0, VESK2_ERR_NOT_AUTHORIZED},
+      {kTag, kInside, kOutside, 0},  // the periods need only meet
+      {kTag, kOutside, kOutside + 60, VESK2_ERR_NOT_AUTHORIZED},
+      {kTag, 1L << 40, 0, VESK2_ERR_TIME_STAMP},
+  };
+  for (const Case& row : cases) {
+    EXPECT_EQ(Verify(ManifestFile(parts), row.tag, row.from, row.to), row.code)
+        << row.tag << " " << row.from;
+  }
+}
+
+TEST_F(ManifestTest, RootsComeFromTheStoreOrTheExtraDirectory) {
+  TempDir extra;
+  extra.Write("vendor.acl", AclEntryText(vendor.Public(), Tag(kTag)));
+  std::filesystem::remove_all(store.File("acl"));
+  Manifest manifest(nullptr);
+  Open(manifest, ManifestFile(parts));
+  EXPECT_EQ(manifest.VerifyManifest(0, 0), VESK2_ERR_FILE_NOT_FOUND);
+  manifest.SetExtraAclDirectory(ZVsysutil::zv_fstrdup(extra.Path().c_str()));
+  EXPECT_EQ(manifest.VerifyManifest(0, 0), 0);
+}
+
+TEST_F(ManifestTest, DropsRevokedAndUndeterminedCertificates) {
+  parts.signer.revocation = revocation;
+  const std::string text = ManifestFile(parts);
+  const size_t begin = text.find("(4:cert");
+  const std::string signerCert = text.substr(begin, text.find("(9:signature") - begin);
+  struct Case {
+    const char* what;
+    std::string lists;
+    int code;
+  };
+  const std::vector<Case> cases = {
+      {"no list to ask", "", VESK2_ERR_CRL_NOT_FOUND},
+      {"a list that names others", RevocationList("", ""), 0},
+      {"revoked after it was signed", RevocationList(signerCert, "", "2024-06-01_00:00:00"), 0},
+      {"a key on the chain revoked", RevocationList("", signer.Public()),
+       VESK2_ERR_SIGNING_CERT_ORDER},
+      {"the signer certificate revoked", RevocationList(signerCert, ""), VESK2_ERR_CERT_REVOKED},
+  };
+  for (const Case& row : cases) {
+    std::filesystem::remove_all(store.File("cert"));
+    parts.lists = row.lists;
+    EXPECT_EQ(Verify(ManifestFile(parts)), row.code) << row.what;
+    // What the manifest carried is in the store now, and counts for those that carry nothing.
+    parts.lists.clear();
+    EXPECT_EQ(Verify(ManifestFile(parts)), row.code) << row.what;
+  }
+  // A list that nobody here vouches for neither clears nor revokes.
+  std::filesystem::remove_all(store.File("cert"));
+  std::filesystem::remove(store.File("acl/revoke.acl"));
+  parts.lists = RevocationList("", "");
+  EXPECT_EQ(Verify(ManifestFile(parts)), VESK2_ERR_CRL_NOT_FOUND);
+  EXPECT_FALSE(std::filesystem::exists(store.File("cert/app (revoke all).crl")));
+}
+
+TEST_F(ManifestTest, ReadsWithoutTheChainAndHandsTheBodyOver) {
+  std::filesystem::remove_all(store.File("acl"));
+  parts.signer.revocation = revocation;
+  parts.lists = RevocationList("", signer.Public());
+  Manifest manifest(nullptr);
+  Open(manifest, ManifestFile(parts));
+  ZVsysutil::ZvBuffer* read = nullptr;
+  ASSERT_EQ(manifest.ReadManifest(false, 0, 0, &read), 0);
+  const BufferPtr body(read);
+  EXPECT_EQ(std::string(reinterpret_cast<const char*>(body->Data()), body->Remaining()),
+            parts.body);
+  EXPECT_EQ(manifest.ReadManifest(false, 0, 0, nullptr), 0);
+
+  std::string text = ManifestFile(parts);
+  text[text.size() - 3] ^= 1;
+  Write(text);
+  EXPECT_EQ(manifest.ReadManifest(false, 0, 0, &read), VESK2_ERR_HASH_MATCH);
+  EXPECT_EQ(read, nullptr);
+  text = ManifestFile(parts);
+  text.back() = '(';
+  Write(text);
+  EXPECT_EQ(manifest.ReadManifest(false, 0, 0, &read), VESK2_ERR_PARSE_FILE);
+  EXPECT_EQ(read, nullptr);
+}
+
+TEST_F(ManifestTest, ComparesTwoManifests) {
+  ManifestText other = parts;
+  other.body = Body(FileEntry("a", "a") + FileEntry("x", ""));
+  const std::string path = Write(ManifestFile(other), "other");
+  Manifest manifest(nullptr);
+  Open(manifest, ManifestFile(parts));
+  for (int run = 0; run < 2; ++run) {
+    EXPECT_EQ(manifest.CompareManifest(path.c_str()), VESK2_ERR_FILE_NOT_FOUND);
+    EXPECT_EQ(Findings(manifest), "V:a I: M:sub/f sub/ X:x");
+  }
+  parts.body = Body(FileEntry("a", "a"));
+  Write(ManifestFile(parts));
+  EXPECT_EQ(manifest.CompareManifest(path.c_str()), VESK2_ERR_EXTRA_FILES);
+  EXPECT_EQ(manifest.CompareManifest("/nonexistent"), VESK2_ERR_OPEN_MANIFEST_FILE);
+  EXPECT_EQ(manifest.CompareManifest(nullptr), VESK2_ERR_INVALID_PARAM);
+  Write(ManifestFile(parts) + "x", "other");
+  EXPECT_EQ(manifest.CompareManifest(path.c_str()), VESK2_ERR_HASH_MATCH);
+}
+
+TEST_F(ManifestTest, InitializeRefusesNullAndBadTags) {
+  Manifest manifest(nullptr);
+  EXPECT_EQ(manifest.Initialize(nullptr, "m", "a"), VESK2_ERR_INVALID_PARAM);
+  EXPECT_EQ(manifest.Initialize("d", nullptr, "a"), VESK2_ERR_INVALID_PARAM);
+  EXPECT_EQ(manifest.Initialize("d", "m", nullptr), VESK2_ERR_INVALID_PARAM);
+  EXPECT_NE(manifest.Initialize("d", "m", "(a"), 0);
+  EXPECT_EQ(manifest.Initialize("d", "m", "(a)"), 0);
+  EXPECT_EQ(manifest.VerifyManifest(0, 0), VESK2_ERR_OPEN_MANIFEST_FILE);
+}
+
+// No truncation and no flipped bit gets through.
+TEST_F(ManifestTest, RefusesEveryTruncationAndFlippedBit) {
+  const std::string text = ManifestFile(parts);
+  Manifest manifest(nullptr);
+  Open(manifest, text);
+  const auto sound = [&](const std::string& changed) {
+    Write(changed);
+    // The cheap half first: hardly a change gets past the signatures and the digest.
+    return manifest.ReadManifest(false, 0, 0, nullptr) == 0 && manifest.VerifyManifest(0, 0) == 0;
+  };
+  ASSERT_TRUE(sound(text));
+  for (size_t length = 1; length < text.size(); ++length) {
+    EXPECT_FALSE(sound(text.substr(0, length))) << length;
+  }
+  for (size_t bit = 0; bit < text.size() * 8; ++bit) {
+    EXPECT_FALSE(sound(Flip(text, bit))) << bit / 8 << " of " << text.size() << ", " << bit % 8;
+  }
+}
+
+// The lists are outside the digest, but a certificate that asks for one is only as good as its
+// list.
+TEST_F(ManifestTest, RefusesAListWithAFlippedBit) {
+  parts.signer.revocation = revocation;
+  parts.lists = RevocationList("", "");
+  const std::string text = ManifestFile(parts);
+  EXPECT_EQ(Verify(text), 0);
+  const size_t begin = text.find(parts.lists);
+  for (size_t place = begin; place < begin + parts.lists.size(); ++place) {
+    std::filesystem::remove_all(store.File("cert"));
+    EXPECT_NE(Verify(Flip(text, place * 8 + place % 8)), 0) << place - begin;
+  }
+}
+
+}  // namespace
