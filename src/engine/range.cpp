@@ -1,4 +1,5 @@
 // Ranges: whether a string lies in one, and how they relate to prefixes and to each other.
+#include "src/engine/chain.h"
 #include "src/engine/tag_forms.h"
 
 namespace ZvVesk2::Engine {
@@ -32,14 +33,14 @@ bool spki_bound_holds(const spki_atom* value, const spki_elem* bound, int32_t or
 }
 
 bool spki_in_range_charged(spki_engine* engine, const spki_elem* string, const spki_elem* range) {
-  if (string == nullptr || string->kind != SPKI_ELEM_STRING) return false;
+  const spki_atom* value = StringOf(string);
+  if (value == nullptr) return false;
   const spki_tag_class range_class = spki_classify(range);
   if (range_class == SPKI_TAG_ALL) return true;
   if (range_class != SPKI_TAG_RANGE) return false;
   const spki_elem* order = spki_form_arguments(range);
-  if (order == nullptr || order->kind != SPKI_ELEM_STRING) return false;
+  if (StringOf(order) == nullptr) return false;
   const int32_t ordering = order->value.atom->keyword;
-  const spki_atom* value = string->value.atom;
   if (!spki_valid_value(value, ordering)) return false;
   for (const spki_elem* bound = order->next; bound != nullptr; bound = bound->next) {
     if (engine != nullptr && !spki_spend(engine, value)) return false;

@@ -2,6 +2,7 @@
 // input that it came from.
 #include <algorithm>
 
+#include "src/engine/chain.h"
 #include "src/engine/tag_forms.h"
 
 namespace ZvVesk2::Engine {
@@ -113,7 +114,7 @@ void spki_range_add_tag(spki_engine* engine, spki_range_bounds* bounds, const sp
                         int32_t source) {
   const bool is_range = spki_classify(range) == SPKI_TAG_RANGE;
   const spki_elem* order = is_range ? spki_form_arguments(range) : nullptr;
-  if (order == nullptr || order->kind != SPKI_ELEM_STRING) return Invalidate(engine, bounds);
+  if (StringOf(order) == nullptr) return Invalidate(engine, bounds);
   const int32_t ordering = order->value.atom->keyword;
   ClaimOrdering(engine, bounds, ordering);
   for (const spki_elem* elem = order->next; elem != nullptr; elem = elem->next) {
@@ -142,6 +143,7 @@ void spki_range_add_prefix(spki_engine* engine, spki_range_bounds* bounds, const
 }
 
 spki_relation spki_range_relation(const spki_range_bounds* bounds) {
+  if (bounds->high_source == kInvalid) return SPKI_REL_DISJOINT;
   if (bounds->low != nullptr && bounds->high != nullptr) {
     const int order = spki_cmp_ordered(bounds->low, bounds->high, bounds->ordering);
     if (order == SPKI_ORDER_EQUAL) {
@@ -150,12 +152,12 @@ spki_relation spki_range_relation(const spki_range_bounds* bounds) {
     }
     if (order != SPKI_ORDER_LESS) return SPKI_REL_DISJOINT;
   }
-  // Sources 1 and 2 are the relations "the first is narrower" and "the second is", 3 is "disjoint".
+  // Sources 1 and 2 are the relations "the first is narrower" and "the second is"; 0 is "equal".
   if (bounds->low_source == 0) return static_cast<spki_relation>(bounds->high_source);
   if (bounds->high_source == 0 || bounds->high_source == bounds->low_source) {
     return static_cast<spki_relation>(bounds->low_source);
   }
-  return bounds->high_source == kInvalid ? SPKI_REL_DISJOINT : SPKI_REL_OVERLAP;
+  return SPKI_REL_OVERLAP;
 }
 
 }  // namespace ZvVesk2::Engine

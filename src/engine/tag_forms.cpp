@@ -3,6 +3,9 @@
 
 #include <algorithm>
 
+#include "src/engine/budget.h"
+#include "src/engine/chain.h"
+
 namespace ZvVesk2::Engine {
 namespace {
 
@@ -18,15 +21,8 @@ spki_elem_owner NewElem(spki_engine* engine, spki_elem_kind kind) {
 }  // namespace
 
 bool spki_spend(spki_engine* engine, const spki_atom* string) {
-  spki_budget* budget = &engine->budget;
-  if (budget->spent != 0) return false;
   const uint32_t cost = 1 + (string != nullptr ? string->length / kBytesPerComparison : 0);
-  if (cost > Limits::kMaxComparisons - budget->comparisons) {
-    budget->spent = SPKI_ERR_NO_MEM;
-    return false;
-  }
-  budget->comparisons += cost;
-  return true;
+  return spki_charge(engine, &spki_budget::comparisons, cost, Limits::kMaxComparisons) == 0;
 }
 
 const spki_elem* spki_form_head(const spki_elem* elem) {
@@ -45,9 +41,7 @@ spki_tag_class spki_classify(const spki_elem* elem) {
   if (elem == nullptr) return SPKI_TAG_NONE;
   const auto plain = static_cast<spki_tag_class>(elem->kind);
   const spki_elem* head = spki_form_head(elem);
-  if (head == nullptr || head->kind != SPKI_ELEM_KEYWORD || head->value.keyword != SPKI_KW_STAR) {
-    return plain;
-  }
+  if (HeadKeyword(head) != SPKI_KW_STAR) return plain;
   if (head->next == nullptr) return SPKI_TAG_ALL;
   if (head->next->kind != SPKI_ELEM_STRING) return plain;
   switch (head->next->value.atom->keyword) {
@@ -65,26 +59,23 @@ spki_tag_class spki_classify(const spki_elem* elem) {
 const spki_elem* spki_prefix_string(const spki_elem* elem) {
   if (spki_classify(elem) != SPKI_TAG_PREFIX) return nullptr;
   const spki_elem* string = spki_form_arguments(elem);
-  const bool exact =
-      string != nullptr && string->kind == SPKI_ELEM_STRING && string->next == nullptr;
-  return exact ? string : nullptr;
+  return StringOf(string) != nullptr && string->next == nullptr ? string : nullptr;
 }
 
 bool spki_has_prefix(const spki_elem* string, const spki_elem* prefix) {
-  const spki_elem* beginning = spki_prefix_string(prefix);
-  if (beginning == nullptr || string == nullptr || string->kind != SPKI_ELEM_STRING) return false;
-  const spki_atom* s = string->value.atom;
-  const spki_atom* p = beginning->value.atom;
+  const spki_atom* s = StringOf(string);
+  const spki_atom* p = StringOf(spki_prefix_string(prefix));
+  if (s == nullptr || p == nullptr) return false;
   return std::equal(s->hint, s->hint + s->hint_length, p->hint, p->hint + p->hint_length) &&
          s->length >= p->length && std::equal(p->data, p->data + p->length, s->data);
 }
 
 spki_bound spki_read_bound(const spki_elem* elem) {
-  if (elem == nullptr || elem->kind != SPKI_ELEM_LIST) return {};
-  const spki_elem* head = elem->value.list;
-  if (head->kind != SPKI_ELEM_KEYWORD || head->next == nullptr) return {};
-  if (head->next->kind != SPKI_ELEM_STRING) return {};
-  return {head->value.keyword, head->next->value.atom, head->next->next == nullptr};
+  const spki_elem* head = ListOf(elem);
+  if (HeadKeyword(head) == -1) return {};
+  spki_atom* value = StringOf(head->next);
+  if (value == nullptr) return {};
+  return {head->value.keyword, value, head->next->next == nullptr};
 }
 
 spki_elem_owner spki_new_string(spki_engine* engine, spki_atom* atom) {

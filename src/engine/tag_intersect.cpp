@@ -1,13 +1,11 @@
 // Intersection of lists and elements.
+#include "src/engine/chain.h"
 #include "src/engine/tag_forms.h"
 
 namespace ZvVesk2::Engine {
 namespace {
 
-bool HasStarHead(const spki_elem* list) {
-  const spki_elem* head = list->value.list;
-  return head->kind == SPKI_ELEM_KEYWORD && head->value.keyword == SPKI_KW_STAR;
-}
+bool HasStarHead(const spki_elem* list) { return HeadKeyword(ListOf(list)) == SPKI_KW_STAR; }
 
 // The list that the relation of two lists names; null when it names none. With `overlap` set the
 // lists have to be intersected element by element.

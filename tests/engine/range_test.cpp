@@ -57,6 +57,7 @@ TEST_F(Ranges, RelationsAndIntersections) {
       {"(* range numeric (l 5))", "(* range numeric (le 5))", 1, 2, "(* range numeric (l 5))"},
       {"(* range numeric (ge 5) (ge 7))", "(* range numeric (le 9) (le 8))", 4, 4,
        "(* range numeric (ge 7) (le 8))"},
+      {"(* range numeric (g 5))", "(* range numeric (g 5))", 1, 1, "(* range numeric (g 5))"},
       {"(* range numeric (ge 5))", "(* range numeric (ge 5))", 1, 1, "(* range numeric (ge 5))"},
       // A single point is an overlap, not a narrower range.
       {"(* range numeric (ge 5) (le 5))", "(* range numeric (ge 1))", 4, 4,
