@@ -48,7 +48,13 @@ template <typename T>
   return Append(list, std::move(made), head);
 }
 
-// AppendPair appends (name value) and points `field` at the value, borrowed.
+// AppendPair appends (name value); the second form points `field` at the value, borrowed.
+template <typename T>
+[[nodiscard]] int AppendPair(SExpression* list, const char* name, Ref<T> value) {
+  SExpression* pair = nullptr;
+  VESK2_TRY(AppendHead(list, name, pair));
+  return Append(pair, std::move(value));
+}
 template <typename T>
 [[nodiscard]] int AppendPair(SExpression* list, const char* name, Ref<T> value, T*& field) {
   SExpression* pair = nullptr;

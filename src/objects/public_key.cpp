@@ -92,8 +92,7 @@ int PublicKey::ImportNumbers(ZvBuffer* buffer) {
     VESK2_TRY(ImportNew(text, buffer, GetContext()));
     VESK2_TRY(buffer->Expect(")"));
     VESK2_TRY(zvclm_BigIntFromBuffer(&record.Number(number), text->GetData(), text->GetLength()));
-    ByteString* listed = nullptr;
-    VESK2_TRY(AppendPair(numbers, number.name, std::move(text), listed));
+    VESK2_TRY(AppendPair(numbers, number.name, std::move(text)));
   }
   VESK2_TRY(
       zvclm_PublicKeyDefine(&key, Form::kType, Form::kDataId, record.get(), 0, CryptoHandle()));
@@ -119,9 +118,8 @@ int PublicKey::SetNumbers(ZVCLMPublicKeyData* newKey) {
   VESK2_TRY(AppendHead(this, Form::kName, numbers));
   for (const auto& number : Form::kNumbers) {
     Ref<ByteString> text;
-    ByteString* listed = nullptr;
     VESK2_TRY(NumberText(text, record.Number(number), GetContext()));
-    VESK2_TRY(AppendPair(numbers, number.name, std::move(text), listed));
+    VESK2_TRY(AppendPair(numbers, number.name, std::move(text)));
   }
   return 0;
 }
