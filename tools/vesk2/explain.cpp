@@ -77,6 +77,11 @@ class Explanation {
         ", not for the signer " + Fingerprint(*signer));
   }
 
+  void Content() {
+    if (!block_.damage.empty()) Add(Escape(question_.manifest) + ": " + block_.damage);
+    if (!block_.certs.empty()) Add(CertName(0) + " is for another version, time or listing");
+  }
+
   void Revocations() {
     Ref<SExpression> lists;
     if (!acls_ || CrlSequence::ImportStore(lists.Out(), acls_.get(), nullptr) != 0) return;
@@ -236,6 +241,7 @@ constexpr struct {
     {VESK2_ERR_SIGNATURE_ID, {&Explanation::Signatures}},
     {VESK2_ERR_HASH_MISMATCH, {&Explanation::Signatures}},
     {VESK2_ERR_NOT_IMPLEMENTED, {&Explanation::Signatures}},
+    {VESK2_ERR_HASH_MATCH, {&Explanation::Content}},
     {VESK2_ERR_NOT_OBJECT_CERT, {&Explanation::Order}},
     {VESK2_ERR_SIGNING_CERT_ORDER, {&Explanation::Order, &Explanation::Revocations}},
     {VESK2_ERR_CERT_REVOKED, {&Explanation::Revocations}},

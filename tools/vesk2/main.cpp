@@ -2,6 +2,7 @@
 #include <fcntl.h>
 #include <unistd.h>
 
+#include <csignal>
 #include <string>
 
 #include "tools/vesk2/command.h"
@@ -86,5 +87,6 @@ ExitCode Run(int argc, char** argv) {
 
 int main(int argc, char** argv) {
   vesk2_command::HoldStandardDescriptors();
+  std::signal(SIGXFSZ, SIG_IGN);  // a file that grows too large is a failed write, cleaned up after
   return vesk2_command::Run(argc, argv);
 }

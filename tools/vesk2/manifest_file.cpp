@@ -70,6 +70,11 @@ SignatureBlock ReadSignatureBlock(const std::string& path) {
     if (!ReadInto(crl, buffer.get())) return block;
     block.crls.push_back(std::move(crl));
   }
+  BodyDirectory listing(nullptr);
+  int code = buffer->Expect(")");
+  if (code == 0) code = listing.ParseBody(buffer.get(), nullptr);
+  if (code == 0) code = buffer->Expect(")");
+  if (code != 0) block.damage = "byte " + std::to_string(buffer->Position()) + ": " + Reason(code);
   return block;
 }
 

@@ -24,6 +24,7 @@ struct SignatureBlock {
   Ref<TimeStamp> signedAt;
   std::vector<SignedCert> certs;  // the signer certificate first
   std::vector<Ref<ZvVesk2::CrlSequence>> crls;
+  std::string damage;  // where the listing stops making sense, and why; empty for a whole one
 };
 // ReadSignatureBlock reads as far as it can; what could not be read is missing.
 SignatureBlock ReadSignatureBlock(const std::string& path);

@@ -114,6 +114,12 @@ void PrintFindings(const std::vector<Finding>& findings) {
   }
 }
 
+size_t CountFiles(const FileItem* list) {
+  size_t count = 0;
+  for (; list != nullptr; list = list->next) count += list->isDirectory == 0 ? 1 : 0;
+  return count;
+}
+
 std::string Summary(const std::vector<Finding>& findings) {
   std::string text;
   for (const Finding& finding : findings) {
@@ -165,7 +171,7 @@ ExitCode AnswerAuthority(const Options& options, const Manifest& manifest, Quest
   }
   Say("no: " + Reason(code));
   for (const std::string& reason : reasons) Note(reason);
-  if (reasons.empty() && code != VESK2_ERR_HASH_MATCH) {
+  if (reasons.empty()) {
     Note("the certificates and the ACL entries do not combine to what was asked, " +
          TagText(question.tag));
   }
@@ -182,8 +188,9 @@ ExitCode AnswerTree(const Options& options, const Manifest& manifest,
   const std::string summary = Summary(findings);
   if (code == 0 && summary.empty()) {
     const SignatureBlock block = ReadSignatureBlock(options.manifest);
-    Say("yes: " + Escape(options.directory) + " is as signed at " + StampText(*block.signedAt) +
-        " by " + Fingerprint(*block.certs.front().cert->GetIssuer()));
+    Say("yes: " + std::to_string(CountFiles(manifest.GetValid())) + " files of " +
+        Escape(options.directory) + " are as signed at " + StampText(*block.signedAt) + " by " +
+        Fingerprint(*block.certs.front().cert->GetIssuer()));
   } else {
     Say("no: " + summary + (code != 0 ? " (" + CodeName(code) + ")" : ""));
     PrintFindings(findings);
