@@ -1,0 +1,67 @@
+/* A C program that knows nothing but vesk2.h and the shared library: what it uses must have C
+ * linkage and be exported. */
+#include <vesk2.h>
+
+#include <stdio.h>
+#include <string.h>
+
+static int failures = 0;
+
+static void check(int holds, const char* what) {
+  if (holds) return;
+  fprintf(stderr, "failed: %s\n", what);
+  ++failures;
+}
+
+static void check_context(void) {
+  Vesk2ContextStruct* context = NULL;
+  unsigned int length = 0;
+  char* copy;
+  check(Vesk2Init(&context, 5) == VESK2_SUCCESS && context->cryptoHandle == 5, "Vesk2Init");
+  check(Vesk2FreeContext(context) == 0, "Vesk2FreeContext");
+  Vesk2DoNothing();
+  copy = Vesk2WideToAscii("name", 4, &length);
+  check(copy != NULL && length == 4, "Vesk2WideToAscii");
+  Vesk2Free(copy);
+  copy = Vesk2AsciiToWide("name", 2, &length);
+  check(copy != NULL && strcmp(copy, "na") == 0, "Vesk2AsciiToWide");
+  Vesk2Free(copy);
+}
+
+static void check_version(void) {
+  check(Vesk2VersionNumber() == 10100, "Vesk2VersionNumber");
+  check(strcmp(Vesk2VersionExtra(), "r2441") == 0, "Vesk2VersionExtra");
+  check(Vesk2VersionExtra() == Vesk2VersionExtraA(), "Vesk2VersionExtraA");
+  check(strcmp(Vesk2ErrorMessage(VESK2_ERR_WRITE_FILE), "VESK2_ERR_WRITE_FILE") == 0, "code 76");
+  check(strcmp(Vesk2ErrorMessage(VESK2_MAX_ERROR), "VESK_UNKNOWN_ERROR") == 0, "code 77");
+}
+
+static void check_manifest(void) {
+  Manifest* manifest = NULL;
+  FileItem ignored;
+  char name[] = "build";
+  memset(&ignored, 0, sizeof ignored);
+  ignored.name = name;
+  Vesk2HomeDirectory("/nonexistent");
+  Vesk2GlobalDirectoryA("/nonexistent");
+  check(CreateManifestContext(&manifest, "/nonexistent", "/nonexistent/m", "(install)") == 0,
+        "CreateManifestContext");
+  FailOnExtraEntries(manifest);
+  SetExtraAclDirectory(manifest, "/nonexistent");
+  SetIgnoredEntries(manifest, &ignored);
+  check(VerifyManifest(manifest, 0, 0) == VESK2_ERR_OPEN_MANIFEST_FILE, "VerifyManifest");
+  check(CompareManifestA(manifest, "/m") == VESK2_ERR_OPEN_MANIFEST_FILE, "CompareManifestA");
+  check(GetTimeOfSigning(manifest) == 0, "GetTimeOfSigning");
+  check(GetValidEntries(manifest) == NULL && GetInvalidEntries(manifest) == NULL &&
+            GetMissingEntries(manifest) == NULL && GetExtraEntries(manifest) == NULL,
+        "result lists");
+  DeleteManifestContext(manifest);
+  check(FreeFileItemList(NULL) == 0, "FreeFileItemList");
+}
+
+int main(void) {
+  check_context();
+  check_version();
+  check_manifest();
+  return failures == 0 ? 0 : 1;
+}
