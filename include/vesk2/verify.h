@@ -26,7 +26,9 @@ namespace ZvVesk2::Verify {
 
 // ReductB returns what the chain grants to `third`: the tag and the dates, as new lists for the
 // caller to free, each null when the grant has none. An empty result is a success with all three
-// null.
+// null; of several grants, what is found last is returned, tag and dates each for themselves. The
+// outputs must be null (VESK2_ERR_PARAM_NOT_NULL) and are null again after a failure.
+// VESK2_ERR_INVALID_PARAM for a null argument, VESK2_ERR_MEM_ALLOC, SPKI_ERR_*.
 [[nodiscard]] VESK2_API int ReductB(Vesk2ContextStruct* ctx, SExpression* acl,
                                     SExpression* sequence, SExpression* third, SExpression*& tag,
                                     SExpression*& notBefore, SExpression*& notAfter);
