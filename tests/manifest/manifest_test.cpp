@@ -244,8 +244,23 @@ TEST_F(ManifestTest, DropsRevokedAndUndeterminedCertificates) {
     parts.lists.clear();
     EXPECT_EQ(Verify(ManifestFile(parts)), row.code) << row.what;
   }
-  // A list that nobody here vouches for neither clears nor revokes.
+  // The period that is asked for counts before the time of signing.
   std::filesystem::remove_all(store.File("cert"));
+  parts.lists = RevocationList(signerCert, "", "2024-06-01_00:00:00");
+  EXPECT_EQ(Verify(ManifestFile(parts), kTag, kInside, 0), VESK2_ERR_CERT_REVOKED);
+  parts.lists.clear();
+  // Elsewhere in the chain too: what is undetermined is left out, needed or not.
+  std::filesystem::remove_all(store.File("cert"));
+  parts.signer.revocation.clear();
+  own.revocation = revocation;
+  const std::string plain = parts.chain;
+  parts.chain = plain + Signed(own, vendor);
+  EXPECT_EQ(Verify(ManifestFile(parts)), 0);
+  parts.chain = Signed(own, vendor);
+  EXPECT_EQ(Verify(ManifestFile(parts)), VESK2_ERR_SIGNING_CERT_ORDER);
+  // A list that nobody here vouches for neither clears nor revokes.
+  parts.chain = plain;
+  parts.signer.revocation = revocation;
   std::filesystem::remove(store.File("acl/revoke.acl"));
   parts.lists = RevocationList("", "");
   EXPECT_EQ(Verify(ManifestFile(parts)), VESK2_ERR_CRL_NOT_FOUND);
