@@ -40,7 +40,7 @@ class VESK2_API CertSequence : public SExpression {
   [[nodiscard]] static int Import(CertSequence*& out, const char* name, bool usePath,
                                   Vesk2ContextStruct* ctx);
   // Import reads the first triple only; the rest of the text is not read. The outputs must be null
-  // (the buffer form does not test `extra`) and are null again after a failure.
+  // (the buffer form does not test `extra`, and overwrites it) and are null again after a failure.
   [[nodiscard]] static int Import(Cert*& cert, Signature*& signature, SExpression*& extra,
                                   ZvBuffer* buffer, Vesk2ContextStruct* ctx);
   [[nodiscard]] static int Import(Cert*& cert, Signature*& signature, SExpression*& extra,

@@ -9,10 +9,9 @@
 // without items counts as absent: a fresh list that revokes nothing yet needs one (dummy) item in
 // list1, or every certificate that depends on it is undetermined.
 //
-// The store keeps one list for every revocation source, an ACL entry whose tag ends in (revoke
-// ...), in "cert"/*.crl below the global root. Its file name is the text of the tag's body, with
-// "/" written
-// "%2F"; a text with a 0 byte or longer than 250 bytes names no file.
+// The store keeps one list for every revocation source, an ACL entry whose tag ends in
+// (revoke ...), in "cert"/*.crl below the global root. Its file name is the text of the tag's body,
+// with "/" written "%2F"; a text with a 0 byte or longer than 250 bytes names no file.
 #ifndef VESK2_CRL_H
 #define VESK2_CRL_H
 
@@ -33,7 +32,7 @@ class VESK2_API Crl : public SExpression {
   // it.
   [[nodiscard]] int Import(ZvBuffer* buffer);
   using SExpression::Import;
-  // BuildSExpression rebuilds the list from the fields.
+  // BuildSExpression rebuilds the list from the fields. VESK2_ERR_PARAM_NULL while they are empty.
   [[nodiscard]] int BuildSExpression();
 
   // The two lists, borrowed; each is headed by its keyword.
@@ -75,6 +74,7 @@ class VESK2_API CrlSequence : public SExpression {
   [[nodiscard]] int Import(const char* path);
   [[nodiscard]] int Import(ZvBuffer* buffer);
   using SExpression::Import;
+  // BuildSExpression rebuilds the list from the fields. VESK2_ERR_PARAM_NULL while they are empty.
   [[nodiscard]] int BuildSExpression();
 
   // VerifyValidity compares the certificate's period with the given one, when both times are given:
@@ -114,13 +114,14 @@ class VESK2_API CrlSequence : public SExpression {
 
   // CheckStatusCritical asks list2 of every sequence in `store` (with the tag, when one is given)
   // about `object`, a key or a hash: VESK2_ERR_KEY_REVOKED, else 0. Only sequences that verify
-  // against `aclEntries` count.
+  // against `aclEntries`, or did before, count. VESK2_ERR_PARAM_NULL without an object; other codes
+  // when it cannot be hashed.
   [[nodiscard]] static int CheckStatusCritical(SExpression* aclEntries, SExpression* store,
                                                SExpression* tag, SExpression* object);
   // CheckStatusNonCritical asks list1 about `object`, a certificate, for a period (null: whenever).
   // VESK2_ERR_CERT_REVOKED when it was revoked at or before `notBefore`; VESK2_ERR_CRL_NOT_FOUND
   // when there is no list to ask; VESK2_ERR_NOT_AFTER when all of them ended before the period;
-  // else 0.
+  // else 0. Other codes as above.
   [[nodiscard]] static int CheckStatusNonCritical(SExpression* aclEntries, SExpression* store,
                                                   SExpression* tag, SExpression* object,
                                                   TimeStamp* notBefore, TimeStamp* notAfter);

@@ -61,6 +61,7 @@ int Crl::Import(ZvBuffer* buffer) {
 
 int Crl::BuildSExpression() {
   DeleteNodes();
+  VESK2_REQUIRE(list1 != nullptr && list2 != nullptr, VESK2_ERR_PARAM_NULL);
   VESK2_TRY(Insert("crl"));
   Ref<SExpression> version;
   VESK2_TRY(SExpression::Create(version.Out(), "version", "1", GetContext()));

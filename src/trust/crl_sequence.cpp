@@ -72,6 +72,8 @@ int CrlSequence::Import(ZvBuffer* buffer) {
 
 int CrlSequence::BuildSExpression() {
   DeleteNodes();
+  // An object that is not complete has no list: the other operations go by that.
+  VESK2_REQUIRE(crl != nullptr && cert != nullptr && signature != nullptr, VESK2_ERR_PARAM_NULL);
   VESK2_TRY(Insert("sequence"));
   VESK2_TRY(AppendShared(this, crl));
   VESK2_TRY(AppendShared(this, cert));

@@ -84,13 +84,8 @@ bool IsStamp(const TimeStamp* stamp) {
 // One question, put to the sequences of a store one after the other.
 class StatusCheck {
  public:
-  StatusCheck(bool critical, SExpression* acls, SExpression* object, TimeStamp* notBefore,
-              TimeStamp* notAfter)
-      : critical_(critical),
-        acls_(acls),
-        digests_(object),
-        notBefore_(notBefore),
-        notAfter_(notAfter) {}
+  StatusCheck(bool critical, SExpression* acls, SExpression* object, TimeStamp* notBefore)
+      : critical_(critical), acls_(acls), digests_(object), notBefore_(notBefore) {}
 
   // Ask puts the question to one sequence: the revocation code when it revokes the object, 0 when
   // the next one is to be asked.
@@ -109,7 +104,7 @@ class StatusCheck {
       if (!IsVerified(sequence)) return 0;
       if (Counts(item)) return critical_ ? VESK2_ERR_KEY_REVOKED : VESK2_ERR_CERT_REVOKED;
     }
-    if (!critical_) NoteCoverage(sequence);
+    if (!critical_) NoteEnd(sequence);
     return 0;
   }
 
@@ -117,8 +112,7 @@ class StatusCheck {
   int Result() const {
     if (critical_) return 0;
     VESK2_REQUIRE(latest_ != nullptr, VESK2_ERR_CRL_NOT_FOUND);
-    const bool ended = notBefore_ != nullptr && latest_->IsBefore(notBefore_);
-    return !covered_ && ended ? VESK2_ERR_NOT_AFTER : 0;
+    return notBefore_ != nullptr && latest_->IsBefore(notBefore_) ? VESK2_ERR_NOT_AFTER : 0;
   }
 
  private:
@@ -144,15 +138,12 @@ class StatusCheck {
     return date->IsBeforeOrEqual(notBefore_);
   }
 
-  // Remembers what period a sequence speaks for. Only a verified one counts: a forged sequence must
-  // not stand in for one that has run out.
-  void NoteCoverage(CrlSequence* sequence) {
-    const TimeStamp* const begin = sequence->GetCert()->GetNotBefore();
+  // Remembers the latest end of a period. Where some list covers the period that is asked about,
+  // its end lies after the start, so nothing else need be kept. Only a verified one counts: a
+  // forged sequence must not stand in for one that has run out.
+  void NoteEnd(CrlSequence* sequence) {
     const TimeStamp* const end = sequence->GetCert()->GetNotAfter();
     if (end == nullptr || !IsVerified(sequence)) return;
-    if (notBefore_ != nullptr && notAfter_ != nullptr && begin != nullptr) {
-      covered_ = covered_ || (begin->IsBefore(notAfter_) && end->IsAfter(notBefore_));
-    }
     if (latest_ == nullptr || end->IsAfter(latest_)) latest_ = end;
   }
 
@@ -160,8 +151,6 @@ class StatusCheck {
   SExpression* acls_;
   Digests digests_;
   const TimeStamp* notBefore_;
-  const TimeStamp* notAfter_;
-  bool covered_ = false;
   const TimeStamp* latest_ = nullptr;
 };
 
@@ -182,15 +171,15 @@ int CheckStatus(StatusCheck& check, SExpression* store, SExpression* tag) {
 int CrlSequence::CheckStatusCritical(SExpression* aclEntries, SExpression* store, SExpression* tag,
                                      SExpression* object) {
   VESK2_REQUIRE(object != nullptr, VESK2_ERR_PARAM_NULL);
-  StatusCheck check(true, aclEntries, object, nullptr, nullptr);
+  StatusCheck check(true, aclEntries, object, nullptr);
   return CheckStatus(check, store, tag);
 }
 
 int CrlSequence::CheckStatusNonCritical(SExpression* aclEntries, SExpression* store,
                                         SExpression* tag, SExpression* object, TimeStamp* notBefore,
-                                        TimeStamp* notAfter) {
+                                        TimeStamp*) {
   VESK2_REQUIRE(object != nullptr, VESK2_ERR_PARAM_NULL);
-  StatusCheck check(false, aclEntries, object, notBefore, notAfter);
+  StatusCheck check(false, aclEntries, object, notBefore);
   return CheckStatus(check, store, tag);
 }
 

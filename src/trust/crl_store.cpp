@@ -7,9 +7,9 @@
 #include <string_view>
 
 #include <vesk2/acl_entry.h>
+#include <vesk2/context.h>
 
 #include "src/platform/file.h"
-#include "src/platform/text.h"
 #include "src/trust/lists.h"
 #include "src/trust/store_write.h"
 
@@ -22,12 +22,14 @@ namespace {
 // ---- Names ----
 
 // Whether the text of `tag` has a 0 byte in it: as a C string it would name another tag's file.
-bool HoldsZeroByte(SExpression* tag) {
+int HoldsZeroByte(bool& holds, SExpression* tag) {
   const unsigned int size = tag->AdvancedLength();
   const std::unique_ptr<unsigned char[]> text(TryNewArray<unsigned char>(size_t{size} + 1));
+  VESK2_REQUIRE(text, VESK2_ERR_MEM_ALLOC);
   unsigned int length = 0;
-  if (!text || tag->ExportAdvanced(text.get(), length, size) != 0) return true;
-  return std::memchr(text.get(), 0, length) != nullptr;
+  VESK2_TRY(tag->ExportAdvanced(text.get(), length, size));
+  holds = std::memchr(text.get(), 0, length) != nullptr;
+  return 0;
 }
 
 // "/" becomes "%2F": what a tag says must not choose a directory, and only the last component of a
@@ -47,27 +49,39 @@ TextPtr EscapeSlashes(std::string_view text) {
   return escaped;
 }
 
-// The name of the file that keeps the list of the source `tag`: the text of the tag's body. Null
-// for a tag that names none.
-TextPtr StoreName(SExpression* tag) {
-  if (tag == nullptr || HoldsZeroByte(tag)) return nullptr;
+// The name of the file that keeps the list of the source `tag` (may be null): the text of the tag's
+// body. Success with null for a tag that names none.
+int StoreName(TextPtr& name, SExpression* tag) {
+  name = nullptr;
+  if (tag == nullptr) return 0;
+  bool holdsZeroByte = false;
+  VESK2_TRY(HoldsZeroByte(holdsZeroByte, tag));
+  if (holdsZeroByte) return 0;
   const TextPtr text(tag->ExportTagW("tag"));
-  if (!text || std::strlen(text.get()) > Limits::kMaxStoreName) return nullptr;
-  return EscapeSlashes(text.get());
+  if (!text) {
+    // No text of a tag with a body is a lack of memory.
+    auto* const keyword = dynamic_cast<ByteString*>(tag->First());
+    const bool hasBody = keyword != nullptr && keyword->IsEqual("tag") && tag->Count() > 1;
+    return hasBody ? VESK2_ERR_MEM_ALLOC : 0;
+  }
+  if (std::strlen(text.get()) > Limits::kMaxStoreName) return 0;
+  name = EscapeSlashes(text.get());
+  return name ? 0 : VESK2_ERR_MEM_ALLOC;
 }
 
 // ---- Loading ----
 
-// Appends the stored list of one source, if it can be read.
+// Appends the stored list of one source, if it can be read. A lack of memory is never taken for a
+// missing list: that would bring revoked keys back.
 int LoadSource(SExpression* store, SExpression* tag) {
-  const TextPtr name = StoreName(tag);
-  if (!name) return 0;
+  TextPtr name;
+  VESK2_TRY(StoreName(name, tag));
+  if (!name || *VeskConf::GetGlobalDirectory() == '\0') return 0;
   const TextPtr path(CrlSequence::CalcPath(name.get(), StorageGlobal));
-  if (!path) return 0;
+  VESK2_REQUIRE(path, VESK2_ERR_MEM_ALLOC);
   Ref<CrlSequence> sequence(TryNew<CrlSequence>(store->GetContext()));
   VESK2_REQUIRE(sequence, VESK2_ERR_MEM_ALLOC);
   const int code = sequence->Import(path.get());
-  // Short of memory, "there is no list" would be a lie that brings revoked keys back.
   VESK2_REQUIRE(code != VESK2_ERR_MEM_ALLOC, VESK2_ERR_MEM_ALLOC);
   return code == 0 ? Append(store, std::move(sequence)) : 0;
 }
@@ -197,8 +211,8 @@ int IsWanted(bool& wanted, const Cert* fresh, const char* path) {
 
 int CrlSequence::UpdateStore(SExpression* aclEntries) {
   VESK2_REQUIRE(First() != nullptr, VESK2_ERR_INVALID_PARAM);
-  const TextPtr name = StoreName(cert->GetTag());
-  VESK2_REQUIRE(name, VESK2_ERR_INVALID_PARAM);
+  TextPtr name;
+  VESK2_REQUIRE(StoreName(name, cert->GetTag()) == 0 && name, VESK2_ERR_INVALID_PARAM);
   // From here on the answer is a plain success: a damaged store degrades to having no list.
   SetStorageType(StorageGlobal);
   const TextPtr path(CalcPath(name.get(), StorageGlobal));
