@@ -46,15 +46,20 @@ TEST_F(ReduceTest, TagsThatMultiply) {
   Fails({Entry(Key("K0"), "(propagate)(tag (*))"), certs}, SPKI_ERR_NO_MEM);
 }
 
-// Principals of one bucket are looked for one after the other.
-TEST_F(ReduceTest, CrowdedBuckets) {
-  std::string hashes;
+// Principals of one bucket, and grants of one issuer, are looked for one after the other.
+TEST_F(ReduceTest, CrowdedTables) {
+  std::string certs;
+  std::string entries;
   for (int i = 0; i < 3000; ++i) {
     const std::string number = std::to_string(i);
-    hashes += Entry("(hash sha1 " + std::string(20 - number.size(), 'h') + number + ")");
+    certs += Cert("(hash sha1 " + std::string(20 - number.size(), 'h') + number + ")", A);
+    entries += Entry(A, "(tag " + number + ")");
   }
   SpendMost(&engine_);
-  Fails({hashes}, SPKI_ERR_NO_MEM);
+  Fails({Entry(R), certs}, SPKI_ERR_NO_MEM);
+  engine_.budget.spent = 0;
+  SpendMost(&engine_);
+  Fails({entries}, SPKI_ERR_NO_MEM);
 }
 
 // Derived grants nest as deep as the chain is long.

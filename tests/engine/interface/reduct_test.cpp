@@ -88,15 +88,11 @@ TEST(ReductA, Sets) {
 
 TEST(ReductA, Arguments) {
   const Ref<SExpression> list = Parse(Acl(AclEntryText(Key("R"), Tag("x"))));
-  SExpression* const given = list.get();
-  EXPECT_EQ(VESK2_ERR_INVALID_PARAM,
-            Verify::ReductA(nullptr, nullptr, given, given, given, nullptr));
-  EXPECT_EQ(VESK2_ERR_INVALID_PARAM,
-            Verify::ReductA(nullptr, given, nullptr, given, given, nullptr));
-  EXPECT_EQ(VESK2_ERR_INVALID_PARAM,
-            Verify::ReductA(nullptr, given, given, nullptr, given, nullptr));
-  EXPECT_EQ(VESK2_ERR_INVALID_PARAM,
-            Verify::ReductA(nullptr, given, given, Parse(Key("R")).get(), nullptr, nullptr));
+  for (int missing = 0; missing < 4; ++missing) {
+    const auto given = [&](int i) { return i == missing ? nullptr : list.get(); };
+    EXPECT_EQ(VESK2_ERR_INVALID_PARAM,
+              Verify::ReductA(nullptr, given(0), given(1), given(2), given(3), nullptr));
+  }
 }
 
 TEST(ReductB, Grants) {
