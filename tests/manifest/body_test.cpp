@@ -3,7 +3,6 @@
 
 #include <cstring>
 #include <string>
-#include <vector>
 
 #include <vesk2/limits.h>
 #include <vesk2/manifest_body.h>
@@ -84,27 +83,25 @@ TEST(IgnoreWalk, MergesForwardAndUsesEntriesUp) {
   PointerArray<char> ignored;
   Push(ignored, {"a", "c", "c", "x"});
   ZvVesk2::IgnoreWalk walk(ignored);
-  const std::vector<std::pair<const char*, bool>> questions = {
-      {"/d/a", true}, {"a", false}, {"b", false}, {"c", true},
-      {"c", true},    {"c", false}, {"d", false}, {"x", true}};
-  for (const auto& [name, expected] : questions) EXPECT_EQ(walk.Ignores(name), expected) << name;
+  std::string found;
+  for (const char* name : {"/d/a", "a", "b", "c", "c", "c", "d", "x"}) {
+    found += walk.Ignores(name) ? name : "-";
+  }
+  EXPECT_EQ(found, "/d/a--cc--x");
 }
 
 TEST(BodyParse, RefusesWhatIsNoBody) {
   const std::string digest = Str(Digest("x"));
-  const auto file = [&](const std::string& name) {
-    return Body("(4:file" + Str(name) + "1:-" + digest + ")");
-  };
   const auto sized = [](size_t length) {
     return Body("(4:file1:a1:-" + Str(std::string(length, 'h')) + ")");
   };
-  const std::string a0b("a\0b", 3);
-  const std::vector<std::pair<std::string, int>> cases = {
+  const struct {
+    std::string text;
+    int code;
+  } cases[] = {
       {Body(""), 0},
-      {file("a"), 0},
-      {file("..."), 0},
       {Body("(4:file1:a0:" + digest + ")"), 0},
-      {Body(DirEntry("d", "") + FileEntry("d", "") + FileEntry("d", "")), 0},
+      {Body(DirEntry("d", "") + FileEntry("d", "") + FileEntry("...", "")), 0},
       {"(4:body(12:random-token3:abc))", VESK2_ERR_RANDOM_TOKEN},
       {"(4:body(12:random-token5:abcde))", VESK2_ERR_RANDOM_TOKEN},
       {"(4:bodx(12:random-token4:abcd))", VESK2_ERR_PARSE_FILE},
@@ -113,16 +110,13 @@ TEST(BodyParse, RefusesWhatIsNoBody) {
       {sized(20), VESK2_ERR_UNKNOWN_HASH_ID},
       {sized(31), VESK2_ERR_UNKNOWN_HASH_ID},
       {sized(33), VESK2_ERR_UNKNOWN_HASH_ID},
-      {Body("(4:file1:a1:-" + digest), VESK2_ERR_PARSE_FILE},
-      {file(""), VESK2_ERR_PARSE_FILE},
-      {file("."), VESK2_ERR_PARSE_FILE},
-      {file(".."), VESK2_ERR_PARSE_FILE},
-      {file("a/b"), VESK2_ERR_PARSE_FILE},
-      {file(a0b), VESK2_ERR_PARSE_FILE},
-      {Body(DirEntry("..", "")), VESK2_ERR_PARSE_FILE},
-      {Body(DirEntry("/etc", "")), VESK2_ERR_PARSE_FILE},
   };
-  for (const auto& [text, code] : cases) EXPECT_EQ(Parse(text), code) << text;
+  for (const auto& row : cases) EXPECT_EQ(Parse(row.text), row.code) << row.text;
+  for (const std::string name : {"", ".", "..", "a/b", "/etc"}) {
+    EXPECT_EQ(Parse(Body(FileEntry(name, ""))), VESK2_ERR_PARSE_FILE) << name;
+    EXPECT_EQ(Parse(Body(DirEntry(name, ""))), VESK2_ERR_PARSE_FILE) << name;
+  }
+  EXPECT_EQ(Parse(Body(FileEntry(std::string("a\0b", 3), ""))), VESK2_ERR_PARSE_FILE);
   EXPECT_EQ(BodyDirectory(nullptr).ParseBody(nullptr, nullptr), VESK2_ERR_PARAM_NULL);
 
   const std::string whole = Body(DirEntry("d", FileEntry("f", "x")));

@@ -3,9 +3,8 @@
 #include <sys/stat.h>
 
 #include <filesystem>
-#include <functional>
+#include <sstream>
 #include <string>
-#include <vector>
 
 #include <vesk2/manifest.h>
 
@@ -20,159 +19,90 @@ namespace fs = std::filesystem;
 
 namespace {
 
-// The tree a, b, sub/f, sub/deep/g and its body.
-struct Tree {
-  Tree() {
-    for (const char* name : {"a", "b", "sub/f", "sub/deep/g"}) dir.Write(name, name);
-    body = BodyOf(dir.Path());
-  }
-  TempDir dir;
-  std::string body;
-};
+constexpr int kDiffers = VESK2_ERR_HASH_MISMATCH;
+constexpr int kMissing = VESK2_ERR_FILE_NOT_FOUND;
+constexpr int kExtra = VESK2_ERR_EXTRA_FILES;
 
-struct DiskCase {
-  const char* what;
-  std::function<void(Tree&)> change;
-  std::vector<const char*> ignored;
+// Changes what is on disk at `path`: "+" writes a file, "-" removes, "P" puts a FIFO there, "S" a
+// socket, "D" a directory, "L" a dangling link; "M" moves it elsewhere and leaves a link.
+void Change(const TempDir& dir, char what, const std::string& path) {
+  const std::string file = dir.File(path);
+  if (what == '+') {
+    dir.Write(path, "new");
+    return;
+  }
+  if (what == 'M') {
+    const std::string moved = dir.File(fs::path(path).filename().string() + "-moved");
+    fs::rename(file, moved);
+    fs::create_symlink(moved, file);
+    return;
+  }
+  fs::remove_all(file);
+  if (what == 'P' || what == 'S') {
+    ASSERT_EQ(mknod(file.c_str(), (what == 'P' ? S_IFIFO : S_IFSOCK) | 0600, 0), 0);
+  }
+  if (what == 'D') fs::create_directory(file);
+  if (what == 'L') fs::create_symlink("nowhere", file);
+}
+
+// The tree is a, b, s/f, s/d/g.
+constexpr struct {
+  const char* changes;
+  const char* ignored;
   int code;
   const char* findings;
+} kDiskCases[] = {
+    {"", "", 0, "V:s/ s/d/ s/d/g s/f b a I: M: X:"},
+    // The root is not searched for extra entries.
+    {"+x +new/y", "", 0, "V:s/ s/d/ s/d/g s/f b a I: M: X:"},
+    // What is extra makes the directories above extra, unless something worse is in them.
+    {"+s/d/x +s/d/q/y", "", kExtra, "V:s/d/g s/f b a I: M: X:s/ s/d/ s/d/x s/d/q/"},
+    {"+s/d/x -s/f", "", kDiffers, "V:s/d/g b a I:s/ M:s/f X:s/d/ s/d/x"},
+    {"-a +s/x", "", kMissing, "V:s/d/ s/d/g s/f b I: M:a X:s/ s/x"},
+    // Below the root a missing file makes its directory invalid.
+    {"-s/f", "", kDiffers, "V:s/d/ s/d/g b a I:s/ M:s/f X:"},
+    {"-a +b", "", kDiffers, "V:s/ s/d/ s/d/g s/f I:b M:a X:"},
+    // A missing directory is recorded by itself and by its parent.
+    {"-s/d", "", kDiffers, "V:s/f b a I:s/ s/d/ s/d/ M:s/d/g X:"},
+    // Contents count, not links; what is no regular file is missing, and nothing blocks.
+    {"Ma Ms/d", "", 0, "V:s/ s/d/ s/d/g s/f b a I: M: X:"},
+    {"Pa Sb Ps/f Ps/x", "", kDiffers, "V:s/d/ s/d/g I:s/ M:s/f b a X:s/x"},
+    {"Da Lb", "", kMissing, "V:s/ s/d/ s/d/g s/f I: M:b a X:"},
+    {"-s/d +s/d", "", kDiffers, "V:s/f b a I:s/ s/d/ s/d/ M:s/d/g X:s/d"},
+    // Ignored names count for their directory only, for files also behind directories of larger
+    // names, and what is in an ignored directory does not matter.
+    {"+a +s/f +s/x +s/a", "a s/x s/f f x", kExtra, "V:s/d/ s/d/g b I: M: X:s/ s/a"},
+    {"+s/a0 +s/zz/y", "s/a0 s/zz", 0, "V:s/ s/d/ s/d/g s/f b a I: M: X:"},
+    {"-s", "s", 0, "V:b a I: M: X:"},
 };
 
-void Special(Tree& tree, const char* name, mode_t type) {
-  fs::remove(tree.dir.File(name));
-  ASSERT_EQ(mknod(tree.dir.File(name).c_str(), type | 0600, 0), 0);
-}
-
-const std::vector<DiskCase>& DiskCases() {
-  static const std::vector<DiskCase> cases = {
-      {"nothing changed", [](Tree&) {}, {}, 0, "V:sub/ sub/deep/ sub/deep/g sub/f b a I: M: X:"},
-      {"the root is not searched for extra entries",
-       [](Tree& t) {
-         t.dir.Write("x", "");
-         t.dir.Write("new/y", "");
-       },
-       {},
-       0,
-       "V:sub/ sub/deep/ sub/deep/g sub/f b a I: M: X:"},
-      {"extra entries make the directories above extra",
-       [](Tree& t) {
-         t.dir.Write("sub/deep/x", "");
-         t.dir.Write("sub/deep/q/y", "");
-       },
-       {},
-       VESK2_ERR_EXTRA_FILES,
-       "V:sub/deep/g sub/f b a I: M: X:sub/ sub/deep/ sub/deep/x sub/deep/q/"},
-      {"missing in the root outranks extra",
-       [](Tree& t) {
-         fs::remove(t.dir.File("a"));
-         t.dir.Write("sub/x", "");
-       },
-       {},
-       VESK2_ERR_FILE_NOT_FOUND,
-       "V:sub/deep/ sub/deep/g sub/f b I: M:a X:sub/ sub/x"},
-      {"missing below the root makes the directory invalid",
-       [](Tree& t) { fs::remove(t.dir.File("sub/f")); },
-       {},
-       VESK2_ERR_HASH_MISMATCH,
-       "V:sub/deep/ sub/deep/g b a I:sub/ M:sub/f X:"},
-      {"changed outranks missing",
-       [](Tree& t) {
-         fs::remove(t.dir.File("a"));
-         t.dir.Write("b", "B");
-       },
-       {},
-       VESK2_ERR_HASH_MISMATCH,
-       "V:sub/ sub/deep/ sub/deep/g sub/f I:b M:a X:"},
-      {"a missing directory is recorded by itself and by its parent",
-       [](Tree& t) { fs::remove_all(t.dir.File("sub/deep")); },
-       {},
-       VESK2_ERR_HASH_MISMATCH,
-       "V:sub/f b a I:sub/ sub/deep/ sub/deep/ M:sub/deep/g X:"},
-      {"contents count, not links",
-       [](Tree& t) {
-         fs::rename(t.dir.File("a"), t.dir.File("elsewhere"));
-         fs::create_symlink("elsewhere", t.dir.File("a"));
-         fs::rename(t.dir.File("sub/deep"), t.dir.File("moved"));
-         fs::create_directory_symlink("../moved", t.dir.File("sub/deep"));
-       },
-       {},
-       0,
-       "V:sub/ sub/deep/ sub/deep/g sub/f b a I: M: X:"},
-      {"special files count as missing and do not block",
-       [](Tree& t) {
-         Special(t, "a", S_IFIFO);
-         Special(t, "b", S_IFSOCK);
-         Special(t, "sub/f", S_IFIFO);
-         Special(t, "sub/x", S_IFIFO);
-       },
-       {},
-       VESK2_ERR_HASH_MISMATCH,
-       "V:sub/deep/ sub/deep/g I:sub/ M:sub/f b a X:sub/x"},
-      {"a directory or a dangling link where a file is listed",
-       [](Tree& t) {
-         fs::remove(t.dir.File("a"));
-         fs::create_directory(t.dir.File("a"));
-         fs::remove(t.dir.File("b"));
-         fs::create_symlink("nowhere", t.dir.File("b"));
-       },
-       {},
-       VESK2_ERR_FILE_NOT_FOUND,
-       "V:sub/ sub/deep/ sub/deep/g sub/f I: M:b a X:"},
-      {"a file where a directory is listed",
-       [](Tree& t) {
-         fs::remove_all(t.dir.File("sub/deep"));
-         t.dir.Write("sub/deep", "");
-       },
-       {},
-       VESK2_ERR_HASH_MISMATCH,
-       "V:sub/f b a I:sub/ sub/deep/ sub/deep/ M:sub/deep/g X:sub/deep"},
-      {"ignored entries count for their directory only",
-       [](Tree& t) {
-         for (const char* name : {"a", "sub/f", "sub/x", "sub/a"}) t.dir.Write(name, "changed");
-       },
-       {"a", "sub/x", "sub/f", "f", "x"},
-       VESK2_ERR_EXTRA_FILES,
-       "V:sub/deep/ sub/deep/g b I: M: X:sub/ sub/a"},
-      {"ignored files stay ignored behind directories of larger names",
-       [](Tree& t) {
-         t.dir.Write("sub/a0", "");
-         t.dir.Write("sub/zz/y", "");
-       },
-       {"sub/a0", "sub/zz"},
-       0,
-       "V:sub/ sub/deep/ sub/deep/g sub/f b a I: M: X:"},
-      {"an ignored directory is not looked into",
-       [](Tree& t) { fs::remove_all(t.dir.File("sub")); },
-       {"sub"},
-       0,
-       "V:b a I: M: X:"},
-      {"duplicates are recorded each, and an entry ignores one of them",
-       [](Tree& t) {
-         t.body = Body(FileEntry("a", "a") + FileEntry("a", "x") + FileEntry("b", "b") +
-                       FileEntry("b", "b"));
-       },
-       {"b"},
-       VESK2_ERR_HASH_MISMATCH,
-       "V:b a I:a M: X:"},
-  };
-  return cases;
-}
-
 TEST(BodyVerify, FindsWhatDiffers) {
-  for (const DiskCase& row : DiskCases()) {
-    Tree tree;
-    row.change(tree);
+  for (const auto& row : kDiskCases) {
+    TempDir dir;
+    for (const char* name : {"a", "b", "s/f", "s/d/g"}) dir.Write(name, name);
+    const std::string body = BodyOf(dir.Path());
+    std::istringstream changes(row.changes);
+    for (std::string word; changes >> word;) Change(dir, word[0], word.substr(1));
     // A separator at the end must not switch the ignored names off.
-    for (const std::string& end : {std::string(), std::string("/"), std::string("//")}) {
+    for (const std::string end : {"", "/", "//"}) {
       Manifest manifest(nullptr);
       Ignore(manifest, row.ignored);
-      const std::string directory = tree.dir.Path() + end;
-      EXPECT_EQ(manifest.Verify(Wrap(tree.body).get(), directory.c_str()), row.code) << row.what;
-      std::string root = directory;
-      if (!end.empty()) root.pop_back();
-      EXPECT_EQ(Findings(manifest, root), row.findings) << row.what << " " << directory;
+      const std::string root = dir.Path() + end;
+      EXPECT_EQ(manifest.Verify(Wrap(body).get(), root.c_str()), row.code) << row.changes;
+      EXPECT_EQ(Findings(manifest, end.empty() ? root + "/" : root), row.findings) << row.changes;
     }
   }
+}
+
+TEST(BodyVerify, DuplicatesAreCheckedEachAndIgnoredOneByOne) {
+  TempDir dir;
+  for (const char* name : {"a", "b"}) dir.Write(name, name);
+  const std::string twice = FileEntry("a", "a") + FileEntry("b", "b") + FileEntry("b", "b");
+  Manifest manifest(nullptr);
+  Ignore(manifest, "b");
+  EXPECT_EQ(manifest.Verify(Wrap(Body(twice + FileEntry("a", ""))).get(), dir.Path().c_str()),
+            kDiffers);
+  EXPECT_EQ(Findings(manifest, dir.Path() + "/"), "V:b a I:a M: X:");
 }
 
 TEST(BodyVerify, RefusesNull) {
@@ -187,37 +117,33 @@ TEST(BodyVerify, RefusesNull) {
 TEST(BodyCompare, FindsWhatDiffers) {
   const std::string a = FileEntry("a", "a"), b = FileEntry("b", "b"), c = FileEntry("c", "c");
   const std::string changed = FileEntry("b", "B");
-  const std::string sub = DirEntry("s", a + DirEntry("t", b));
-  struct Case {
+  const std::string s = DirEntry("s", a + DirEntry("t", b));
+  const std::string sa = DirEntry("s", a), sab = DirEntry("s", a + b);
+  const struct {
     std::string reference, other;
-    std::vector<const char*> ignored;
+    const char* ignored;
     int code;
     const char* findings;
-  };
-  const std::vector<Case> cases = {
-      {a + sub, sub + a, {}, 0, "V:s/ s/t/ s/t/b s/a a I: M: X:"},
-      {a + b, changed + c, {}, VESK2_ERR_HASH_MISMATCH, "V: I:b M:a X:c"},
-      {a, a + b, {}, VESK2_ERR_EXTRA_FILES, "V:a I: M: X:b"},
-      {a + b, a, {}, VESK2_ERR_FILE_NOT_FOUND, "V:a I: M:b X:"},
+  } cases[] = {
+      {a + s, s + a, "", 0, "V:s/ s/t/ s/t/b s/a a I: M: X:"},
+      {a + b, changed + c, "", kDiffers, "V: I:b M:a X:c"},
+      {a, a + b, "", kExtra, "V:a I: M: X:b"},
+      {a + b, a, "", kMissing, "V:a I: M:b X:"},
       // Whole subtrees, the directory first; nothing inside is ignored.
-      {sub, a, {"s/a"}, VESK2_ERR_FILE_NOT_FOUND, "V: I: M:s/t/b s/t/ s/a s/ X:a"},
-      {a, sub + a, {}, VESK2_ERR_EXTRA_FILES, "V:a I: M: X:s/t/b s/t/ s/a s/"},
+      {s, a, "s/a", kMissing, "V: I: M:s/t/b s/t/ s/a s/ X:a"},
+      {a, s + a, "", kExtra, "V:a I: M: X:s/t/b s/t/ s/a s/"},
       // Any difference inside makes both directories of that name invalid, also extra files.
-      {DirEntry("s", a), DirEntry("s", a + b), {}, VESK2_ERR_HASH_MISMATCH, "V:s/a I:s/ M: X:s/b"},
-      {sub, a, {"s"}, VESK2_ERR_EXTRA_FILES, "V: I: M: X:a"},
-      {a, sub + a, {"s"}, 0, "V:a I: M: X:"},
-      {a + b, changed + c, {"a", "b", "c"}, 0, "V: I: M: X:"},
-      {DirEntry("s", a + b), DirEntry("s", a + changed), {"s/b"}, 0, "V:s/ s/a I: M: X:"},
-      {DirEntry("s", a),
-       DirEntry("s", a + b),
-       {"b"},
-       VESK2_ERR_HASH_MISMATCH,
-       "V:s/a I:s/ M: X:s/b"},
+      {sa, sab, "", kDiffers, "V:s/a I:s/ M: X:s/b"},
+      {sa, sab, "b", kDiffers, "V:s/a I:s/ M: X:s/b"},
+      {sa, sab, "s/b", 0, "V:s/ s/a I: M: X:"},
+      {s, a, "s", kExtra, "V: I: M: X:a"},
+      {a, s + a, "s", 0, "V:a I: M: X:"},
+      {a + b, changed + c, "a b c", 0, "V: I: M: X:"},
       // The reference's list decides while both sides last, then each side's own.
-      {b + c, b + b + c, {"b"}, VESK2_ERR_EXTRA_FILES, "V:c I: M: X:b"},
-      {b, b + b, {"b"}, 0, "V: I: M: X:"},
+      {b + c, b + b + c, "b", kExtra, "V:c I: M: X:b"},
+      {b, b + b, "b", 0, "V: I: M: X:"},
   };
-  for (const Case& row : cases) {
+  for (const auto& row : cases) {
     Manifest manifest(nullptr);
     Ignore(manifest, row.ignored);
     const int code = manifest.Compare(Wrap(Body(row.reference)).get(), Wrap(Body(row.other)).get());

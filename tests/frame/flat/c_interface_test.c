@@ -17,15 +17,18 @@ static void check_context(void) {
   Vesk2ContextStruct* context = NULL;
   unsigned int length = 0;
   char* copy;
+  check(Vesk2Init(NULL, 5) == VESK2_SUCCESS, "Vesk2Init without an output");
   check(Vesk2Init(&context, 5) == VESK2_SUCCESS && context->cryptoHandle == 5, "Vesk2Init");
-  check(Vesk2FreeContext(context) == 0, "Vesk2FreeContext");
+  check(Vesk2FreeContext(context) == 0 && Vesk2FreeContext(NULL) == 0, "Vesk2FreeContext");
   Vesk2DoNothing();
-  copy = Vesk2WideToAscii("name", 4, &length);
-  check(copy != NULL && length == 4, "Vesk2WideToAscii");
+  copy = Vesk2WideToAscii("name", 9, &length);
+  check(copy != NULL && strcmp(copy, "name") == 0 && length == 4, "Vesk2WideToAscii");
   Vesk2Free(copy);
-  copy = Vesk2AsciiToWide("name", 2, &length);
+  copy = Vesk2AsciiToWide("name", 2, NULL);
   check(copy != NULL && strcmp(copy, "na") == 0, "Vesk2AsciiToWide");
   Vesk2Free(copy);
+  check(Vesk2AsciiToWide(NULL, 2, &length) == NULL && length == 0, "no text");
+  Vesk2Free(NULL);
 }
 
 static void check_version(void) {
