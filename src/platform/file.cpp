@@ -46,6 +46,7 @@ ZvFile* OpenForReading(const char* path) {
   file->fd = OpenRegular(path, O_RDONLY, &file->opened);
   if (file->fd < 0) return nullptr;
   file->block = block.release();
+  file->next = file->end = file->block;
   return file.release();
 }
 
