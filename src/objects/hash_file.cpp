@@ -27,10 +27,10 @@ int FeedFile(ZVCLMHashContextData* hash, ZvFile* file, uint32_t handle) {
   const std::unique_ptr<unsigned char[]> buffer(TryNewArray<unsigned char>(kBufferSize));
   VESK2_REQUIRE(buffer, VESK2_ERR_MEM_ALLOC);
   unsigned char* const bytes = buffer.get();
-  while (const size_t count = zv_read(file, bytes, kReadSize)) {
-    // All but the last count are kReadSize; as a constant it makes the copies plain moves.
-    VESK2_TRY(count == kReadSize ? zvclm_HashUpdate(hash, bytes, kReadSize, handle)
-                                 : zvclm_HashUpdate(hash, bytes, count, handle));
+  ZVsysutil::ZvReader reader(file);
+  ZVCLMHashFeed feed(hash);
+  while (const size_t count = zv_read(reader, bytes, kReadSize)) {
+    VESK2_TRY(zvclm_HashUpdate(feed, bytes, count, handle));
   }
   return 0;
 }
