@@ -22,6 +22,13 @@
 
 namespace ZvVesk2 {
 
+// Whether a code tells of a lack of memory, the crypto layer's included. Where a file or an object
+// that fails is passed over, one that only lacked memory is not: what it says may be what matters.
+[[nodiscard]] constexpr bool LacksMemory(int code) {
+  constexpr int kCryptoNoMemory = 1007;
+  return code == VESK2_ERR_MEM_ALLOC || code == kCryptoNoMemory;
+}
+
 // The library is built without exceptions: memory that cannot be had is a null pointer, tested
 // where it is asked for.
 template <typename T, typename... Args>

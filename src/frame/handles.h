@@ -2,6 +2,7 @@
 #ifndef VESK2_SRC_FRAME_HANDLES_H
 #define VESK2_SRC_FRAME_HANDLES_H
 
+#include <cerrno>
 #include <cstdint>
 #include <memory>
 
@@ -15,6 +16,16 @@ struct BufferFree {
   void operator()(ZvBuffer* buffer) const { ZVsysutil::zv_buffer_free(buffer); }
 };
 using BufferOwner = std::unique_ptr<ZvBuffer, BufferFree>;
+
+// WrapFile reads a file into `out`. Returns `failure` when it cannot be read, but
+// VESK2_ERR_MEM_ALLOC for lack of memory: taken for a missing file, a revocation list would count
+// for nothing.
+[[nodiscard]] inline int WrapFile(BufferOwner& out, const char* path, int failure) {
+  errno = 0;
+  out.reset(ZVsysutil::zv_buffer_wrap_file(path));
+  if (out != nullptr) return 0;
+  return errno == ENOMEM ? VESK2_ERR_MEM_ALLOC : failure;
+}
 
 struct HashFree {
   uint32_t handle;  // the context's cryptoHandle

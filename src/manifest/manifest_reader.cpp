@@ -30,8 +30,7 @@ constexpr unsigned kStampLength = 19;
 int ManifestReader::Read(ZvBuffer** body) {
   if (body != nullptr) *body = nullptr;
   manifest_.ClearRead();
-  buffer_.reset(ZVsysutil::zv_buffer_wrap_file(manifest_.manifestPath.get()));
-  VESK2_REQUIRE(buffer_, VESK2_ERR_OPEN_MANIFEST_FILE);
+  VESK2_TRY(WrapFile(buffer_, manifest_.manifestPath.get(), VESK2_ERR_OPEN_MANIFEST_FILE));
   const int code = ReadFile(body);
   manifest_.readPosition = buffer_->Position();
   VESK2_TRY(code);

@@ -13,8 +13,6 @@
 
 namespace ZvVesk2 {
 
-using BufferPtr = BufferOwner;
-
 // ImportNew makes a T and reads it from the buffer with T::Import. `out` is untouched on failure.
 template <typename T>
 [[nodiscard]] int ImportNew(Ref<T>& out, ZvBuffer* buffer, Vesk2ContextStruct* context) {

@@ -56,8 +56,8 @@ int PublicKey::Import(ZvBuffer* buffer) {
 int PublicKey::Import(const char* name) {
   VESK2_REQUIRE(name != nullptr, VESK2_ERR_INVALID_PARAM);
   const std::unique_ptr<char[]> path(CalcPath(DirectoryName(), ExtensionName(), name, StoragePath));
-  const BufferPtr buffer(ZVsysutil::zv_buffer_wrap_file(path.get()));
-  VESK2_REQUIRE(buffer, VESK2_ERR_FILE_OPEN);
+  BufferOwner buffer;
+  VESK2_TRY(WrapFile(buffer, path.get(), VESK2_ERR_FILE_OPEN));
   VESK2_TRY(Import(buffer.get()));
   return SetFilePath(path.get());
 }

@@ -3,6 +3,7 @@
 #include <vesk2/signature.h>
 
 #include "src/objects/build.h"
+#include "src/sexpr/same.h"
 
 namespace ZvVesk2 {
 
@@ -68,8 +69,9 @@ int Signature::AppendValue(Ref<ByteString> newAlgorithm, Ref<ByteString> newValu
 
 int Signature::Verify(Cert* cert) {
   VESK2_REQUIRE(cert != nullptr, VESK2_ERR_PARAM_NULL);
-  Principal* const issuer = cert->GetIssuer();
-  VESK2_REQUIRE(issuer != nullptr && issuer->IsEqual(principal), VESK2_ERR_SIGNATURE);
+  bool own = false;
+  VESK2_TRY(CompareValues(own, cert->GetIssuer(), principal));
+  VESK2_REQUIRE(own, VESK2_ERR_SIGNATURE);
   return Verify(static_cast<SExpression*>(cert));
 }
 

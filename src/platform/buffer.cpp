@@ -61,12 +61,13 @@ ZvBuffer* zv_buffer_wrap_file(const char* path) {
   const auto size = static_cast<uint64_t>(file->opened.st_size);
   if (size > ZvVesk2::Limits::kMaxFile) return nullptr;
   std::unique_ptr<unsigned char[]> bytes(new (std::nothrow) unsigned char[size]);
-  if (bytes == nullptr) return nullptr;
+  if (bytes == nullptr) return NoMemory();
   if (zv_read(file.get(), bytes.get(), size) != size) return nullptr;
   unsigned char more = 0;
   if (zv_read(file.get(), &more, 1) != 0 || zv_failed(file.get())) return nullptr;
   ZvBuffer* buffer = new (std::nothrow) ZvBuffer(bytes.get(), size);
-  if (buffer != nullptr) bytes.release();
+  if (buffer == nullptr) return NoMemory();
+  bytes.release();
   return buffer;
 }
 

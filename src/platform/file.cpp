@@ -42,7 +42,7 @@ int OpenRegular(const char* path, int flags, struct stat* opened) {
 ZvFile* OpenForReading(const char* path) {
   std::unique_ptr<ZvFile> file(new (std::nothrow) ZvFile);
   std::unique_ptr<unsigned char[]> block(new (std::nothrow) unsigned char[kReadBlock]);
-  if (file == nullptr || block == nullptr) return nullptr;
+  if (file == nullptr || block == nullptr) return NoMemory();
   file->fd = OpenRegular(path, O_RDONLY, &file->opened);
   if (file->fd < 0) return nullptr;
   file->block = block.release();
@@ -52,7 +52,7 @@ ZvFile* OpenForReading(const char* path) {
 
 ZvFile* OpenForWriting(const char* path, int flags) {
   std::unique_ptr<ZvFile> file(new (std::nothrow) ZvFile);
-  if (file == nullptr) return nullptr;
+  if (file == nullptr) return NoMemory();
   Descriptor fd(OpenRegular(path, O_WRONLY | O_CREAT | O_NOFOLLOW | flags, &file->opened));
   if (fd.get() < 0) return nullptr;
   file->stream = fdopen(fd.get(), "w");

@@ -5,6 +5,7 @@
 
 #include <sys/stat.h>
 
+#include <cerrno>
 #include <cstddef>
 #include <cstdint>
 #include <cstdio>
@@ -28,6 +29,12 @@ struct ZvFile {
 };
 
 enum ZvOpenMode : int { ZV_WRITE = 1, ZV_READ = 2 };
+
+// The null pointer of an operation that lacked memory; errno tells so.
+inline std::nullptr_t NoMemory() {
+  errno = ENOMEM;
+  return nullptr;
+}
 
 // zv_open opens for writing (create or truncate) or for reading. Null for a null path, for anything
 // but a regular file, and on failure.

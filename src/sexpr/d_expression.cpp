@@ -7,6 +7,7 @@
 
 #include "src/frame/check.h"
 #include "src/frame/handles.h"
+#include "src/sexpr/same.h"
 
 namespace ZvVesk2 {
 
@@ -21,17 +22,23 @@ void DExpression::Free() {
 }
 
 bool DExpression::IsEqual(DExpression* other) {
-  if (other == nullptr) return false;
+  bool equal = false;
+  return CompareValues(equal, this, other) == 0 && equal;
+}
+
+int CompareValues(bool& equal, DExpression* a, DExpression* b) {
+  equal = false;
+  if (a == nullptr || b == nullptr) return 0;
   // Equal encodings are equally long; this spares most comparisons two digests.
-  if (CanonicalLength() != other->CanonicalLength()) return false;
+  if (a->CanonicalLength() != b->CanonicalLength()) return 0;
   unsigned char* digests[2] = {};
   unsigned int lengths[2] = {};
-  const int failed = ComputeHash(digests[0], lengths[0], ZVCLM_HASH_SHA256, true);
-  const std::unique_ptr<unsigned char[]> mine(digests[0]);
-  if (failed) return false;
-  if (other->ComputeHash(digests[1], lengths[1], ZVCLM_HASH_SHA256, true)) return false;
-  const std::unique_ptr<unsigned char[]> theirs(digests[1]);
-  return lengths[0] == lengths[1] && std::memcmp(digests[0], digests[1], lengths[0]) == 0;
+  VESK2_TRY(a->ComputeHash(digests[0], lengths[0], ZVCLM_HASH_SHA256, true));
+  const std::unique_ptr<unsigned char[]> first(digests[0]);
+  VESK2_TRY(b->ComputeHash(digests[1], lengths[1], ZVCLM_HASH_SHA256, true));
+  const std::unique_ptr<unsigned char[]> second(digests[1]);
+  equal = lengths[0] == lengths[1] && std::memcmp(digests[0], digests[1], lengths[0]) == 0;
+  return 0;
 }
 
 int DExpression::ComputeHash(unsigned char*& digest, unsigned int& digestLength, ZvclmHashID id,

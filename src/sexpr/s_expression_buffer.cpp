@@ -61,8 +61,8 @@ int SExpression::Import(SExpression*& out, ZvBuffer* buffer, Vesk2ContextStruct*
 int SExpression::Import(SExpression*& out, const char* path, Vesk2ContextStruct* context) {
   VESK2_REQUIRE(out == nullptr, VESK2_ERR_PARAM_NOT_NULL);
   VESK2_REQUIRE(path != nullptr, VESK2_ERR_PARAM_NULL);
-  const BufferOwner buffer(ZVsysutil::zv_buffer_wrap_file(path));
-  VESK2_REQUIRE(buffer != nullptr, VESK2_ERR_FILE_OPEN);
+  BufferOwner buffer;
+  VESK2_TRY(WrapFile(buffer, path, VESK2_ERR_FILE_OPEN));
   return Import(out, buffer.get(), context);
 }
 

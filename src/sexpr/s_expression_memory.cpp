@@ -72,11 +72,14 @@ class MemoryReader {
       VESK2_TRY(Look());
       if (buf_[pos_] == ')') return DExpression::Expect(")", buf_, size_, pos_);
       const bool nested = buf_[pos_] == '(';
+      SExpression* const foundBefore = search_ != nullptr ? search_->found : nullptr;
       VESK2_TRY(nested ? ReadList(element, level + 1) : ReadString(element));
-      const int code = list.Insert(element.get());
-      if (code) {
-        // A search goes on without an element that could not be kept.
+      if (const int code = list.Insert(element.get())) {
         if (search_ == nullptr) return code;
+        // A search goes on without an element that could not be kept, and without what was found
+        // in it.
+        search_->found = foundBefore;
+        element.Reset();
         continue;
       }
       if (nested && search_ != nullptr) search_->Test(element.get());

@@ -19,8 +19,8 @@ int AclEntry::Import(const char* name) {
     SetStorageType(StorageGlobal);
     VESK2_TRY(SetFileName(name));
   }
-  const BufferPtr buffer(ZVsysutil::zv_buffer_wrap_file(GetFileName()));
-  VESK2_REQUIRE(buffer, VESK2_ERR_FILE_OPEN);
+  BufferOwner buffer;
+  VESK2_TRY(WrapFile(buffer, GetFileName(), VESK2_ERR_FILE_OPEN));
   return Import(buffer.get());
 }
 
@@ -38,7 +38,7 @@ int LoadDirectory(SExpression* list, const char* directory) {
     status = entry->Import(path);
     if (status == 0) VESK2_TRY(Append(list, std::move(entry)));
     // An entry that is missing for lack of memory may be the one that names a revocation list.
-    if (status == VESK2_ERR_MEM_ALLOC) return status;
+    if (LacksMemory(status)) return VESK2_ERR_MEM_ALLOC;
   }
   return dir.failed() ? VESK2_ERR_MEM_ALLOC : status;
 }

@@ -19,8 +19,8 @@ int CertRequest::Import(Cert*& cert, Signature*& signature, SExpression*& sequen
                 VESK2_ERR_INVALID_PARAM);
   const TextPtr path(SExpression::CalcPath("", ".req", file, StoragePath));
   VESK2_REQUIRE(path, VESK2_ERR_MEM_ALLOC);
-  const BufferPtr buffer(ZVsysutil::zv_buffer_wrap_file(path.get()));
-  VESK2_REQUIRE(buffer, VESK2_ERR_FILE_OPEN);
+  BufferOwner buffer;
+  VESK2_TRY(WrapFile(buffer, path.get(), VESK2_ERR_FILE_OPEN));
   return CertSequence::Import(cert, signature, sequence, buffer.get(), context);
 }
 

@@ -48,12 +48,10 @@ struct Triple {
 };
 
 // Finds and reads the file of a sequence.
-int OpenFile(BufferPtr& buffer, TextPtr& path, const char* name, bool usePath) {
+int OpenFile(BufferOwner& buffer, TextPtr& path, const char* name, bool usePath) {
   path.reset(CertSequence::CalcPath(name, usePath ? StoragePath : StorageHome));
   VESK2_REQUIRE(path, VESK2_ERR_MEM_ALLOC);
-  buffer.reset(ZVsysutil::zv_buffer_wrap_file(path.get()));
-  VESK2_REQUIRE(buffer, VESK2_ERR_FILE_OPEN);
-  return 0;
+  return WrapFile(buffer, path.get(), VESK2_ERR_FILE_OPEN);
 }
 
 }  // namespace
@@ -80,7 +78,7 @@ int CertSequence::Import(CertSequence*& out, ZvBuffer* buffer, Vesk2ContextStruc
 int CertSequence::Import(CertSequence*& out, const char* name, bool usePath,
                          Vesk2ContextStruct* ctx) {
   VESK2_REQUIRE(out == nullptr && name != nullptr && *name != '\0', VESK2_ERR_INVALID_PARAM);
-  BufferPtr buffer;
+  BufferOwner buffer;
   TextPtr path;
   VESK2_TRY(OpenFile(buffer, path, name, usePath));
   Ref<CertSequence> sequence;
@@ -110,7 +108,7 @@ int CertSequence::Import(Cert*& cert, Signature*& signature, SExpression*& extra
                          bool usePath, Vesk2ContextStruct* ctx) {
   VESK2_REQUIRE(cert == nullptr && signature == nullptr && extra == nullptr && name != nullptr,
                 VESK2_ERR_INVALID_PARAM);
-  BufferPtr buffer;
+  BufferOwner buffer;
   TextPtr path;
   VESK2_TRY(OpenFile(buffer, path, name, usePath));
   return Import(cert, signature, extra, buffer.get(), ctx);

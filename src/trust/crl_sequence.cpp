@@ -3,6 +3,7 @@
 
 #include <vesk2/acl_entry.h>
 
+#include "src/sexpr/same.h"
 #include "src/trust/lists.h"
 
 namespace ZvVesk2 {
@@ -40,8 +41,8 @@ int CrlSequence::Import(const char* path) {
   VESK2_REQUIRE(path != nullptr, VESK2_ERR_FILE_NOT_FOUND);
   SetStorageType(StoragePath);
   VESK2_TRY(SetFilePath(path));
-  const BufferPtr buffer(ZVsysutil::zv_buffer_wrap_file(path));
-  VESK2_REQUIRE(buffer, VESK2_ERR_FILE_NOT_FOUND);
+  BufferOwner buffer;
+  VESK2_TRY(WrapFile(buffer, path, VESK2_ERR_FILE_NOT_FOUND));
   return Import(buffer.get());
 }
 
@@ -104,15 +105,23 @@ int CrlSequence::VerifyValidity(long* notBefore, long* notAfter) {
 namespace {
 
 // The last entry with the tag decides; null when there is none.
-AclEntry* LastWithTag(SExpression* entries, SExpression* tag) {
-  AclEntry* found = nullptr;
+int LastWithTag(AclEntry*& found, SExpression* entries, SExpression* tag) {
+  found = nullptr;
   for (auto it = entries->Begin(); it; it.Next()) {
     auto* entry = dynamic_cast<AclEntry*>(it.Value());
-    if (entry != nullptr && entry->GetTag() != nullptr && entry->GetTag()->IsEqual(tag)) {
-      found = entry;
-    }
+    if (entry == nullptr) continue;
+    bool equal = false;
+    VESK2_TRY(CompareValues(equal, entry->GetTag(), tag));
+    if (equal) found = entry;
   }
-  return found;
+  return 0;
+}
+
+// `mismatch` unless the two are equal.
+int RequireEqual(DExpression* a, DExpression* b, int mismatch) {
+  bool equal = false;
+  VESK2_TRY(CompareValues(equal, a, b));
+  return equal ? 0 : mismatch;
 }
 
 // Whether `subject` is the hash of the list.
@@ -125,7 +134,7 @@ int VerifyHash(Crl* crl, Subject* subject) {
   VESK2_TRY(computed->Init(expected->GetAlgorithm()));
   VESK2_TRY(computed->Update(crl));
   VESK2_TRY(computed->Finalize());
-  return computed->IsEqual(expected) ? 0 : VESK2_ERR_SIGNATURE;
+  return RequireEqual(computed.get(), expected, VESK2_ERR_SIGNATURE);
 }
 
 }  // namespace
@@ -134,9 +143,10 @@ int CrlSequence::VerifySelf(SExpression* aclEntries) {
   VESK2_REQUIRE(aclEntries != nullptr && aclEntries->First() != nullptr, VESK2_ERR_INVALID_PARAM);
   VESK2_REQUIRE(First() != nullptr, VESK2_ERR_INVALID_PARAM);
 
-  AclEntry* const root = LastWithTag(aclEntries, cert->GetTag());
+  AclEntry* root = nullptr;
+  VESK2_TRY(LastWithTag(root, aclEntries, cert->GetTag()));
   VESK2_REQUIRE(root != nullptr, VESK2_ERR_ACL_ENTRY_NOT_FOUND);
-  VESK2_REQUIRE(root->GetSubject()->IsEqual(cert->GetIssuer()), VESK2_ERR_ACL_ENTRY_NOT_FOUND);
+  VESK2_TRY(RequireEqual(root->GetSubject(), cert->GetIssuer(), VESK2_ERR_ACL_ENTRY_NOT_FOUND));
   VESK2_TRY(VerifyHash(crl, cert->GetSubject()));
   VESK2_TRY(signature->Verify(cert));
 

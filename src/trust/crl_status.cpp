@@ -8,6 +8,7 @@
 
 #include <vesk2/hash.h>
 
+#include "src/sexpr/same.h"
 #include "src/trust/lists.h"
 
 namespace ZvVesk2 {
@@ -101,11 +102,12 @@ class StatusCheck {
       VESK2_TRY(MatchItem(matches, item));
       if (!matches) continue;
       // Asked once: a sequence that does not verify is done with.
-      if (!IsVerified(sequence)) return 0;
+      bool verified = false;
+      VESK2_TRY(Verify(verified, sequence));
+      if (!verified) return 0;
       if (Counts(item)) return critical_ ? VESK2_ERR_KEY_REVOKED : VESK2_ERR_CERT_REVOKED;
     }
-    if (!critical_) NoteEnd(sequence);
-    return 0;
+    return critical_ ? 0 : NoteEnd(sequence);
   }
 
   // Result is the answer when no sequence revoked the object.
@@ -125,8 +127,12 @@ class StatusCheck {
     return named != nullptr ? digests_.Match(matches, named) : 0;
   }
 
-  bool IsVerified(CrlSequence* sequence) const {
-    return sequence->GetCrl()->GetIssuerTag() != nullptr || sequence->VerifySelf(acls_) == 0;
+  int Verify(bool& verified, CrlSequence* sequence) const {
+    verified = sequence->GetCrl()->GetIssuerTag() != nullptr;
+    if (verified) return 0;
+    const int code = sequence->VerifySelf(acls_);
+    verified = code == 0;
+    return LacksMemory(code) ? VESK2_ERR_MEM_ALLOC : 0;
   }
 
   // Whether a matching item revokes: always when critical or when no period is asked about, else
@@ -141,10 +147,13 @@ class StatusCheck {
   // Remembers the latest end of a period. Where some list covers the period that is asked about,
   // its end lies after the start, so nothing else need be kept. Only a verified one counts: a
   // forged sequence must not stand in for one that has run out.
-  void NoteEnd(CrlSequence* sequence) {
+  int NoteEnd(CrlSequence* sequence) {
     const TimeStamp* const end = sequence->GetCert()->GetNotAfter();
-    if (end == nullptr || !IsVerified(sequence)) return;
-    if (latest_ == nullptr || end->IsAfter(latest_)) latest_ = end;
+    if (end == nullptr) return 0;
+    bool verified = false;
+    VESK2_TRY(Verify(verified, sequence));
+    if (verified && (latest_ == nullptr || end->IsAfter(latest_))) latest_ = end;
+    return 0;
   }
 
   bool critical_;
@@ -160,8 +169,9 @@ int CheckStatus(StatusCheck& check, SExpression* store, SExpression* tag) {
     auto* const sequence = dynamic_cast<CrlSequence*>(it.Value());
     // A sequence whose import failed has no list.
     if (sequence == nullptr || sequence->First() == nullptr) continue;
-    if (tag != nullptr && !tag->IsEqual(sequence->GetCert()->GetTag())) continue;
-    VESK2_TRY(check.Ask(sequence));
+    bool asked = tag == nullptr;
+    if (!asked) VESK2_TRY(CompareValues(asked, tag, sequence->GetCert()->GetTag()));
+    if (asked) VESK2_TRY(check.Ask(sequence));
   }
   return check.Result();
 }

@@ -82,7 +82,7 @@ int LoadSource(SExpression* store, SExpression* tag) {
   Ref<CrlSequence> sequence(TryNew<CrlSequence>(store->GetContext()));
   VESK2_REQUIRE(sequence, VESK2_ERR_MEM_ALLOC);
   const int code = sequence->Import(path.get());
-  VESK2_REQUIRE(code != VESK2_ERR_MEM_ALLOC, VESK2_ERR_MEM_ALLOC);
+  VESK2_REQUIRE(!LacksMemory(code), VESK2_ERR_MEM_ALLOC);
   return code == 0 ? Append(store, std::move(sequence)) : 0;
 }
 
@@ -117,13 +117,17 @@ int CrlSequence::ImportDir(SExpression*& list, const char* dir, StorageType type
   Ref<SExpression> loaded(TryNew<SExpression>(ctx));
   VESK2_REQUIRE(loaded, VESK2_ERR_MEM_ALLOC);
   while (const char* path = directory.read(true)) {
-    const BufferPtr buffer(ZVsysutil::zv_buffer_wrap_file(path));
-    if (!buffer) continue;
+    BufferOwner buffer;
+    const int opened = WrapFile(buffer, path, VESK2_ERR_FILE_NOT_FOUND);
+    VESK2_REQUIRE(opened != VESK2_ERR_MEM_ALLOC, opened);
+    if (opened != 0) continue;
     Ref<CrlSequence> sequence(TryNew<CrlSequence>(ctx));
     VESK2_REQUIRE(sequence, VESK2_ERR_MEM_ALLOC);
     sequence->SetStorageType(type);
     VESK2_TRY(sequence->SetFilePath(path));
-    if (sequence->Import(buffer.get()) != 0) continue;
+    const int code = sequence->Import(buffer.get());
+    VESK2_REQUIRE(!LacksMemory(code), VESK2_ERR_MEM_ALLOC);
+    if (code != 0) continue;
     VESK2_TRY(Append(loaded.get(), std::move(sequence)));
   }
   VESK2_REQUIRE(!directory.failed(), VESK2_ERR_MEM_ALLOC);

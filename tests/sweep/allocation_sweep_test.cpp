@@ -1,0 +1,470 @@
+// The n-th allocation of every public operation fails, for n = 0, 1, 2 ... until none is reached.
+// Each run must leave its outputs null and leak nothing (the asan preset looks), and may never
+// answer "yes" where it would have said "no" or hide what it did not do.
+#include <gtest/gtest.h>
+
+#include <functional>
+#include <memory>
+#include <string>
+#include <vector>
+#include <vesk2.hpp>
+
+#include "tests/support/temp_dir.h"
+#include "tests/support/test_key.h"
+#include "tests/support/test_manifest.h"
+#include "tests/support/test_object.h"
+#include "tests/support/test_text.h"
+#include "tests/sweep/failing_memory.h"
+
+using namespace ZvVesk2;
+using namespace vesk2test;
+
+namespace {
+
+using vesk2test::List;
+using CertObject = ZvVesk2::Cert;
+constexpr const char* kFrom = "2020-01-01_00:00:00";
+constexpr const char* kTo = "2040-01-01_00:00:00";
+
+// A machine with a store, a vendor (key 0) trusted to install and to revoke, a signer (key 1), a
+// revoked key (key 2) and a signed tree.
+struct World {
+  World() {
+    VeskConf::SetHomeDirectory(dir.File("home").c_str());
+    VeskConf::SetGlobalDirectory(dir.File("global").c_str());
+    dir.Write("global/acl/install.acl", AclEntryText(vendor, Tag("install")));
+    dir.Write("global/acl/revoke.acl", AclEntryText(vendor, revokeTag));
+    dir.Write("new/more.acl", AclEntryText(signer, Tag("other")));
+    dir.Write("lists/list.crl", list);
+    dir.Write("tree/sub/file", "contents");
+    dir.Write("chain.cert", sequence);
+    dir.Write("chain.req", sequence);
+    ManifestText text;
+    text.chain = Signed(link, TestKey::Rsa(0));
+    text.lists = list;
+    text.body = BodyOf(dir.File("tree"));
+    dir.Write("tree.manifest", ManifestFile(text));
+    EXPECT_EQ(AclEntry::Import(acls.Out(), nullptr, nullptr), 0);
+    EXPECT_EQ(CrlSequence::ImportDirAndStore(File("lists"), nullptr), 0);
+    EXPECT_EQ(CrlSequence::ImportStore(store.Out(), acls.get(), nullptr), 0);
+  }
+
+  std::string RevocationList() const {
+    const auto item = [](const std::string& text) {
+      return List({Str("item"), HashOf(text), Str("2021-01-01_00:00:00")});
+    };
+    const std::string crl =
+        List({Str("crl"), List({Str("version"), Str("1")}), List({Str("list1"), item("(1:x)")}),
+              List({Str("list2"), item("(1:x)"), item(revokedKey)})});
+    const CertText voucher{.issuer = vendor,
+                           .subject = HashOf(crl),
+                           .tag = revokeTag,
+                           .notBefore = kFrom,
+                           .notAfter = kTo};
+    return List({Str("sequence"), crl, Signed(voucher, TestKey::Rsa(0))});
+  }
+  const char* File(const char* name) { return (path = dir.File(name)).c_str(); }
+
+  TempDir dir;
+  std::string path;
+  std::string revokeTag = Tag("app (revoke all)");
+  std::string vendor = TestKey::Rsa(0).Public();
+  std::string signer = TestKey::Rsa(1).Public();
+  std::string revokedKey = TestKey::Rsa(2).Public();
+  CertText link{.issuer = vendor,
+                .subject = signer,
+                .tag = Tag("install (app calc)"),
+                .propagate = true,
+                .notBefore = kFrom,
+                .notAfter = kTo,
+                .comment = "c"};
+  std::string cert = vesk2test::Cert(link);
+  std::string sequence =
+      List({Str("sequence"), Signed(link, TestKey::Rsa(0)), List({Str("owner"), Str("me")})});
+  std::string list = RevocationList();
+  Ref<SExpression> acls;
+  Ref<SExpression> store;
+};
+
+World& W() {
+  static World world;
+  return world;
+}
+
+// What an operation did: its code, and whether its outputs are as they must be for that code.
+struct Outcome {
+  int code;
+  bool outputsFit = true;
+};
+using Operation = std::function<Outcome()>;
+
+// `prepare` runs with good memory and returns the operation to sweep. An operation that `manages`
+// may succeed all the same: it has another way to the same answer, or reports success whatever it
+// could not do, by its contract.
+struct Case {
+  const char* name;
+  std::function<Operation()> prepare;
+  bool manages = false;
+};
+
+// A case without preparation.
+Case Plain(const char* name, Operation operation, bool manages = false) {
+  return {name, [operation] { return operation; }, manages};
+}
+
+// A factory of values; `whole` judges what it made.
+template <typename T, typename Make>
+Operation Makes(Make make, std::function<bool(T*)> whole = nullptr) {
+  return [make, whole] {
+    T* out = nullptr;
+    const int code = make(out);
+    const bool fits = (out != nullptr) == (code == 0) && (!whole || out == nullptr || whole(out));
+    if (out != nullptr) out->Free();
+    return Outcome{code, fits};
+  };
+}
+
+// A new array; null stands for a failure.
+Operation MakesText(std::function<char*()> make) {
+  return [make] {
+    char* const text = make();
+    Vesk2Free(text);
+    return Outcome{text != nullptr ? 0 : VESK2_ERR_MEM_ALLOC};
+  };
+}
+
+template <typename T>
+std::shared_ptr<T> Keep(Ref<T> value) {
+  return {value.Release(), [](T* kept) { kept->Free(); }};
+}
+std::shared_ptr<SExpression> Kept(const std::string& text) { return Keep(Parse(text)); }
+template <typename T>
+std::shared_ptr<T> KeptAs(const std::string& text) {
+  Ref<T> object(new T(static_cast<Vesk2ContextStruct*>(nullptr)));
+  EXPECT_EQ(object->Import(Wrap(text).get()), 0);
+  return Keep(std::move(object));
+}
+
+template <typename T>
+Case Imports(const char* name, const std::string& text) {
+  return Plain(name, [text] {
+    const BufferPtr buffer = Wrap(text);
+    if (!buffer) return Outcome{VESK2_ERR_MEM_ALLOC};
+    Ref<T> object(new T(static_cast<Vesk2ContextStruct*>(nullptr)));
+    return Outcome{object->Import(buffer.get())};
+  });
+}
+
+unsigned char* Bytes(std::string& text) { return reinterpret_cast<unsigned char*>(text.data()); }
+unsigned Size(const std::string& text) { return static_cast<unsigned>(text.size()); }
+
+std::vector<Case> ExpressionCases() {
+  return {
+      Plain("Import", Makes<SExpression>([](SExpression*& out) {
+              return SExpression::Import(out, W().File("global/acl/revoke.acl"), nullptr);
+            })),
+      Plain("ParseCanonical", Makes<DExpression>([](DExpression*& out) {
+              unsigned pos = 0;
+              return SExpression::ParseCanonical(out, Bytes(W().cert), Size(W().cert), pos,
+                                                 nullptr);
+            })),
+      // An element that there was no room for is left out of the list, and the search goes on.
+      Plain(
+          "FindSubExpression",
+          [] {
+            Ref<SExpression> out;
+            const int code = SExpression::FindSubExpression(out.Out(), Bytes(W().cert),
+                                                            Size(W().cert), "tag", nullptr);
+            return Outcome{code, code == 0 || !out};
+          },
+          true),
+      Plain("ParseTagAdvanced", Makes<SExpression>([](SExpression*& out) {
+              return SExpression::ParseTagAdvanced(out, "(a (b c)) d", "tag", nullptr);
+            })),
+      Plain("Create", Makes<SExpression>([](SExpression*& out) {
+              return SExpression::Create(out, "a", "b", nullptr);
+            })),
+      {"Export",
+       [] {
+         return [list = Kept(W().cert)] {
+           unsigned char* out = nullptr;
+           unsigned length = 0;
+           const int code = list->Export(out, length);
+           const bool fits = (out != nullptr) == (code == 0);
+           Vesk2Free(out);
+           return Outcome{code, fits};
+         };
+       }},
+      {"IsEqual",
+       [] {
+         return [list = Kept(W().cert)] { return Outcome{list->IsEqual(list.get()) ? 0 : 1}; };
+       }},
+      {"ExportTagW",
+       [] { return MakesText([list = Kept(W().revokeTag)] { return list->ExportTagW("tag"); }); }},
+      Plain("CalcPath", MakesText([] { return AclEntry::CalcPath("x", StorageGlobal); })),
+      {"Export to a file",
+       [] {
+         const auto list = Kept(W().cert);
+         list->SetStorageType(StoragePath);
+         return [list] { return Outcome{list->SExpression::Export(W().File("out"))}; };
+       }},
+      Plain("TimeStamp::Set",
+            [] {
+              Ref<TimeStamp> stamp(new TimeStamp(nullptr));
+              return Outcome{stamp->Set("2020", true)};
+            }),
+  };
+}
+
+std::vector<Case> ObjectCases() {
+  const std::string signature = TestKey::Rsa(0).Sign(W().cert);
+  const std::string members = W().vendor + W().signer;
+  return {
+      Imports<Hash>("Hash::Import", HashOf("x")),
+      Imports<PublicKey>("PublicKey::Import", W().vendor),
+      Imports<ThresholdSubject>("ThresholdSubject::Import",
+                                List({Str("k-of-n"), Str("\x01"), Str("\x02"), members})),
+      Imports<Signature>("Signature::Import", signature),
+      Imports<CertObject>("Cert::Import", W().cert),
+      Imports<AclEntry>("AclEntry::Import", AclEntryText(W().vendor, W().revokeTag)),
+      Imports<CrlSequence>("CrlSequence::Import", W().list),
+      Plain("HashFile",
+            [] {
+              unsigned char digest[32];
+              unsigned length = sizeof digest;
+              const int code = Hash::HashFile(W().File("chain.cert"), digest, &length, nullptr);
+              return Outcome{code, length == (code == 0 ? 32u : 0u)};
+            }),
+      {"Signature::Verify",
+       [signature] {
+         return [read = KeptAs<Signature>(signature), cert = KeptAs<CertObject>(W().cert)] {
+           return Outcome{read->Verify(cert.get())};
+         };
+       }},
+      {"Signature::Create",
+       [] {
+         return [hash = KeptAs<Hash>(HashOf("x")), key = KeptAs<PublicKey>(W().vendor)] {
+           Ref<Signature> made;
+           unsigned char value[] = {1};
+           const int code =
+               Signature::Create(made.Out(), hash.get(), key.get(), "rsa-1.5", value, 1, nullptr);
+           if (code == 0) {  // the references were taken over
+             hash->IncrementRefCount();
+             key->IncrementRefCount();
+           }
+           return Outcome{code};
+         };
+       }},
+      {"X509Export",
+       [] {
+         return [key = KeptAs<PublicKey>(W().vendor)] {
+           unsigned char* out = nullptr;
+           unsigned length = 0;
+           const int code = key->X509Export(out, length);
+           Vesk2Free(out);
+           return Outcome{code};
+         };
+       }},
+      {"Cert::Clone",
+       [] {
+         return [cert = KeptAs<CertObject>(W().cert)] {
+           Ref<CertObject> clone(new CertObject(nullptr));
+           return Outcome{clone->Clone(cert.get())};
+         };
+       }},
+      // The key is on a stored list: short of memory the answer may not be that it is not.
+      {"Cert::IsRevoked",
+       [] {
+         const CertText text{
+             .issuer = W().vendor, .subject = W().revokedKey, .tag = Tag("install")};
+         return [cert = KeptAs<CertObject>(vesk2test::Cert(text))] {
+           bool revoked = false;
+           const int code = cert->IsRevoked(revoked);
+           return Outcome{code, code != 0 || revoked};
+         };
+       },
+       true},
+  };
+}
+
+std::vector<Case> TrustCases() {
+  const std::string text = List({Str("acl"), List({Str("entry"), List({Str("subject"), W().vendor}),
+                                                   List({Str("propagate")}), W().revokeTag})});
+  const auto loaded = [](unsigned count) {
+    return [count](SExpression* list) { return list->Count() == count; };
+  };
+  return {
+      // Directories are sorted in place when they must be.
+      Plain(
+          "AclEntry::Import of the store",
+          Makes<SExpression>(
+              [](SExpression*& out) { return AclEntry::Import(out, nullptr, nullptr); }, loaded(3)),
+          true),
+      // A file that could not be read is passed over.
+      {"AclEntry::Find",
+       [] {
+         return [key = KeptAs<PublicKey>(W().vendor), tag = Kept(Tag("install (app calc)"))] {
+           unsigned k = 0;
+           return Outcome{AclEntry::Find(key.get(), tag.get(), nullptr, nullptr, k)};
+         };
+       },
+       true},
+      {"AclEntry::FindRevocationEntry",
+       [] {
+         return [tag = Kept(Tag("install (revoke all)"))] {
+           return Outcome{AclEntry::FindRevocationEntry(tag.get())};
+         };
+       },
+       true},
+      Plain(
+          "AclEntry::InstallAcls",
+          [] { return Outcome{AclEntry::InstallAcls(W().File("new"), nullptr)}; }, true),
+      Plain("ParseTagCanonical", Makes<SExpression>([text](SExpression*& out) {
+              std::string copy = text;
+              return AclEntry::ParseTagCanonical(out, Bytes(copy), Size(copy), nullptr);
+            })),
+      Plain("CrlSequence::ImportStore", Makes<SExpression>(
+                                            [](SExpression*& out) {
+                                              return CrlSequence::ImportStore(out, W().acls.get(),
+                                                                              nullptr);
+                                            },
+                                            loaded(1))),
+      Plain("CrlSequence::ImportDir", Makes<SExpression>(
+                                          [](SExpression*& out) {
+                                            return CrlSequence::ImportDir(out, W().File("lists"),
+                                                                          StorageGlobal, nullptr);
+                                          },
+                                          loaded(1))),
+      {"CrlSequence::VerifySelf",
+       [] {
+         return [list = KeptAs<CrlSequence>(W().list)] {
+           return Outcome{list->VerifySelf(W().acls.get())};
+         };
+       }},
+      {"CrlSequence::UpdateStore",
+       [] {
+         return [list = KeptAs<CrlSequence>(W().list)] {
+           return Outcome{list->UpdateStore(W().acls.get())};
+         };
+       },
+       true},
+      {"CrlSequence::CheckStatusCritical",
+       [] {
+         return [object = Kept("(1:x)")] {
+           const int code = CrlSequence::CheckStatusCritical(W().acls.get(), W().store.get(),
+                                                             nullptr, object.get());
+           return Outcome{code == VESK2_ERR_KEY_REVOKED ? 0 : VESK2_ERR_MEM_ALLOC, code != 0};
+         };
+       }},
+      Plain("CertSequence::Import", Makes<CertSequence>([](CertSequence*& out) {
+              return CertSequence::Import(out, W().File("chain"), true, nullptr);
+            })),
+      Plain("CertRequest::Import",
+            [] {
+              Ref<CertObject> cert;
+              Ref<Signature> signature;
+              Ref<SExpression> extra;
+              const int code = CertRequest::Import(cert.Out(), signature.Out(), extra.Out(),
+                                                   W().File("chain"), nullptr);
+              const bool made = bool(cert) && bool(signature) && bool(extra);
+              return Outcome{code, code == 0 ? made : !cert && !signature && !extra};
+            }),
+      {"IsSubset",
+       [] {
+         return [narrow = Kept(Tag("install (app calc)")), wide = Kept(Tag("install"))] {
+           return Outcome{narrow->IsSubset(wide.get()) ? 0 : 1};
+         };
+       }},
+      // Tags that could not be hashed are compared by the engine.
+      {"ReductA",
+       [] {
+         return [chain = Kept(List({Str("sequence"), W().cert})), third = Kept(W().signer),
+                 tag = Kept(Tag("install (app calc)"))] {
+           return Outcome{Verify::ReductA(nullptr, W().acls.get(), chain.get(), third.get(),
+                                          tag.get(), nullptr)};
+         };
+       },
+       true},
+      // The tag is looked up by FindSubExpression.
+      {"ReductB",
+       [] {
+         return [chain = Kept(List({Str("sequence"), W().cert})), third = Kept(W().signer)] {
+           Ref<SExpression> out[3];
+           return Outcome{Verify::ReductB(nullptr, W().acls.get(), chain.get(), third.get(),
+                                          out[0].Out(), out[1].Out(), out[2].Out())};
+         };
+       },
+       true},
+  };
+}
+
+std::vector<Case> FlatCases() {
+  const auto make = [] {
+    Manifest* manifest = nullptr;
+    const std::string tree = W().dir.File("tree");
+    EXPECT_EQ(CreateManifestContext(&manifest, tree.c_str(), W().File("tree.manifest"),
+                                    "install (app calc)"),
+              0);
+    return std::shared_ptr<Manifest>(manifest, DeleteManifestContext);
+  };
+  return {
+      Plain("Vesk2Init",
+            [] {
+              Vesk2ContextStruct* context = nullptr;
+              const int code = Vesk2Init(&context, 1);
+              const bool fits = (context != nullptr) == (code == 0);
+              Vesk2FreeContext(context);
+              return Outcome{code, fits};
+            }),
+      Plain("Vesk2AsciiToWide", MakesText([] { return Vesk2AsciiToWide("abc", 3, nullptr); })),
+      Plain("CreateManifestContextA",
+            [] {
+              Manifest* manifest = nullptr;
+              const int code = CreateManifestContextA(&manifest, "dir", "file", "(install)");
+              const bool fits = (manifest != nullptr) == (code == 0);
+              DeleteManifestContext(manifest);
+              return Outcome{code, fits};
+            }),
+      // A list that could not be stored does not make the tree any worse.
+      {"VerifyManifest",
+       [make] {
+         return [manifest = make()] {
+           const int code = VerifyManifest(manifest.get(), 0, 0);
+           return Outcome{code, code != 0 || GetValidEntries(manifest.get()) != nullptr};
+         };
+       },
+       true},
+      {"CompareManifestA",
+       [make] {
+         return [manifest = make()] {
+           return Outcome{CompareManifestA(manifest.get(), W().File("tree.manifest"))};
+         };
+       }},
+  };
+}
+
+void Sweep(const std::vector<Case>& cases) {
+  constexpr long kMost = 200'000;
+  for (const Case& row : cases) {
+    SCOPED_TRACE(row.name);
+    EXPECT_EQ(row.prepare()().code, 0) << "with all the memory it wants";
+    bool fired = true;
+    for (long n = 0; fired && n < kMost; ++n) {
+      const Operation operation = row.prepare();
+      Arm(n);
+      const Outcome outcome = operation();
+      fired = Disarm();
+      EXPECT_TRUE(outcome.outputsFit) << "allocation " << n << ", code " << outcome.code;
+      const bool mayPass = !fired || row.manages;
+      EXPECT_TRUE(mayPass || outcome.code != 0) << "allocation " << n << " was missed by nobody";
+    }
+    EXPECT_FALSE(fired) << "no end of allocations";
+  }
+}
+
+TEST(AllocationSweep, Expressions) { Sweep(ExpressionCases()); }
+TEST(AllocationSweep, Objects) { Sweep(ObjectCases()); }
+TEST(AllocationSweep, TrustAndReduction) { Sweep(TrustCases()); }
+TEST(AllocationSweep, FlatFunctions) { Sweep(FlatCases()); }
+
+}  // namespace

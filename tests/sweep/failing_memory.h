@@ -1,0 +1,15 @@
+// Allocation that fails on demand, by replacing the program's operator new. The library asks with
+// std::nothrow, and only such requests fail; test code, whose requests throw, runs as ever.
+#ifndef VESK2_TESTS_SWEEP_FAILING_MEMORY_H
+#define VESK2_TESTS_SWEEP_FAILING_MEMORY_H
+
+namespace vesk2test {
+
+// From Arm(n) on, the n-th allocation (from 0) fails, once. Disarm ends that and tells whether it
+// came to it.
+void Arm(long n);
+bool Disarm();
+
+}  // namespace vesk2test
+
+#endif  // VESK2_TESTS_SWEEP_FAILING_MEMORY_H
