@@ -6,7 +6,8 @@
  *
  * Conventions
  *   - Functions return an int: 0 is success, a positive value is a VESK2_ERR_* code, a negative one
- *     an SPKI_ERR_* code of the reduction engine (Vesk2CertVerify, VerifyManifest and their kin only).
+ *     an SPKI_ERR_* code of the reduction engine (Vesk2CertVerify, VerifyManifest and their kin
+ * only).
  *   - Times are seconds since 1970-01-01 00:00:00 UTC; 0 means "not given". Lengths are bytes.
  *   - Text is 0-terminated bytes. A function whose name ends in A takes 8-bit ASCII text where its
  *     base function takes the platform's file-name string; on Linux both are bytes.
@@ -35,126 +36,126 @@
 /* One row a code: number, constant, the text that Vesk2ErrorMessage returns. 0 and 1 have no
  * constant of their own in the list of failures. Code 67's text is a sentence, and 41 and 42 are
  * spelled ERROR: callers and their logs rely on both. */
-#define VESK2_ERROR_TABLE(X)                                                    \
-  X(0, VESK2_SUCCESS, "Success")                                                \
-  X(1, VESK2_GENERAL_FAILURE, "Failure")                                        \
-  X(2, VESK2_ERR_INVALID_PARAM, "VESK2_ERR_INVALID_PARAM")                      \
-  X(3, VESK2_ERR_MEM_ALLOC, "VESK2_ERR_MEM_ALLOC")                              \
-  X(4, VESK2_ERR_STAT_FILE, "VESK2_ERR_STAT_FILE")                              \
-  X(5, VESK2_ERR_FILE_NOT_FOUND, "VESK2_ERR_FILE_NOT_FOUND")                    \
-  X(6, VESK2_ERR_INVALID_DATA, "VESK2_ERR_INVALID_DATA")                        \
-  X(7, VESK2_ERR_FILE_OPEN, "VESK2_ERR_FILE_OPEN")                              \
-  X(8, VESK2_ERR_RESERVED8, "VESK2_ERR_RESERVED8")                              \
-  X(9, VESK2_ERR_PARSE_FILE, "VESK2_ERR_PARSE_FILE")                            \
-  X(10, VESK2_ERR_READ_FILE, "VESK2_ERR_READ_FILE")                             \
-  X(11, VESK2_ERR_PRINCIPAL, "VESK2_ERR_PRINCIPAL")                             \
-  X(12, VESK2_ERR_INVALID_HASH, "VESK2_ERR_INVALID_HASH")                       \
-  X(13, VESK2_ERR_UNKNOWN_HASH_ID, "VESK2_ERR_UNKNOWN_HASH_ID")                 \
-  X(14, VESK2_ERR_MAX_BYTE_STRING, "VESK2_ERR_MAX_BYTE_STRING")                 \
-  X(15, VESK2_ERR_SIGNATURE_ID, "VESK2_ERR_SIGNATURE_ID")                       \
-  X(16, VESK2_ERR_HASH_ID, "VESK2_ERR_HASH_ID")                                 \
-  X(17, VESK2_ERR_BIG_INT_BUFFER_SIZE, "VESK2_ERR_BIG_INT_BUFFER_SIZE")         \
-  X(18, VESK2_ERR_NOT_IMPLEMENTED, "VESK2_ERR_NOT_IMPLEMENTED")                 \
-  X(19, VESK2_ERR_OPEN_MANIFEST_FILE, "VESK2_ERR_OPEN_MANIFEST_FILE")           \
-  X(20, VESK2_ERR_COMMAND_LINE_OPTION, "VESK2_ERR_COMMAND_LINE_OPTION")         \
-  X(21, VESK2_ERR_SIGNATURE, "VESK2_ERR_SIGNATURE")                             \
-  X(22, VESK2_ERR_HASH_MISMATCH, "VESK2_ERR_HASH_MISMATCH")                     \
-  X(23, VESK2_ERR_PRIVATE_KEY_TYPE, "VESK2_ERR_PRIVATE_KEY_TYPE")               \
-  X(24, VESK2_ERR_NOT_SUPPORTED, "VESK2_ERR_NOT_SUPPORTED")                     \
-  X(25, VESK2_ERR_CREATE_DIR, "VESK2_ERR_CREATE_DIR")                           \
-  X(26, VESK2_ERR_FIND_DIR, "VESK2_ERR_FIND_DIR")                               \
-  X(27, VESK2_ERR_SUB_COMMAND, "VESK2_ERR_SUB_COMMAND")                         \
-  X(28, VESK2_ERR_UNEXPECTED_CHAR, "VESK2_ERR_UNEXPECTED_CHAR")                 \
-  X(29, VESK2_ERR_INVALID_S_EXPRESSION, "VESK2_ERR_INVALID_S_EXPRESSION")       \
-  X(30, VESK2_ERR_BUFFER_OVERFLOW, "VESK2_ERR_BUFFER_OVERFLOW")                 \
-  X(31, VESK2_ERR_NOT_AUTHORIZED, "VESK2_ERR_NOT_AUTHORIZED")                   \
-  X(32, VESK2_ERR_HASH_MATCH, "VESK2_ERR_HASH_MATCH")                           \
-  X(33, VESK2_ERR_RANDOM_TOKEN, "VESK2_ERR_RANDOM_TOKEN")                       \
-  X(34, VESK2_ERR_TIME_STAMP, "VESK2_ERR_TIME_STAMP")                           \
-  X(35, VESK2_ERR_AUTH_TAG_MISSING, "VESK2_ERR_AUTH_TAG_MISSING")               \
-  X(36, VESK2_ERR_SIGNING_CERT_ORDER, "VESK2_ERR_SIGNING_CERT_ORDER")           \
-  X(37, VESK2_ERR_CONTAINING_DIR, "VESK2_ERR_CONTAINING_DIR")                   \
-  X(38, VESK2_ERR_PARAM_NULL, "VESK2_ERR_PARAM_NULL")                           \
-  X(39, VESK2_ERR_PARAM_NOT_NULL, "VESK2_ERR_PARAM_NOT_NULL")                   \
-  X(40, VESK2_ERR_ALL_USERS_DIR, "VESK2_ERR_ALL_USERS_DIR")                     \
-  X(41, VESK2_ERROR_SUBJECT_FOUND, "VESK2_ERROR_SUBJECT_FOUND")                 \
-  X(42, VESK2_ERROR_FINDING_ISSUER, "VESK2_ERROR_FINDING_ISSUER")               \
-  X(43, VESK2_ERR_LOG_FILE_OPEN, "VESK2_ERR_LOG_FILE_OPEN")                     \
-  X(44, VESK2_ERR_ZERO_AUTH_MATCH, "VESK2_ERR_ZERO_AUTH_MATCH")                 \
-  X(45, VESK2_ERR_MULTI_AUTH_MATCH, "VESK2_ERR_MULTI_AUTH_MATCH")               \
-  X(46, VESK2_ERR_ISSUER_SIGNER_MATCH, "VESK2_ERR_ISSUER_SIGNER_MATCH")         \
-  X(47, VESK2_ERR_ISSUER_MISMATCH, "VESK2_ERR_ISSUER_MISMATCH")                 \
-  X(48, VESK2_ERR_PROPAGATE, "VESK2_ERR_PROPAGATE")                             \
-  X(49, VESK2_ERR_NO_ISSUER_FOUND, "VESK2_ERR_NO_ISSUER_FOUND")                 \
-  X(50, VESK2_ERR_SIGNER_AUTH_NARROWER, "VESK2_ERR_SIGNER_AUTH_NARROWER")       \
-  X(51, VESK2_ERR_NOT_BEFORE, "VESK2_ERR_NOT_BEFORE")                           \
-  X(52, VESK2_ERR_NOT_AFTER, "VESK2_ERR_NOT_AFTER")                             \
-  X(53, VESK2_ERR_NEEDS_MORE_SIGNING, "VESK2_ERR_NEEDS_MORE_SIGNING")           \
-  X(54, VESK2_ERR_ACL_ENTRY_NOT_FOUND, "VESK2_ERR_ACL_ENTRY_NOT_FOUND")         \
-  X(55, VESK2_ERR_AUTH_NOT_SUBSET, "VESK2_ERR_AUTH_NOT_SUBSET")                 \
-  X(56, VESK2_ERR_MANIFEST_VERSION, "VESK2_ERR_MANIFEST_VERSION")               \
-  X(57, VESK2_ERR_MANIFEST_TYPE, "VESK2_ERR_MANIFEST_TYPE")                     \
-  X(58, VESK2_ERR_NOT_BEFORE_AFTER, "VESK2_ERR_NOT_BEFORE_AFTER")               \
-  X(59, VESK2_ERR_NO_REVOCATION_ACL, "VESK2_ERR_NO_REVOCATION_ACL")             \
-  X(60, VESK2_ERR_USER_INTERRUPT, "VESK2_ERR_USER_INTERRUPT")                   \
-  X(61, VESK2_ERR_NO_REVOCATION_SPEC, "VESK2_ERR_NO_REVOCATION_SPEC")           \
-  X(62, VESK2_ERR_ACL_KEY_NOT_FOUND, "VESK2_ERR_ACL_KEY_NOT_FOUND")             \
-  X(63, VESK2_ERR_AUTH_TAGS_ARE_EQUAL, "VESK2_ERR_AUTH_TAGS_ARE_EQUAL")         \
-  X(64, VESK2_ERR_INVALID_SEQUENCE, "VESK2_ERR_INVALID_SEQUENCE")               \
-  X(65, VESK2_ERR_ALREADY_ISSUED_BY_KEY, "VESK2_ERR_ALREADY_ISSUED_BY_KEY")     \
-  X(66, VESK2_ERR_CERT_REVOKED, "VESK2_ERR_CERT_REVOKED")                       \
-  X(67, VESK2_ERR_PACKAGE_NOT_GRANTED,                                          \
-    "The specified package is not granted the specified authorization")         \
-  X(68, VESK2_ERR_KEY_REVOKED, "VESK2_ERR_KEY_REVOKED")                         \
-  X(69, VESK2_ERR_NOT_IN_LIST, "VESK2_ERR_NOT_IN_LIST")                         \
-  X(70, VESK2_ERR_INVALID_REVOCATION_TAG, "VESK2_ERR_INVALID_REVOCATION_TAG")   \
-  X(71, VESK2_ERR_NOT_OBJECT_CERT, "VESK2_ERR_NOT_OBJECT_CERT")                 \
-  X(72, VESK2_ERR_INVALID_PASSPHRASE, "VESK2_ERR_INVALID_PASSPHRASE")           \
-  X(73, VESK2_ERR_CRL_NOT_FOUND, "VESK2_ERR_CRL_NOT_FOUND")                     \
-  X(74, VESK2_ERR_EXTRA_FILES, "VESK2_ERR_EXTRA_FILES")                         \
-  X(75, VESK2_ERR_FAILURE, "VESK2_ERR_FAILURE")                                 \
-  X(76, VESK2_ERR_WRITE_FILE, "VESK2_ERR_WRITE_FILE")                           \
+#define VESK2_ERROR_TABLE(X)                                                  \
+  X(0, VESK2_SUCCESS, "Success")                                              \
+  X(1, VESK2_GENERAL_FAILURE, "Failure")                                      \
+  X(2, VESK2_ERR_INVALID_PARAM, "VESK2_ERR_INVALID_PARAM")                    \
+  X(3, VESK2_ERR_MEM_ALLOC, "VESK2_ERR_MEM_ALLOC")                            \
+  X(4, VESK2_ERR_STAT_FILE, "VESK2_ERR_STAT_FILE")                            \
+  X(5, VESK2_ERR_FILE_NOT_FOUND, "VESK2_ERR_FILE_NOT_FOUND")                  \
+  X(6, VESK2_ERR_INVALID_DATA, "VESK2_ERR_INVALID_DATA")                      \
+  X(7, VESK2_ERR_FILE_OPEN, "VESK2_ERR_FILE_OPEN")                            \
+  X(8, VESK2_ERR_RESERVED8, "VESK2_ERR_RESERVED8")                            \
+  X(9, VESK2_ERR_PARSE_FILE, "VESK2_ERR_PARSE_FILE")                          \
+  X(10, VESK2_ERR_READ_FILE, "VESK2_ERR_READ_FILE")                           \
+  X(11, VESK2_ERR_PRINCIPAL, "VESK2_ERR_PRINCIPAL")                           \
+  X(12, VESK2_ERR_INVALID_HASH, "VESK2_ERR_INVALID_HASH")                     \
+  X(13, VESK2_ERR_UNKNOWN_HASH_ID, "VESK2_ERR_UNKNOWN_HASH_ID")               \
+  X(14, VESK2_ERR_MAX_BYTE_STRING, "VESK2_ERR_MAX_BYTE_STRING")               \
+  X(15, VESK2_ERR_SIGNATURE_ID, "VESK2_ERR_SIGNATURE_ID")                     \
+  X(16, VESK2_ERR_HASH_ID, "VESK2_ERR_HASH_ID")                               \
+  X(17, VESK2_ERR_BIG_INT_BUFFER_SIZE, "VESK2_ERR_BIG_INT_BUFFER_SIZE")       \
+  X(18, VESK2_ERR_NOT_IMPLEMENTED, "VESK2_ERR_NOT_IMPLEMENTED")               \
+  X(19, VESK2_ERR_OPEN_MANIFEST_FILE, "VESK2_ERR_OPEN_MANIFEST_FILE")         \
+  X(20, VESK2_ERR_COMMAND_LINE_OPTION, "VESK2_ERR_COMMAND_LINE_OPTION")       \
+  X(21, VESK2_ERR_SIGNATURE, "VESK2_ERR_SIGNATURE")                           \
+  X(22, VESK2_ERR_HASH_MISMATCH, "VESK2_ERR_HASH_MISMATCH")                   \
+  X(23, VESK2_ERR_PRIVATE_KEY_TYPE, "VESK2_ERR_PRIVATE_KEY_TYPE")             \
+  X(24, VESK2_ERR_NOT_SUPPORTED, "VESK2_ERR_NOT_SUPPORTED")                   \
+  X(25, VESK2_ERR_CREATE_DIR, "VESK2_ERR_CREATE_DIR")                         \
+  X(26, VESK2_ERR_FIND_DIR, "VESK2_ERR_FIND_DIR")                             \
+  X(27, VESK2_ERR_SUB_COMMAND, "VESK2_ERR_SUB_COMMAND")                       \
+  X(28, VESK2_ERR_UNEXPECTED_CHAR, "VESK2_ERR_UNEXPECTED_CHAR")               \
+  X(29, VESK2_ERR_INVALID_S_EXPRESSION, "VESK2_ERR_INVALID_S_EXPRESSION")     \
+  X(30, VESK2_ERR_BUFFER_OVERFLOW, "VESK2_ERR_BUFFER_OVERFLOW")               \
+  X(31, VESK2_ERR_NOT_AUTHORIZED, "VESK2_ERR_NOT_AUTHORIZED")                 \
+  X(32, VESK2_ERR_HASH_MATCH, "VESK2_ERR_HASH_MATCH")                         \
+  X(33, VESK2_ERR_RANDOM_TOKEN, "VESK2_ERR_RANDOM_TOKEN")                     \
+  X(34, VESK2_ERR_TIME_STAMP, "VESK2_ERR_TIME_STAMP")                         \
+  X(35, VESK2_ERR_AUTH_TAG_MISSING, "VESK2_ERR_AUTH_TAG_MISSING")             \
+  X(36, VESK2_ERR_SIGNING_CERT_ORDER, "VESK2_ERR_SIGNING_CERT_ORDER")         \
+  X(37, VESK2_ERR_CONTAINING_DIR, "VESK2_ERR_CONTAINING_DIR")                 \
+  X(38, VESK2_ERR_PARAM_NULL, "VESK2_ERR_PARAM_NULL")                         \
+  X(39, VESK2_ERR_PARAM_NOT_NULL, "VESK2_ERR_PARAM_NOT_NULL")                 \
+  X(40, VESK2_ERR_ALL_USERS_DIR, "VESK2_ERR_ALL_USERS_DIR")                   \
+  X(41, VESK2_ERROR_SUBJECT_FOUND, "VESK2_ERROR_SUBJECT_FOUND")               \
+  X(42, VESK2_ERROR_FINDING_ISSUER, "VESK2_ERROR_FINDING_ISSUER")             \
+  X(43, VESK2_ERR_LOG_FILE_OPEN, "VESK2_ERR_LOG_FILE_OPEN")                   \
+  X(44, VESK2_ERR_ZERO_AUTH_MATCH, "VESK2_ERR_ZERO_AUTH_MATCH")               \
+  X(45, VESK2_ERR_MULTI_AUTH_MATCH, "VESK2_ERR_MULTI_AUTH_MATCH")             \
+  X(46, VESK2_ERR_ISSUER_SIGNER_MATCH, "VESK2_ERR_ISSUER_SIGNER_MATCH")       \
+  X(47, VESK2_ERR_ISSUER_MISMATCH, "VESK2_ERR_ISSUER_MISMATCH")               \
+  X(48, VESK2_ERR_PROPAGATE, "VESK2_ERR_PROPAGATE")                           \
+  X(49, VESK2_ERR_NO_ISSUER_FOUND, "VESK2_ERR_NO_ISSUER_FOUND")               \
+  X(50, VESK2_ERR_SIGNER_AUTH_NARROWER, "VESK2_ERR_SIGNER_AUTH_NARROWER")     \
+  X(51, VESK2_ERR_NOT_BEFORE, "VESK2_ERR_NOT_BEFORE")                         \
+  X(52, VESK2_ERR_NOT_AFTER, "VESK2_ERR_NOT_AFTER")                           \
+  X(53, VESK2_ERR_NEEDS_MORE_SIGNING, "VESK2_ERR_NEEDS_MORE_SIGNING")         \
+  X(54, VESK2_ERR_ACL_ENTRY_NOT_FOUND, "VESK2_ERR_ACL_ENTRY_NOT_FOUND")       \
+  X(55, VESK2_ERR_AUTH_NOT_SUBSET, "VESK2_ERR_AUTH_NOT_SUBSET")               \
+  X(56, VESK2_ERR_MANIFEST_VERSION, "VESK2_ERR_MANIFEST_VERSION")             \
+  X(57, VESK2_ERR_MANIFEST_TYPE, "VESK2_ERR_MANIFEST_TYPE")                   \
+  X(58, VESK2_ERR_NOT_BEFORE_AFTER, "VESK2_ERR_NOT_BEFORE_AFTER")             \
+  X(59, VESK2_ERR_NO_REVOCATION_ACL, "VESK2_ERR_NO_REVOCATION_ACL")           \
+  X(60, VESK2_ERR_USER_INTERRUPT, "VESK2_ERR_USER_INTERRUPT")                 \
+  X(61, VESK2_ERR_NO_REVOCATION_SPEC, "VESK2_ERR_NO_REVOCATION_SPEC")         \
+  X(62, VESK2_ERR_ACL_KEY_NOT_FOUND, "VESK2_ERR_ACL_KEY_NOT_FOUND")           \
+  X(63, VESK2_ERR_AUTH_TAGS_ARE_EQUAL, "VESK2_ERR_AUTH_TAGS_ARE_EQUAL")       \
+  X(64, VESK2_ERR_INVALID_SEQUENCE, "VESK2_ERR_INVALID_SEQUENCE")             \
+  X(65, VESK2_ERR_ALREADY_ISSUED_BY_KEY, "VESK2_ERR_ALREADY_ISSUED_BY_KEY")   \
+  X(66, VESK2_ERR_CERT_REVOKED, "VESK2_ERR_CERT_REVOKED")                     \
+  X(67, VESK2_ERR_PACKAGE_NOT_GRANTED,                                        \
+    "The specified package is not granted the specified authorization")       \
+  X(68, VESK2_ERR_KEY_REVOKED, "VESK2_ERR_KEY_REVOKED")                       \
+  X(69, VESK2_ERR_NOT_IN_LIST, "VESK2_ERR_NOT_IN_LIST")                       \
+  X(70, VESK2_ERR_INVALID_REVOCATION_TAG, "VESK2_ERR_INVALID_REVOCATION_TAG") \
+  X(71, VESK2_ERR_NOT_OBJECT_CERT, "VESK2_ERR_NOT_OBJECT_CERT")               \
+  X(72, VESK2_ERR_INVALID_PASSPHRASE, "VESK2_ERR_INVALID_PASSPHRASE")         \
+  X(73, VESK2_ERR_CRL_NOT_FOUND, "VESK2_ERR_CRL_NOT_FOUND")                   \
+  X(74, VESK2_ERR_EXTRA_FILES, "VESK2_ERR_EXTRA_FILES")                       \
+  X(75, VESK2_ERR_FAILURE, "VESK2_ERR_FAILURE")                               \
+  X(76, VESK2_ERR_WRITE_FILE, "VESK2_ERR_WRITE_FILE")                         \
   X(77, VESK2_MAX_ERROR, "VESK2_MAX_ERROR")
 
 /* One row a code of the reduction engine, in the order in which ZvVesk2::V2SpkiError searches. */
-#define VESK2_SPKI_ERROR_TABLE(X)                                                             \
-  X(-126, SPKI_ERR_NULL_PARAM, "SPKI_ERR_NULL_PARAM")                                         \
-  X(-129, SPKI_ERR_NO_MEM, "SPKI_ERR_NO_MEM")                                                 \
-  X(-130, SPKI_ERR_BAD_SEXP, "SPKI_ERR_BAD_SEXP")                                             \
-  X(-132, SPKI_ERR_LTH_TOO_BIG, "SPKI_ERR_LTH_TOO_BIG")                                       \
-  X(-135, SPKI_ERR_BAD_LTH_FORMAT, "SPKI_ERR_BAD_LTH_FORMAT")                                 \
-  X(-136, SPKI_ERR_COLON_EXPECTED, "SPKI_ERR_COLON_EXPECTED")                                 \
-  X(-137, SPKI_ERR_DISP_HINT_NOT_CLOSED, "SPKI_ERR_DISP_HINT_NOT_CLOSED")                     \
-  X(-138, SPKI_ERR_DISP_HINT_TOO_LONG, "SPKI_ERR_DISP_HINT_TOO_LONG")                         \
-  X(-139, SPKI_ERR_STRING_TOO_LONG, "SPKI_ERR_STRING_TOO_LONG")                               \
-  X(-140, SPKI_ERR_BAD_SEXP_START, "SPKI_ERR_BAD_SEXP_START")                                 \
-  X(-142, SPKI_ERR_BAD_SEXP_FORMAT, "SPKI_ERR_BAD_SEXP_FORMAT")                               \
-  X(-143, SPKI_ERR_SEXP_NOT_CLOSED, "SPKI_ERR_SEXP_NOT_CLOSED")                               \
-  X(-145, SPKI_ERR_NOT_HASH_SEXP, "S-exp isn't a (hash...)")                                  \
-  X(-146, SPKI_ERR_UNKNOWN_HASH_ALG, "Unknown hash algorithm")                                \
-  X(-147, SPKI_ERR_BAD_HASH_FORMAT, "Bad format for (hash...)")                               \
-  X(-149, SPKI_ERR_HASH_LTH_DIFFER, "Hash value lengths differ")                              \
-  X(-150, SPKI_ERR_NO_ACL,                                                                    \
-    "No ACL was provided for reduction without an ACL, there can be no results")              \
-  X(-151, SPKI_ERR_ACL_HAS_ISSUER, "An ACL entry should have no issuer field")                \
-  X(-152, SPKI_ERR_NEED_ISSUER, "A non-ACL needs an issuer")                                  \
+#define VESK2_SPKI_ERROR_TABLE(X)                                                              \
+  X(-126, SPKI_ERR_NULL_PARAM, "SPKI_ERR_NULL_PARAM")                                          \
+  X(-129, SPKI_ERR_NO_MEM, "SPKI_ERR_NO_MEM")                                                  \
+  X(-130, SPKI_ERR_BAD_SEXP, "SPKI_ERR_BAD_SEXP")                                              \
+  X(-132, SPKI_ERR_LTH_TOO_BIG, "SPKI_ERR_LTH_TOO_BIG")                                        \
+  X(-135, SPKI_ERR_BAD_LTH_FORMAT, "SPKI_ERR_BAD_LTH_FORMAT")                                  \
+  X(-136, SPKI_ERR_COLON_EXPECTED, "SPKI_ERR_COLON_EXPECTED")                                  \
+  X(-137, SPKI_ERR_DISP_HINT_NOT_CLOSED, "SPKI_ERR_DISP_HINT_NOT_CLOSED")                      \
+  X(-138, SPKI_ERR_DISP_HINT_TOO_LONG, "SPKI_ERR_DISP_HINT_TOO_LONG")                          \
+  X(-139, SPKI_ERR_STRING_TOO_LONG, "SPKI_ERR_STRING_TOO_LONG")                                \
+  X(-140, SPKI_ERR_BAD_SEXP_START, "SPKI_ERR_BAD_SEXP_START")                                  \
+  X(-142, SPKI_ERR_BAD_SEXP_FORMAT, "SPKI_ERR_BAD_SEXP_FORMAT")                                \
+  X(-143, SPKI_ERR_SEXP_NOT_CLOSED, "SPKI_ERR_SEXP_NOT_CLOSED")                                \
+  X(-145, SPKI_ERR_NOT_HASH_SEXP, "S-exp isn't a (hash...)")                                   \
+  X(-146, SPKI_ERR_UNKNOWN_HASH_ALG, "Unknown hash algorithm")                                 \
+  X(-147, SPKI_ERR_BAD_HASH_FORMAT, "Bad format for (hash...)")                                \
+  X(-149, SPKI_ERR_HASH_LTH_DIFFER, "Hash value lengths differ")                               \
+  X(-150, SPKI_ERR_NO_ACL,                                                                     \
+    "No ACL was provided for reduction without an ACL, there can be no results")               \
+  X(-151, SPKI_ERR_ACL_HAS_ISSUER, "An ACL entry should have no issuer field")                 \
+  X(-152, SPKI_ERR_NEED_ISSUER, "A non-ACL needs an issuer")                                   \
   X(-153, SPKI_ERR_ISSUER_NAME_AND_AUTH, "Credential with both issuer name and authorization") \
-  X(-155, SPKI_ERR_ISSUER_SYNTAX, "Syntax error in (issuer ..)")                              \
-  X(-156, SPKI_ERR_SUBJECT_SYNTAX, "Syntax error in (subject ..)")                            \
-  X(-157, SPKI_ERR_KOFN_SYNTAX, "Bad k-of-n syntax")                                          \
-  X(-158, SPKI_ERR_ISSUER_UNRESOLVED,                                                         \
-    "Issuer could not be resolved to a public key -- so could not have been validated.  "     \
-    "Rejected during processing.")                                                            \
-  X(-159, SPKI_ERR_TOO_MANY_NOT_BEFORE, "Too many not-before dates")                          \
-  X(-160, SPKI_ERR_TOO_MANY_NOT_AFTER, "Too many not-after dates")                            \
-  X(-161, SPKI_ERR_TOO_MANY_ISSUERS, "Too many issuers")                                      \
-  X(-162, SPKI_ERR_TOO_MANY_SUBJECTS, "Too many subjects")                                    \
-  X(-163, SPKI_ERR_TOO_MANY_PROPAGATE, "Too many propagate fields")                           \
-  X(-164, SPKI_ERR_TOO_MANY_TAGS, "Too many tag fields")                                      \
-  X(-165, SPKI_ERR_KEY_OR_HASH_EXPECTED, "Public key or hash expected")                       \
-  X(-166, SPKI_ERR_THRESHOLD, "Error processing a threshold block")                           \
-  X(-167, SPKI_ERR_BAD_NAME_SYNTAX, "Bad name syntax -- not a list of byte strings")          \
-  X(-168, SPKI_ERR_DATE_INTERSECTION, "Date intersection failed")                             \
+  X(-155, SPKI_ERR_ISSUER_SYNTAX, "Syntax error in (issuer ..)")                               \
+  X(-156, SPKI_ERR_SUBJECT_SYNTAX, "Syntax error in (subject ..)")                             \
+  X(-157, SPKI_ERR_KOFN_SYNTAX, "Bad k-of-n syntax")                                           \
+  X(-158, SPKI_ERR_ISSUER_UNRESOLVED,                                                          \
+    "Issuer could not be resolved to a public key -- so could not have been validated.  "      \
+    "Rejected during processing.")                                                             \
+  X(-159, SPKI_ERR_TOO_MANY_NOT_BEFORE, "Too many not-before dates")                           \
+  X(-160, SPKI_ERR_TOO_MANY_NOT_AFTER, "Too many not-after dates")                             \
+  X(-161, SPKI_ERR_TOO_MANY_ISSUERS, "Too many issuers")                                       \
+  X(-162, SPKI_ERR_TOO_MANY_SUBJECTS, "Too many subjects")                                     \
+  X(-163, SPKI_ERR_TOO_MANY_PROPAGATE, "Too many propagate fields")                            \
+  X(-164, SPKI_ERR_TOO_MANY_TAGS, "Too many tag fields")                                       \
+  X(-165, SPKI_ERR_KEY_OR_HASH_EXPECTED, "Public key or hash expected")                        \
+  X(-166, SPKI_ERR_THRESHOLD, "Error processing a threshold block")                            \
+  X(-167, SPKI_ERR_BAD_NAME_SYNTAX, "Bad name syntax -- not a list of byte strings")           \
+  X(-168, SPKI_ERR_DATE_INTERSECTION, "Date intersection failed")                              \
   X(-200, SPKI_ERR_UNKNOWN, "Unknown SPKI problem")
 
 #define VESK2_ENUM_ROW(number, name, text) name = number,
@@ -175,24 +176,57 @@ typedef struct Vesk2ContextStruct {
 /* One file or directory name in a chain: results of a manifest comparison, names to ignore, names
  * found in a store. */
 typedef struct FileItem {
-  char* name;           /* the name, platform form; owned */
-  char* name2;          /* null in every record that the library makes */
-  char* nameA;          /* the name, ASCII form; owned */
-  char* name2A;         /* null in every record that the library makes */
+  char* name;   /* the name, platform form; owned */
+  char* name2;  /* null in every record that the library makes */
+  char* nameA;  /* the name, ASCII form; owned */
+  char* name2A; /* null in every record that the library makes */
   struct FileItem* next;
-  uint32_t size;        /* 28 in every record that the library makes: a format mark, not a sizeof */
-  int32_t isDirectory;  /* 1 for a directory, else 0 */
+  uint32_t size;       /* 28 in every record that the library makes: a format mark, not a sizeof */
+  int32_t isDirectory; /* 1 for a directory, else 0 */
 } FileItem;
 
-/* A manifest context, opaque to C: ZvVesk2::Manifest of vesk2/manifest.h. */
+/* Objects that C holds by pointer only: the classes of these names in vesk2.hpp. */
 #ifdef __cplusplus
 namespace ZvVesk2 {
+class CertSequence;
+class CrlSequence;
 class Manifest;
-}
+}  // namespace ZvVesk2
+using ZvVesk2::CertSequence;
+using ZvVesk2::CrlSequence;
 using ZvVesk2::Manifest;
-extern "C" {
 #else
+typedef struct CertSequence CertSequence;
+typedef struct CrlSequence CrlSequence;
 typedef struct Manifest Manifest;
+#endif
+
+/* One certificate of a sequence, in a chain in the sequence's order (the end entity first). */
+typedef struct Vesk2CertInfoStruct {
+  uint32_t size;          /* 44: a format mark, not a sizeof */
+  CertSequence* sequence; /* the same in every record; the chain holds one reference */
+  time_t notBefore;       /* 0 when the certificate has none */
+  time_t notAfter;        /* 0 when the certificate has none */
+  char* tag;              /* body of the tag as text, or null */
+  char* owner;            /* body of the (owner ...) that follows the signature, or null */
+  unsigned char* keyData; /* the subject's key, DER SubjectPublicKeyInfo; null for other subjects */
+  uint32_t keyLength;
+  char* hashText; /* the signature's hash as text; its digest is raw bytes, so use the length */
+  uint32_t hashTextLength;
+  struct Vesk2CertInfoStruct* next;
+} Vesk2CertInfoStruct;
+
+/* One revocation list with the certificate that vouches for it. */
+typedef struct Vesk2CrlInfoStruct {
+  uint32_t size;    /* 20: a format mark, not a sizeof */
+  CrlSequence* crl; /* the record holds one reference */
+  time_t notBefore; /* of the certificate; 0 when it has none */
+  time_t notAfter;  /* of the certificate; 0 when it has none */
+  char* tag;        /* body of the certificate's tag as text, or null */
+} Vesk2CrlInfoStruct;
+
+#ifdef __cplusplus
+extern "C" {
 #endif
 
 /* ---- Context and memory -------------------------------------------------------------------- */
@@ -255,8 +289,8 @@ VESK2_API unsigned int FreeFileItemList(FileItem* chain);
  * released with DeleteManifestContext.
  *   VESK2_ERR_INVALID_PARAM  *out is not null (and is left alone), or an argument is null
  *   VESK2_ERR_MEM_ALLOC, and what the parser of the tag text reports. */
-VESK2_API int CreateManifestContext(Manifest** out, const char* directory,
-                                    const char* manifestPath, const char* tagText);
+VESK2_API int CreateManifestContext(Manifest** out, const char* directory, const char* manifestPath,
+                                    const char* tagText);
 VESK2_API int CreateManifestContextA(Manifest** out, const char* directory,
                                      const char* manifestPath, const char* tagText);
 
@@ -308,6 +342,87 @@ VESK2_API FileItem* GetValidEntries(Manifest* manifest);
 VESK2_API FileItem* GetInvalidEntries(Manifest* manifest);
 VESK2_API FileItem* GetMissingEntries(Manifest* manifest);
 VESK2_API FileItem* GetExtraEntries(Manifest* manifest);
+
+/* ---- Certificates -------------------------------------------------------------------------- */
+
+/* Vesk2CertReadCtx reads a certificate sequence file (".cert" appended unless it is there) into a
+ * chain of records, to be freed with Vesk2CertFree. *out is written on success only; a sequence
+ * without certificates gives 0 and a null *out. Nothing is verified.
+ *   VESK2_ERR_PARAM_NULL, VESK2_ERR_FILE_OPEN, VESK2_ERR_MEM_ALLOC, codes of the readers. */
+VESK2_API int Vesk2CertReadCtx(Vesk2CertInfoStruct** out, const char* path,
+                               Vesk2ContextStruct* context);
+VESK2_API int Vesk2CertReadCtxA(Vesk2CertInfoStruct** out, const char* path,
+                                Vesk2ContextStruct* context);
+/* The same without a context. */
+VESK2_API int Vesk2CertRead(Vesk2CertInfoStruct** out, const char* path);
+VESK2_API int Vesk2CertReadA(Vesk2CertInfoStruct** out, const char* path);
+
+/* Vesk2CertFree frees a chain and its sequence. VESK2_ERR_PARAM_NULL for null, else 0. */
+VESK2_API int Vesk2CertFree(Vesk2CertInfoStruct* chain);
+
+/* Vesk2CertVerify proves that a chain grants the authorization `tagText` (the body of a tag, as in
+ * CreateManifestContext) to the subject of its first certificate for the period from `notBefore` to
+ * `notAfter` (0: not given), on this machine's word. May be called any number of times.
+ *   0                              granted
+ *   VESK2_ERR_PARAM_NULL           a null chain
+ *   VESK2_ERR_INVALID_SEQUENCE     not whole triples; VESK2_ERR_SIGNATURE and its kin
+ *   VESK2_ERR_CERT_REVOKED         a certificate, or its key, is on a revocation list
+ *   VESK2_ERR_CRL_NOT_FOUND        a revocation state could not be determined
+ *   VESK2_ERR_ACL_ENTRY_NOT_FOUND  there is no ACL store
+ *   VESK2_ERR_NOT_AUTHORIZED       nothing is granted; VESK2_ERR_PACKAGE_NOT_GRANTED not the tag
+ *   VESK2_ERR_TIME_STAMP           a time that has no text; the codes of the tag's parser;
+ * SPKI_ERR_* */
+VESK2_API int Vesk2CertVerify(Vesk2CertInfoStruct* chain, const char* tagText, time_t notBefore,
+                              time_t notAfter);
+/* Vesk2CertVerifyFile does the same for a sequence file. VESK2_ERR_PARAM_NULL for a null path. */
+VESK2_API int Vesk2CertVerifyFile(const char* path, const char* tagText, time_t notBefore,
+                                  time_t notAfter);
+VESK2_API int Vesk2CertVerifyFileA(const char* path, const char* tagText, time_t notBefore,
+                                   time_t notAfter);
+
+/* CertFind lists the "*.cert" files of a directory (null: the home store's) as bare names, in byte
+ * order, or null when there are none or no such directory. Free with FreeFileItemList. */
+VESK2_API FileItem* CertFind(const char* directory);
+VESK2_API FileItem* CertFindA(const char* directory);
+
+/* ---- Revocation lists ---------------------------------------------------------------------- */
+
+/* Vesk2CrlImport offers every "*.crl" file of a directory to the store, which keeps, for each
+ * revocation source that an ACL entry names, the newest list that verifies. 0 whether any was kept
+ * or not; VESK2_ERR_FILE_NOT_FOUND (no ACL store, no directory), VESK2_ERR_CRL_NOT_FOUND (no list
+ * that can be read), VESK2_ERR_MEM_ALLOC. */
+VESK2_API int Vesk2CrlImport(const char* directory, Vesk2ContextStruct* context);
+VESK2_API int Vesk2CrlImportA(const char* directory, Vesk2ContextStruct* context);
+/* The same without a context. */
+VESK2_API int Vesk2ImportCrls(const char* directory);
+VESK2_API int Vesk2ImportCrlsA(const char* directory);
+
+/* Vesk2CrlRead reads a list (".crl" appended unless it is there) into a record, to be freed with
+ * Vesk2CrlFree. Nothing is verified. VESK2_ERR_FILE_NOT_FOUND, VESK2_ERR_MEM_ALLOC, codes of the
+ * readers; *out is then null. */
+VESK2_API int Vesk2CrlRead(Vesk2CrlInfoStruct** out, const char* path, Vesk2ContextStruct* context);
+VESK2_API int Vesk2CrlReadA(Vesk2CrlInfoStruct** out, const char* path,
+                            Vesk2ContextStruct* context);
+/* Vesk2CrlFindA finds the stored list whose certificate has the tag `tagText`.
+ * VESK2_ERR_CRL_NOT_FOUND (an empty store), VESK2_ERR_ACL_ENTRY_NOT_FOUND (no such list),
+ * VESK2_ERR_FIND_DIR (no store), codes of the tag's parser; *out is then null. */
+VESK2_API int Vesk2CrlFindA(Vesk2CrlInfoStruct** out, const char* tagText,
+                            Vesk2ContextStruct* context);
+/* Vesk2CrlFree frees a record; null is allowed. Always 0. */
+VESK2_API int Vesk2CrlFree(Vesk2CrlInfoStruct* record);
+
+/* Vesk2CrlVerify proves a list against the ACL store. With a `tagText` the record's tag must be
+ * that text: VESK2_ERR_AUTH_TAG_MISSING, VESK2_ERR_NOT_AUTHORIZED. With both `from` and `to` (not
+ * 0) its period must meet theirs: VESK2_ERR_NOT_AFTER when it starts after `to`,
+ * VESK2_ERR_NOT_BEFORE when it ends before `from`. VESK2_ERR_PARAM_NULL, the codes of loading the
+ * store, and VESK2_ERR_ACL_ENTRY_NOT_FOUND, VESK2_ERR_HASH_ID, VESK2_ERR_SIGNATURE for one that
+ * does not hold. */
+VESK2_API int Vesk2CrlVerify(Vesk2CrlInfoStruct* record, const char* tagText, time_t from,
+                             time_t to);
+VESK2_API int Vesk2CrlVerifyFile(const char* path, const char* tagText, time_t from, time_t to,
+                                 Vesk2ContextStruct* context);
+VESK2_API int Vesk2CrlVerifyFileA(const char* path, const char* tagText, time_t from, time_t to,
+                                  Vesk2ContextStruct* context);
 
 #ifdef __cplusplus
 } /* extern "C" */

@@ -46,6 +46,72 @@ class VESK2_API CertSequence : public SExpression {
   [[nodiscard]] static int Import(Cert*& cert, Signature*& signature, SExpression*& extra,
                                   const char* name, bool usePath, Vesk2ContextStruct* ctx);
   using SExpression::Import;
+
+  // ---- One triple at a time ----
+
+  // GetFirstPair opens a sequence file and reads its first triple; `buffer` stays open at the next
+  // one. `buffer`, `cert` and `signature` must be null and `name` given (VESK2_ERR_INVALID_PARAM).
+  // After a failure `buffer` is freed and null; outputs that were set by then are the caller's.
+  [[nodiscard]] static int GetFirstPair(ZvBuffer*& buffer, Cert*& cert, Signature*& signature,
+                                        SExpression*& extra, const char* name, bool usePath,
+                                        Vesk2ContextStruct* ctx);
+  // GetNextPair reads the next triple over the three outputs; what they held stays the caller's. At
+  // the end it returns 0 with `cert` and `signature` null, `extra` as it was and the buffer open,
+  // for the caller to free. After a failure the buffer is freed, and `buffer`, `cert` and
+  // `signature` are null.
+  [[nodiscard]] static int GetNextPair(ZvBuffer*& buffer, Cert*& cert, Signature*& signature,
+                                       SExpression*& extra, Vesk2ContextStruct* ctx);
+
+  // ---- Finding in the home store ----
+
+  // Find returns the bare name (free with Vesk2Free) of the stored sequence whose first certificate
+  // carries exactly `tag`. VESK2_ERR_FILE_NOT_FOUND; VESK2_ERR_MULTI_AUTH_MATCH for several, with
+  // the first one's name; a file that cannot be read ends the search with its error.
+  // VESK2_ERR_INVALID_PARAM, VESK2_ERR_MEM_ALLOC (also: no home root).
+  [[nodiscard]] static int Find(char*& fileName, SExpression* tag);
+  // Find makes a list of byte strings, each a bare name and its terminating 0 byte, of all stored
+  // sequences whose first certificate's tag contains `tag`. Files that cannot be read are skipped;
+  // no match is an empty list.
+  [[nodiscard]] static int Find(SExpression*& names, SExpression* tag);
+
+  // ---- Verification ----
+  //
+  // Three stages: every signature; no certificate revoked or undetermined; the reduction of the
+  // chain, with the ACL store, to the tag. The stores are read afresh by each stage. Results are
+  // library codes or, from the reduction, negative engine codes. `tag` is required by the
+  // reduction.
+
+  // Verify runs the three stages; the first failure is the result. `subject` null means the subject
+  // of the first certificate, which must then be a key or a hash (a k-of-n subject is refused with
+  // SPKI_ERR_KEY_OR_HASH_EXPECTED). Times may be null.
+  //   VESK2_ERR_INVALID_SEQUENCE (empty, or not whole triples), Signature::Verify's,
+  //   VESK2_ERR_CERT_REVOKED, VESK2_ERR_CRL_NOT_FOUND (undetermined), VESK2_ERR_ACL_ENTRY_NOT_FOUND
+  //   (no ACL store), Verify::ReductA's.
+  [[nodiscard]] int Verify(Subject* subject, SExpression* tag, TimeStamp* notBefore,
+                           TimeStamp* notAfter);
+  // The same for a sequence file. VESK2_ERR_PARAM_NULL for a null name.
+  [[nodiscard]] static int Verify(Subject* subject, SExpression* tag, TimeStamp* notBefore,
+                                  TimeStamp* notAfter, const char* name, bool usePath,
+                                  Vesk2ContextStruct* ctx);
+  // The stages.
+  [[nodiscard]] int VerifySignatures();
+  [[nodiscard]] int VerifyRevocations(TimeStamp* notBefore, TimeStamp* notAfter);
+  [[nodiscard]] int VerifyChain(Subject* subject, SExpression* tag, TimeStamp* notBefore,
+                                TimeStamp* notAfter);
+
+  // Verify2 drops the certificates that fail and returns what the others grant to the subject of
+  // the first of them: the outputs of Verify::ReductB, which must be null
+  // (VESK2_ERR_INVALID_PARAM). A certificate whose revocation state cannot be determined is kept.
+  // Without any certificate left: VESK2_ERR_INVALID_SEQUENCE.
+  [[nodiscard]] int Verify2(SExpression*& first, SExpression*& second, SExpression*& third);
+  // The stages of Verify2. VerifySignatures2 shares the certificates whose signature holds, and
+  // their extra items, into the two lists; after one that fails it goes on with that triple's extra
+  // item as the next certificate. VerifyRevocations2 replaces the lists by what is not revoked of
+  // them.
+  [[nodiscard]] int VerifySignatures2(SExpression* goodCerts, SExpression* goodExtras);
+  [[nodiscard]] int VerifyRevocations2(SExpression*& goodCerts, SExpression*& goodExtras);
+  [[nodiscard]] int VerifyChain2(SExpression* goodCerts, SExpression*& first, SExpression*& second,
+                                 SExpression*& third);
 };
 
 // CertRequest is a certificate sequence kept in a ".req" file.
