@@ -39,7 +39,14 @@ int OpenRegular(const char* path, int flags, struct stat* opened) {
   return fd.release();
 }
 
+// Opening a device can do something by itself, so what is no regular file is not even opened.
+bool IsRegular(const char* path) {
+  struct stat about {};
+  return path != nullptr && stat(path, &about) == 0 && S_ISREG(about.st_mode);
+}
+
 ZvFile* OpenForReading(const char* path) {
+  if (!IsRegular(path)) return nullptr;
   std::unique_ptr<ZvFile> file(new (std::nothrow) ZvFile);
   std::unique_ptr<unsigned char[]> block(new (std::nothrow) unsigned char[kReadBlock]);
   if (file == nullptr || block == nullptr) return NoMemory();
