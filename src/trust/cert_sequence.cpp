@@ -1,4 +1,4 @@
-// CertSequence: reading a chain of certificates, whole or only its first triple.
+// CertSequence: reading a chain of certificates, whole, triple by triple, or only its first triple.
 #include <vesk2/cert_sequence.h>
 
 #include "src/trust/lists.h"
@@ -112,6 +112,46 @@ int CertSequence::Import(Cert*& cert, Signature*& signature, SExpression*& extra
   TextPtr path;
   VESK2_TRY(OpenFile(buffer, path, name, usePath));
   return Import(cert, signature, extra, buffer.get(), ctx);
+}
+
+// ---- One triple at a time ----
+
+int CertSequence::GetFirstPair(ZvBuffer*& buffer, Cert*& cert, Signature*& signature,
+                               SExpression*& extra, const char* name, bool usePath,
+                               Vesk2ContextStruct* ctx) {
+  VESK2_REQUIRE(buffer == nullptr && cert == nullptr && signature == nullptr && name != nullptr,
+                VESK2_ERR_INVALID_PARAM);
+  extra = nullptr;
+  BufferOwner opened;
+  TextPtr path;
+  VESK2_TRY(OpenFile(opened, path, name, usePath));
+  VESK2_TRY(opened->Expect(kOpening));
+  Triple triple;
+  const int code = triple.Import(opened.get(), ctx);
+  // Callers look at what was read before the failure, and free it.
+  cert = triple.cert.Release();
+  signature = triple.signature.Release();
+  extra = triple.extra.Release();
+  VESK2_TRY(code);
+  buffer = opened.release();
+  return 0;
+}
+
+int CertSequence::GetNextPair(ZvBuffer*& buffer, Cert*& cert, Signature*& signature,
+                              SExpression*& extra, Vesk2ContextStruct* ctx) {
+  // What the outputs held is the caller's: nothing here frees it.
+  cert = nullptr;
+  signature = nullptr;
+  VESK2_REQUIRE(buffer != nullptr, VESK2_ERR_INVALID_PARAM);
+  if (buffer->Peek() == ')') return 0;
+  BufferOwner opened(std::exchange(buffer, nullptr));
+  Triple triple;
+  VESK2_TRY(triple.Import(opened.get(), ctx));
+  buffer = opened.release();
+  cert = triple.cert.Release();
+  signature = triple.signature.Release();
+  extra = triple.extra.Release();
+  return 0;
 }
 
 }  // namespace ZvVesk2
