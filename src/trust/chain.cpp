@@ -1,0 +1,65 @@
+// See chain.h.
+#include "src/trust/chain.h"
+
+#include <vesk2/acl_entry.h>
+#include <vesk2/crl.h>
+
+#include "src/objects/build.h"
+
+namespace ZvVesk2 {
+
+SExpression::Iterator FirstItem(const SExpression* sequence) {
+  auto at = sequence->Begin();
+  if (at) at.Next();
+  return at;
+}
+
+int ReadLink(ChainLink& link, SExpression::Iterator& at) {
+  VESK2_REQUIRE(at, VESK2_ERR_INVALID_SEQUENCE);
+  link.cert = dynamic_cast<Cert*>(at.Value());
+  at.Next();
+  VESK2_REQUIRE(at, VESK2_ERR_INVALID_SEQUENCE);
+  link.signature = dynamic_cast<Signature*>(at.Value());
+  at.Next();
+  VESK2_REQUIRE(at, VESK2_ERR_INVALID_SEQUENCE);
+  link.extra = at.Value();
+  return 0;
+}
+
+int ReadWholeLink(ChainLink& link, SExpression::Iterator& at) {
+  VESK2_TRY(ReadLink(link, at));
+  VESK2_REQUIRE(link.cert != nullptr && link.signature != nullptr, VESK2_ERR_INVALID_SEQUENCE);
+  at.Next();
+  return 0;
+}
+
+int LoadRoots(Ref<SExpression>& acls, Vesk2ContextStruct* ctx) {
+  VESK2_REQUIRE(AclEntry::Import(acls.Out(), ctx, nullptr) == 0, VESK2_ERR_ACL_ENTRY_NOT_FOUND);
+  return 0;
+}
+
+int MarkRevoked(SExpression* certs, SExpression* acls, TimeStamp* notBefore, TimeStamp* notAfter) {
+  Ref<SExpression> crls;
+  VESK2_TRY(CrlSequence::ImportStore(crls.Out(), acls, certs->GetContext()));
+  for (auto it = certs->Begin(); it; it.Next()) {
+    auto* const cert = dynamic_cast<Cert*>(it.Value());
+    if (cert == nullptr) continue;
+    // The status decides, which is "undetermined" after a failure.
+    bool revoked = false;
+    static_cast<void>(cert->IsRevoked(revoked, acls, crls.get(), notBefore, notAfter));
+  }
+  return 0;
+}
+
+int AppendCopy(SExpression* chain, Cert* cert) {
+  Ref<Cert> copy(TryNew<Cert>(cert->GetContext()));
+  VESK2_REQUIRE(copy, VESK2_ERR_MEM_ALLOC);
+  SExpression* const own = cert->GetRevocationElement();
+  cert->SetRevocationElement(nullptr);
+  const int code = copy->Clone(cert);
+  cert->SetRevocationElement(own);
+  VESK2_TRY(code);
+  return Append(chain, std::move(copy));
+}
+
+}  // namespace ZvVesk2

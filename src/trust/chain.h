@@ -1,0 +1,43 @@
+// What the two ways of verifying a sequence share: walking its triples, asking the stores about its
+// certificates, and copying them for the reduction.
+#ifndef VESK2_SRC_TRUST_CHAIN_H
+#define VESK2_SRC_TRUST_CHAIN_H
+
+#include <vesk2/cert.h>
+#include <vesk2/ref.h>
+#include <vesk2/signature.h>
+
+namespace ZvVesk2 {
+
+// One triple of a sequence, borrowed. An item of another kind is null: anybody can insert anything.
+struct ChainLink {
+  Cert* cert = nullptr;
+  Signature* signature = nullptr;
+  DExpression* extra = nullptr;
+};
+
+// FirstItem is the place behind the keyword of a sequence.
+SExpression::Iterator FirstItem(const SExpression* sequence);
+// ReadLink reads three items from `at`, and leaves it at the third. VESK2_ERR_INVALID_SEQUENCE when
+// there are fewer.
+[[nodiscard]] int ReadLink(ChainLink& link, SExpression::Iterator& at);
+// ReadWholeLink also insists on the kinds (VESK2_ERR_INVALID_SEQUENCE), and moves on to the next
+// triple.
+[[nodiscard]] int ReadWholeLink(ChainLink& link, SExpression::Iterator& at);
+
+// LoadRoots loads the ACL store. Whatever fails is VESK2_ERR_ACL_ENTRY_NOT_FOUND: without all of
+// its roots a machine trusts nobody.
+[[nodiscard]] int LoadRoots(Ref<SExpression>& acls, Vesk2ContextStruct* ctx);
+
+// MarkRevoked asks the CRL store, vouched for by `acls`, about each certificate of the list, and
+// leaves the answers in the certificates. Errors of loading only.
+[[nodiscard]] int MarkRevoked(SExpression* certs, SExpression* acls, TimeStamp* notBefore,
+                              TimeStamp* notAfter);
+
+// AppendCopy appends a copy of the certificate without its revocation element, which the reduction
+// knows nothing of.
+[[nodiscard]] int AppendCopy(SExpression* chain, Cert* cert);
+
+}  // namespace ZvVesk2
+
+#endif  // VESK2_SRC_TRUST_CHAIN_H
