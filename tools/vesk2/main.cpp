@@ -19,7 +19,7 @@ constexpr struct {
 } kNouns[] = {
     {"key", "Make and show keys"},
     {"acl", "Decide what this machine trusts"},
-    {"cert", "Pass authority on to another key"},
+    {"cert", "Pass authority on to another key, and check how it came"},
     {"manifest", "Sign a directory, and check one"},
 };
 
@@ -28,6 +28,9 @@ constexpr Command kCommands[] = {
     {"key", "show", "Show type, size and fingerprint of a key", DefineKeyShow},
     {"acl", "grant", "Write an entry into the ACL store: a root of trust", DefineAclGrant},
     {"cert", "issue", "Certify a key for a tag", DefineCertIssue},
+    {"cert", "show", "Show the certificates of a chain", DefineCertShow},
+    {"cert", "verify", "Is the first subject of a chain authorized?", DefineCertVerify},
+    {"cert", "find", "Find stored chains for a tag", DefineCertFind},
     {"manifest", "sign", "Sign what a directory holds", DefineManifestSign},
     {"manifest", "verify", "Is a directory as signed, by someone authorized?",
      DefineManifestVerify},

@@ -129,10 +129,10 @@ std::string CodeWords(int code) {
       {VESK2_ERR_SIGNING_CERT_ORDER, "the second certificate is not the signer's own"},
       {VESK2_ERR_MANIFEST_VERSION, "a manifest version other than 1"},
       {VESK2_ERR_MANIFEST_TYPE, "a manifest type other than plain"},
-      {VESK2_ERR_CERT_REVOKED, "the signer is revoked"},
+      {VESK2_ERR_CERT_REVOKED, "a certificate that is needed is revoked"},
       {VESK2_ERR_PACKAGE_NOT_GRANTED, "less than the asked tag is granted"},
       {VESK2_ERR_NOT_OBJECT_CERT, "the first certificate is not for a digest"},
-      {VESK2_ERR_CRL_NOT_FOUND, "no revocation list tells whether the signer is revoked"},
+      {VESK2_ERR_CRL_NOT_FOUND, "no current list tells whether a certificate is revoked"},
       {SPKI_ERR_NO_MEM, "the reduction ran out of memory or of its work budget"},
   };
   for (const auto& row : kWords) {

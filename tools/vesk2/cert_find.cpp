@@ -1,0 +1,45 @@
+// cert_find.cpp: vesk2 cert find.
+#include "tools/vesk2/command.h"
+#include "tools/vesk2/issue.h"
+#include "tools/vesk2/report.h"
+#include "tools/vesk2/stores.h"
+
+namespace vesk2_command {
+namespace {
+
+using ZvVesk2::CertSequence;
+
+struct Options {
+  std::string tag;
+  StoreOptions stores;
+};
+
+ExitCode Run(const Options& options) {
+  UseStores(options.stores);
+  const Ref<SExpression> tag = ParseTag(options.tag);
+  const Text directory(CertSequence::CalcDir(ZvVesk2::StorageHome));
+  if (!directory) throw Trouble("there is no home store: --home names one");
+  Ref<SExpression> names;
+  Check(CertSequence::Find(names.Out(), tag.get()), Escape(directory.get()));
+  for (auto it = names->Begin(); it; it.Next()) {
+    const auto* name = dynamic_cast<ByteString*>(it.Value());
+    // A name ends in the 0 byte that it is stored with.
+    Say(Escape(directory.get() + std::string("/") +
+               reinterpret_cast<const char*>(name->GetData())));
+  }
+  if (names->First() != nullptr) return kYes;
+  Note("no certificate in " + Escape(directory.get()) + " carries " + TagText(tag.get()));
+  return kNo;
+}
+
+}  // namespace
+
+Action DefineCertFind(CLI::App& app) {
+  auto options = std::make_shared<Options>();
+  app.add_option("--tag", options->tag, "What the first certificate of a chain must cover")
+      ->required();
+  AddStoreOptions(app, options->stores);
+  return [options] { return Run(*options); };
+}
+
+}  // namespace vesk2_command
