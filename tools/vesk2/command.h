@@ -29,6 +29,10 @@ Action DefineCertIssue(CLI::App& app);
 Action DefineCertShow(CLI::App& app);
 Action DefineCertVerify(CLI::App& app);
 Action DefineCertFind(CLI::App& app);
+Action DefineCrlIssue(CLI::App& app);
+Action DefineCrlImport(CLI::App& app);
+Action DefineCrlShow(CLI::App& app);
+Action DefineCrlVerify(CLI::App& app);
 Action DefineManifestSign(CLI::App& app);
 Action DefineManifestVerify(CLI::App& app);
 

@@ -21,7 +21,7 @@ SignedCert IssueCert(const PrivateKey& key, const Grant& grant, const std::strin
   SignedCert result{Ref<Cert>(new Cert(nullptr)), {}};
   Check(result.cert->Set(issuer.get(), grant.subject, grant.propagate, grant.tag,
                          grant.period.notBefore.get(), grant.period.notAfter.get(), grant.comment,
-                         nullptr),
+                         grant.revocation),
         "building a certificate");
   result.signature = key.Sign(*result.cert, algorithm);
   return result;

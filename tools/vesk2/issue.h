@@ -29,6 +29,7 @@ struct Grant {
   SExpression* tag = nullptr;
   Period period = {};
   ByteString* comment = nullptr;
+  SExpression* revocation = nullptr;  // where lists tell whether the certificate is revoked
 };
 
 struct SignedCert {

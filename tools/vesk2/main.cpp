@@ -20,6 +20,7 @@ constexpr struct {
     {"key", "Make and show keys"},
     {"acl", "Decide what this machine trusts"},
     {"cert", "Pass authority on to another key, and check how it came"},
+    {"crl", "Take authority back"},
     {"manifest", "Sign a directory, and check one"},
 };
 
@@ -31,6 +32,10 @@ constexpr Command kCommands[] = {
     {"cert", "show", "Show the certificates of a chain", DefineCertShow},
     {"cert", "verify", "Is the first subject of a chain authorized?", DefineCertVerify},
     {"cert", "find", "Find stored chains for a tag", DefineCertFind},
+    {"crl", "issue", "Sign a list of what is revoked", DefineCrlIssue},
+    {"crl", "import", "Offer lists to the store", DefineCrlImport},
+    {"crl", "show", "Show what a list revokes", DefineCrlShow},
+    {"crl", "verify", "Is a list current, and vouched for?", DefineCrlVerify},
     {"manifest", "sign", "Sign what a directory holds", DefineManifestSign},
     {"manifest", "verify", "Is a directory as signed, by someone authorized?",
      DefineManifestVerify},

@@ -82,10 +82,10 @@ std::string TagText(SExpression* tag) {
   return text ? Escape(text.get()) : "()";
 }
 
-Ref<SExpression> ParseTag(const std::string& text) {
+Ref<SExpression> ParseTag(const std::string& text, const char* keyword) {
   const std::string what = "tag \"" + Escape(text) + "\"";
   Ref<SExpression> tag;
-  Check(SExpression::ParseTagAdvanced(tag.Out(), text.c_str(), "tag", nullptr), what);
+  Check(SExpression::ParseTagAdvanced(tag.Out(), text.c_str(), keyword, nullptr), what);
   if (tag->Count() < 2) throw Trouble(what + ": empty; a tag names what is granted");
   if (HasEmptyWord(*tag)) throw Trouble(what + ": every list must begin with a word");
   // What is typed may be longer than what can be read back from a file.

@@ -55,8 +55,8 @@ std::string TagText(SExpression* tag);
 
 // ParseTag reads the body of a tag in advanced form. Trouble for what the library's reader refuses,
 // for an empty tag, and for empty words: the reduction cannot read those, and one such entry in the
-// ACL store would stop every verification.
-Ref<SExpression> ParseTag(const std::string& text);
+// ACL store would stop every verification. The result is headed by `keyword`.
+Ref<SExpression> ParseTag(const std::string& text, const char* keyword = "tag");
 // A byte string, null for an empty text.
 Ref<ByteString> MakeText(const std::string& text);
 

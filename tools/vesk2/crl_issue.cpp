@@ -1,0 +1,153 @@
+// crl_issue.cpp: vesk2 crl issue.
+#include <algorithm>
+
+#include "tools/vesk2/command.h"
+#include "tools/vesk2/crl_file.h"
+#include "tools/vesk2/files.h"
+#include "tools/vesk2/inspect.h"
+#include "tools/vesk2/report.h"
+
+#include <vesk2/limits.h>
+
+namespace vesk2_command {
+namespace {
+
+using ZvVesk2::Crl;
+using ZvVesk2::Hash;
+
+struct Options {
+  SignerOptions signer;
+  std::string tag;
+  std::vector<std::string> certs;
+  std::vector<std::string> keys;
+  std::string date = "now";
+  PeriodOptions period;
+  std::string hash = "sha256";
+  std::string output;
+  bool force = false;
+};
+
+ZvclmHashID HashId(const std::string& name) {
+  return name == "sha1" ? ZVCLM_HASH_SHA1 : ZVCLM_HASH_SHA256;
+}
+
+// (item (hash NAME DIGEST) DATE)
+std::string Item(const std::string& hash, const std::string& digest, const TimeStamp& date) {
+  const std::string stamp(reinterpret_cast<const char*>(date.GetData()), date.GetLength());
+  return "(" + Atom("item") + "(" + Atom("hash") + Atom(hash) + Atom(digest) + ")" + Atom(stamp) +
+         ")";
+}
+
+std::string Digest(DExpression& object, const std::string& hash, bool ignoreHints) {
+  unsigned char* digest = nullptr;
+  unsigned int length = 0;
+  Check(object.ComputeHash(digest, length, HashId(hash), ignoreHints), "digest of an object");
+  const std::unique_ptr<unsigned char[]> owner(digest);
+  return {reinterpret_cast<char*>(digest), length};
+}
+
+// FILE or FILE:N: the digest of the first or N-th certificate of a file, as it stands there.
+std::string CertDigest(const std::string& argument, const std::string& hash) {
+  std::string path = argument;
+  size_t number = 1;
+  const size_t colon = argument.rfind(':');
+  const std::string digits = colon != std::string::npos ? argument.substr(colon + 1) : "";
+  const bool numbered =
+      !digits.empty() && digits.size() < 6 &&
+      std::all_of(digits.begin(), digits.end(), [](char c) { return c >= '0' && c <= '9'; });
+  if (numbered) {
+    path.resize(colon);
+    number = std::stoul(digits);
+  }
+  const CertChain chain = ReadCertChain(path);
+  const std::vector<ChainLink> links = ChainLinks(chain, path);
+  if (number < 1 || number > links.size()) {
+    throw Trouble(Escape(path) + ": holds " + std::to_string(links.size()) +
+                  " certificates, no number " + digits);
+  }
+  return Digest(*links[number - 1].cert, hash, false);
+}
+
+Ref<Crl> MakeList(const Options& options) {
+  const Ref<TimeStamp> date = ParseTime(options.date, false);
+  std::string certs;
+  std::string keys;
+  for (const std::string& argument : options.certs) {
+    certs += Item(options.hash, CertDigest(argument, options.hash), *date);
+  }
+  for (const std::string& path : options.keys) {
+    keys += Item(options.hash, Digest(*ReadPublicKey(path), options.hash, true), *date);
+  }
+  // A list without items counts as absent, and every certificate that depends on it as
+  // undetermined. This item is the digest of nothing.
+  if (certs.empty()) {
+    certs = Item(options.hash, std::string(options.hash == "sha1" ? 20 : 32, '\0'), *date);
+  }
+  const Buffer buffer =
+      WrapBytes("(3:crl(7:version1:1)(5:list1" + certs + ")(5:list2" + keys + "))");
+  Ref<Crl> list(new Crl(nullptr));
+  Check(list->Import(buffer.get()), "building a revocation list");
+  return list;
+}
+
+Ref<Hash> HashOf(Crl& list, const std::string& name) {
+  Ref<Hash> hash(new Hash(nullptr));
+  Check(hash->Init(HashId(name)), "hashing");
+  Check(hash->Update(&list), "hashing");
+  Check(hash->Finalize(), "hashing");
+  return hash;
+}
+
+ExitCode Run(const Options& options) {
+  const Ref<SExpression> tag = ParseRevocationTag(options.tag);
+  if (TagText(tag.get()).size() > ZvVesk2::Limits::kMaxStoreName) {
+    throw Trouble("--tag: too long; the store names the list's file by it");
+  }
+  Period period = ParsePeriod(options.period);
+  const PrivateKey key = PrivateKey::Read(options.signer.key, options.signer.passphrase);
+  const Ref<Crl> list = MakeList(options);
+  const Ref<Hash> subject = HashOf(*list, options.hash);
+  Grant grant{subject.get()};
+  grant.tag = tag.get();
+  grant.period = std::move(period);
+  const SignedCert issued = IssueCert(key, grant, options.signer.algorithm);
+  const std::string bytes = "(" + Atom("sequence") + Canonical(*list) + Canonical(*issued.cert) +
+                            Canonical(*issued.signature) + ")";
+  const auto readBack = [](const std::string& temporary) {
+    Check(CheckIssuerWord(*ReadCrl(temporary)), "checking the new list");
+  };
+  WriteFile(options.output, bytes, {0666, options.force, readBack});
+  Note("wrote " + Escape(options.output) + "; revoked certificates: " +
+       std::to_string(options.certs.size()) + ", keys: " + std::to_string(options.keys.size()));
+  return kYes;
+}
+
+}  // namespace
+
+Action DefineCrlIssue(CLI::App& app) {
+  auto options = std::make_shared<Options>();
+  AddSignerOptions(app, options->signer);
+  app.add_option("--tag", options->tag, "The source of the list: \"calc (revoke all)\"")
+      ->required();
+  app.add_option("--revoke-cert", options->certs,
+                 "A certificate that is revoked: FILE, or FILE:N for the N-th of a chain")
+      ->allow_extra_args(false);
+  app.add_option("--revoke-key", options->keys, "A public key that is revoked, at any time")
+      ->allow_extra_args(false);
+  app.add_option("--date", options->date, "From when on the certificates are revoked")
+      ->capture_default_str();
+  AddPeriodOptions(app, options->period);
+  // A list without an end answers nothing and replaces nothing.
+  app.get_option("--not-after")->required();
+  app.add_option("--hash", options->hash, "How the list and what it names are hashed")
+      ->check(CLI::IsMember({"sha256", "sha1"}))
+      ->capture_default_str();
+  app.add_option("-o,--output", options->output, "The revocation list file, .crl")->required();
+  app.add_flag("-f,--force", options->force, "Replace an existing file");
+  app.footer(
+      "A list that revokes no certificate holds one dummy item, a digest of zeros: without any "
+      "item\nit would count as absent.");
+  return [options] { return Run(*options); };
+}
+
+}  // namespace vesk2_command
