@@ -2,8 +2,8 @@
 #include <vesk2/context.h>
 #include <vesk2/file_item.h>
 
+#include <cstring>
 #include <string>
-#include <tuple>
 #include <utility>
 
 #include <gtest/gtest.h>
@@ -13,61 +13,44 @@
 namespace ZvVesk2 {
 namespace {
 
-using ZVsysutil::zv_strdup;
-
 TEST(Errors, EveryCodeHasItsText) {
   int expected = 0;
-#define CHECK_ROW(number, name, text)                                                    \
-  EXPECT_EQ(number, expected++);                                                         \
-  EXPECT_STREQ(V2Error(number), number < VESK2_MAX_ERROR ? text : "VESK_UNKNOWN_ERROR"); \
-  EXPECT_TRUE(number <= 1 || number == 67 || std::string(text) == #name);
+#define CHECK_ROW(number, name, text) \
+  EXPECT_EQ(number, expected++);      \
+  EXPECT_TRUE(number <= 1 || number == 67 || number == 77 || V2Error(number) == std::string(#name));
   VESK2_ERROR_TABLE(CHECK_ROW)
 #undef CHECK_ROW
-#define CHECK_ROW(number, name, text) EXPECT_STREQ(V2SpkiError(number), text) << #name;
-  VESK2_SPKI_ERROR_TABLE(CHECK_ROW)
-#undef CHECK_ROW
-}
-
-TEST(Errors, TextsThatCallersCompareWith) {
   const std::pair<const char*, const char*> cases[] = {
+      {V2Error(0), "Success"},
+      {V2Error(1), "Failure"},
       {V2Error(67), "The specified package is not granted the specified authorization"},
       {V2Error(77), "VESK_UNKNOWN_ERROR"},  // the table has a text for it
       {V2Error(-1), "VESK_UNKNOWN_ERROR"},
-      {V2SpkiError(-158),
-       "Issuer could not be resolved to a public key -- so could not have been validated.  "
-       "Rejected during processing."},
+      {std::strstr(V2SpkiError(-158), "validated."), "validated.  Rejected during processing."},
       {V2SpkiError(-128), "VESK_UNKNOWN_SPKI_ERROR"},
-      {V2SpkiError(0), "VESK_UNKNOWN_SPKI_ERROR"},
-      {V2VersionExtra(), "r2441"},
-      {V2VersionExtraA(), "r2441"},
-  };
-  for (const auto& [actual, expected] : cases) EXPECT_STREQ(actual, expected);
-  EXPECT_EQ(V2Version(), 10100);
+      {V2VersionExtra(), "r2441"}};
+  for (const auto& [actual, text] : cases) EXPECT_STREQ(actual, text);
+  EXPECT_TRUE(V2Version() == 10100 && V2VersionExtraA() == V2VersionExtra());
 }
 
 TEST(VeskConf, RootsAreIndependentAndCutAt4096) {
-  const std::string longest(4096, 'h');
   VeskConf::SetGlobalDirectory("/g");
-  VeskConf::SetHomeDirectory((longest + "x").c_str());
-  EXPECT_EQ(VeskConf::GetHomeDirectory(), longest);
+  VeskConf::SetHomeDirectory(std::string(4097, 'h').c_str());
+  EXPECT_EQ(VeskConf::GetHomeDirectory(), std::string(4096, 'h'));
   EXPECT_STREQ(VeskConf::GetGlobalDirectory(), "/g");
   VeskConf::SetHomeDirectory(nullptr);
   EXPECT_STREQ(VeskConf::GetHomeDirectory(), "");
 }
 
 TEST(FileItem, TheMissingFormIsDerived) {
-  const std::tuple<const char*, const char*, const char*, const char*> cases[] = {
-      {"a", nullptr, "a", "a"}, {nullptr, "b", "b", "b"}, {"c", "d", "c", "d"}};
   FileItem* chain = nullptr;
-  for (const auto& [name, nameA, expectedName, expectedNameA] : cases) {
-    FileItem* item = FileItemCreate(zv_strdup(name), zv_strdup(nameA));
-    EXPECT_STREQ(item->name, expectedName);
-    EXPECT_STREQ(item->nameA, expectedNameA);
+  for (const auto& [name, nameA] : {std::pair{"a", (const char*)nullptr}, {nullptr, "a"}}) {
+    FileItem* item = FileItemCreate(ZVsysutil::zv_strdup(name), ZVsysutil::zv_strdup(nameA));
     EXPECT_EQ(item->size, 28u);
+    EXPECT_EQ(item->name + std::string(item->nameA), "aa");
     item->next = std::exchange(chain, item);
   }
-  EXPECT_EQ(FileItemDelete(chain), 3u);
-  EXPECT_EQ(FileItemDelete(nullptr), 0u);
+  EXPECT_EQ(FileItemDelete(chain), 2u);
 }
 
 }  // namespace

@@ -7,10 +7,10 @@
 #include <memory>
 #include <string>
 #include <tuple>
+#include <utility>
 
 #include <gtest/gtest.h>
 
-#include "src/frame/check.h"
 #include "tests/support/temp_dir.h"
 
 namespace ZvVesk2 {
@@ -21,7 +21,7 @@ namespace fs = std::filesystem;
 // A class with a store, as an access-control entry is.
 class Stored : public SExpression {
  public:
-  using SExpression::SExpression;
+  Stored() : SExpression(nullptr) {}
   const char* DirectoryName() const override { return "acl"; }
   const char* ExtensionName() const override { return ".acl"; }
 };
@@ -31,98 +31,70 @@ constexpr auto kOddType = static_cast<StorageType>(7);
 // Runs in a temporary directory, with the roots "h" and "g" in it.
 class Storage : public testing::Test {
  protected:
-  void SetUp() override {
+  Storage() {
     fs::current_path(dir_.Path());
-    fs::create_directory("h");
-    fs::create_directory("g");
+    for (const char* root : {"h", "g"}) fs::create_directory(root);
     VeskConf::SetHomeDirectory("h");
     VeskConf::SetGlobalDirectory("g");
   }
-  void TearDown() override { fs::current_path("/"); }
-
+  ~Storage() override { fs::current_path("/"); }
   const vesk2test::TempDir dir_;
+  const Ref<SExpression> object_{new Stored};
 };
 
 TEST_F(Storage, Paths) {
+  delete[] SExpression::CalcPath("acl", ".acl", "a/..", StorageHome);
+  EXPECT_FALSE(fs::exists("h/acl")) << "made only for a name that can be stored";
   const std::string tooLong(4097, 'x');
-  const std::tuple<const char*, const char*, const char*, StorageType, const char*> cases[] = {
-      {"acl", ".acl", "x/y/root", StorageHome, "h/acl/root.acl"},  // the base name counts
-      {"acl", ".acl", "root.acl", StorageHome, "h/acl/root.acl"},
-      {"acl", ".acl", "a.txt", StorageHome, "h/acl/a.txt.acl"},  // another extension is kept
-      {"acl", ".acl", "r", kOddType, "h/acl/r.acl"},             // all but 1 and 2 mean home
-      {"cert", ".crl", "r", StorageGlobal, "g/cert/r.crl"},
-      {"cert", ".cert", "/tmp/c.cert", StoragePath, "/tmp/c.cert"},
-      {"cert", ".cert", "/tmp/c", StoragePath, "/tmp/c.cert"},
-      {"cert", ".cert", "/tmp.cert/c", StoragePath, "/tmp.cert/c.cert"},
-      {"", ".pub", "d/k", StorageGlobal, "d/k.pub"},  // no directory name, no store
-      {"acl", ".acl", "", StorageHome, nullptr},
-      {"acl", ".acl", "a/..", StorageHome, nullptr},
-      {"acl", ".acl", "/", StorageHome, nullptr},
-      {"acl", ".acl", nullptr, StorageHome, nullptr},
-      {"acl", ".acl", tooLong.c_str() + 1, StorageHome, nullptr},  // cut only below the root
-      {"acl", ".acl", tooLong.c_str(), StoragePath, nullptr},
+  const std::tuple<const char*, const char*, StorageType, const char*> cases[] = {
+      {"acl", "x/y/root", StorageHome, "h/acl/root.acl"},  // the base name counts
+      {"acl", "root.acl", StorageHome, "h/acl/root.acl"},
+      {"acl", "a.txt", StorageHome, "h/acl/a.txt.acl"},  // another extension is kept
+      {"acl", "r", kOddType, "h/acl/r.acl"},             // all but 1 and 2 mean home
+      {"cert", "r", StorageGlobal, "g/cert/r.acl"},
+      {"cert", "/tmp.acl/c", StoragePath, "/tmp.acl/c.acl"},
+      {"", "d/k", StorageGlobal, "d/k.acl"},  // no directory name, no store
+      {"acl", "", StorageHome, nullptr},
+      {"acl", tooLong.c_str() + 1, StorageHome, nullptr},  // cut only below the root
+      {"acl", tooLong.c_str(), StoragePath, nullptr},
   };
-  for (const auto& [directory, extension, name, type, expected] : cases) {
-    const std::unique_ptr<char[]> path(SExpression::CalcPath(directory, extension, name, type));
+  for (const auto& [directory, name, type, expected] : cases) {
+    const std::unique_ptr<char[]> path(SExpression::CalcPath(directory, ".acl", name, type));
     EXPECT_STREQ(path.get(), expected);
   }
-}
-
-TEST_F(Storage, Directories) {
-  const std::tuple<const char*, StorageType, const char*> cases[] = {
-      {"acl", StorageHome, "h/acl"}, {"acl", StorageGlobal, "g/acl"}, {"acl", kOddType, "h/acl"},
-      {"acl", StoragePath, "."},     {"", StorageGlobal, "."},
-  };
-  for (const auto& [directory, type, expected] : cases) {
-    const std::unique_ptr<char[]> path(SExpression::CalcDir(directory, type));
-    EXPECT_STREQ(path.get(), expected);
-  }
-  // A path makes its directory, for a name that can be stored.
-  delete[] SExpression::CalcPath("acl", ".acl", "..", StorageHome);
-  EXPECT_FALSE(fs::exists("h/acl"));
-  delete[] SExpression::CalcPath("acl", ".acl", "x", StorageHome);
-  EXPECT_EQ(fs::status("h/acl").permissions() & fs::perms{077}, fs::perms::none)
-      << "the home store is its user's alone";
-}
-
-TEST_F(Storage, AnUnsetRootIsNotTheCurrentDirectory) {
-  VeskConf::SetHomeDirectory("");
-  EXPECT_EQ(SExpression::CalcDir("acl", StorageHome), nullptr);
-  EXPECT_EQ(SExpression::CalcPath("acl", ".acl", "x", StorageHome), nullptr);
-  const Ref<Stored> object(TryNew<Stored>(nullptr));
-  EXPECT_EQ(object->SetFileName("x"), VESK2_ERR_MEM_ALLOC);
-  EXPECT_EQ(object->CreateFileDirectory(), VESK2_ERR_FIND_DIR);
-  EXPECT_EQ(object->Export("x"), VESK2_ERR_FIND_DIR);
-  EXPECT_FALSE(fs::exists("acl"));
-}
-
-TEST_F(Storage, ExportWritesIntoTheStore) {
-  const Ref<Stored> object(TryNew<Stored>(nullptr));
-  ASSERT_EQ(object->Insert("abc"), 0);
-  object->SetStorageType(StorageGlobal);
-  ASSERT_EQ(object->Export("some/where/x"), 0);
-  EXPECT_EQ(dir_.Read("g/acl/x.acl"), "(3:abc)");
-  EXPECT_STREQ(std::unique_ptr<char[]>(object->BaseName()).get(), "x.acl");
-  ASSERT_EQ(object->Insert("d"), 0);
-  EXPECT_EQ(object->Export(static_cast<const char*>(nullptr)), 0) << "to the name it has";
-  EXPECT_EQ(dir_.Read("g/acl/x.acl"), "(3:abc1:d)");
-  ASSERT_EQ(object->SetFileName(object->GetFileName()), 0) << "its own name as the new one";
-  EXPECT_STREQ(object->GetFileName(), "g/acl/x.acl");
+  EXPECT_EQ(fs::status("h/acl").permissions(), fs::perms::owner_all);
 }
 
 TEST_F(Storage, DirectoriesThatCannotBe) {
-  const Ref<SExpression> plain(TryNew<SExpression>(nullptr));
-  EXPECT_EQ(plain->Export(static_cast<const char*>(nullptr)), VESK2_ERR_FILE_OPEN);
+  for (const auto& [directory, type] : {std::pair{"acl", StoragePath}, {"", StorageGlobal}}) {
+    EXPECT_STREQ(std::unique_ptr<char[]>(SExpression::CalcDir(directory, type)).get(), ".");
+  }
+  VeskConf::SetHomeDirectory("none");
+  EXPECT_EQ(object_->Export("x"), VESK2_ERR_CREATE_DIR);
+  VeskConf::SetHomeDirectory("");  // is not the current directory
+  EXPECT_EQ(SExpression::CalcDir("acl", StorageHome), nullptr);
+  EXPECT_EQ(object_->SetFileName("x"), VESK2_ERR_MEM_ALLOC);
+  EXPECT_EQ(object_->Export("x"), VESK2_ERR_FIND_DIR);
+  const Ref<SExpression> plain(new SExpression(nullptr));
   EXPECT_EQ(plain->CreateFileDirectory(), 0) << "a class without a store needs none";
   plain->SetStorageType(kOddType);
   EXPECT_EQ(plain->CreateFileDirectory(), VESK2_ERR_FIND_DIR);
+  object_->SetStorageType(StoragePath);
+  EXPECT_TRUE(object_->Export("none") == 0 && object_->Exists());
+}
 
-  const Ref<Stored> stored(TryNew<Stored>(nullptr));
-  VeskConf::SetHomeDirectory("none");
-  EXPECT_EQ(stored->Export("x"), VESK2_ERR_CREATE_DIR);
-  stored->SetStorageType(StoragePath);
-  EXPECT_EQ(stored->Export("none"), 0);
-  EXPECT_TRUE(stored->Exists());
+TEST_F(Storage, ExportWritesIntoTheStore) {
+  ASSERT_EQ(object_->Insert("abc"), 0);
+  object_->SetStorageType(StorageGlobal);
+  ASSERT_EQ(object_->Export("some/where/x"), 0);
+  EXPECT_STREQ(std::unique_ptr<char[]>(object_->BaseName()).get(), "x.acl");
+  ASSERT_EQ(object_->Insert("d"), 0);
+  ASSERT_EQ(object_->SetFileName(object_->GetFileName()), 0) << "its own name as the new one";
+  EXPECT_EQ(object_->Export(static_cast<const char*>(nullptr)), 0) << "to the name it has";
+  Ref<SExpression> read;
+  ASSERT_EQ(SExpression::Import(read.Out(), "g/acl/x.acl", nullptr), 0);
+  EXPECT_TRUE(object_->IsEqual(read.get()) && read->Count() == 2);
+  EXPECT_EQ(SExpression::Import(read.Out(), "g/acl/x", nullptr), VESK2_ERR_FILE_OPEN);
 }
 
 }  // namespace
