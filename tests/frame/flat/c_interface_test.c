@@ -62,9 +62,43 @@ static void check_manifest(void) {
   check(FreeFileItemList(NULL) == 0, "FreeFileItemList");
 }
 
+static void check_certificates(void) {
+  Vesk2CertInfoStruct* chain = NULL;
+  FileItem* found = CertFindA("/nonexistent");
+  check(found == NULL && CertFind(NULL) == NULL, "CertFind");
+  check(Vesk2CertReadCtx(&chain, "/nonexistent", NULL) == VESK2_ERR_FILE_OPEN, "Vesk2CertReadCtx");
+  check(Vesk2CertReadCtxA(&chain, NULL, NULL) == VESK2_ERR_PARAM_NULL, "Vesk2CertReadCtxA");
+  check(Vesk2CertRead(&chain, "/n") == Vesk2CertReadA(&chain, "/n"), "Vesk2CertRead");
+  check(chain == NULL && Vesk2CertFree(chain) == VESK2_ERR_PARAM_NULL, "Vesk2CertFree");
+  check(Vesk2CertVerify(chain, "(install)", 0, 0) == VESK2_ERR_PARAM_NULL, "Vesk2CertVerify");
+  check(Vesk2CertVerifyFile(NULL, "(install)", 0, 0) == VESK2_ERR_PARAM_NULL, "a null path");
+  check(Vesk2CertVerifyFileA("/nonexistent", "(install)", 0, 0) == VESK2_ERR_FILE_OPEN,
+        "Vesk2CertVerifyFileA");
+}
+
+static void check_lists(void) {
+  Vesk2CrlInfoStruct mark;
+  Vesk2CrlInfoStruct* list = &mark;
+  const int missing = VESK2_ERR_FILE_NOT_FOUND;
+  check(Vesk2CrlRead(&list, "/nonexistent", NULL) == missing && list == NULL, "Vesk2CrlRead");
+  list = &mark;
+  check(Vesk2CrlReadA(&list, NULL, NULL) == missing && list == NULL, "Vesk2CrlReadA");
+  list = &mark;
+  check(Vesk2CrlFindA(&list, "a", NULL) == VESK2_ERR_FIND_DIR && list == NULL, "Vesk2CrlFindA");
+  check(Vesk2CrlFree(list) == 0, "Vesk2CrlFree");
+  check(Vesk2CrlVerify(NULL, NULL, 0, 0) == VESK2_ERR_PARAM_NULL, "Vesk2CrlVerify");
+  check(Vesk2CrlVerifyFile("/n", NULL, 0, 0, NULL) == missing, "Vesk2CrlVerifyFile");
+  check(Vesk2CrlVerifyFileA("/n", NULL, 0, 0, NULL) == missing, "Vesk2CrlVerifyFileA");
+  check(Vesk2CrlImport("/n", NULL) == missing, "Vesk2CrlImport");
+  check(Vesk2CrlImportA("/n", NULL) == missing, "Vesk2CrlImportA");
+  check(Vesk2ImportCrls("/n") == missing && Vesk2ImportCrlsA("/n") == missing, "Vesk2ImportCrls");
+}
+
 int main(void) {
   check_context();
   check_version();
   check_manifest();
+  check_certificates();
+  check_lists();
   return failures == 0 ? 0 : 1;
 }

@@ -1,0 +1,105 @@
+// Flat functions: verifying certificate sequences, and listing those of a directory.
+#include <vesk2/cert_sequence.h>
+#include <vesk2/file_item.h>
+
+#include <memory>
+
+#include "src/frame/check.h"
+#include "src/frame/flat/ascii_text.h"
+#include "src/platform/file.h"
+#include "src/platform/text.h"
+
+using namespace ZvVesk2;
+
+namespace {
+
+// ---- Verifying ----
+
+// Null for a time that is not given.
+int MakeStamp(Ref<TimeStamp>& stamp, time_t time, Vesk2ContextStruct* context) {
+  if (time == 0) return 0;
+  stamp.Reset(TryNew<TimeStamp>(context));
+  VESK2_REQUIRE(stamp, VESK2_ERR_MEM_ALLOC);
+  const int code = stamp->Set(time);
+  VESK2_REQUIRE(code != -1, VESK2_ERR_TIME_STAMP);  // a year that has no text
+  return code;
+}
+
+int VerifySequence(CertSequence* sequence, const char* tagText, time_t notBefore, time_t notAfter) {
+  Vesk2ContextStruct* const context = sequence->GetContext();
+  Ref<SExpression> tag;
+  VESK2_TRY(SExpression::ParseTagAdvanced(tag.Out(), tagText, "tag", context));
+  Ref<TimeStamp> from;
+  Ref<TimeStamp> to;
+  VESK2_TRY(MakeStamp(from, notBefore, context));
+  VESK2_TRY(MakeStamp(to, notAfter, context));
+  // No subject: the chain is presented for whoever its first certificate is about.
+  return sequence->Verify(nullptr, tag.get(), from.get(), to.get());
+}
+
+}  // namespace
+
+int Vesk2CertVerify(Vesk2CertInfoStruct* chain, const char* tagText, time_t notBefore,
+                    time_t notAfter) {
+  VESK2_REQUIRE(chain != nullptr, VESK2_ERR_PARAM_NULL);
+  return VerifySequence(chain->sequence, tagText, notBefore, notAfter);
+}
+
+int Vesk2CertVerifyFile(const char* path, const char* tagText, time_t notBefore, time_t notAfter) {
+  VESK2_REQUIRE(path != nullptr, VESK2_ERR_PARAM_NULL);
+  Ref<CertSequence> sequence;
+  VESK2_TRY(CertSequence::Import(sequence.Out(), path, true, nullptr));
+  return VerifySequence(sequence.get(), tagText, notBefore, notAfter);
+}
+
+int Vesk2CertVerifyFileA(const char* path, const char* tagText, time_t notBefore, time_t notAfter) {
+  const AsciiText name(path);
+  VESK2_REQUIRE(!name.OutOfMemory(), VESK2_ERR_MEM_ALLOC);
+  return Vesk2CertVerifyFile(name.get(), tagText, notBefore, notAfter);
+}
+
+// ---- Listing ----
+
+namespace {
+
+struct ItemsFree {
+  void operator()(FileItem* chain) const { FileItemDelete(chain); }
+};
+using ItemsOwner = std::unique_ptr<FileItem, ItemsFree>;
+
+// A record of one name; null without memory.
+FileItem* MakeItem(const char* name) {
+  std::unique_ptr<char[]> copy(ZVsysutil::zv_fstrdup(name));
+  FileItem* const item = copy ? FileItemCreate(copy.get(), nullptr) : nullptr;
+  if (item != nullptr) static_cast<void>(copy.release());  // the record's now
+  return item;
+}
+
+}  // namespace
+
+FileItem* CertFind(const char* directory) {
+  const std::unique_ptr<char[]> store(directory == nullptr ? CertSequence::CalcDir(StorageHome)
+                                                           : nullptr);
+  ZVsysutil::ZvDir reader;
+  if (reader.open(directory != nullptr ? directory : store.get(), "*.cert") != 0) return nullptr;
+  ItemsOwner chain;
+  FileItem* last = nullptr;
+  while (const char* name = reader.read(false)) {
+    FileItem* const item = MakeItem(name);
+    if (item == nullptr) return nullptr;
+    if (last == nullptr) {
+      chain.reset(item);
+    } else {
+      last->next = item;
+    }
+    last = item;
+  }
+  // Half a list would pass for the whole one.
+  return reader.failed() ? nullptr : chain.release();
+}
+
+FileItem* CertFindA(const char* directory) {
+  const AsciiText name(directory);
+  // Null would mean the home store here.
+  return name.OutOfMemory() ? nullptr : CertFind(name.get());
+}
