@@ -1,20 +1,22 @@
-// Cert: the elements that it reads, in their order, and the certificates that it builds.
+// Cert: the elements that it reads, in their order, and the certificates that it builds. Subjects:
+// the choice of a class, and k-of-n.
 #include <vesk2/cert.h>
+#include <vesk2/public_key.h>
 
-#include <gtest/gtest.h>
+#include <tuple>
 
-#include "tests/support/test_object.h"
+#include "tests/support/test_read.h"
 #include "tests/support/test_text.h"
 
 namespace vesk2test {
 namespace {
 
-using ZvVesk2::Ref;
+using namespace ZvVesk2;
+using CertObject = ZvVesk2::Cert;
 
-const std::string kKey = "(10:public-key(3:rsa(1:e1:\3)(1:n1:n)))";
-const std::string kThreshold = "(6:k-of-n1:\1" + Str("\1") + kKey + ")";
-
-Ref<ZvVesk2::Cert> NewCert() { return Ref<ZvVesk2::Cert>(new ZvVesk2::Cert(nullptr)); }
+const std::string kKey = "(10:public-key(3:rsa(1:e[bin]1:\3)(1:n[bin]2:\1\1)))";
+const std::string kKey2 = "(10:public-key(3:rsa(1:e1:\3)(1:n1:m)))";
+const std::string kThreshold = "(6:k-of-n[num]1:\1[num]1:\2" + kKey + kKey + ")";
 
 // A certificate over two short hash principals, with `middle` between subject and end.
 std::string Short(const std::string& middle, const std::string& version = "") {
@@ -35,98 +37,128 @@ CertText Full() {
 }
 
 TEST(CertTest, ReadsWhatItPrints) {
-  const std::string texts[] = {
-      Short(""),
-      Short("", "(7:version1:1)"),
-      Short("(9:propagate)"),
-      Short("(3:foo)"),  // any keyword of three characters makes a tag
-      Short("(5:valid)"),
-      Short("(5:valid(10:not-before3:abc))"),  // stamps are not judged
-      Short("(5:valid(9:not-after0:))"),
-      Short("(7:comment[utf-8]3:why)"),
-      Short("(1:x(3:abc))"),  // "(1" makes a revocation element
-      Short("(10:not-before1:x)"),
-      Cert(Full()),
+  ExpectRead<CertObject>(Short("", "(7:version1:1)"));
+  ExpectRead<CertObject>(Short("(3:foo)"));  // any keyword of three characters makes a tag
+  ExpectRead<CertObject>(Short("(5:valid)"));
+  ExpectRead<CertObject>(Short("(5:valid(10:not-before3:abc))"));  // stamps are not judged
+  ExpectRead<CertObject>(Short("(5:valid(9:not-after0:))"));
+  ExpectRead<CertObject>(Short("(7:comment[utf-8]3:why)"));
+  ExpectRead<CertObject>(Short("(1:x(3:abc))"));  // "(1" makes a revocation element
+  ExpectRead<CertObject>(Cert(Full()));
+  ExpectDamageIsSeen<CertObject>(Cert(Full()));
+  const std::string refused[] = {
+      Short("", "(7:version1:2)"),
+      Short("", "(7:version1:1)(7:version1:1)"),
+      Short("(3:tag)(9:propagate)"),
+      Short("(3:tag)(3:tag)"),
+      Short("(5:valid(9:not-after1:a)(10:not-before1:b))"),
+      Short("(7:comment1:c)(5:valid)"),
+      Short("(2:ab)"),
+      "(4:cert" + List({Str("issuer"), HashOf("i")}) + ")",
   };
-  for (const std::string& text : texts) {
-    SCOPED_TRACE(text);
-    const Ref<ZvVesk2::Cert> cert = NewCert();
-    const BufferPtr buffer = Wrap(text + "rest");
-    ASSERT_EQ(cert->Import(buffer.get()), 0);
-    EXPECT_EQ(buffer->Remaining(), 4u);
-    EXPECT_EQ(Canonical(cert), text);
-    EXPECT_EQ(cert->Import(Wrap(text).get()), VESK2_ERR_INVALID_PARAM);
-  }
+  for (const auto& text : refused) ExpectRead<CertObject>(text, VESK2_ERR_PARSE_FILE);
+  ExpectRead<CertObject>(Cert({.issuer = kThreshold, .subject = kKey}), VESK2_ERR_PRINCIPAL);
 }
 
-TEST(CertTest, RefusesOtherOrdersRepetitionsAndVersions) {
-  const std::pair<const char*, std::string> cases[] = {
-      {"version 2", Short("", "(7:version1:2)")},
-      {"version twice", Short("", "(7:version1:1)(7:version1:1)")},
-      {"tag before propagate", Short("(3:tag)(9:propagate)")},
-      {"two tags", Short("(3:tag)(3:tag)")},
-      {"dates exchanged", Short("(5:valid(9:not-after1:a)(10:not-before1:b))")},
-      {"comment first", Short("(7:comment1:c)(5:valid)")},
-      {"propagate with a value", Short("(9:propagate1:x)")},
-      {"comment without text", Short("(7:comment)")},
-      {"unknown element", Short("(2:ab)")},
-      {"no subject", "(4:cert" + List({Str("issuer"), HashOf("i")}) + ")"},
-      {"two principals", "(4:cert" + List({Str("issuer"), HashOf("i"), HashOf("i")}) + ")"},
-  };
-  for (const auto& [what, text] : cases) {
-    EXPECT_EQ(NewCert()->Import(Wrap(text).get()), VESK2_ERR_PARSE_FILE) << what;
-  }
-  EXPECT_EQ(NewCert()->Import(Wrap(Cert({.issuer = kThreshold, .subject = kKey})).get()),
-            VESK2_ERR_PRINCIPAL);
-}
-
-TEST(CertTest, ClonesShareEveryPartAndHaveAVersion) {
-  CertText parts = Full();
-  for (const bool least : {false, true}) {
-    if (least) parts = {.issuer = HashOf("i"), .subject = HashOf("s")};
+// Of the fields, whatever the list says, and always with a version.
+TEST(CertTest, ClonesShareEveryPart) {
+  const CertText least = {.issuer = HashOf("i"), .subject = HashOf("s")};
+  for (auto [parts, change] : {std::pair(Full(), false), {Full(), true}, {least, true}}) {
     parts.version = false;
-    Ref<ZvVesk2::Cert> source = NewCert();
-    ASSERT_EQ(source->Import(Wrap(Cert(parts)).get()), 0);
-    EXPECT_EQ(source->GetVersion(), nullptr);
-    EXPECT_EQ(source->GetTag() == nullptr, least);
-    EXPECT_EQ(Bytes(source->GetNotBefore()), parts.notBefore);
-    EXPECT_EQ(Bytes(source->GetNotAfter()), parts.notAfter);
-    EXPECT_EQ(Bytes(source->GetComment()), parts.comment);
-    const Ref<ZvVesk2::Cert> clone = NewCert();
+    parts.propagate = !change;
+    Ref<CertObject> source = Read<CertObject>(Cert(parts));
+    if (change) {
+      source->SetPropagate(true);
+      source->SetRevocationElement(nullptr);
+      parts.revocation.clear();
+    }
+    const Ref<CertObject> clone(new CertObject(nullptr));
     ASSERT_EQ(clone->Clone(source.get()), 0);
     EXPECT_EQ(clone->GetIssuer(), source->GetIssuer());
     EXPECT_EQ(clone->Clone(source.get()), VESK2_ERR_INVALID_PARAM);
     source.Reset();  // the clone has references of its own
-    parts.version = true;
+    parts.version = parts.propagate = true;
     EXPECT_EQ(Canonical(clone), Cert(parts));
-    EXPECT_EQ(Canonical(*clone->GetVersion()), "(7:version1:1)");
+    EXPECT_EQ(Bytes(clone->GetComment()), parts.comment);
   }
 }
 
-TEST(CertTest, CloneFollowsFieldsThatWereSetAside) {
-  CertText parts = Full();
-  parts.propagate = false;
-  const Ref<ZvVesk2::Cert> source = NewCert();
-  ASSERT_EQ(source->Import(Wrap(Cert(parts)).get()), 0);
-  source->SetPropagate(true);
-  source->SetRevocationElement(nullptr);
-  const Ref<ZvVesk2::Cert> clone = NewCert();
-  ASSERT_EQ(clone->Clone(source.get()), 0);
-  parts.propagate = true;
-  parts.revocation.clear();
-  EXPECT_EQ(Canonical(clone), Cert(parts));
+// ---- Subjects ----
 
-  const Ref<ZvVesk2::Cert> set = NewCert();
-  EXPECT_EQ(
-      set->Set(nullptr, source->GetSubject(), false, nullptr, nullptr, nullptr, nullptr, nullptr),
-      VESK2_ERR_INVALID_PARAM);
-  ASSERT_EQ(set->Set(source->GetIssuer(), source->GetSubject(), false, nullptr, nullptr,
-                     source->GetNotAfter(), nullptr, nullptr),
-            0);
-  EXPECT_EQ(Canonical(set), Cert({.issuer = parts.issuer,
-                                  .subject = parts.subject,
-                                  .notAfter = parts.notAfter,
-                                  .version = true}));
+std::string Threshold(const std::string& k, const std::string& n, const std::string& members) {
+  return "(6:k-of-n" + k + n + members + ")";
+}
+
+TEST(SubjectTest, ChoosesTheClassByTwoCharacters) {
+  // The answers of Subject and of Principal.
+  const std::tuple<std::string, int, int> cases[] = {
+      {kKey, 0, 0},
+      {HashOf("x"), 0, 0},
+      {Threshold("1:\1", "1:\1", kKey), 0, VESK2_ERR_PRINCIPAL},
+      {"(4:name3:abc)", VESK2_ERR_PARSE_FILE, VESK2_ERR_PARSE_FILE},
+      {"(1:x)", VESK2_ERR_PARSE_FILE, VESK2_ERR_PARSE_FILE},
+      {"(5:other)", VESK2_ERR_PRINCIPAL, VESK2_ERR_PRINCIPAL},
+      {"(", VESK2_ERR_PRINCIPAL, VESK2_ERR_PRINCIPAL},
+  };
+  for (const auto& [text, subjectCode, principalCode] : cases) {
+    Ref<Subject> subject;
+    Ref<Principal> principal;
+    EXPECT_EQ(Subject::Import(subject.Out(), Wrap(text).get(), nullptr), subjectCode) << text;
+    EXPECT_EQ(Principal::Import(principal.Out(), Wrap(text).get(), nullptr), principalCode);
+    EXPECT_EQ(static_cast<bool>(principal), principalCode == 0);
+    ASSERT_EQ(static_cast<bool>(subject), subjectCode == 0);
+    if (!subject) continue;
+    EXPECT_EQ(subject->IsHash(), text == HashOf("x"));
+    EXPECT_EQ(subject->IsThresholdSubject(), principalCode != 0);
+    EXPECT_EQ(subject->GetStorageType(), StoragePath);
+    EXPECT_EQ(Canonical(subject), text);
+  }
+}
+
+TEST(SubjectTest, NamesAreBuiltAndNeverRead) {
+  const Ref<Name> name(new Name(nullptr));
+  EXPECT_EQ(name->Set(""), VESK2_ERR_INVALID_PARAM);
+  ASSERT_EQ(name->Set("bob"), 0);
+  EXPECT_EQ(Canonical(name), "(4:name3:bob)");
+  EXPECT_EQ(Bytes(name->GetName()), "bob");
+  Read<Name>("(4:name3:bob)", VESK2_ERR_NOT_IMPLEMENTED);
+}
+
+TEST(ThresholdTest, ReadsRawCountsAndExactlyNKeys) {
+  const std::string two = kKey + kKey2;
+  ExpectRead<ThresholdSubject>(Threshold("[num]1:\1", "1:\2", two));  // hints stay as they are
+  ExpectRead<ThresholdSubject>(Threshold("1:\1", "[bin]1:\2", two));
+  ExpectRead<ThresholdSubject>(Threshold("1:\2", "1:\1", kKey));  // 2 of 1
+  ExpectRead<ThresholdSubject>(Threshold(Str({"\0", 1}), Str({"\0", 1}), ""));
+  const std::string refused[] = {
+      Threshold("1:1", "1:2", two),  // digits
+      Threshold("0:", "1:\2", two),           Threshold("1:\2", "0:", two),
+      Threshold("1:\1", "1:\2", kKey),        Threshold("1:\1", "1:\1", two),
+      Threshold("1:\1", "1:\1", HashOf("x")),
+  };
+  for (const auto& text : refused) ExpectRead<ThresholdSubject>(text, VESK2_ERR_PARSE_FILE);
+  // Only the first byte of a count is read.
+  EXPECT_EQ(Canonical(Read<ThresholdSubject>(Threshold("2:\1x", "3:\2yz", two))),
+            Threshold("1:\1", "1:\2", two));
+}
+
+TEST(ThresholdTest, SetWritesLowBytesAndSharesMembers) {
+  const Ref<ThresholdSubject> subject(new ThresholdSubject(nullptr));
+  ASSERT_EQ(subject->Set(2, 300), 0);
+  EXPECT_EQ(Canonical(subject), "(6:k-of-n[num]1:\2[num]1:,)");
+  EXPECT_EQ(subject->GetK(), 2u);
+  EXPECT_EQ(subject->GetN(), 300u);
+  EXPECT_EQ(subject->Set(1, 1), VESK2_ERR_INVALID_PARAM);
+
+  const Ref<PublicKey> member = Read<PublicKey>(kKey);
+  ASSERT_EQ(subject->Insert(Ref<PublicKey>::Share(member.get()).Release()), 0);
+  EXPECT_TRUE(subject->HasMember(member.get()));
+  EXPECT_FALSE(subject->HasMember(Read<PublicKey>(kKey2).get()));
+  EXPECT_FALSE(subject->HasMember(nullptr));
+  Ref<SExpression> members;
+  ASSERT_EQ(subject->GetSubjects(members.Out()), 0);
+  EXPECT_EQ(Canonical(members), "(" + kKey + ")");
+  EXPECT_EQ(member->GetRefCount(), 3);
 }
 
 }  // namespace

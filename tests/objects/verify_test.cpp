@@ -3,25 +3,18 @@
 #include <vesk2/public_key.h>
 #include <vesk2/signature.h>
 
-#include <gtest/gtest.h>
-
 #include <cstdlib>
 #include <tuple>
 
 #include "tests/support/temp_dir.h"
 #include "tests/support/test_key.h"
-#include "tests/support/test_object.h"
+#include "tests/support/test_read.h"
 #include "tests/support/test_text.h"
 
 namespace vesk2test {
 namespace {
 
-using ZvVesk2::ByteString;
-using ZvVesk2::Hash;
-using ZvVesk2::PublicKey;
-using ZvVesk2::Ref;
-using ZvVesk2::SExpression;
-using ZvVesk2::Signature;
+using namespace ZvVesk2;
 
 const std::string kObject = "(6:object[bin]3:abc(1:x))";
 
@@ -30,43 +23,27 @@ std::string SignatureText(const std::string& hash, const std::string& principal,
   return List({Str("signature"), hash, principal, List({Str(algorithm), Str(value)})});
 }
 
-Ref<Signature> Imported(const std::string& text) {
-  Ref<Signature> signature(new Signature(nullptr));
-  EXPECT_EQ(signature->Import(Wrap(text).get()), 0);
-  EXPECT_EQ(Canonical(signature), text);
-  return signature;
-}
-
 int Verify(const std::string& signature, const std::string& object = kObject) {
-  return Imported(signature)->Verify(Parse(object).get());
+  return Read<Signature>(signature)->Verify(Parse(object).get());
 }
 
 TEST(VerifyTest, TakesWhatTheOpensslCommandSigns) {
   const TempDir dir;
   const std::string object = dir.Write("object", kObject);
-  const struct {
-    const TestKey& key;
-    const char* options;
-    const char* algorithm;
-    const char* hash;
-  } cases[] = {
-      {TestKey::Rsa(0), "-sha256", "rsa-1.5", "sha256"},
-      {TestKey::Rsa(0), "-sha1", "rsa-1.5", "sha1"},
-      {TestKey::Rsa(0), "-sha256 -sigopt rsa_padding_mode:pss -sigopt rsa_pss_saltlen:-1",
-       "rsa-pss", "sha256"},
-      {TestKey::Rsa(0), "-sha256 -sigopt rsa_padding_mode:pss -sigopt rsa_pss_saltlen:0", "rsa-pss",
-       "sha256"},
-      {TestKey::Dsa(0), "-sha1", "dsa-sha1", "sha1"},
+  const std::string pss = " -sigopt rsa_padding_mode:pss -sigopt rsa_pss_saltlen:";
+  const std::tuple<const char*, std::string, const char*> cases[] = {
+      {"sha256", "", "rsa-1.5"},        {"sha1", "", "rsa-1.5"},  {"sha256", pss + "-1", "rsa-pss"},
+      {"sha256", pss + "0", "rsa-pss"}, {"sha1", "", "dsa-sha1"},
   };
-  for (const auto& row : cases) {
-    const std::string key = dir.Write("key.pem", row.key.PrivatePem());
-    const std::string command = "openssl dgst " + std::string(row.options) + " -sign " + key +
+  for (const auto& [hash, options, algorithm] : cases) {
+    const bool dsa = algorithm[0] == 'd';
+    const TestKey& key = dsa ? TestKey::Dsa(0) : TestKey::Rsa(0);
+    const std::string pem = dir.Write("key.pem", key.PrivatePem());
+    const std::string command = std::string("openssl dgst -") + hash + options + " -sign " + pem +
                                 " -out " + dir.File("value") + " " + object;
     ASSERT_EQ(std::system(command.c_str()), 0) << command;
-    std::string value = dir.Read("value");
-    if (&row.key == &TestKey::Dsa(0)) value = TestKey::RawDsa(value);
-    EXPECT_EQ(
-        Verify(SignatureText(HashOf(kObject, row.hash), row.key.Public(), row.algorithm, value)), 0)
+    const std::string value = dsa ? TestKey::RawDsa(dir.Read("value")) : dir.Read("value");
+    EXPECT_EQ(Verify(SignatureText(HashOf(kObject, hash), key.Public(), algorithm, value)), 0)
         << command;
   }
 }
@@ -84,117 +61,85 @@ TEST(VerifyTest, RefusesWithTheCodeOfTheFirstFailure) {
   const std::string rmd = HashOf(kObject, "rmd160");
   const std::string sha1AsRmd = List({Str("hash"), Str("rmd160"), Str(sha1)});
   std::string flipped = pkcs;
-  flipped[100] = static_cast<char>(flipped[100] ^ 1);
   std::string flippedRaw = raw;
-  flippedRaw[39] = static_cast<char>(flippedRaw[39] ^ 1);
-  const struct {
-    const char* what;
-    const TestKey& key;
-    std::string algorithm, hash, value;
-    int code;
-  } cases[] = {
+  for (std::string* value : {&flipped, &flippedRaw}) value->back() = char(value->back() ^ 1);
+  using Row = std::tuple<const TestKey&, std::string, std::string, std::string, int>;
+  const Row cases[] = {
       // Names: a prefix of a known name matches it, PSS first.
-      {"rsa", rsa, "rsa", h256, pss, 0},
-      {"no name", rsa, "", h256, pss, 0},
-      {"rsa is not 1.5", rsa, "rsa", h256, pkcs, VESK2_ERR_SIGNATURE},
-      {"rsa-1", rsa, "rsa-1", h256, pkcs, 0},
-      {"rsa-pkcs1", rsa, "rsa-pkcs1", h256, pkcs, VESK2_ERR_SIGNATURE_ID},
-      {"rsa-1.6", rsa, "rsa-1.6", h256, pkcs, VESK2_ERR_SIGNATURE_ID},
-      {"longer name", rsa, "rsa-1.5x", h256, pkcs, VESK2_ERR_SIGNATURE_ID},
-      {"0 byte in a name", rsa, std::string("rsa\0", 4), h256, pss, VESK2_ERR_SIGNATURE_ID},
-      {"rsa name, dsa key", dsa, "rsa-1.5", h1, raw, VESK2_ERR_SIGNATURE_ID},
-      {"dsa", dsa, "dsa", h1, raw, 0},
+      {rsa, "rsa", h256, pss, 0},
+      {rsa, "", h256, pss, 0},
+      {rsa, "rsa", h256, pkcs, VESK2_ERR_SIGNATURE},
+      {rsa, "rsa-1", h256, pkcs, 0},
+      {rsa, "rsa-pkcs1", h256, pkcs, VESK2_ERR_SIGNATURE_ID},
+      {rsa, "rsa-1.6", h256, pkcs, VESK2_ERR_SIGNATURE_ID},
+      {rsa, "rsa-1.5x", h256, pkcs, VESK2_ERR_SIGNATURE_ID},
+      {rsa, std::string("rsa\0", 4), h256, pss, VESK2_ERR_SIGNATURE_ID},
+      {dsa, "rsa-1.5", h1, raw, VESK2_ERR_SIGNATURE_ID},
+      {dsa, "dsa", h1, raw, 0},
       // Hashes: RSA knows two, DSA takes none but SHA-1 whatever it is called.
-      {"rsa over rmd160", rsa, "rsa-1.5", rmd, pkcs, VESK2_ERR_SIGNATURE_ID},
-      {"dsa, rmd160 in name only", dsa, "dsa-sha1", sha1AsRmd, raw, 0},
-      {"dsa over sha256", dsa, "dsa-sha1", h256, raw, VESK2_ERR_HASH_MISMATCH},
+      {rsa, "rsa-1.5", rmd, pkcs, VESK2_ERR_SIGNATURE_ID},
+      {dsa, "dsa-sha1", sha1AsRmd, raw, 0},
+      {dsa, "dsa-sha1", h256, raw, VESK2_ERR_HASH_MISMATCH},
       // Objects are judged before values.
-      {"another object, no value", rsa, "rsa-1.5", HashOf("x"), "", VESK2_ERR_HASH_MISMATCH},
-      {"another object", dsa, "dsa-sha1", HashOf("x", "sha1"), raw, VESK2_ERR_HASH_MISMATCH},
+      {rsa, "rsa-1.5", HashOf("x"), "", VESK2_ERR_HASH_MISMATCH},
+      {dsa, "dsa-sha1", HashOf("x", "sha1"), raw, VESK2_ERR_HASH_MISMATCH},
       // Values.
-      {"one bit", rsa, "rsa-1.5", h256, flipped, VESK2_ERR_SIGNATURE},
-      {"short", rsa, "rsa-1.5", h256, pkcs.substr(1), VESK2_ERR_SIGNATURE},
-      {"empty", rsa, "rsa-1.5", h256, "", VESK2_ERR_SIGNATURE},
-      {"other scheme", rsa, "rsa-pss", h256, pkcs, VESK2_ERR_SIGNATURE},
-      {"other key", TestKey::Rsa(1), "rsa-1.5", h256, pkcs, VESK2_ERR_SIGNATURE},
-      {"other digest", rsa, "rsa-1.5", h1, pkcs, VESK2_ERR_SIGNATURE},
-      {"one bit", dsa, "dsa-sha1", h1, flippedRaw, VESK2_ERR_SIGNATURE},
-      {"halves of 19", dsa, "dsa-sha1", h1, raw.substr(2), VESK2_ERR_SIGNATURE},
+      {rsa, "rsa-1.5", h256, flipped, VESK2_ERR_SIGNATURE},
+      {rsa, "rsa-1.5", h256, pkcs.substr(1), VESK2_ERR_SIGNATURE},
+      {rsa, "rsa-1.5", h256, "", VESK2_ERR_SIGNATURE},
+      {rsa, "rsa-pss", h256, pkcs, VESK2_ERR_SIGNATURE},
+      {TestKey::Rsa(1), "rsa-1.5", h256, pkcs, VESK2_ERR_SIGNATURE},
+      {rsa, "rsa-1.5", h1, pkcs, VESK2_ERR_SIGNATURE},
+      {dsa, "dsa-sha1", h1, flippedRaw, VESK2_ERR_SIGNATURE},
+      {dsa, "dsa-sha1", h1, raw.substr(2), VESK2_ERR_SIGNATURE},
   };
-  for (const auto& row : cases) {
-    EXPECT_EQ(Verify(SignatureText(row.hash, row.key.Public(), row.algorithm, row.value)), row.code)
-        << row.what << " " << row.algorithm;
+  for (const auto& [key, algorithm, hash, value, code] : cases) {
+    EXPECT_EQ(Verify(SignatureText(hash, key.Public(), algorithm, value)), code)
+        << algorithm << " " << code;
   }
-}
-
-// Display hints are part of what is signed.
-TEST(VerifyTest, HashesWithHints) {
-  const std::string signature = TestKey::Rsa(0).Sign(kObject);
-  EXPECT_EQ(Verify(signature, "(6:object3:abc(1:x))"), VESK2_ERR_HASH_MISMATCH);
-  EXPECT_EQ(Verify(signature, "(6:object[num]3:abc(1:x))"), VESK2_ERR_HASH_MISMATCH);
-}
-
-TEST(VerifyTest, NeedsAKeyAndItsArguments) {
-  const Ref<Signature> signature = Imported(TestKey::Rsa(0).Sign(kObject));
-  const Ref<SExpression> object = Parse(kObject);
-  ByteString* const name = signature->GetAlgorithm();
-  ByteString* const value = signature->GetValue();
-  const Ref<PublicKey> none(new PublicKey(nullptr));
-  EXPECT_EQ(none->Verify(name, value, signature->GetHash(), object.get()),
-            VESK2_ERR_NOT_IMPLEMENTED);
-  ZvVesk2::Principal* const key = signature->GetPrincipal();
-  EXPECT_EQ(key->Verify(name, nullptr, signature->GetHash(), object.get()),
-            VESK2_ERR_INVALID_PARAM);
-  EXPECT_EQ(key->VerifyMobile(name, nullptr, 0, nullptr, 0), VESK2_ERR_NOT_IMPLEMENTED);
+  // Display hints are part of what is signed.
+  EXPECT_EQ(Verify(rsa.Sign(kObject), "(6:object3:abc(1:x))"), VESK2_ERR_HASH_MISMATCH);
+  EXPECT_EQ(Verify(rsa.Sign(kObject), "(6:object[num]3:abc(1:x))"), VESK2_ERR_HASH_MISMATCH);
 }
 
 TEST(VerifyTest, ChecksMobileBlocks) {
   const TestKey& dsa = TestKey::Dsa(0);
-  const Ref<PublicKey> key(new PublicKey(nullptr));
-  ASSERT_EQ(key->Import(Wrap(dsa.Public()).get()), 0);
-  const Ref<SExpression> names = Parse("(8:dsa-sha13:dsa7:rsa-pss)");
-  auto* const name = dynamic_cast<ByteString*>(names->First());
-  auto* const other = dynamic_cast<ByteString*>(names->Last());
+  const Ref<PublicKey> key = Read<PublicKey>(dsa.Public());
+  const Ref<ByteString> name = Read<ByteString>("8:dsa-sha1");
+  const Ref<ByteString> other = Read<ByteString>("7:rsa-pss");
   const std::string header = "header of 14 b";
-  const auto check = [&](ByteString* algorithm, const std::string& signedData, std::string data) {
-    std::string block =
-        header + dsa.SignDigest(Digest(header + signedData, "sha1"), "dsa-sha1", "sha1");
+  const auto check = [&](ByteString* algorithm, std::string data) {
+    const std::string digest = Digest(header + "data", "sha1");
+    std::string block = header + dsa.SignDigest(digest, "dsa-sha1", "sha1");
     return key->VerifyMobile(algorithm, reinterpret_cast<unsigned char*>(block.data()), 0,
                              reinterpret_cast<unsigned char*>(data.data()),
                              static_cast<unsigned>(data.size()));
   };
-  EXPECT_EQ(check(name, "data", "data"), 0);
-  EXPECT_EQ(check(name, "data", "dato"), VESK2_ERR_SIGNATURE);
-  EXPECT_EQ(check(other, "data", "data"), VESK2_ERR_SIGNATURE_ID);
-  unsigned char block[54] = {};
-  EXPECT_EQ(key->VerifyMobile(name, block, 54, nullptr, 1), VESK2_ERR_INVALID_PARAM);
+  EXPECT_EQ(check(name.get(), "data"), 0);
+  EXPECT_EQ(check(name.get(), "dato"), VESK2_ERR_SIGNATURE);
+  EXPECT_EQ(check(other.get(), "data"), VESK2_ERR_SIGNATURE_ID);
+  const Ref<PublicKey> rsa = Read<PublicKey>(TestKey::Rsa(0).Public());
+  EXPECT_EQ(rsa->VerifyMobile(name.get(), nullptr, 0, nullptr, 0), VESK2_ERR_NOT_IMPLEMENTED);
 }
 
 TEST(SignatureTest, ReadsHashThenPrincipal) {
   const std::string key = TestKey::Rsa(0).Public();
   const std::string hash = HashOf(kObject);
-  const std::pair<std::string, int> cases[] = {
-      {SignatureText(key, hash, "a", "v"), VESK2_ERR_PARSE_FILE},
-      {"(9:signature" + hash + "(6:k-of-n)(1:a1:v))", VESK2_ERR_PRINCIPAL},
-      {"(9:signature" + hash + key + "(1:a))", VESK2_ERR_PARSE_FILE},
-      {"(9:signature" + hash + key + "(1:a1:v1:w))", VESK2_ERR_PARSE_FILE},
-      {"(9:signature" + hash + key + "(1:a1:v)", VESK2_ERR_PARSE_FILE},
-  };
-  for (const auto& [text, code] : cases) {
-    EXPECT_EQ(Ref<Signature>(new Signature(nullptr))->Import(Wrap(text).get()), code) << text;
-  }
-  const Ref<Signature> signature = Imported(SignatureText(hash, key, "a", "v"));
-  EXPECT_EQ(signature->Import(Wrap("").get()), VESK2_ERR_INVALID_PARAM);
+  ExpectRead<Signature>(SignatureText(hash, key, "a", "v"));
+  ExpectRead<Signature>(SignatureText(key, hash, "a", "v"), VESK2_ERR_PARSE_FILE);
+  ExpectRead<Signature>("(9:signature" + hash + "(6:k-of-n)(1:a1:v))", VESK2_ERR_PRINCIPAL);
+  ExpectRead<Signature>("(9:signature" + hash + key + "(1:a))", VESK2_ERR_PARSE_FILE);
+  ExpectRead<Signature>("(9:signature" + hash + key + "(1:a1:v1:w))", VESK2_ERR_PARSE_FILE);
+  ExpectDamageIsSeen<Signature>(TestKey::Dsa(0).Sign("(1:x)"));
+  ExpectDamageIsSeen<Signature>(
+      List({Str("signature"), HashOf("x", "sha1"), HashOf("y"), "(7:rsa-1.5[bin]5:value)"}));
 }
 
 TEST(SignatureTest, OfACertificateIsItsIssuers) {
   const TestKey& key = TestKey::Rsa(0);
   const std::string text = Cert({.issuer = key.Public(), .subject = HashOf("s")});
   const std::string byHash = Cert({.issuer = HashOf(key.Public()), .subject = HashOf("s")});
-  const struct {
-    std::string cert, signature;
-    int code;
-  } cases[] = {
+  const std::tuple<std::string, std::string, int> cases[] = {
       {text, key.Sign(text), 0},
       {text, key.Sign(text + " "), VESK2_ERR_HASH_MISMATCH},
       {text, TestKey::Rsa(1).Sign(text), VESK2_ERR_SIGNATURE},
@@ -203,10 +148,8 @@ TEST(SignatureTest, OfACertificateIsItsIssuers) {
       {byHash, SignatureText(HashOf(byHash), HashOf(key.Public()), "rsa-1.5", "v"),
        VESK2_ERR_NOT_IMPLEMENTED},
   };
-  for (const auto& row : cases) {
-    const Ref<ZvVesk2::Cert> cert(new ZvVesk2::Cert(nullptr));
-    ASSERT_EQ(cert->Import(Wrap(row.cert).get()), 0);
-    EXPECT_EQ(Imported(row.signature)->Verify(cert.get()), row.code);
+  for (const auto& [cert, signature, code] : cases) {
+    EXPECT_EQ(Read<Signature>(signature)->Verify(Read<ZvVesk2::Cert>(cert).get()), code);
   }
 }
 
@@ -217,28 +160,18 @@ TEST(SignatureTest, CreatesFromParts) {
   std::string value = test.SignDigest(Digest(kObject), "rsa-1.5", "sha256");
   auto* const bytes = reinterpret_cast<unsigned char*>(value.data());
   for (const bool finished : {true, false}) {
-    Ref<PublicKey> key(new PublicKey(nullptr));
+    Ref<PublicKey> key = Read<PublicKey>(test.Public());
     Ref<Hash> hash(new Hash(nullptr));
-    ASSERT_EQ(key->Import(Wrap(test.Public()).get()), 0);
     ASSERT_EQ(hash->Init(ZVCLM_HASH_SHA256), 0);
     ASSERT_EQ(hash->Update(object.get()), 0);
     ASSERT_EQ(finished ? hash->Finalize() : 0, 0);
     // After a failure the parts are still the caller's, whatever the half-built object holds.
-    for (const auto& [name, length, code] : {std::tuple("", 1u, VESK2_ERR_INVALID_PARAM),
-                                             std::tuple("a", 8193u, VESK2_ERR_MAX_BYTE_STRING)}) {
-      Ref<Signature> failed;
-      std::string big(8193, 'v');
-      EXPECT_EQ(Signature::Create(failed.Out(), hash.get(), key.get(), name,
-                                  reinterpret_cast<unsigned char*>(big.data()), length, nullptr),
-                code);
-      EXPECT_TRUE(failed);
-      failed.Reset();
-      EXPECT_EQ(hash->GetRefCount() + key->GetRefCount(), 2);
-    }
     Ref<Signature> signature;
-    EXPECT_EQ(
-        Signature::Create(signature.Out(), hash.get(), key.get(), "rsa-1.5", bytes, 0, nullptr),
-        VESK2_ERR_INVALID_PARAM);
+    EXPECT_EQ(Signature::Create(signature.Out(), hash.get(), key.get(), "", bytes, 1, nullptr),
+              VESK2_ERR_INVALID_PARAM);
+    EXPECT_TRUE(signature);
+    signature.Reset();
+    EXPECT_EQ(hash->GetRefCount() + key->GetRefCount(), 2);
     ASSERT_EQ(Signature::Create(signature.Out(), hash.Release(), key.Release(), "rsa-1.5", bytes,
                                 static_cast<unsigned>(value.size()), nullptr),
               0);

@@ -24,17 +24,14 @@ void Check(bool ok, const char* what) {
 }
 
 EVP_PKEY* MakeDsa() {
-  // The parameters are the slow part; all keys share them.
-  static EVP_PKEY* const parameters = [] {
-    EVP_PKEY* made = nullptr;
-    const ContextPtr context(EVP_PKEY_CTX_new_id(EVP_PKEY_DSA, nullptr), EVP_PKEY_CTX_free);
-    Check(EVP_PKEY_paramgen_init(context.get()) == 1 &&
-              EVP_PKEY_CTX_set_dsa_paramgen_bits(context.get(), 1024) == 1 &&
-              EVP_PKEY_CTX_set_dsa_paramgen_q_bits(context.get(), 160) == 1 &&
-              EVP_PKEY_paramgen(context.get(), &made) == 1,
-          "DSA parameters");
-    return made;
-  }();
+  const ContextPtr made(EVP_PKEY_CTX_new_id(EVP_PKEY_DSA, nullptr), EVP_PKEY_CTX_free);
+  EVP_PKEY* parameters = nullptr;
+  Check(EVP_PKEY_paramgen_init(made.get()) == 1 &&
+            EVP_PKEY_CTX_set_dsa_paramgen_bits(made.get(), 1024) == 1 &&
+            EVP_PKEY_CTX_set_dsa_paramgen_q_bits(made.get(), 160) == 1 &&
+            EVP_PKEY_paramgen(made.get(), &parameters) == 1,
+        "DSA parameters");
+  const std::unique_ptr<EVP_PKEY, decltype(&EVP_PKEY_free)> owned(parameters, EVP_PKEY_free);
   EVP_PKEY* key = nullptr;
   const ContextPtr context(EVP_PKEY_CTX_new(parameters, nullptr), EVP_PKEY_CTX_free);
   Check(EVP_PKEY_keygen_init(context.get()) == 1 && EVP_PKEY_keygen(context.get(), &key) == 1,
@@ -54,20 +51,15 @@ std::string Number(EVP_PKEY* key, const char* name, const char* parameter) {
 
 }  // namespace
 
-const TestKey& TestKey::Rsa(unsigned index) {
-  static std::map<unsigned, TestKey> keys;
-  const auto found = keys.find(index);
-  if (found != keys.end()) return found->second;
-  EVP_PKEY* const key = EVP_RSA_gen(2048);
-  Check(key != nullptr, "RSA key");
-  return keys.emplace(index, TestKey(key)).first->second;
-}
-
-const TestKey& TestKey::Dsa(unsigned index) {
-  static std::map<unsigned, TestKey> keys;
-  const auto found = keys.find(index);
-  if (found != keys.end()) return found->second;
-  return keys.emplace(index, TestKey(MakeDsa())).first->second;
+const TestKey& TestKey::Made(bool dsa, unsigned index) {
+  static std::map<std::pair<bool, unsigned>, TestKey> keys;
+  auto found = keys.find({dsa, index});
+  if (found == keys.end()) {
+    EVP_PKEY* const key = dsa ? MakeDsa() : EVP_RSA_gen(2048);
+    Check(key != nullptr, "key");
+    found = keys.emplace(std::pair(dsa, index), TestKey(key)).first;
+  }
+  return found->second;
 }
 
 std::string TestKey::Public() const {
@@ -116,14 +108,12 @@ std::string TestKey::SignDigest(const std::string& digest, const char* algorithm
   return IsDsa() ? RawDsa(value) : value;
 }
 
-std::string TestKey::Sign(const std::string& canonicalObject, const char* algorithm,
-                          const char* hash) const {
-  if (algorithm == nullptr) algorithm = IsDsa() ? "dsa-sha1" : "rsa-1.5";
-  if (hash == nullptr) hash = IsDsa() ? "sha1" : "sha256";
-  const char* const signedHash = IsDsa() ? "sha1" : hash;
-  const std::string value = SignDigest(Digest(canonicalObject, signedHash), algorithm, signedHash);
-  return List({Str("signature"), HashOf(canonicalObject, hash), Public(),
-               List({Str(algorithm), Str(value)})});
+std::string TestKey::Sign(const std::string& object) const {
+  const char* const algorithm = IsDsa() ? "dsa-sha1" : "rsa-1.5";
+  const char* const hash = IsDsa() ? "sha1" : "sha256";
+  const std::string value = SignDigest(Digest(object, hash), algorithm, hash);
+  return List(
+      {Str("signature"), HashOf(object, hash), Public(), List({Str(algorithm), Str(value)})});
 }
 
 std::string TestKey::PrivatePem() const {

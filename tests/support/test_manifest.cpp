@@ -49,7 +49,7 @@ std::string Signed(const CertText& cert, const TestKey& issuer) {
 }
 
 std::string ManifestFile(ManifestText parts) {
-  const std::string version = List({Str("version"), Str(parts.version), Str(parts.versionText)});
+  const std::string version = List({Str("version"), Str(parts.version), Str("text")});
   const std::string type = List({Str("type"), Str(parts.type)});
   const std::string time = List({Str("time-of-signing"), Str(parts.signingTime)});
   CertText& signer = parts.signer;

@@ -21,7 +21,7 @@ std::string BodyOf(const std::string& directory);
 std::string Signed(const CertText& cert, const TestKey& issuer);
 
 struct ManifestText {
-  std::string version = "1", versionText = "text", type = "plain";
+  std::string version = "1", type = "plain";
   std::string signingTime = "2024-05-01_12:00:00";
   const TestKey* key = &TestKey::Rsa(1);  // the signer's
   const char* hash = "sha256";            // names the digest of what is signed

@@ -11,10 +11,6 @@ std::string Str(std::string_view bytes) {
   return std::to_string(bytes.size()) + ":" + std::string(bytes);
 }
 
-std::string Hint(std::string_view hint, std::string_view bytes) {
-  return "[" + std::string(hint) + "]" + Str(bytes);
-}
-
 std::string List(std::initializer_list<std::string> items) {
   std::string text = "(";
   for (const std::string& item : items) text += item;
@@ -24,7 +20,7 @@ std::string List(std::initializer_list<std::string> items) {
 std::string Tag(std::string_view advanced) {
   std::string text = "(3:tag";
   std::string word;
-  for (const char c : advanced) {
+  for (const char c : std::string(advanced) + " ") {
     const bool paren = c == '(' || c == ')';
     if (!paren && c != ' ') {
       word += c;
@@ -34,7 +30,6 @@ std::string Tag(std::string_view advanced) {
     word.clear();
     if (paren) text += c;
   }
-  if (!word.empty()) text += Str(word);
   return text + ")";
 }
 
@@ -63,26 +58,29 @@ std::string Valid(const std::string& notBefore, const std::string& notAfter) {
   return text + ")";
 }
 
+namespace {
+
+std::string Optional(bool wanted, const std::string& text) { return wanted ? text : ""; }
+
+std::string OptionalValid(const std::string& notBefore, const std::string& notAfter) {
+  return Optional(!notBefore.empty() || !notAfter.empty(), Valid(notBefore, notAfter));
+}
+
+}  // namespace
+
 std::string Cert(const CertText& parts) {
-  std::string text = "(4:cert";
-  if (parts.version) text += "(7:version1:1)";
-  text += List({Str("issuer"), parts.issuer}) + List({Str("subject"), parts.subject});
-  if (parts.propagate) text += "(9:propagate)";
-  text += parts.tag;
-  if (!parts.notBefore.empty() || !parts.notAfter.empty()) {
-    text += Valid(parts.notBefore, parts.notAfter);
-  }
-  if (!parts.comment.empty()) text += List({Str("comment"), Str(parts.comment)});
-  return text + parts.revocation + ")";
+  return List({Str("cert"), Optional(parts.version, "(7:version1:1)"),
+               List({Str("issuer"), parts.issuer}), List({Str("subject"), parts.subject}),
+               Optional(parts.propagate, "(9:propagate)"), parts.tag,
+               OptionalValid(parts.notBefore, parts.notAfter),
+               Optional(!parts.comment.empty(), List({Str("comment"), Str(parts.comment)})),
+               parts.revocation});
 }
 
 std::string AclEntryText(const std::string& subject, const std::string& tag, bool propagate,
                          const std::string& notBefore, const std::string& notAfter) {
-  std::string text = "(5:entry" + List({Str("subject"), subject});
-  if (propagate) text += "(9:propagate)";
-  text += tag;
-  if (!notBefore.empty() || !notAfter.empty()) text += Valid(notBefore, notAfter);
-  return text + ")";
+  return List({Str("entry"), List({Str("subject"), subject}), Optional(propagate, "(9:propagate)"),
+               tag, OptionalValid(notBefore, notAfter)});
 }
 
 }  // namespace vesk2test

@@ -9,9 +9,8 @@
 
 namespace vesk2test {
 
-// Str("abc") is "3:abc", Hint("bin", "abc") "[bin]3:abc".
+// Str("abc") is "3:abc".
 std::string Str(std::string_view bytes);
-std::string Hint(std::string_view hint, std::string_view bytes);
 // The list of items that are canonical already.
 std::string List(std::initializer_list<std::string> items);
 

@@ -5,123 +5,78 @@
 namespace vesk2test {
 namespace {
 
-const std::string& CertPart() {
-  static const std::string text = [] {
-    CertText parts;
-    parts.issuer = KeyText(0);
-    parts.subject = KeyText(1);
-    return Cert(parts);
-  }();
-  return text;
-}
-const std::string& SignaturePart() {
-  static const std::string text = TestKey::Rsa(0).Sign(CertPart());
-  return text;
-}
-std::string Triple() { return CertPart() + SignaturePart() + "(5:owner2:me)"; }
+std::string CertPart() { return Cert({.issuer = KeyText(0), .subject = KeyText(1)}); }
+std::string SignaturePart() { return TestKey::Rsa(0).Sign(CertPart()); }
+const std::string kOwner = "(5:owner2:me)";
+std::string Triple() { return CertPart() + SignaturePart() + kOwner; }
 std::string Sequence(const std::string& items) { return List({Str("sequence"), items}); }
 
-// The first triple as a reader hands it out: all of it or nothing.
-struct First {
-  Ref<ZvVesk2::Cert> cert;
+// The first triple as a reader hands it out, or the number of the error. `extra` is what is left
+// over from an earlier read.
+template <typename... Source>
+std::string First(SExpression* extra, Source... source) {
+  Ref<CertObject> cert;
   Ref<Signature> signature;
-  Ref<SExpression> extra;
-  template <typename... Source>
-  int Import(Source... source) {
-    return CertSequence::Import(cert.Out(), signature.Out(), extra.Out(), source..., nullptr);
-  }
-  std::string Text() const {
-    if (!cert && !signature && !extra) return "";
-    return Canonical(cert) + Canonical(signature) + Canonical(extra);
-  }
-};
+  const int code = CertSequence::Import(cert.Out(), signature.Out(), extra, source..., nullptr);
+  if (code != 0) return std::to_string(code);
+  return Canonical(cert) + Canonical(signature) + Canonical(Ref(extra));
+}
 
-TEST(CertSequence, ReadsCompleteTriples) {
-  constexpr int kBad = VESK2_ERR_PARSE_FILE;
-  const struct {
-    std::string text;
-    int whole, first;
-  } cases[] = {
-      {Sequence(Triple()), 0, 0},
-      {Sequence(Triple() + Triple()), 0, 0},
-      {Sequence(""), 0, kBad},
-      {Sequence(Triple() + "1:x"), kBad, 0},
-      {Sequence(CertPart() + SignaturePart()), kBad, kBad},
-      {Sequence(Triple() + CertPart()), kBad, 0},
-      {List({Str("sequences"), Triple()}), kBad, kBad},
+class CertSequences : public TrustTest {};
+
+TEST_F(CertSequences, ReadsCompleteTriples) {
+  const std::string bad = std::to_string(kBad);
+  const std::tuple<std::string, int, std::string> cases[] = {
+      {Sequence(Triple() + Triple()), 0, Triple()},
+      {Sequence(""), 0, bad},
+      {Sequence(Triple() + "1:x"), kBad, Triple()},
+      {Sequence(CertPart() + SignaturePart()), kBad, bad},
+      {Sequence(Triple() + CertPart()), kBad, Triple()},
+      {List({Str("sequences"), Triple()}), kBad, bad},
   };
-  for (const auto& c : cases) {
-    SCOPED_TRACE(&c - cases);
+  const Ref<SExpression> leftOver = Parse("(1:x)");  // refused by the file form only
+  for (const auto& [text, code, first] : cases) {
     Ref<CertSequence> sequence;
-    EXPECT_EQ(CertSequence::Import(sequence.Out(), Wrap(c.text).get(), nullptr), c.whole);
-    EXPECT_EQ(sequence ? Canonical(sequence) : "", c.whole == 0 ? c.text : "");
-    First first;
-    EXPECT_EQ(first.Import(Wrap(c.text).get()), c.first);
-    EXPECT_EQ(first.Text(), c.first == 0 ? Triple() : "");
+    EXPECT_EQ(CertSequence::Import(sequence.Out(), Wrap(text).get(), nullptr), code) << text;
+    EXPECT_EQ(sequence ? Canonical(sequence) : "", code == 0 ? text : "");
+    EXPECT_EQ(First(leftOver.get(), Wrap(text).get()), first);
   }
+  EXPECT_EQ(First(leftOver.get(), "name", true), std::to_string(kInvalid));
 }
 
-TEST(CertSequence, AnExtraItemLeftOverIsTestedForFilesOnly) {
-  const Ref<SExpression> old = Parse("(1:x)");
-  SExpression* extra = old.get();
-  First first;
-  EXPECT_EQ(
-      CertSequence::Import(first.cert.Out(), first.signature.Out(), extra, "name", true, nullptr),
-      VESK2_ERR_INVALID_PARAM);
-  EXPECT_EQ(CertSequence::Import(first.cert.Out(), first.signature.Out(), extra,
-                                 Wrap(Sequence(Triple())).get(), nullptr),
-            0);
-  first.extra = Ref<SExpression>(extra);
-  EXPECT_EQ(first.Text(), Triple());
-}
-
-class CertSequenceFiles : public TrustTest {};
-
-TEST_F(CertSequenceFiles, NamesAndPaths) {
+TEST_F(CertSequences, NamesAndPaths) {
   home.Write("cert/chain.cert", Sequence(Triple()));
-  other.Write("chain.cert", Sequence(Triple()));
-  other.Write("plain", Sequence(Triple()));
-  const struct {
-    std::string name;
-    bool usePath;
-    int code;
-    std::string file;
-  } cases[] = {
-      {"chain", false, 0, home.File("cert/chain.cert")},
-      {"any/where/chain.cert", false, 0, home.File("cert/chain.cert")},
-      {other.File("chain"), true, 0, other.File("chain.cert")},
-      {other.File("chain.cert"), true, 0, other.File("chain.cert")},
-      {other.File("plain"), true, VESK2_ERR_FILE_OPEN, ""},
-      {"..", false, VESK2_ERR_MEM_ALLOC, ""},  // no such path
+  other.Write("more.cert", Sequence(Triple()));
+  const std::tuple<std::string, bool, int> cases[] = {
+      {"chain", false, 0},
+      {other.File("more"), true, 0},
+      {"more", false, VESK2_ERR_FILE_OPEN},
+      {"..", false, VESK2_ERR_MEM_ALLOC},  // no such path
   };
-  for (const auto& c : cases) {
-    SCOPED_TRACE(c.name);
+  for (const auto& [name, usePath, code] : cases) {
     Ref<CertSequence> sequence;
-    EXPECT_EQ(CertSequence::Import(sequence.Out(), c.name.c_str(), c.usePath, nullptr), c.code);
-    EXPECT_EQ(sequence ? sequence->GetFileName() : "", c.file);
-    First first;
-    EXPECT_EQ(first.Import(c.name.c_str(), c.usePath), c.code);
-    EXPECT_EQ(first.Text(), c.code == 0 ? Triple() : "");
+    EXPECT_EQ(CertSequence::Import(sequence.Out(), name.c_str(), usePath, nullptr), code) << name;
+    EXPECT_EQ(First(nullptr, name.c_str(), usePath), code == 0 ? Triple() : std::to_string(code));
   }
 }
 
-TEST_F(CertSequenceFiles, RequestNames) {
+// Requests have an extension of their own and stay out of every store.
+TEST_F(CertSequences, Requests) {
   const Ref<CertRequest> request(new CertRequest(nullptr));
   ASSERT_EQ(request->Init(), 0);
-  ASSERT_EQ(request->Insert(Read<ZvVesk2::Cert>(CertPart()).Release()), 0);
-  ASSERT_EQ(request->Insert(Read<Signature>(SignaturePart()).Release()), 0);
-  ASSERT_EQ(request->Insert(Parse("(5:owner2:me)").Release()), 0);
-  const char* const cases[][2] = {{"r", "r.req"}, {"s.req", "s.req"}, {"t.REQ", "t.REQ.req"}};
-  for (const auto& [name, file] : cases) {
-    First first;
-    EXPECT_EQ(request->Export(other.File(name).c_str()), 0);
-    EXPECT_EQ(other.Read(file), Sequence(Triple()));
-    EXPECT_EQ(CertRequest::Import(first.cert.Out(), first.signature.Out(), first.extra.Out(),
-                                  other.File(name).c_str(), nullptr),
-              0);
-    EXPECT_EQ(first.Text(), Triple());
+  for (const std::string& part : {CertPart(), SignaturePart(), kOwner}) {
+    ASSERT_EQ(request->Insert(Parse(part).Release()), 0);
   }
-  EXPECT_EQ(request->Export(""), VESK2_ERR_INVALID_PARAM);
+  const std::string file = other.File("t.REQ");
+  EXPECT_EQ(request->Export(file.c_str()), 0);
+  EXPECT_EQ(other.Read("t.REQ.req"), Sequence(Triple()));
+  Ref<CertObject> cert;
+  Ref<Signature> signature;
+  Ref<SExpression> extra;
+  EXPECT_EQ(CertRequest::Import(cert.Out(), signature.Out(), extra.Out(), file.c_str(), nullptr),
+            0);
+  EXPECT_EQ(Canonical(cert) + Canonical(signature) + Canonical(extra), Triple());
+  EXPECT_EQ(request->Export(""), kInvalid);
   EXPECT_EQ(request->Export(other.File("no/directory").c_str()), VESK2_ERR_FILE_OPEN);
 }
 
