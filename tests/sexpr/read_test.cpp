@@ -110,9 +110,9 @@ TEST(Readers, Lists) {
 TEST(Readers, ExpectComparesFromThePositionOnward) {
   constexpr int kNoRoom = VESK2_ERR_BUFFER_OVERFLOW, kOther = VESK2_ERR_UNEXPECTED_CHAR;
   const std::tuple<const char*, const char*, unsigned, int> cases[] = {
-      {"(", "x", 0, kOther},          {"(", "ax", 1, 0},       {"ab", "--b", 1, 0},
-      {"ab", "-a-", 1, kOther},       {"ab", "a", 0, kNoRoom}, {"(", "a", 1, kNoRoom},
-      {"(", "a", 0xffffffff, kNoRoom}};
+      {"(", "x", 0, kOther},           {"(", "ax", 1, 0},       {"ab", "--b", 1, 0},
+      {"ab", "-a-", 1, kOther},        {"ab", "a", 0, kNoRoom}, {"(", "a", 1, kNoRoom},
+      {"(", "a", 0xffffffff, kNoRoom}, {"ab", "-a", 1, kNoRoom}};
   for (const auto& [text, bytes, before, code] : cases) {
     const Input input(bytes);
     unsigned pos = before;

@@ -158,7 +158,7 @@ TEST(Writers, RoomInACallersBuffer) {
       {true, "(2:x 1:((1:a1:b))", 0, 64, "(x  ( (a b))"},
       {true, "(1:a)", 2, 7, "--(a)"},
       {true, "(1:a)", 2, 6, ""},
-      {true, "(9:aaaaaaaaa1:b)", 0, 9, "( b)"},
+      {true, "(2:ab)", 0, 4, "()"},
       {true, "(1:a1:b1:c1:d1:e)", 0, 6, ""},
   };
   for (const auto& [advanced, text, start, size, written] : cases) {
