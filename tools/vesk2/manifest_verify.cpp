@@ -157,8 +157,6 @@ bool JudgedTree(const Manifest& manifest, int code) {
     throw Trouble("the ACL store cannot be loaded; nothing is trusted (" + CodeName(code) + ")");
   }
   if (code < 0 || code == VESK2_ERR_MEM_ALLOC) throw Trouble(Reason(code));
-  // A body that does not parse has been read to the end of the file: this tells the byte.
-  ReadListing(options.manifest, options.directory);
   Malformed(options.manifest, manifest.GetReadPosition(), "manifest", code);
 }
 
