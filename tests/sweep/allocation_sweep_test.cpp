@@ -228,13 +228,16 @@ std::vector<Case> ObjectCases() {
       Imports<CertObject>("Cert::Import", W().cert),
       Imports<AclEntry>("AclEntry::Import", AclEntryText(W().vendor, W().revokeTag)),
       Imports<CrlSequence>("CrlSequence::Import", W().list),
-      Plain("HashFile",
-            [] {
-              unsigned char digest[32];
-              unsigned length = sizeof digest;
-              const int code = Hash::HashFile(W().File("chain.cert"), digest, &length, nullptr);
-              return Outcome{code, length == (code == 0 ? 32u : 0u)};
-            }),
+      // Without its large block it hashes in smaller ones.
+      Plain(
+          "HashFile",
+          [] {
+            unsigned char digest[32];
+            unsigned length = sizeof digest;
+            const int code = Hash::HashFile(W().File("chain.cert"), digest, &length, nullptr);
+            return Outcome{code, length == (code == 0 ? 32u : 0u)};
+          },
+          true),
       {"Signature::Verify",
        [signature] {
          return [read = KeptAs<Signature>(signature), cert = KeptAs<CertObject>(W().cert)] {
@@ -369,6 +372,28 @@ std::vector<Case> TrustCases() {
               const bool made = bool(cert) && bool(signature) && bool(extra);
               return Outcome{code, code == 0 ? made : !cert && !signature && !extra};
             }),
+      // Its key is revoked: the answer is never a yes.
+      {"CertSequence::Verify of a revoked chain",
+       [] {
+         const CertText leaf{
+             .issuer = W().vendor, .subject = W().revokedKey, .tag = Tag("install")};
+         W().dir.Write("revoked.cert",
+                       List({Str("sequence"), Signed(leaf, TestKey::Rsa(0)), "(1:x)"}));
+         return [tag = Kept(Tag("install"))] {
+           const int code = CertSequence::Verify(nullptr, tag.get(), nullptr, nullptr,
+                                                 W().File("revoked"), true, nullptr);
+           return Outcome{code == VESK2_ERR_CERT_REVOKED ? 0 : VESK2_ERR_MEM_ALLOC, code != 0};
+         };
+       },
+       true},
+      {"CertSequence::Verify",
+       [] {
+         return [tag = Kept(Tag("install (app calc)"))] {
+           return Outcome{CertSequence::Verify(nullptr, tag.get(), nullptr, nullptr,
+                                               W().File("chain"), true, nullptr)};
+         };
+       },
+       true},
       {"IsSubset",
        [] {
          return [narrow = Kept(Tag("install (app calc)")), wide = Kept(Tag("install"))] {
@@ -423,6 +448,22 @@ std::vector<Case> FlatCases() {
               const int code = CreateManifestContextA(&manifest, "dir", "file", "(install)");
               const bool fits = (manifest != nullptr) == (code == 0);
               DeleteManifestContext(manifest);
+              return Outcome{code, fits};
+            }),
+      Plain("Vesk2CertRead",
+            [] {
+              Vesk2CertInfoStruct* chain = nullptr;
+              const int code = Vesk2CertRead(&chain, W().File("chain"));
+              const bool fits = (chain != nullptr) == (code == 0);
+              if (chain != nullptr) (void)Vesk2CertFree(chain);
+              return Outcome{code, fits};
+            }),
+      Plain("Vesk2CrlReadA",
+            [] {
+              Vesk2CrlInfoStruct* record = nullptr;
+              const int code = Vesk2CrlReadA(&record, W().File("lists/list"), nullptr);
+              const bool fits = (record != nullptr) == (code == 0);
+              (void)Vesk2CrlFree(record);
               return Outcome{code, fits};
             }),
       // A list that could not be stored does not make the tree any worse.
