@@ -1,40 +1,16 @@
-// Order of byte strings, and equality of atoms and chains.
+// Order of byte strings, and equality of atoms.
 //
 // The order sees a 0 byte as the end: a string with an embedded 0 equals its beginning. Stored
 // grants are judged by it, so whoever issues a tag keeps 0 bytes out of it.
 #include <algorithm>
-#include <cstring>
 
 #include "src/engine/model.h"
 
 namespace ZvVesk2::Engine {
 namespace {
 
-bool SameBytes(const unsigned char* a, size_t a_length, const unsigned char* b, size_t b_length) {
-  return a_length == b_length && std::equal(a, a + a_length, b);
-}
-
 bool SameHint(const spki_atom* a, const spki_atom* b) {
-  return SameBytes(a->hint, a->hint_length, b->hint, b->hint_length);
-}
-
-// Every byte counts here, those behind a 0 too: identity must agree with the canonical bytes.
-bool SameAtom(const spki_atom* a, const spki_atom* b) {
-  return a == b || (SameHint(a, b) && SameBytes(a->data, a->length, b->data, b->length));
-}
-
-bool SameElem(const spki_elem* a, const spki_elem* b) {
-  if (a->kind != b->kind) return false;
-  switch (a->kind) {
-    case SPKI_ELEM_KEYWORD:
-      return a->value.keyword == b->value.keyword;
-    case SPKI_ELEM_HEAD:
-    case SPKI_ELEM_STRING:
-      return SameAtom(a->value.atom, b->value.atom);
-    case SPKI_ELEM_LIST:
-      return spki_chain_equal(a->value.list, b->value.list);
-  }
-  return false;
+  return a->hint_length == b->hint_length && std::equal(a->hint, a->hint + a->hint_length, b->hint);
 }
 
 }  // namespace
@@ -77,13 +53,6 @@ bool spki_atom_equal(const spki_atom* a, const spki_atom* b) {
   if (a == nullptr || b == nullptr) return a == b;
   return SameHint(a, b) &&
          spki_cmp_bytes(a->data, a->length, b->data, b->length) == SPKI_ORDER_EQUAL;
-}
-
-bool spki_chain_equal(const spki_elem* a, const spki_elem* b) {
-  for (; a != b; a = a->next, b = b->next) {
-    if (a == nullptr || b == nullptr || !SameElem(a, b)) return false;
-  }
-  return true;
 }
 
 }  // namespace ZvVesk2::Engine

@@ -180,8 +180,6 @@ int spki_cmp_padded(const unsigned char* a, size_t a_length, const unsigned char
                     size_t b_length, unsigned char pad);
 // Same hint and equal by spki_cmp_bytes. Null equals null only.
 bool spki_atom_equal(const spki_atom* a, const spki_atom* b);
-// Whether two chains have the same canonical bytes. Null equals null only.
-bool spki_chain_equal(const spki_elem* a, const spki_elem* b);
 
 // ---- Canonical text ----
 
