@@ -361,8 +361,10 @@ VESK2_API int Vesk2CertReadA(Vesk2CertInfoStruct** out, const char* path);
 VESK2_API int Vesk2CertFree(Vesk2CertInfoStruct* chain);
 
 /* Vesk2CertVerify proves that a chain grants the authorization `tagText` (the body of a tag, as in
- * CreateManifestContext) to the subject of its first certificate for the period from `notBefore` to
- * `notAfter` (0: not given), on this machine's word. May be called any number of times.
+ * CreateManifestContext) to the subject of its first certificate, on this machine's word. The
+ * chain's period must meet the one from `notBefore` to `notAfter`; give one moment twice to ask
+ * about that moment. 0 is not given: with neither, a chain that has run out passes. May be called
+ * any number of times.
  *   0                              granted
  *   VESK2_ERR_PARAM_NULL           a null chain
  *   VESK2_ERR_INVALID_SEQUENCE     not whole triples; VESK2_ERR_SIGNATURE and its kin
