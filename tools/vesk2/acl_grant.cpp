@@ -23,7 +23,6 @@ struct Options {
   std::string comment;
   std::string name;
   bool force = false;
-  StoreOptions stores;
 };
 
 Ref<AclEntry> MakeEntry(const Options& options) {
@@ -60,7 +59,6 @@ std::string EntryPath(const Options& options) {
 }
 
 ExitCode Run(const Options& options) {
-  UseStores(options.stores);
   const Ref<AclEntry> entry = MakeEntry(options);
   const std::string path = EntryPath(options);
   // One entry that cannot be read back would stop the whole store from loading.
@@ -90,7 +88,6 @@ Action DefineAclGrant(CLI::App& app) {
   app.add_option("--comment", options->comment, "A text for people");
   app.add_option("--name", options->name, "Name of the entry [the key file's name]");
   app.add_flag("-f,--force", options->force, "Replace an entry of that name");
-  AddStoreOptions(app, options->stores);
   return [options] { return Run(*options); };
 }
 

@@ -2,7 +2,6 @@
 #include "tools/vesk2/command.h"
 #include "tools/vesk2/issue.h"
 #include "tools/vesk2/report.h"
-#include "tools/vesk2/stores.h"
 
 namespace vesk2_command {
 namespace {
@@ -11,11 +10,9 @@ using ZvVesk2::CertSequence;
 
 struct Options {
   std::string tag;
-  StoreOptions stores;
 };
 
 ExitCode Run(const Options& options) {
-  UseStores(options.stores);
   const Ref<SExpression> tag = ParseTag(options.tag);
   const Text directory(CertSequence::CalcDir(ZvVesk2::StorageHome));
   if (!directory) throw Trouble("there is no home store: --home names one");
@@ -38,7 +35,6 @@ Action DefineCertFind(CLI::App& app) {
   auto options = std::make_shared<Options>();
   app.add_option("--tag", options->tag, "What the first certificate of a chain must cover")
       ->required();
-  AddStoreOptions(app, options->stores);
   return [options] { return Run(*options); };
 }
 

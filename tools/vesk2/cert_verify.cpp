@@ -14,7 +14,6 @@ struct Options {
   std::string tag;
   std::string at;
   PeriodOptions period;
-  StoreOptions stores;
 };
 
 Period AskedPeriod(const Options& options) {
@@ -77,7 +76,6 @@ void ExplainGrant(const CertChain& chain, const std::vector<ChainLink>& links, S
 }
 
 ExitCode Run(const Options& options) {
-  UseStores(options.stores);
   const Ref<SExpression> tag = ParseTag(options.tag);
   const Period period = AskedPeriod(options);
   const CertChain chain = ReadCertChain(options.file);
@@ -86,11 +84,10 @@ ExitCode Run(const Options& options) {
 
   const int code = chain->Verify(nullptr, tag.get(), period.notBefore.get(), period.notAfter.get());
   if (code == 0) {
-    Say("yes: " + SubjectText(*links[0].cert->GetSubject()) + " is granted " + TagText(tag.get()));
-    return kYes;
+    return Yes(SubjectText(*links[0].cert->GetSubject()) + " is granted " + TagText(tag.get()));
   }
-  if (code < 0 || code == VESK2_ERR_MEM_ALLOC) throw Trouble(Reason(code));
-  Say("no: " + Reason(code));
+  if (code < 0 || code == VESK2_ERR_MEM_ALLOC) Check(code, Escape(options.file));
+  const ExitCode verdict = No(code, CodeWords(code));
   for (size_t i = 0; i < links.size(); ++i) {
     ExplainLink(links[i], "certificate " + std::to_string(i + 1) + " (issuer " +
                               SubjectText(*links[i].cert->GetIssuer()) + ")");
@@ -98,7 +95,7 @@ ExitCode Run(const Options& options) {
   if (code == VESK2_ERR_NOT_AUTHORIZED || code == VESK2_ERR_PACKAGE_NOT_GRANTED) {
     ExplainGrant(chain, links, tag.get(), period);
   }
-  return kNo;
+  return verdict;
 }
 
 }  // namespace
@@ -112,7 +109,6 @@ Action DefineCertVerify(CLI::App& app) {
   app.add_option("--at", options->at, "Authorized at this moment [now]")
       ->excludes("--not-before")
       ->excludes("--not-after");
-  AddStoreOptions(app, options->stores);
   return [options] { return Run(*options); };
 }
 

@@ -1,10 +1,13 @@
-// command.h: the shape of a subcommand. main.cpp holds the table of them; each lives in a file of
-// its own and is one function that declares its options and returns what to do with them.
+// command.h: the shape of a subcommand. commands.cpp holds the table of them; each lives in a file
+// of its own and is one function that declares its options and returns what to do with them. What
+// every subcommand takes (--json, --quiet, the store roots, ...) is declared and used by run.cpp.
 #ifndef VESK2_TOOLS_COMMAND_H
 #define VESK2_TOOLS_COMMAND_H
 
 #include <CLI/CLI.hpp>
 #include <functional>
+#include <memory>
+#include <span>
 
 namespace vesk2_command {
 
@@ -15,12 +18,24 @@ enum ExitCode : int { kYes = 0, kNo = 1, kTrouble = 2 };
 // Runs a subcommand whose options have been parsed; throws Trouble (report.h) for exit 2.
 using Action = std::function<ExitCode()>;
 
+// A row of the table, from which parsing, --help, the manual pages and the shells' completion come.
 struct Command {
   const char* noun;
-  const char* verb;
-  const char* about;
+  const char* verb;      // empty for a noun that is a command itself
+  const char* about;     // one line
+  const char* examples;  // a command line a line
   Action (*define)(CLI::App& app);
 };
+struct Noun {
+  const char* name;
+  const char* about;
+  const char* description;  // paragraphs for the manual page
+};
+std::span<const Command> Commands();
+std::span<const Noun> Nouns();
+
+// Runs one command line, argv[0] included, and returns its exit status. Nothing throws.
+int RunCommand(int argc, const char* const* argv);
 
 Action DefineKeyNew(CLI::App& app);
 Action DefineKeyShow(CLI::App& app);
@@ -35,6 +50,7 @@ Action DefineCrlShow(CLI::App& app);
 Action DefineCrlVerify(CLI::App& app);
 Action DefineManifestSign(CLI::App& app);
 Action DefineManifestVerify(CLI::App& app);
+Action DefineVersion(CLI::App& app);
 
 }  // namespace vesk2_command
 

@@ -6,14 +6,12 @@
 #include "tools/vesk2/crl_file.h"
 #include "tools/vesk2/inspect.h"
 #include "tools/vesk2/report.h"
-#include "tools/vesk2/stores.h"
 
 namespace vesk2_command {
 namespace {
 
 struct Options {
   std::string source;
-  StoreOptions stores;
 };
 
 // The list files of a directory, sorted, or the one file.
@@ -80,7 +78,6 @@ ExitCode Offer(const std::string& path, SExpression* acls) {
 }
 
 ExitCode Run(const Options& options) {
-  UseStores(options.stores);
   const std::vector<std::string> files = ListFiles(options.source);
   const Ref<SExpression> acls = LoadAcls();
   ExitCode worst = kYes;
@@ -102,7 +99,6 @@ Action DefineCrlImport(CLI::App& app) {
   auto options = std::make_shared<Options>();
   app.add_option("source", options->source, "A revocation list, or a directory of them (*.crl)")
       ->required();
-  AddStoreOptions(app, options->stores);
   app.footer(
       "Exit status: 0 when every list is in the store now, 1 when one was refused, 2 when one "
       "could\nnot be read or written.");

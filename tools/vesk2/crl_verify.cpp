@@ -3,7 +3,6 @@
 #include "tools/vesk2/crl_file.h"
 #include "tools/vesk2/inspect.h"
 #include "tools/vesk2/report.h"
-#include "tools/vesk2/stores.h"
 
 namespace vesk2_command {
 namespace {
@@ -12,7 +11,6 @@ struct Options {
   std::string file;
   std::string tag;
   std::string at = "now";
-  StoreOptions stores;
 };
 
 // Why the list does not count at the moment asked about; empty when it does.
@@ -34,7 +32,6 @@ std::string WhyNot(CrlSequence& list, SExpression* tag, SExpression* acls, TimeS
 }
 
 ExitCode Run(const Options& options) {
-  UseStores(options.stores);
   Ref<SExpression> tag;
   if (!options.tag.empty()) tag = ParseRevocationTag(options.tag);
   const Ref<TimeStamp> at = ParseTime(options.at, false);
@@ -52,7 +49,6 @@ Action DefineCrlVerify(CLI::App& app) {
   app.add_option("file", options->file, "The revocation list file")->required();
   app.add_option("--tag", options->tag, "The source that it must be of");
   app.add_option("--at", options->at, "Valid at this moment")->capture_default_str();
-  AddStoreOptions(app, options->stores);
   return [options] { return Run(*options); };
 }
 

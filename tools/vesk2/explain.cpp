@@ -284,4 +284,12 @@ std::vector<std::string> ExplainStore() {
   return reasons;
 }
 
+void ThrowNoStore(int code) {
+  for (const std::string& reason : ExplainStore()) Note(reason);
+  Trouble trouble("the ACL store cannot be loaded; nothing is trusted (" + CodeName(code) + ")",
+                  "no-acl-store");
+  trouble.code = code;
+  throw trouble;
+}
+
 }  // namespace vesk2_command

@@ -27,6 +27,8 @@ std::vector<std::string> ExplainAuthority(const Question& question, int code);
 
 // Why the ACL store yields no entry.
 std::vector<std::string> ExplainStore();
+// Notes that, and throws the Trouble for a store without which nothing can be answered.
+[[noreturn]] void ThrowNoStore(int code);
 
 }  // namespace vesk2_command
 

@@ -18,7 +18,7 @@ namespace vesk2_command {
 namespace {
 
 [[noreturn]] void Fail(const std::string& path, int error) {
-  throw Trouble(Escape(path) + ": " + std::strerror(error));
+  throw FileTrouble(path, std::strerror(error), "io");
 }
 
 class Descriptor {
@@ -82,6 +82,12 @@ class Temporary {
 
 }  // namespace
 
+Trouble FileTrouble(const std::string& path, const std::string& text, const std::string& reason) {
+  Trouble trouble(Escape(path) + ": " + text, reason);
+  trouble.file = Escape(path);
+  return trouble;
+}
+
 std::string WhyUnreadable(const std::string& path) {
   struct stat status = {};
   if (stat(path.c_str(), &status) != 0) return std::strerror(errno);
@@ -97,7 +103,7 @@ std::string ReadFile(const std::string& path, size_t limit) {
   if (file.get() < 0) Fail(path, errno);
   struct stat status = {};
   if (fstat(file.get(), &status) != 0) Fail(path, errno);
-  if (!S_ISREG(status.st_mode)) throw Trouble(Escape(path) + ": not a regular file");
+  if (!S_ISREG(status.st_mode)) throw FileTrouble(path, "not a regular file", "io");
   std::string text(limit + 1, '\0');
   size_t size = 0;
   while (size < text.size()) {
@@ -107,7 +113,7 @@ std::string ReadFile(const std::string& path, size_t limit) {
     if (got == 0) break;
     size += static_cast<size_t>(got);
   }
-  if (size > limit) throw Trouble(Escape(path) + ": too large");
+  if (size > limit) throw FileTrouble(path, "too large", "io");
   text.resize(size);
   return text;
 }
@@ -115,7 +121,7 @@ std::string ReadFile(const std::string& path, size_t limit) {
 void RefuseExisting(const std::string& path, bool force) {
   struct stat status = {};
   if (force || lstat(path.c_str(), &status) != 0) return;
-  throw Trouble(Escape(path) + ": exists; --force replaces it");
+  throw FileTrouble(path, "exists; --force replaces it", "exists");
 }
 
 void WriteFile(const std::string& path, std::string_view bytes, const WriteOptions& options) {

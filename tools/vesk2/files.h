@@ -8,7 +8,12 @@
 #include <string>
 #include <string_view>
 
+#include "tools/vesk2/report.h"
+
 namespace vesk2_command {
+
+// A Trouble "PATH: TEXT" that names the file for machines too.
+Trouble FileTrouble(const std::string& path, const std::string& text, const std::string& reason);
 
 // Why a file that the library could not open cannot be read, in words.
 std::string WhyUnreadable(const std::string& path);

@@ -78,8 +78,7 @@ Ref<SExpression> LoadAcls() {
   Ref<SExpression> acls;
   const int code = AclEntry::Import(acls.Out(), nullptr, nullptr);
   if (code == 0) return acls;
-  for (const std::string& reason : ExplainStore()) Note(reason);
-  throw Trouble("the ACL store cannot be loaded; nothing is trusted (" + CodeName(code) + ")");
+  ThrowNoStore(code);
 }
 
 }  // namespace vesk2_command

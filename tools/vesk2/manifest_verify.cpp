@@ -8,7 +8,6 @@
 #include "tools/vesk2/files.h"
 #include "tools/vesk2/manifest_file.h"
 #include "tools/vesk2/report.h"
-#include "tools/vesk2/stores.h"
 #include "tools/vesk2/tree.h"
 
 #include <vesk2/manifest.h>
@@ -28,7 +27,6 @@ struct Options {
   bool allowLinks = false;
   std::string aclDirectory;
   std::vector<std::string> ignored;
-  StoreOptions stores;
 };
 
 Period AskedPeriod(const Options& options) {
@@ -150,13 +148,12 @@ bool JudgedTree(const Manifest& manifest, int code) {
 
 [[noreturn]] void ThrowTrouble(const Options& options, const Manifest& manifest, int code) {
   if (code == VESK2_ERR_OPEN_MANIFEST_FILE) {
-    throw Trouble(Escape(options.manifest) + ": " + WhyUnreadable(options.manifest));
+    throw FileTrouble(options.manifest, WhyUnreadable(options.manifest), "io");
   }
   if (code == VESK2_ERR_FILE_NOT_FOUND || code == VESK2_ERR_FIND_DIR) {
-    for (const std::string& reason : ExplainStore()) Note(reason);
-    throw Trouble("the ACL store cannot be loaded; nothing is trusted (" + CodeName(code) + ")");
+    ThrowNoStore(code);
   }
-  if (code < 0 || code == VESK2_ERR_MEM_ALLOC) throw Trouble(Reason(code));
+  if (code < 0 || code == VESK2_ERR_MEM_ALLOC) Check(code, Escape(options.manifest));
   Malformed(options.manifest, manifest.GetReadPosition(), "manifest", code);
 }
 
@@ -167,13 +164,13 @@ ExitCode AnswerAuthority(const Options& options, const Manifest& manifest, Quest
     for (const std::string& reason : reasons) Note(reason);
     ThrowTrouble(options, manifest, code);
   }
-  Say("no: " + Reason(code));
+  const ExitCode verdict = No(code, CodeWords(code));
   for (const std::string& reason : reasons) Note(reason);
   if (reasons.empty()) {
     Note("the certificates and the ACL entries do not combine to what was asked, " +
          TagText(question.tag));
   }
-  return kNo;
+  return verdict;
 }
 
 ExitCode AnswerTree(const Options& options, const Manifest& manifest,
@@ -184,13 +181,14 @@ ExitCode AnswerTree(const Options& options, const Manifest& manifest,
   const std::vector<Finding> findings =
       TreeFindings(manifest, options.allowLinks ? none : notes.leaving, options.allowExtra);
   const std::string summary = Summary(findings);
+  ExitCode verdict = kNo;
   if (code == 0 && summary.empty()) {
     const SignatureBlock block = ReadSignatureBlock(options.manifest);
-    Say("yes: " + std::to_string(CountFiles(manifest.GetValid())) + " files of " +
-        Escape(options.directory) + " are as signed at " + StampText(*block.signedAt) + " by " +
-        Fingerprint(*block.certs.front().cert->GetIssuer()));
+    verdict = Yes(std::to_string(CountFiles(manifest.GetValid())) + " files of " +
+                  Escape(options.directory) + " are as signed at " + StampText(*block.signedAt) +
+                  " by " + Fingerprint(*block.certs.front().cert->GetIssuer()));
   } else {
-    Say("no: " + summary + (code != 0 ? " (" + CodeName(code) + ")" : ""));
+    verdict = code != 0 ? No(code, summary) : No("link-leaves-tree", summary);
     PrintFindings(findings);
   }
   if (!options.allowExtra) {
@@ -198,11 +196,10 @@ ExitCode AnswerTree(const Options& options, const Manifest& manifest,
       Note("note: " + Escape(name) + " is not listed; the top directory may hold more");
     }
   }
-  return code == 0 && summary.empty() ? kYes : kNo;
+  return verdict;
 }
 
 ExitCode Run(const Options& options) {
-  UseStores(options.stores);
   RealDirectory(options.directory);
   const Ref<SExpression> tag = ParseTag(options.tag);
   Period period = AskedPeriod(options);
@@ -236,7 +233,6 @@ Action DefineManifestVerify(CLI::App& app) {
   app.add_option("--acl-dir", options->aclDirectory, "Trust the entries of this directory too");
   app.add_option("--ignore", options->ignored, "Leave this entry out (a path below the directory)")
       ->allow_extra_args(false);
-  AddStoreOptions(app, options->stores);
   return [options] { return Run(*options); };
 }
 

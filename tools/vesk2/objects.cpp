@@ -26,7 +26,7 @@ bool HasEmptyWord(const SExpression& list) {
 
 Buffer OpenBuffer(const std::string& path) {
   Buffer buffer(ZVsysutil::zv_buffer_wrap_file(path.c_str()));
-  if (!buffer) throw Trouble(Escape(path) + ": " + WhyUnreadable(path));
+  if (!buffer) throw FileTrouble(path, WhyUnreadable(path), "io");
   return buffer;
 }
 
@@ -37,12 +37,19 @@ Buffer WrapBytes(std::string_view bytes) {
 }
 
 void Check(int code, const std::string& what) {
-  if (code != 0) throw Trouble(what + ": " + Reason(code));
+  if (code == 0) return;
+  Trouble trouble(what + ": " + Reason(code), ReasonWord(code));
+  trouble.code = code;
+  throw trouble;
 }
 
 void Malformed(const std::string& path, size_t offset, const std::string& kind, int code) {
-  throw Trouble(Escape(path) + ": byte " + std::to_string(offset) + ": malformed " + kind + ": " +
-                Reason(code));
+  Trouble trouble = FileTrouble(
+      path, "byte " + std::to_string(offset) + ": malformed " + kind + ": " + Reason(code),
+      "malformed");
+  trouble.code = code;
+  trouble.byte = offset;
+  throw trouble;
 }
 
 char* NewText(const std::string& text) {

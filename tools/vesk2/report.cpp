@@ -1,9 +1,11 @@
-// report.cpp: escaping, the two output streams and the words for codes.
+// report.cpp: escaping, the output for people and for machines, and the words for codes.
 #include "tools/vesk2/report.h"
 
 #include <array>
+#include <cctype>
 #include <cstdio>
 #include <cstring>
+#include <vector>
 
 #include <vesk2.h>
 
@@ -41,6 +43,51 @@ bool IsUnsafe(char32_t point) {
   return false;
 }
 
+constexpr const char* kGreen = "\033[32m";
+constexpr const char* kRed = "\033[31m";
+
+// What has been said so far; a process answers one question.
+struct State {
+  Style style;
+  std::string command;
+  std::string reason;
+  int code = 0;
+  std::string message;
+  std::string file;
+  std::optional<uint64_t> byte;
+  std::vector<std::string> notes;
+  Json result;
+};
+State report;
+
+std::string Colored(const std::string& word, const char* color) {
+  return report.style.color ? color + word + "\033[0m" : word;
+}
+
+void WriteError(const std::string& line) {
+  std::fflush(stdout);  // keeps the order of lines where both go to one terminal
+  std::fprintf(stderr, "%s\n", line.c_str());
+}
+
+void WriteJson(ExitCode code) {
+  constexpr const char* kVerdicts[] = {"yes", "no", "trouble"};
+  constexpr const char* kReasons[] = {"ok", "no", "trouble"};
+  Json answer = {
+      {"schema", "vesk2.answer/1"},
+      {"command", report.command},
+      {"verdict", kVerdicts[code]},
+      {"exit", static_cast<int>(code)},
+      {"reason", report.reason.empty() ? kReasons[code] : report.reason},
+      {"code", report.code},
+      {"message", report.message},
+  };
+  if (!report.file.empty()) answer["file"] = report.file;
+  if (report.byte) answer["byte"] = *report.byte;
+  answer["notes"] = report.notes;
+  answer["result"] = report.result.is_null() ? Json::object() : report.result;
+  std::printf("%s\n", answer.dump().c_str());
+}
+
 }  // namespace
 
 std::string Hex(std::string_view bytes) {
@@ -69,17 +116,65 @@ std::string Escape(std::string_view text) {
   return out;
 }
 
-void Say(const std::string& line) { std::printf("%s\n", line.c_str()); }
-
-void Note(const std::string& line) {
-  std::fflush(stdout);  // keeps the order of lines where both go to one terminal
-  std::fprintf(stderr, "%s\n", line.c_str());
+void StartReport(const std::string& command, const Style& style) {
+  report = State();
+  report.style = style;
+  report.command = command;
 }
 
-ExitCode Finish(ExitCode code) {
+const Style& GetStyle() { return report.style; }
+
+void Say(const std::string& line) {
+  if (!report.style.json) std::printf("%s\n", line.c_str());
+}
+
+void Note(const std::string& line) {
+  report.notes.push_back(line);
+  if (!report.style.quiet) WriteError(line);
+}
+
+void Detail(const std::string& line) {
+  if (report.style.verbose) Note(line);
+}
+
+Json& Result() { return report.result; }
+
+ExitCode Yes(const std::string& text) {
+  report.message = text;
+  Say(Colored("yes", kGreen) + ": " + text);
+  return kYes;
+}
+
+ExitCode No(int code, const std::string& text) {
+  report.reason = ReasonWord(code);
+  report.code = code;
+  report.message = text;
+  Say(Colored("no", kRed) + ": " + (text.empty() ? "" : text + " ") + "(" + CodeName(code) + ")");
+  return kNo;
+}
+
+ExitCode No(const std::string& reason, const std::string& text) {
+  report.reason = reason;
+  report.message = text;
+  Say(Colored("no", kRed) + ": " + text);
+  return kNo;
+}
+
+ExitCode FinishReport(ExitCode code) {
+  if (report.style.json) WriteJson(code);
   if (std::fflush(stdout) == 0 && std::ferror(stdout) == 0) return code;
-  Note(std::string("vesk2: standard output: ") + std::strerror(errno));
+  WriteError(std::string("vesk2: standard output: ") + std::strerror(errno));
   return kTrouble;
+}
+
+ExitCode FinishReport(const Trouble& trouble) {
+  WriteError(std::string("vesk2: ") + trouble.what());
+  report.reason = trouble.reason;
+  report.code = trouble.code;
+  report.message = trouble.what();
+  report.file = trouble.file;
+  report.byte = trouble.byte;
+  return FinishReport(kTrouble);
 }
 
 std::string LibraryVersion() {
@@ -99,6 +194,16 @@ std::string CodeName(int code) {
       return "code " + std::to_string(code);
   }
 #undef VESK2_NAME_ROW
+}
+
+std::string ReasonWord(int code) {
+  if (code == 0) return "ok";
+  std::string word = CodeName(code);
+  for (const std::string_view prefix : {"VESK2_ERR_", "VESK2_"}) {
+    if (word.starts_with(prefix)) word.erase(0, prefix.size());
+  }
+  for (char& c : word) c = c == '_' || c == ' ' ? '-' : static_cast<char>(std::tolower(c));
+  return word;
 }
 
 std::string CodeWords(int code) {

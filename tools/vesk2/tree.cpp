@@ -177,11 +177,11 @@ std::set<std::string> ListedInRoot(BodyDirectory& root) {
 std::string RealDirectory(const std::string& directory) {
   struct stat status = {};
   if (stat(directory.c_str(), &status) != 0) {
-    throw Trouble(Escape(directory) + ": " + std::strerror(errno));
+    throw FileTrouble(directory, std::strerror(errno), "io");
   }
-  if (!S_ISDIR(status.st_mode)) throw Trouble(Escape(directory) + ": not a directory");
+  if (!S_ISDIR(status.st_mode)) throw FileTrouble(directory, "not a directory", "io");
   const std::string real = RealPath(directory);
-  if (real.empty()) throw Trouble(Escape(directory) + ": " + std::strerror(errno));
+  if (real.empty()) throw FileTrouble(directory, std::strerror(errno), "io");
   return real;
 }
 

@@ -1,0 +1,64 @@
+// commands.cpp: the table of subcommands.
+#include "tools/vesk2/command.h"
+
+namespace vesk2_command {
+namespace {
+
+constexpr Noun kNouns[] = {
+    {"key", "Make and show keys",
+     "Keys are the principals of the system: a grant names a key, and a key signs. The private "
+     "half is a PEM file (PKCS#8), the public half a canonical S-expression."},
+    {"acl", "Decide what this machine trusts",
+     "Every answer starts in the access-control entries of the machine's store. An entry trusts a "
+     "key for a tag, unsigned: whoever may write the store decides."},
+    {"cert", "Pass authority on to another key, and check how it came",
+     "A certificate passes what its issuer was granted, or less, on to its subject."},
+    {"crl", "Take authority back",
+     "A revocation list names certificates and keys that are not to be honoured any more. The "
+     "machine believes a list when its access-control entries let the signer revoke."},
+    {"manifest", "Sign a directory, and check one",
+     "A manifest lists every file of a directory with its digest, and is signed. Verifying asks "
+     "two things: is the directory as listed, and was the signer authorized?"},
+    {"version", "Show the version of the command and the library", ""},
+};
+
+constexpr Command kCommands[] = {
+    {"key", "new", "Make a key pair: NAME.pem (private) and NAME.pub", "vesk2 key new -o vendor",
+     DefineKeyNew},
+    {"key", "show", "Show type, size and fingerprint of a key", "vesk2 key show vendor.pub",
+     DefineKeyShow},
+    {"acl", "grant", "Write an entry into the ACL store: a root of trust",
+     "vesk2 acl grant --subject vendor.pub --tag '(install)' --propagate", DefineAclGrant},
+    {"cert", "issue", "Certify a key for a tag",
+     "vesk2 cert issue --key vendor.pem --subject signer.pub --tag '(install (app calc))' "
+     "-o signer.cert",
+     DefineCertIssue},
+    {"cert", "show", "Show the certificates of a chain", "vesk2 cert show signer.cert",
+     DefineCertShow},
+    {"cert", "verify", "Is the first subject of a chain authorized?",
+     "vesk2 cert verify signer.cert --tag '(install (app calc))'", DefineCertVerify},
+    {"cert", "find", "Find stored chains for a tag", "vesk2 cert find --tag '(install (app calc))'",
+     DefineCertFind},
+    {"crl", "issue", "Sign a list of what is revoked",
+     "vesk2 crl issue --key vendor.pem --tag '(install (revoke all))' --revoke-key signer.pub "
+     "--not-after 2027 -o vendor.crl",
+     DefineCrlIssue},
+    {"crl", "import", "Offer lists to the store", "vesk2 crl import vendor.crl", DefineCrlImport},
+    {"crl", "show", "Show what a list revokes", "vesk2 crl show vendor.crl", DefineCrlShow},
+    {"crl", "verify", "Is a list current, and vouched for?", "vesk2 crl verify vendor.crl",
+     DefineCrlVerify},
+    {"manifest", "sign", "Sign what a directory holds",
+     "vesk2 manifest sign app --key signer.pem --cert signer.cert -o app.manifest",
+     DefineManifestSign},
+    {"manifest", "verify", "Is a directory as signed, by someone authorized?",
+     "vesk2 manifest verify app app.manifest --tag '(install (app calc))'", DefineManifestVerify},
+    {"version", "", "Show the version of the command and the library", "vesk2 version",
+     DefineVersion},
+};
+
+}  // namespace
+
+std::span<const Command> Commands() { return kCommands; }
+std::span<const Noun> Nouns() { return kNouns; }
+
+}  // namespace vesk2_command

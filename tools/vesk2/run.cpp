@@ -1,0 +1,156 @@
+// run.cpp: one command line: from the table to a parser, from the parser to an action, and the one
+// place that turns failures into exit codes.
+#include <unistd.h>
+
+#include <cstdlib>
+#include <string>
+
+#include "tools/vesk2/command.h"
+#include "tools/vesk2/report.h"
+#include "tools/vesk2/stores.h"
+
+#include <vesk2.h>
+
+namespace vesk2_command {
+namespace {
+
+// What every subcommand takes.
+struct Common {
+  Style style;
+  bool noColor = false;
+  bool noProgress = false;
+  StoreOptions stores;
+};
+
+struct Choice {
+  std::string command;  // "noun verb"
+  Action action;
+};
+
+// Help that leads with what a reader wants to copy.
+class HelpText : public CLI::Formatter {
+ public:
+  std::string make_description(const CLI::App* app) const override {
+    std::string text = app->get_description() + "\n";
+    for (const Command& command : Commands()) {
+      const bool verb = app->get_parent() != nullptr && app->get_name() == command.verb &&
+                        app->get_parent()->get_name() == command.noun;
+      const bool lone = *command.verb == '\0' && app->get_name() == command.noun;
+      if (verb || lone) text += "\nExamples:\n" + Indented(command.examples);
+    }
+    return text + "\n";
+  }
+
+ private:
+  static std::string Indented(std::string_view lines) {
+    std::string text = "  ";
+    for (const char c : lines) text += c == '\n' ? std::string("\n  ") : std::string(1, c);
+    return text + "\n";
+  }
+};
+
+void AddCommonOptions(CLI::App& app, Common& common) {
+  constexpr const char* kGroup = "Common options";
+  AddStoreOptions(app, common.stores);
+  app.add_flag("--json", common.style.json, "Answer with one JSON object")->group(kGroup);
+  app.add_flag("-q,--quiet", common.style.quiet, "No notes; the verdict and errors only")
+      ->group(kGroup);
+  app.add_flag("-v,--verbose", common.style.verbose, "More notes")
+      ->group(kGroup)
+      ->excludes("--quiet");
+  app.add_flag("--no-color", common.noColor, "No colour, on a terminal either")->group(kGroup);
+  app.add_flag("--no-progress", common.noProgress, "No progress line, on a terminal either")
+      ->group(kGroup);
+}
+
+void DefineCommand(CLI::App& app, const Command& command, Common& common, Choice& choice) {
+  const Action action = command.define(app);
+  AddCommonOptions(app, common);
+  std::string name = command.noun;
+  if (*command.verb != '\0') name.append(" ").append(command.verb);
+  app.callback([&choice, action, name] { choice = {name, action}; });
+}
+
+void Define(CLI::App& app, Common& common, Choice& choice) {
+  app.formatter(std::make_shared<HelpText>());
+  app.set_version_flag("--version", "vesk2 " + LibraryVersion() + " (" + Vesk2VersionExtra() + ")");
+  app.require_subcommand(1);
+  for (const Noun& noun : Nouns()) {
+    CLI::App* group = app.add_subcommand(noun.name, noun.about);
+    for (const Command& command : Commands()) {
+      if (std::string_view(command.noun) != noun.name) continue;
+      const bool lone = *command.verb == '\0';
+      if (!lone) group->require_subcommand(1);
+      DefineCommand(lone ? *group : *group->add_subcommand(command.verb, command.about), command,
+                    common, choice);
+    }
+  }
+  app.footer(
+      "Exit status: 0 yes, 1 a clean no, 2 usage or trouble. The verdict is on standard output,\n"
+      "everything else on standard error.\n");
+}
+
+// Whether a command line that could not be parsed asked for JSON.
+bool WantsJson(int argc, const char* const* argv) {
+  for (int i = 1; i < argc; ++i) {
+    const std::string_view word = argv[i];
+    if (word == "--") return false;
+    if (word == "--json") return true;
+  }
+  return false;
+}
+
+bool TerminalTakesColor() {
+  const char* noColor = std::getenv("NO_COLOR");
+  if (noColor != nullptr && *noColor != '\0') return false;
+  const char* terminal = std::getenv("TERM");
+  return terminal != nullptr && std::string_view(terminal) != "dumb" && isatty(STDOUT_FILENO) == 1;
+}
+
+Style ResolveStyle(const Common& common) {
+  Style style = common.style;
+  style.color = !style.json && !common.noColor && TerminalTakesColor();
+  style.progress = !style.quiet && !common.noProgress && isatty(STDERR_FILENO) == 1;
+  return style;
+}
+
+// Help and version end the parsing with an exception too; they are no failure.
+ExitCode EndParsing(const CLI::App& app, const CLI::ParseError& error) {
+  if (error.get_exit_code() == 0) return app.exit(error) == 0 ? FinishReport(kYes) : kTrouble;
+  const ExitCode code = FinishReport(Trouble(Escape(error.what()), "usage"));
+  if (!GetStyle().json) Note("vesk2: --help after any subcommand shows its options");
+  return code;
+}
+
+ExitCode Run(int argc, const char* const* argv) {
+  CLI::App app{"Signed manifests and SPKI certificates, checked offline.", "vesk2"};
+  Common common;
+  Choice choice;
+  try {
+    Define(app, common, choice);
+    app.parse(argc, argv);
+  } catch (const CLI::ParseError& error) {
+    const bool help = error.get_exit_code() == 0;
+    StartReport("", {.json = !help && WantsJson(argc, argv)});
+    return EndParsing(app, error);
+  }
+  StartReport(choice.command, ResolveStyle(common));
+  UseStores(common.stores);
+  return FinishReport(choice.action());
+}
+
+}  // namespace
+
+int RunCommand(int argc, const char* const* argv) {
+  try {
+    return Run(argc, argv);
+  } catch (const Trouble& trouble) {
+    return FinishReport(trouble);
+  } catch (const std::bad_alloc&) {
+    return FinishReport(Trouble("out of memory", "mem-alloc"));
+  } catch (const std::exception& error) {
+    return FinishReport(Trouble(error.what()));
+  }
+}
+
+}  // namespace vesk2_command
