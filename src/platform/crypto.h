@@ -47,7 +47,7 @@ struct ZVCLMDSAParameters {
 extern "C" {
 
 // zvclm_HashAlloc starts a hash in *context, which must be null. 0, ZVCLM_ERR_NULL_PARAM,
-// ZVCLM_ERR_UNKNOWN_HASH or ZVCLM_ERR_NO_MEM.
+// ZVCLM_ERR_UNKNOWN_HASH for an id that is none of ZvclmHashID's, or ZVCLM_ERR_NO_MEM.
 int zvclm_HashAlloc(ZVCLMHashContextData** context, ZvclmHashID id, uint32_t handle);
 int zvclm_HashInfo(ZvclmHashID id, ZVCLMHashInfo* info);
 // Writes the digest; the context can then only be freed.

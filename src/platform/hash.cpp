@@ -60,12 +60,13 @@ int zvclm_HashAlloc(ZVCLMHashContextData** context, ZvclmHashID id, uint32_t /*h
   const ErrorMark mark;
   const char* name = HashName(id);
   if (name == nullptr) return ZVCLM_ERR_UNKNOWN_HASH;
+  // libcrypto has every algorithm of the table, and never is another taken instead. One that it does
+  // not come up with, or cannot start, is a lack of memory, though it may be called unsupported.
   const Evp<EVP_MD, EVP_MD_free> algorithm(EVP_MD_fetch(nullptr, name, nullptr));
-  if (algorithm == nullptr) return ZVCLM_ERR_UNKNOWN_HASH;  // never another algorithm instead
   Evp<EVP_MD_CTX, EVP_MD_CTX_free> digest(EVP_MD_CTX_new());
   std::unique_ptr<ZVCLMHashContextData> made(new (std::nothrow) ZVCLMHashContextData);
-  if (digest == nullptr || made == nullptr) return ZVCLM_ERR_NO_MEM;
-  if (EVP_DigestInit_ex2(digest.get(), algorithm.get(), nullptr) != 1) return ZVCLM_ERR_FAILURE;
+  if (algorithm == nullptr || digest == nullptr || made == nullptr) return ZVCLM_ERR_NO_MEM;
+  if (EVP_DigestInit_ex2(digest.get(), algorithm.get(), nullptr) != 1) return ZVCLM_ERR_NO_MEM;
   made->digest = digest.release();
   *context = made.release();
   return 0;

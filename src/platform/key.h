@@ -33,7 +33,7 @@ enum DsaNumber : size_t { kDsaP, kDsaQ, kDsaG, kDsaY };
 
 using PkeyOwner = Evp<EVP_PKEY, EVP_PKEY_free>;
 
-// The key as libcrypto's own object; null when it does not take the numbers.
+// The key as libcrypto's own object, which takes any numbers: null is a lack of memory.
 PkeyOwner MakePkey(const ZVCLMPublicKeyData& key);
 
 }  // namespace ZVsysutil

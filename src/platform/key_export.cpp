@@ -27,14 +27,15 @@ int Allocate(Encoding* out, size_t length) {
   return out->bytes != nullptr ? 0 : ZVCLM_ERR_NO_MEM;
 }
 
+// Any numbers can be encoded: what fails is a lack of memory, whatever libcrypto calls it.
 int EncodeDer(const ZVCLMPublicKeyData& key, Encoding* out) {
   const PkeyOwner pkey = MakePkey(key);
-  if (pkey == nullptr) return ZVCLM_ERR_KEY;
+  if (pkey == nullptr) return ZVCLM_ERR_NO_MEM;
   const int length = i2d_PUBKEY(pkey.get(), nullptr);
-  if (length <= 0) return ZVCLM_ERR_KEY;
+  if (length <= 0) return ZVCLM_ERR_NO_MEM;
   if (const int code = Allocate(out, static_cast<size_t>(length))) return code;
   unsigned char* at = out->bytes.get();
-  return i2d_PUBKEY(pkey.get(), &at) == length ? 0 : ZVCLM_ERR_KEY;
+  return i2d_PUBKEY(pkey.get(), &at) == length ? 0 : ZVCLM_ERR_NO_MEM;
 }
 
 constexpr size_t kLengthBytes = 4;

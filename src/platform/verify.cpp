@@ -1,8 +1,16 @@
-// Signature checks. The answer is "not valid" until libcrypto says otherwise, in one place; numbers
-// outside the limits never reach its arithmetic, which they could keep busy for minutes.
+// Signature checks. The answer is "not valid" until libcrypto says otherwise, in one place.
+//
+// libcrypto answers a bad signature and a lack of memory alike, with "no". Taken for "not valid",
+// the second would leave a revocation list unread, and the keys on it in use. So a key or signature
+// that cannot be good is refused here, by its numbers, before libcrypto sees it (they could also
+// keep its arithmetic busy for minutes). What libcrypto then fails to prepare is a lack of memory,
+// and its "no" counts only with the reason that a bad signature leaves behind.
+#include <openssl/bn.h>
 #include <openssl/dsa.h>
 #include <openssl/rsa.h>
 
+#include <algorithm>
+#include <array>
 #include <span>
 
 #include <vesk2/limits.h>
@@ -16,34 +24,84 @@ namespace Limits = ZvVesk2::Limits;
 namespace {
 
 using Bytes = std::span<const unsigned char>;
-using PkeyContext = Evp<EVP_PKEY_CTX, EVP_PKEY_CTX_free>;
 using MdOwner = Evp<EVP_MD, EVP_MD_free>;
+using PkeyContext = Evp<EVP_PKEY_CTX, EVP_PKEY_CTX_free>;
+using Number = Evp<BIGNUM, BN_free>;
 
-bool WithinRsaLimits(const ZVCLMPublicKeyData& key) {
-  const BIGNUM* n = key.number(kRsaN);
-  const BIGNUM* e = key.number(kRsaE);
-  return BN_num_bits(n) <= Limits::kMaxRsaModulusBits && BN_is_odd(n) && BN_is_odd(e) &&
-         !BN_is_one(e) && BN_num_bits(e) <= Limits::kMaxRsaExponentBits;
+// ---- What a "no" of libcrypto means ----
+
+// Stands in libcrypto's error queue between the caller's entries and ours.
+constexpr int kOurs = 1;
+
+// The verdicts of the signature code, as opposed to troubles that any code can have. A number
+// without an inverse is a DSA signature's or key's own fault.
+bool IsVerdict(unsigned long entry) {
+  const int library = ERR_GET_LIB(entry);
+  if (library == ERR_LIB_BN) return ERR_GET_REASON(entry) == BN_R_NO_INVERSE;
+  return (library == ERR_LIB_RSA || library == ERR_LIB_DSA) && !ERR_COMMON_ERROR(entry);
 }
 
-bool WithinDsaLimits(const ZVCLMPublicKeyData& key) {
-  const BIGNUM* p = key.number(kDsaP);
-  const int qBits = BN_num_bits(key.number(kDsaQ));
-  if (BN_num_bits(p) > Limits::kMaxDsaPrimeBits) return false;
-  if (qBits != 160 && qBits != 224 && qBits != 256) return false;
-  for (const BIGNUM* element : {key.number(kDsaG), key.number(kDsaY)}) {
-    if (BN_cmp(element, BN_value_one()) <= 0 || BN_cmp(element, p) >= 0) return false;
+// Whether a verdict stands behind kOurs. The queue can only be read from its old end: the caller's
+// entries are taken out and put back, without their texts.
+bool FindVerdict() {
+  std::array<unsigned long, ERR_NUM_ERRORS> callers;
+  size_t count = 0;
+  bool ours = false;
+  bool found = false;
+  while (const unsigned long entry = ERR_get_error()) {
+    if (ours) {
+      found = found || IsVerdict(entry);
+    } else if (ERR_GET_LIB(entry) == ERR_LIB_USER && ERR_GET_REASON(entry) == kOurs) {
+      ours = true;
+    } else if (count < callers.size()) {
+      callers[count++] = entry;
+    }
   }
-  return true;
+  for (const unsigned long entry : std::span(callers).first(count)) {
+    ERR_raise(ERR_GET_LIB(entry), ERR_GET_REASON(entry));
+  }
+  ERR_set_mark();  // the one that was there has been read away
+  return found;
 }
 
-// A context that is ready to verify with `key`; null when libcrypto refuses it.
+// The DSA code answers 0 for a bad signature only, and leaves no reason; the RSA code for anything.
+enum class Zero { kIsNo, kNeedsReason };
+
+int Ask(bool* good, EVP_PKEY_CTX* context, Bytes digest, Bytes signature, Zero zero) {
+  ERR_raise(ERR_LIB_USER, kOurs);
+  const int answer =
+      EVP_PKEY_verify(context, signature.data(), signature.size(), digest.data(), digest.size());
+  *good = answer == 1;
+  const bool told = *good || (answer == 0 && zero == Zero::kIsNo) || FindVerdict();
+  return told ? 0 : ZVCLM_ERR_NO_MEM;
+}
+
+// A context that is ready to verify with `key`, which libcrypto takes whatever its numbers are.
 PkeyContext StartVerify(const ZVCLMPublicKeyData& key) {
   const PkeyOwner pkey = MakePkey(key);
   if (pkey == nullptr) return nullptr;
   PkeyContext context(EVP_PKEY_CTX_new_from_pkey(nullptr, pkey.get(), nullptr));
   if (context == nullptr || EVP_PKEY_verify_init(context.get()) != 1) return nullptr;
   return context;
+}
+
+// ---- RSA ----
+
+constexpr size_t kMaxModulus = Limits::kMaxRsaModulusBits / 8;
+
+bool WithinRsaLimits(const ZVCLMPublicKeyData& key) {
+  const BIGNUM* n = key.number(kRsaN);
+  const BIGNUM* e = key.number(kRsaE);
+  return BN_num_bits(n) <= Limits::kMaxRsaModulusBits && BN_is_odd(n) && BN_is_odd(e) &&
+         !BN_is_one(e) && BN_num_bits(e) <= Limits::kMaxRsaExponentBits && BN_cmp(e, n) < 0;
+}
+
+// Whether it is as long as n and smaller: a bare number of that range.
+bool FitsModulus(Bytes signature, const BIGNUM* n) {
+  std::array<unsigned char, kMaxModulus> modulus;
+  const auto length = static_cast<size_t>(BN_bn2bin(n, modulus.data()));
+  return signature.size() == length &&
+         std::ranges::lexicographical_compare(signature, Bytes(modulus).first(length));
 }
 
 // Any salt length is taken: the signer chose it. The mask uses the digest's hash.
@@ -57,65 +115,75 @@ bool SetRsaScheme(EVP_PKEY_CTX* context, int scheme, const EVP_MD* hash) {
          EVP_PKEY_CTX_set_rsa_pss_saltlen(context, RSA_PSS_SALTLEN_AUTO) == 1;
 }
 
-bool Check(EVP_PKEY_CTX* context, Bytes digest, Bytes signature) {
-  return EVP_PKEY_verify(context, signature.data(), signature.size(), digest.data(),
-                         digest.size()) == 1;
-}
-
-bool VerifyRsa(const ZVCLMPublicKeyData& key, int scheme, const ZVCLMRSAParameters& parameters,
-               Bytes digest, Bytes signature) {
+int VerifyRsa(bool* good, const ZVCLMPublicKeyData& key, int scheme,
+              const ZVCLMRSAParameters& parameters, Bytes digest, Bytes signature) {
   const uint32_t hashId = parameters.words[3];
-  if (!WithinRsaLimits(key) || digest.empty() || digest.size() != HashLength(hashId)) return false;
-  if (signature.size() != static_cast<size_t>(BN_num_bytes(key.number(kRsaN)))) return false;
+  if (!WithinRsaLimits(key) || digest.empty() || digest.size() != HashLength(hashId)) return 0;
+  if (!FitsModulus(signature, key.number(kRsaN))) return 0;
   const MdOwner hash(EVP_MD_fetch(nullptr, HashName(hashId), nullptr));
   const PkeyContext context = StartVerify(key);
-  return hash != nullptr && context != nullptr && SetRsaScheme(context.get(), scheme, hash.get()) &&
-         Check(context.get(), digest, signature);
+  if (hash == nullptr || context == nullptr) return ZVCLM_ERR_NO_MEM;
+  if (!SetRsaScheme(context.get(), scheme, hash.get())) return ZVCLM_ERR_NO_MEM;
+  return Ask(good, context.get(), digest, signature, Zero::kNeedsReason);
 }
 
-// The DER form that libcrypto takes, of r and s in two equal halves.
+// ---- DSA ----
+
+bool WithinDsaLimits(const ZVCLMPublicKeyData& key) {
+  const BIGNUM* p = key.number(kDsaP);
+  const int qBits = BN_num_bits(key.number(kDsaQ));
+  if (BN_num_bits(p) > Limits::kMaxDsaPrimeBits || !BN_is_odd(p)) return false;
+  if (qBits != 160 && qBits != 224 && qBits != 256) return false;
+  for (const BIGNUM* element : {key.number(kDsaG), key.number(kDsaY)}) {
+    if (BN_cmp(element, BN_value_one()) <= 0 || BN_cmp(element, p) >= 0) return false;
+  }
+  return true;
+}
+
+// The DER form that libcrypto takes of r and s.
 struct DerSignature {
   ~DerSignature() { OPENSSL_free(data); }
   unsigned char* data = nullptr;
   int length = 0;
 };
 
-bool ToDer(Bytes signature, DerSignature* out) {
-  const auto half = static_cast<int>(signature.size() / 2);
-  Evp<BIGNUM, BN_free> r(BN_bin2bn(signature.data(), half, nullptr));
-  Evp<BIGNUM, BN_free> s(BN_bin2bn(signature.data() + half, half, nullptr));
+bool ToDer(DerSignature* out, Number r, Number s) {
   const Evp<DSA_SIG, DSA_SIG_free> pair(DSA_SIG_new());
-  if (r == nullptr || s == nullptr || pair == nullptr) return false;
-  if (DSA_SIG_set0(pair.get(), r.get(), s.get()) != 1) return false;
+  if (pair == nullptr || DSA_SIG_set0(pair.get(), r.get(), s.get()) != 1) return false;
   r.release();  // the pair's now
   s.release();
   out->length = i2d_DSA_SIG(pair.get(), &out->data);
   return out->length > 0;
 }
 
-// The digest is always SHA-1's; for one of other lengths (none, say) anybody could make a
-// signature.
-bool VerifyDsa(const ZVCLMPublicKeyData& key, Bytes digest, Bytes signature) {
-  if (!WithinDsaLimits(key) || digest.size() != HashLength(ZVCLM_HASH_SHA1)) return false;
-  const auto half = static_cast<size_t>(BN_num_bytes(key.number(kDsaQ)));
-  if (signature.size() != 2 * half) return false;
+// The signature is r and s in two equal halves. The digest is always SHA-1's; for one of other
+// lengths (none, say) anybody could make a signature.
+int VerifyDsa(bool* good, const ZVCLMPublicKeyData& key, Bytes digest, Bytes signature) {
+  if (!WithinDsaLimits(key) || digest.size() != HashLength(ZVCLM_HASH_SHA1)) return 0;
+  const int half = BN_num_bytes(key.number(kDsaQ));
+  if (signature.size() != 2 * static_cast<size_t>(half)) return 0;
+  Number r(BN_bin2bn(signature.data(), half, nullptr));
+  Number s(BN_bin2bn(signature.data() + half, half, nullptr));
+  if (r == nullptr || s == nullptr) return ZVCLM_ERR_NO_MEM;
   DerSignature der;
-  if (!ToDer(signature, &der)) return false;
+  if (!ToDer(&der, std::move(r), std::move(s))) return ZVCLM_ERR_NO_MEM;
   const PkeyContext context = StartVerify(key);
-  return context != nullptr &&
-         Check(context.get(), digest, {der.data, static_cast<size_t>(der.length)});
+  if (context == nullptr) return ZVCLM_ERR_NO_MEM;
+  return Ask(good, context.get(), digest, {der.data, static_cast<size_t>(der.length)}, Zero::kIsNo);
 }
 
-bool Verify(const ZVCLMPublicKeyData& key, int scheme, const void* parameters, Bytes digest,
-            Bytes signature) {
+// ---- Either ----
+
+int Verify(bool* good, const ZVCLMPublicKeyData& key, int scheme, const void* parameters,
+           Bytes digest, Bytes signature) {
   if (scheme == ZVCLM_SCHEME_DSA) {
-    return key.type == ZVCLM_KEY_DSA && VerifyDsa(key, digest, signature);
+    return key.type == ZVCLM_KEY_DSA ? VerifyDsa(good, key, digest, signature) : 0;
   }
   if (scheme == ZVCLM_SCHEME_RSA_PKCS1 || scheme == ZVCLM_SCHEME_RSA_PSS) {
     const auto& record = *static_cast<const ZVCLMRSAParameters*>(parameters);
-    return key.type == ZVCLM_KEY_RSA && VerifyRsa(key, scheme, record, digest, signature);
+    return key.type == ZVCLM_KEY_RSA ? VerifyRsa(good, key, scheme, record, digest, signature) : 0;
   }
-  return false;
+  return 0;
 }
 
 }  // namespace
@@ -129,8 +197,9 @@ int zvclm_PublicKeyVerifySignature(const ZVCLMPublicKeyData* key, int scheme,
   if (key == nullptr || parameters == nullptr || digest == nullptr) return ZVCLM_ERR_NULL_PARAM;
   if (signature == nullptr && signatureLength > 0) return ZVCLM_ERR_NULL_PARAM;
   const ErrorMark mark;
-  const bool good =
-      Verify(*key, scheme, parameters, {digest, digestLength}, {signature, signatureLength});
-  if (good) *valid = 1;
-  return 0;
+  bool good = false;
+  const int code =
+      Verify(&good, *key, scheme, parameters, {digest, digestLength}, {signature, signatureLength});
+  if (code == 0 && good) *valid = 1;
+  return code;
 }
