@@ -63,19 +63,21 @@ class DiskCheck {
   int Subdirectories(BodyDirectory& directory, unsigned depth, StatusSet& statuses);
   int Unlisted(BodyDirectory& directory, StatusSet& statuses);
   int ReadEntries(ZvDir& disk, PointerArray<BodyObject>& entries);
-  uint32_t StatusOf(const BodyFile& file, const char* path);
+  int StatusOf(uint32_t& status, const BodyFile& file, const char* path);
 
   Vesk2ContextStruct* context_;
   Findings& findings_;
 };
 
-uint32_t DiskCheck::StatusOf(const BodyFile& file, const char* path) {
+int DiskCheck::StatusOf(uint32_t& status, const BodyFile& file, const char* path) {
   unsigned char digest[32];
   unsigned int length = sizeof digest;
   const int code = Hash::HashFile(path, digest, &length, context_);
-  if (code == VESK2_ERR_FILE_OPEN) return BodyObject::Missing;
-  if (code != 0 || !file.Equal(digest, static_cast<int>(length))) return BodyObject::Invalid;
-  return BodyObject::Valid;
+  VESK2_REQUIRE(!LacksMemory(code), VESK2_ERR_MEM_ALLOC);
+  const bool same = code == 0 && file.Equal(digest, static_cast<int>(length));
+  status = same ? BodyObject::Valid : BodyObject::Invalid;
+  if (code == VESK2_ERR_FILE_OPEN) status = BodyObject::Missing;
+  return 0;
 }
 
 int DiskCheck::Files(BodyDirectory& directory, StatusSet& statuses) {
@@ -85,7 +87,8 @@ int DiskCheck::Files(BodyDirectory& directory, StatusSet& statuses) {
     if (ignore.Ignores(entry->GetName())) continue;
     std::unique_ptr<char[]> path(zv_concat_path(directory.GetName(), entry->GetName()));
     VESK2_REQUIRE(path, VESK2_ERR_MEM_ALLOC);
-    const uint32_t status = StatusOf(static_cast<const BodyFile&>(*entry), path.get());
+    uint32_t status = BodyObject::Invalid;
+    VESK2_TRY(StatusOf(status, static_cast<const BodyFile&>(*entry), path.get()));
     VESK2_TRY(findings_.AddFile(directory, entry->GetName(), status, statuses));
   }
   return 0;

@@ -9,6 +9,7 @@
 
 #include "src/frame/check.h"
 #include "src/objects/build.h"
+#include "src/sexpr/same.h"
 
 namespace ZvVesk2 {
 namespace {
@@ -70,8 +71,9 @@ int ManifestAuthority::MarkRevoked(SExpression* carried) {
     // The status that this leaves decides; a certificate about which nothing is known is dropped
     // like a revoked one.
     bool revoked = false;
-    static_cast<void>(
-        cert->IsRevoked(revoked, acls_.get(), lists.get(), notBefore_.get(), notAfter_.get()));
+    const int code =
+        cert->IsRevoked(revoked, acls_.get(), lists.get(), notBefore_.get(), notAfter_.get());
+    VESK2_REQUIRE(!LacksMemory(code), VESK2_ERR_MEM_ALLOC);
   }
   // Lists that do not verify, or are older than the stored ones, are left out by the store.
   for (auto it = carried->Begin(); it; it.Next()) {
@@ -92,7 +94,9 @@ int ManifestAuthority::BuildChain(Ref<SExpression>& chain) {
       VESK2_TRY(Append(chain.get(), Ref<Cert>::Share(cert)));
       continue;
     }
-    VESK2_REQUIRE(cert->GetSubject()->IsEqual(signer_->GetIssuer()), VESK2_ERR_SIGNING_CERT_ORDER);
+    bool follows = false;
+    VESK2_TRY(CompareValues(follows, cert->GetSubject(), signer_->GetIssuer()));
+    VESK2_REQUIRE(follows, VESK2_ERR_SIGNING_CERT_ORDER);
     Ref<Cert> clone;
     VESK2_TRY(ClonePropagating(*cert, clone));
     VESK2_TRY(Append(chain.get(), std::move(clone)));

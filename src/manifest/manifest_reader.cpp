@@ -19,6 +19,7 @@
 #include "src/frame/check.h"
 #include "src/manifest/manifest_authority.h"
 #include "src/objects/build.h"
+#include "src/sexpr/same.h"
 
 namespace ZvVesk2 {
 namespace {
@@ -158,7 +159,9 @@ int ManifestReader::CheckDigest(const unsigned char* body, unsigned int length) 
   VESK2_TRY(digest->Update(timeElement_.get()));
   VESK2_TRY(digest->Update(body, length));
   VESK2_TRY(digest->Finalize());
-  return digest->IsEqual(signedDigest) ? 0 : VESK2_ERR_HASH_MATCH;
+  bool same = false;
+  VESK2_TRY(CompareValues(same, digest.get(), signedDigest));
+  return same ? 0 : VESK2_ERR_HASH_MATCH;
 }
 
 }  // namespace ZvVesk2

@@ -2,6 +2,7 @@
 // through.
 #include <vesk2/hash.h>
 
+#include <cerrno>
 #include <memory>
 
 #include "src/frame/check.h"
@@ -36,7 +37,10 @@ int FeedFile(ZVCLMHashContextData* hash, ZvFile* file, uint32_t handle) {
 }
 
 int DigestFile(const char* path, unsigned char* digest, uint32_t handle) {
+  errno = 0;
   const std::unique_ptr<ZvFile, FileClose> file(ZVsysutil::zv_open(path, ZVsysutil::ZV_READ));
+  // A file that there was no memory for is not a missing one.
+  VESK2_REQUIRE(file || errno != ENOMEM, VESK2_ERR_MEM_ALLOC);
   VESK2_REQUIRE(file, VESK2_ERR_FILE_OPEN);
   ZVCLMHashContextData* started = nullptr;
   VESK2_TRY(zvclm_HashAlloc(&started, ZVCLM_HASH_SHA256, handle));

@@ -60,8 +60,9 @@ int zvclm_HashAlloc(ZVCLMHashContextData** context, ZvclmHashID id, uint32_t /*h
   const ErrorMark mark;
   const char* name = HashName(id);
   if (name == nullptr) return ZVCLM_ERR_UNKNOWN_HASH;
-  // libcrypto has every algorithm of the table, and never is another taken instead. One that it does
-  // not come up with, or cannot start, is a lack of memory, though it may be called unsupported.
+  // libcrypto has every algorithm of the table, and never is another taken instead. One that it
+  // does not come up with, or cannot start, is a lack of memory, though it may be called
+  // unsupported.
   const Evp<EVP_MD, EVP_MD_free> algorithm(EVP_MD_fetch(nullptr, name, nullptr));
   Evp<EVP_MD_CTX, EVP_MD_CTX_free> digest(EVP_MD_CTX_new());
   std::unique_ptr<ZVCLMHashContextData> made(new (std::nothrow) ZVCLMHashContextData);

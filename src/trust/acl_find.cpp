@@ -24,11 +24,10 @@ class Scan {
   bool Next() {
     while (const char* name = directory_.read(false)) {
       entry_.Reset(TryNew<AclEntry>(context_));
-      if (!entry_) {
-        failed_ = true;
-        return false;
-      }
-      if (entry_->Import(name) == 0) return true;
+      const int code = entry_ ? entry_->Import(name) : VESK2_ERR_MEM_ALLOC;
+      if (code == 0) return true;
+      failed_ = LacksMemory(code);
+      if (failed_) return false;
     }
     return false;
   }

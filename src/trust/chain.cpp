@@ -44,9 +44,11 @@ int MarkRevoked(SExpression* certs, SExpression* acls, TimeStamp* notBefore, Tim
   for (auto it = certs->Begin(); it; it.Next()) {
     auto* const cert = dynamic_cast<Cert*>(it.Value());
     if (cert == nullptr) continue;
-    // The status decides, which is "undetermined" after a failure.
+    // The status decides, which is "undetermined" after a failure. Some callers keep such a
+    // certificate, which may not happen because a list could not be asked for want of memory.
     bool revoked = false;
-    static_cast<void>(cert->IsRevoked(revoked, acls, crls.get(), notBefore, notAfter));
+    const int code = cert->IsRevoked(revoked, acls, crls.get(), notBefore, notAfter);
+    VESK2_REQUIRE(!LacksMemory(code), VESK2_ERR_MEM_ALLOC);
   }
   return 0;
 }

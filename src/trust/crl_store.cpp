@@ -168,7 +168,9 @@ int CrlSequence::Find(CrlSequence*& out, SExpression* tag) {
     candidate.Reset(TryNew<CrlSequence>(tag->GetContext()));
     VESK2_REQUIRE(candidate, VESK2_ERR_MEM_ALLOC);
     status = VESK2_ERR_ACL_ENTRY_NOT_FOUND;
-    if (candidate->Import(file.get()) != 0) continue;
+    const int code = candidate->Import(file.get());
+    VESK2_REQUIRE(!LacksMemory(code), VESK2_ERR_MEM_ALLOC);
+    if (code != 0) continue;
     if (wanted->IsEqual(candidate->GetCert()->GetTag())) {
       status = 0;
       break;
@@ -200,7 +202,7 @@ int IsWanted(bool& wanted, const Cert* fresh, const char* path) {
   Ref<CrlSequence> stored(TryNew<CrlSequence>(fresh->GetContext()));
   VESK2_REQUIRE(stored, VESK2_ERR_MEM_ALLOC);
   const int code = stored->Import(path);
-  VESK2_REQUIRE(code != VESK2_ERR_MEM_ALLOC, VESK2_ERR_MEM_ALLOC);
+  VESK2_REQUIRE(!LacksMemory(code), VESK2_ERR_MEM_ALLOC);
   if (code != 0) {
     wanted = true;
     return 0;
@@ -216,7 +218,8 @@ int IsWanted(bool& wanted, const Cert* fresh, const char* path) {
 int CrlSequence::UpdateStore(SExpression* aclEntries) {
   VESK2_REQUIRE(First() != nullptr, VESK2_ERR_INVALID_PARAM);
   TextPtr name;
-  VESK2_REQUIRE(StoreName(name, cert->GetTag()) == 0 && name, VESK2_ERR_INVALID_PARAM);
+  VESK2_TRY(StoreName(name, cert->GetTag()));
+  VESK2_REQUIRE(name, VESK2_ERR_INVALID_PARAM);
   // From here on the answer is a plain success: a damaged store degrades to having no list.
   SetStorageType(StorageGlobal);
   const TextPtr path(CalcPath(name.get(), StorageGlobal));
