@@ -152,8 +152,13 @@ TEST(KeyTest, RefusesKeysOutsideTheLimits) {
   }
   // r = s = 1 fits any digest when g and y are 1.
   const std::string &p = dsa[0], &q = dsa[1], &g = dsa[2], &y = dsa[3];
-  for (const Numbers& numbers :
-       {Numbers{p, q, "\1", "\1"}, {p, q, "", y}, {p, q, g, p}, {"", q, g, y}, {p, "", g, y}}) {
+  for (const Numbers& numbers : {Numbers{p, q, "\1", "\1"},
+                                 {p, q, "", y},
+                                 {p, q, g, p},
+                                 {"", q, g, y},
+                                 {p, "", g, y},
+                                 Numbers{p + '\2', q, g, y},
+                                 Numbers{p, std::string(20, '\x99'), g, y}}) {
     const std::string one = numbers[1].empty() ? "" : std::string(19, '\0') + '\1';
     EXPECT_FALSE(Valid(Define(numbers), ZVCLM_SCHEME_DSA, 0, Digest("object", "sha1"), one + one));
   }
