@@ -129,6 +129,46 @@ TEST(KeyTest, VerifiesWhatTheOpensslCommandSigns) {
   EXPECT_FALSE(Valid(nullptr, ZVCLM_SCHEME_DSA, 0, "x", "x", ZVCLM_ERR_NULL_PARAM));
 }
 
+// libcrypto's no is told from its lack of memory by what it leaves in its error queue: Valid
+// expects the code 0 for odd numbers of every length and for changes anywhere in a good signature.
+TEST(KeyTest, TellsANoFromALackOfMemory) {
+  const std::string digest = Digest("object");
+  const Numbers rsa = NumbersOf(true);
+  for (const auto& [scheme, name] :
+       {std::pair{ZVCLM_SCHEME_RSA_PKCS1, "rsa-1.5"}, std::pair{ZVCLM_SCHEME_RSA_PSS, "rsa-pss"}}) {
+    std::string signature = Pair(true).SignDigest(digest, name, "sha256");
+    for (char& byte : signature) {
+      byte ^= 0x10;
+      EXPECT_FALSE(Valid(Define(rsa), scheme, ZVCLM_HASH_SHA256, digest, signature));
+      byte ^= 0x10;
+    }
+    for (size_t bytes = 1; bytes < 160; ++bytes) {
+      for (const char top : {'\x01', '\x1f', '\xff'}) {
+        std::string n(bytes, '\xa7');
+        n[0] = top;
+        const std::string below = std::string(1, static_cast<char>(top - 1)) + n.substr(1);
+        EXPECT_FALSE(Valid(Define({n, "\3"}), scheme, ZVCLM_HASH_SHA256, digest, below));
+      }
+    }
+  }
+}
+
+TEST(KeyTest, LeavesTheCallersErrors) {
+  const Key key = Define(NumbersOf(true));
+  const std::string digest = Digest("object"), zeros(256, '\0');
+  ZVCLMRSAParameters record{};
+  record.words[3] = ZVCLM_HASH_SHA256;
+  ERR_raise(ERR_LIB_USER, 7);
+  ERR_raise(ERR_LIB_USER, 8);
+  int valid = 1;
+  EXPECT_EQ(zvclm_PublicKeyVerifySignature(key.get(), ZVCLM_SCHEME_RSA_PSS, &record, Data(digest),
+                                           Size(digest), Data(zeros), Size(zeros), &valid, 0),
+            0);
+  EXPECT_EQ(valid, 0);
+  for (const int reason : {7, 8}) EXPECT_EQ(ERR_GET_REASON(ERR_get_error()), reason);
+  EXPECT_EQ(ERR_peek_error(), 0u);
+}
+
 // The first of each kind would be good by arithmetic alone, the others only have to be harmless.
 TEST(KeyTest, RefusesKeysOutsideTheLimits) {
   const std::string digest = Digest("object");
