@@ -1,0 +1,70 @@
+// grant.cpp: entries of the ACL store.
+#include "tools/vesk2/grant.h"
+
+#include <filesystem>
+
+#include "tools/vesk2/files.h"
+#include "tools/vesk2/report.h"
+#include "tools/vesk2/stores.h"
+
+#include <vesk2/limits.h>
+
+namespace vesk2_command {
+namespace {
+
+using ZvVesk2::AclEntry;
+
+// The library would drop directories from a name.
+std::string EntryPath(const std::string& name) {
+  if (name.find('/') != std::string::npos) {
+    throw Trouble("--name " + Escape(name) + ": a name, not a path", "usage");
+  }
+  const Text path(AclEntry::CalcPath(name.c_str(), ZvVesk2::StorageGlobal));
+  if (!path) throw Trouble("--name " + Escape(name) + ": cannot name an entry", "usage");
+  return path.get();
+}
+
+bool IsAlready(const std::string& path, const std::string& bytes) {
+  std::error_code error;
+  return std::filesystem::is_regular_file(path, error) &&
+         std::filesystem::file_size(path, error) == bytes.size() && !error &&
+         ReadFile(path, ZvVesk2::Limits::kMaxFile) == bytes;
+}
+
+// One entry that cannot be read back would stop the whole store from loading.
+void ReadBack(const std::string& temporary) {
+  const Ref<AclEntry> again(new AclEntry(nullptr));
+  Check(again->Import(temporary.c_str()), "checking the new entry");
+}
+
+}  // namespace
+
+Ref<AclEntry> MakeEntry(EntryText text) {
+  Ref<ByteString> comment = MakeText(text.comment);
+  Ref<AclEntry> entry;
+  Check(AclEntry::Create(entry.Out(), text.subject.get(), text.propagate, text.tag.get(),
+                         text.period.notBefore.get(), text.period.notAfter.get(), 0, comment.get()),
+        "building an ACL entry");
+  // The entry holds the references now.
+  (void)text.subject.Release();
+  (void)text.tag.Release();
+  (void)text.period.notBefore.Release();
+  (void)text.period.notAfter.Release();
+  (void)comment.Release();
+  return entry;
+}
+
+void GrantEntry(AclEntry& entry, const EntryPlace& place) {
+  const std::string path = EntryPath(place.name);
+  const std::string bytes = Canonical(entry);
+  if (IsAlready(path, bytes)) return Note(Escape(path) + " says so already");
+  if (!place.dryRun) {
+    std::error_code error;
+    std::filesystem::create_directories(AclDirectory(), error);
+    if (error) throw FileTrouble(AclDirectory(), error.message(), "io");
+  }
+  WriteFile(path, bytes, {0666, place.force, ReadBack});
+  Note("wrote " + Escape(path));
+}
+
+}  // namespace vesk2_command

@@ -1,0 +1,36 @@
+// grant.h: writing entries of this machine's ACL store: what `acl grant` and `manifest sign --grant`
+// share.
+#ifndef VESK2_TOOLS_GRANT_H
+#define VESK2_TOOLS_GRANT_H
+
+#include <string>
+
+#include "tools/vesk2/objects.h"
+#include "tools/vesk2/times.h"
+
+#include <vesk2/acl_entry.h>
+
+namespace vesk2_command {
+
+// MakeEntry builds the entry that trusts `subject`, which it shares, for a tag.
+struct EntryText {
+  Ref<PublicKey> subject;
+  bool propagate = false;
+  Ref<SExpression> tag;
+  Period period = {};
+  std::string comment = {};
+};
+Ref<ZvVesk2::AclEntry> MakeEntry(EntryText text);
+
+struct EntryPlace {
+  std::string name;  // of the entry: NAME.acl
+  bool force = false;
+  bool dryRun = false;
+};
+// GrantEntry checks an entry and writes it into the machine's store, which it makes if need be. An
+// equal entry of that name stays as it is.
+void GrantEntry(ZvVesk2::AclEntry& entry, const EntryPlace& place);
+
+}  // namespace vesk2_command
+
+#endif  // VESK2_TOOLS_GRANT_H
