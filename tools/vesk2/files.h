@@ -18,22 +18,33 @@ Trouble FileTrouble(const std::string& path, const std::string& text, const std:
 // Why a file that the library could not open cannot be read, in words.
 std::string WhyUnreadable(const std::string& path);
 
-// ReadFile returns the contents of a regular file; Trouble when it cannot, or past `limit` bytes.
+// "-" names standard input where a file is read, and standard output where one is written.
+inline constexpr char kStandard[] = "-";
+
+// ReadFile returns the contents of a regular file or of standard input; Trouble when it cannot, or
+// past `limit` bytes. Standard input is read once and kept: a file may be looked at twice.
 std::string ReadFile(const std::string& path, size_t limit);
 
-// Trouble if something is at `path`, unless `force`.
+// InputPath returns a path under which the library can open what `path` names: for standard input
+// that of a file without a name that holds all of it.
+std::string InputPath(const std::string& path);
+
+// Trouble if something is at `path`, unless `force`; what is no file is never replaced.
 void RefuseExisting(const std::string& path, bool force);
 
 struct WriteOptions {
   mode_t mode = 0666;  // less the umask
   bool force = false;  // replace what is there
-  // Called with the finished file's temporary path; throws to refuse it.
+  // Called with a path of the finished file before it has its name; throws to refuse it.
   std::function<void(const std::string&)> check = nullptr;
+  bool dryRun = false;         // check only, and note what would be written
+  bool makeDirectory = false;  // make the directory that holds it
 };
 
-// WriteFile puts `bytes` under a temporary name beside `path`, checks it, and only then gives it
-// its name: what stands at `path` is the old file or the whole new one. Throws Trouble.
-void WriteFile(const std::string& path, std::string_view bytes, const WriteOptions& options);
+// WriteFile writes a file that has no name until it is finished and checked: what stands at `path`
+// is the old file or the whole new one, whatever happens. Returns false for a dry run, which writes
+// nothing. The path goes into "written" of the answer, or into "would_write". Throws Trouble.
+bool WriteFile(const std::string& path, std::string_view bytes, const WriteOptions& options);
 
 }  // namespace vesk2_command
 

@@ -5,7 +5,6 @@
 
 #include "tools/vesk2/files.h"
 #include "tools/vesk2/report.h"
-#include "tools/vesk2/stores.h"
 
 #include <vesk2/limits.h>
 
@@ -58,13 +57,8 @@ void GrantEntry(AclEntry& entry, const EntryPlace& place) {
   const std::string path = EntryPath(place.name);
   const std::string bytes = Canonical(entry);
   if (IsAlready(path, bytes)) return Note(Escape(path) + " says so already");
-  if (!place.dryRun) {
-    std::error_code error;
-    std::filesystem::create_directories(AclDirectory(), error);
-    if (error) throw FileTrouble(AclDirectory(), error.message(), "io");
-  }
-  WriteFile(path, bytes, {0666, place.force, ReadBack});
-  Note("wrote " + Escape(path));
+  const WriteOptions options{0666, place.force, ReadBack, place.dryRun, true};
+  if (WriteFile(path, bytes, options)) Note("wrote " + Escape(path));
 }
 
 }  // namespace vesk2_command

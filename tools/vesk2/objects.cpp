@@ -8,6 +8,8 @@
 #include "tools/vesk2/files.h"
 #include "tools/vesk2/report.h"
 
+#include <vesk2/limits.h>
+
 namespace vesk2_command {
 namespace {
 
@@ -25,6 +27,7 @@ bool HasEmptyWord(const SExpression& list) {
 }  // namespace
 
 Buffer OpenBuffer(const std::string& path) {
+  if (path == kStandard) return WrapBytes(ReadFile(path, ZvVesk2::Limits::kMaxFile));
   Buffer buffer(ZVsysutil::zv_buffer_wrap_file(path.c_str()));
   if (!buffer) throw FileTrouble(path, WhyUnreadable(path), "io");
   return buffer;

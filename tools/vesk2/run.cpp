@@ -6,6 +6,7 @@
 #include <string>
 
 #include "tools/vesk2/command.h"
+#include "tools/vesk2/files.h"
 #include "tools/vesk2/report.h"
 #include "tools/vesk2/stores.h"
 
@@ -100,6 +101,17 @@ bool WantsJson(int argc, const char* const* argv) {
   return false;
 }
 
+// Standard input can be read for one argument only.
+void RefuseSharedInput(const CLI::App& app) {
+  size_t readers = 0;
+  for (const CLI::Option* option : app.get_options()) {
+    if (option->check_name("--output")) continue;
+    for (const std::string& value : option->results()) readers += value == kStandard ? 1 : 0;
+  }
+  if (readers > 1) throw Trouble("standard input (-) is asked for more than once", "usage");
+  for (const CLI::App* verb : app.get_subcommands()) RefuseSharedInput(*verb);
+}
+
 bool TerminalTakesColor() {
   const char* noColor = std::getenv("NO_COLOR");
   if (noColor != nullptr && *noColor != '\0') return false;
@@ -135,6 +147,7 @@ ExitCode Run(int argc, const char* const* argv) {
     return EndParsing(app, error);
   }
   StartReport(choice.command, ResolveStyle(common));
+  RefuseSharedInput(app);
   UseStores(common.stores);
   return FinishReport(choice.action());
 }
