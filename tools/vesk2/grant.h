@@ -1,5 +1,5 @@
-// grant.h: writing entries of this machine's ACL store: what `acl grant` and `manifest sign --grant`
-// share.
+// grant.h: writing entries of this machine's ACL store: what `acl grant` and `manifest sign
+// --grant` share.
 #ifndef VESK2_TOOLS_GRANT_H
 #define VESK2_TOOLS_GRANT_H
 
