@@ -10,6 +10,7 @@
 #include <vesk2/context.h>
 
 #include "src/platform/file.h"
+#include "src/platform/text.h"
 #include "src/trust/lists.h"
 #include "src/trust/store_write.h"
 
@@ -71,13 +72,21 @@ int StoreName(TextPtr& name, SExpression* tag) {
 
 // ---- Loading ----
 
+// The path of a stored list, without the store's directory being made: a verification only reads.
+TextPtr StoredPath(const char* name) {
+  const TextPtr directory(CrlSequence::CalcDir(StorageGlobal));
+  if (!directory) return nullptr;
+  const TextPtr path(ZVsysutil::zv_concat_path(directory.get(), name));
+  return TextPtr(path ? CrlSequence::CalcPath(path.get(), StoragePath) : nullptr);
+}
+
 // Appends the stored list of one source, if it can be read. A lack of memory is never taken for a
 // missing list: that would bring revoked keys back.
 int LoadSource(SExpression* store, SExpression* tag) {
   TextPtr name;
   VESK2_TRY(StoreName(name, tag));
   if (!name || *VeskConf::GetGlobalDirectory() == '\0') return 0;
-  const TextPtr path(CrlSequence::CalcPath(name.get(), StorageGlobal));
+  const TextPtr path = StoredPath(name.get());
   VESK2_REQUIRE(path, VESK2_ERR_MEM_ALLOC);
   Ref<CrlSequence> sequence(TryNew<CrlSequence>(store->GetContext()));
   VESK2_REQUIRE(sequence, VESK2_ERR_MEM_ALLOC);
