@@ -5,6 +5,7 @@
 
 #include "tools/vesk2/files.h"
 #include "tools/vesk2/report.h"
+#include "tools/vesk2/stores.h"
 
 #include <vesk2/limits.h>
 
@@ -13,14 +14,15 @@ namespace {
 
 using ZvVesk2::AclEntry;
 
-// The library would drop directories from a name.
+// The library would drop directories from a name, and make the store even for a dry run.
 std::string EntryPath(const std::string& name) {
   if (name.find('/') != std::string::npos) {
     throw Trouble("--name " + Escape(name) + ": a name, not a path", "usage");
   }
-  const Text path(AclEntry::CalcPath(name.c_str(), ZvVesk2::StorageGlobal));
-  if (!path) throw Trouble("--name " + Escape(name) + ": cannot name an entry", "usage");
-  return path.get();
+  if (name.empty() || name == "." || name == "..") {
+    throw Trouble("--name " + Escape(name) + ": cannot name an entry", "usage");
+  }
+  return AclDirectory() + "/" + name + (name.ends_with(".acl") ? "" : ".acl");
 }
 
 bool IsAlready(const std::string& path, const std::string& bytes) {
