@@ -185,6 +185,22 @@ typedef struct FileItem {
   int32_t isDirectory; /* 1 for a directory, else 0 */
 } FileItem;
 
+/* What a caller wants to hear while files are read and hashed (SetFileCallbacks). Each function may
+ * be null. They are called on the thread that called the library, between its reads: what they
+ * take, the verification takes longer. They must return (no exception, no longjmp), and leave the
+ * manifest that is being verified and the store roots alone; any other call is theirs. */
+typedef struct Vesk2FileCallbacks {
+  uint32_t size; /* sizeof(Vesk2FileCallbacks) */
+  void* user;    /* handed to every call */
+  /* A file was opened; it holds `bytes` bytes. Files that cannot be opened are not told. The path
+   * comes from the manifest: whoever signed it chose its bytes. */
+  int (*fileStart)(void* user, const char* path, uint64_t bytes);
+  /* `bytes` more bytes of that file were hashed: 1 to 65536. */
+  int (*fileBytes)(void* user, uint64_t bytes);
+  /* The file is done with, completely or not; `code` is 0 or why its digest is not known. */
+  void (*fileEnd)(void* user, const char* path, int code);
+} Vesk2FileCallbacks;
+
 /* Objects that C holds by pointer only: the classes of these names in vesk2.hpp. */
 #ifdef __cplusplus
 namespace ZvVesk2 {
@@ -315,6 +331,17 @@ VESK2_API void SetExtraAclDirectoryA(Manifest* manifest, const char* directory);
  * clears the list. The caller keeps `list`. */
 VESK2_API void SetIgnoredEntries(Manifest* manifest, const FileItem* list);
 
+/* SetFileCallbacks has VerifyManifest tell about the files that it hashes. The record is copied;
+ * null takes the setting back. Anything but 0 from fileStart or fileBytes ends the verification,
+ * which then answers VESK2_ERR_USER_INTERRUPT and has no results. CompareManifest hashes no files.
+ * VESK2_ERR_INVALID_PARAM for a record of another size. */
+VESK2_API int SetFileCallbacks(Manifest* manifest, const Vesk2FileCallbacks* callbacks);
+
+/* SetStoreUpdate with 0 keeps VerifyManifest from offering the revocation lists that the manifest
+ * carries to the store, which it does otherwise: nothing is written then. The lists count in the
+ * verification all the same. */
+VESK2_API void SetStoreUpdate(Manifest* manifest, int update);
+
 /* VerifyManifest proves the manifest's signatures, that its chain grants the tag within the period
  * from `notBefore` to `notAfter` (the periods must meet; both times 0: at the moment of signing),
  * that the body is the one that was signed, and compares the directory with it. Unlisted entries
@@ -325,6 +352,7 @@ VESK2_API void SetIgnoredEntries(Manifest* manifest, const FileItem* list);
  *   VESK2_ERR_HASH_MATCH          the body is not the one that was signed
  *   VESK2_ERR_NOT_AUTHORIZED      nothing is granted; VESK2_ERR_PACKAGE_NOT_GRANTED not the tag
  *   VESK2_ERR_CERT_REVOKED, VESK2_ERR_CRL_NOT_FOUND   the signer certificate was dropped
+ *   VESK2_ERR_USER_INTERRUPT      a callback ended it (SetFileCallbacks)
  *   VESK2_ERR_OPEN_MANIFEST_FILE and the codes of its readers for a malformed file. */
 VESK2_API int VerifyManifest(Manifest* manifest, time_t notBefore, time_t notAfter);
 

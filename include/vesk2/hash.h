@@ -53,6 +53,11 @@ class VESK2_API Hash : public Principal {
   // meanwhile), VESK2_ERR_MEM_ALLOC; *digestLength is 0 after a failure (except of the room test).
   [[nodiscard]] static int HashFile(const char* path, unsigned char* digest,
                                     unsigned int* digestLength, Vesk2ContextStruct* context);
+  // The same, telling `callbacks` (may be null) about it. VESK2_ERR_USER_INTERRUPT when they end
+  // it.
+  [[nodiscard]] static int HashFile(const char* path, unsigned char* digest,
+                                    unsigned int* digestLength, Vesk2ContextStruct* context,
+                                    const Vesk2FileCallbacks* callbacks);
 
   // ZVCLM_HASH_NONE until Init, Set or Import.
   ZvclmHashID GetAlgorithm() const { return algorithm; }

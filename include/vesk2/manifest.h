@@ -60,6 +60,8 @@ class VESK2_API Manifest {
   void SetExtraAclDirectory(char* owned) { extraAclDirectory.reset(owned); }
   // Replaces the ignored entries by copies, in reverse order. VESK2_ERR_MEM_ALLOC leaves none.
   [[nodiscard]] int SetIgnoredEntries(const FileItem* list);
+  [[nodiscard]] int SetFileCallbacks(const Vesk2FileCallbacks* callbacks);
+  void SetStoreUpdate(bool value) { storeUpdate = value; }
 
   // ---- What the object holds, borrowed ----
   Vesk2ContextStruct* GetContext() const { return context; }
@@ -68,6 +70,11 @@ class VESK2_API Manifest {
   SExpression* GetTag() const { return tag.get(); }
   bool GetFailOnExtraEntries() const { return failOnExtraEntries; }
   const char* GetExtraAclDirectory() const { return extraAclDirectory.get(); }
+  bool GetStoreUpdate() const { return storeUpdate; }
+  // Null when none are set.
+  const Vesk2FileCallbacks* GetFileCallbacks() const {
+    return fileCallbacks.size != 0 ? &fileCallbacks : nullptr;
+  }
   FileItem* GetValid() const { return valid.get(); }
   FileItem* GetInvalid() const { return invalid.get(); }
   FileItem* GetMissing() const { return missing.get(); }
@@ -105,6 +112,8 @@ class VESK2_API Manifest {
   Ref<SExpression> type;
   Ref<TimeStamp> signingTime;
   size_t readPosition = 0;
+  bool storeUpdate = true;
+  Vesk2FileCallbacks fileCallbacks{};
 };
 
 }  // namespace ZvVesk2

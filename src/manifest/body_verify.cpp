@@ -44,8 +44,8 @@ struct Listing {
 
 class DiskCheck {
  public:
-  DiskCheck(Vesk2ContextStruct* context, Findings& findings)
-      : context_(context), findings_(findings) {}
+  DiskCheck(Vesk2ContextStruct* context, Findings& findings, const Vesk2FileCallbacks* callbacks)
+      : context_(context), findings_(findings), callbacks_(callbacks) {}
 
   // Checks one directory, the root at depth 0, and collects the statuses found in it. Trouble is
   // returned; what was found is no trouble.
@@ -67,12 +67,14 @@ class DiskCheck {
 
   Vesk2ContextStruct* context_;
   Findings& findings_;
+  const Vesk2FileCallbacks* callbacks_;
 };
 
 int DiskCheck::StatusOf(uint32_t& status, const BodyFile& file, const char* path) {
   unsigned char digest[32];
   unsigned int length = sizeof digest;
-  const int code = Hash::HashFile(path, digest, &length, context_);
+  const int code = Hash::HashFile(path, digest, &length, context_, callbacks_);
+  VESK2_REQUIRE(code != VESK2_ERR_USER_INTERRUPT, code);
   VESK2_REQUIRE(!LacksMemory(code), VESK2_ERR_MEM_ALLOC);
   const bool same = code == 0 && file.Equal(digest, static_cast<int>(length));
   status = same ? BodyObject::Valid : BodyObject::Invalid;
@@ -168,7 +170,7 @@ int Manifest::Verify(ZvBuffer* body, const char* directoryPath) {
 
   Findings findings(context);
   StatusSet statuses;
-  VESK2_TRY(DiskCheck(context, findings).Directory(root, 0, statuses));
+  VESK2_TRY(DiskCheck(context, findings, GetFileCallbacks()).Directory(root, 0, statuses));
   VESK2_TRY(Publish(findings));
   return statuses.Code();
 }

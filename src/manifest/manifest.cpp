@@ -69,6 +69,13 @@ int Manifest::SetIgnoredEntries(const FileItem* list) {
   return code;
 }
 
+int Manifest::SetFileCallbacks(const Vesk2FileCallbacks* callbacks) {
+  VESK2_REQUIRE(callbacks == nullptr || callbacks->size == sizeof *callbacks,
+                VESK2_ERR_INVALID_PARAM);
+  fileCallbacks = callbacks != nullptr ? *callbacks : Vesk2FileCallbacks{};
+  return 0;
+}
+
 int Manifest::BuildIgnoreList(const char* base, PointerArray<char>& list) const {
   for (const FileItem* item = ignoredEntries.get(); item != nullptr; item = item->next) {
     std::unique_ptr<char[]> path(zv_concat_path(base, item->name));

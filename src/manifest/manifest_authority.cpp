@@ -59,7 +59,7 @@ int ManifestAuthority::LoadRoots(const char* extraAclDirectory) {
   return AclEntry::Import(acls_.Out(), context_, extraAclDirectory);
 }
 
-int ManifestAuthority::MarkRevoked(SExpression* carried) {
+int ManifestAuthority::MarkRevoked(SExpression* carried, bool updateStore) {
   Ref<SExpression> lists;
   VESK2_TRY(CrlSequence::ImportStore(lists.Out(), acls_.get(), context_));
   for (auto it = carried->Begin(); it; it.Next()) {
@@ -75,6 +75,7 @@ int ManifestAuthority::MarkRevoked(SExpression* carried) {
         cert->IsRevoked(revoked, acls_.get(), lists.get(), notBefore_.get(), notAfter_.get());
     VESK2_REQUIRE(!LacksMemory(code), VESK2_ERR_MEM_ALLOC);
   }
+  if (!updateStore) return 0;
   // Lists that do not verify, or are older than the stored ones, are left out by the store.
   for (auto it = carried->Begin(); it; it.Next()) {
     if (auto* const list = dynamic_cast<CrlSequence*>(it.Value())) {

@@ -20,9 +20,9 @@ class ManifestAuthority {
   [[nodiscard]] int SetPeriod(long notBefore, long notAfter, TimeStamp* signingTime);
   // Loads the trust roots of this machine and of `extraAclDirectory` (may be null).
   [[nodiscard]] int LoadRoots(const char* extraAclDirectory);
-  // Marks revoked certificates by the stored lists and those that the manifest carries, and offers
-  // the carried ones to the store.
-  [[nodiscard]] int MarkRevoked(SExpression* carried);
+  // Marks revoked certificates by the stored lists and those that the manifest carries, and with
+  // `updateStore` offers the carried ones to the store.
+  [[nodiscard]] int MarkRevoked(SExpression* carried, bool updateStore);
   // Reduces the certificates that are left. VESK2_ERR_CERT_REVOKED or VESK2_ERR_CRL_NOT_FOUND when
   // the signer is not among them, VESK2_ERR_SIGNING_CERT_ORDER when the one after it is not its
   // issuer's, and what the reduction answers.

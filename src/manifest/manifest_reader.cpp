@@ -131,7 +131,7 @@ int ManifestReader::ProveAuthority() {
   Ref<SExpression> carried(TryNew<SExpression>(Context()));
   VESK2_REQUIRE(carried, VESK2_ERR_MEM_ALLOC);
   VESK2_TRY(ReadRevocationLists(carried.get()));
-  VESK2_TRY(authority.MarkRevoked(carried.get()));
+  VESK2_TRY(authority.MarkRevoked(carried.get(), manifest_.storeUpdate));
   return authority.Prove(manifest_.tag.get());
 }
 

@@ -257,6 +257,76 @@ TEST_F(ManifestTest, DropsRevokedAndUndeterminedCertificates) {
   EXPECT_FALSE(std::filesystem::exists(store.File("cert/app (revoke all).crl")));
 }
 
+TEST_F(ManifestTest, CarriedListsCountWithoutTheStoreBeingWritten) {
+  parts.signer.revocation = revocation;
+  parts.lists = RevocationList("", signer.Public());
+  Manifest manifest(nullptr);
+  Open(manifest, ManifestFile(parts));
+  manifest.SetStoreUpdate(false);
+  EXPECT_EQ(manifest.VerifyManifest(0, 0), VESK2_ERR_SIGNING_CERT_ORDER);
+  EXPECT_FALSE(std::filesystem::exists(store.File("cert")));
+  manifest.SetStoreUpdate(true);
+  EXPECT_EQ(manifest.VerifyManifest(0, 0), VESK2_ERR_SIGNING_CERT_ORDER);
+  EXPECT_TRUE(std::filesystem::exists(store.File("cert/app (revoke all).crl")));
+}
+
+// What callbacks were told, and when they end the work: at the call of that number.
+struct Told {
+  std::string text;
+  int calls = 0;
+  int end = 0;
+
+  int Tell(const std::string& what) {
+    text += what;
+    return ++calls == end ? 1 : 0;
+  }
+  Vesk2FileCallbacks Callbacks() {
+    return {sizeof(Vesk2FileCallbacks), this,
+            [](void* user, const char* path, uint64_t bytes) {
+              return static_cast<Told*>(user)->Tell(
+                  std::filesystem::path(path).filename().string() + ":" + std::to_string(bytes));
+            },
+            [](void* user, uint64_t bytes) {
+              return static_cast<Told*>(user)->Tell("+" + std::to_string(bytes));
+            },
+            [](void* user, const char*, int code) {
+              static_cast<Told*>(user)->text += "=" + std::to_string(code) + " ";
+            }};
+  }
+};
+
+TEST_F(ManifestTest, CallbacksHearOfEveryFileAndMayEndTheWork) {
+  tree.Write("big", std::string(130000, 'x'));
+  parts.body = BodyOf(tree.Path() + "/");
+  std::filesystem::remove(tree.File("a"));
+  constexpr struct {
+    int end, code;
+    const char* told;
+  } kCases[] = {
+      {0, VESK2_ERR_FILE_NOT_FOUND, "big:130000+65536+64464=0 f:5+5=0 "},
+      {1, VESK2_ERR_USER_INTERRUPT, "big:130000=60 "},
+      {3, VESK2_ERR_USER_INTERRUPT, "big:130000+65536+64464=60 "},
+      {5, VESK2_ERR_USER_INTERRUPT, "big:130000+65536+64464=0 f:5+5=60 "},
+  };
+  for (const auto& row : kCases) {
+    Told told;
+    told.end = row.end;
+    Vesk2FileCallbacks callbacks = told.Callbacks();
+    Manifest manifest(nullptr);
+    Open(manifest, ManifestFile(parts));
+    ASSERT_EQ(manifest.SetFileCallbacks(&callbacks), 0);
+    EXPECT_EQ(manifest.VerifyManifest(0, 0), row.code);
+    EXPECT_EQ(told.text, row.told);
+    EXPECT_EQ(manifest.GetValid() == nullptr, row.code == VESK2_ERR_USER_INTERRUPT);
+    // Functions that are not given are not missed.
+    callbacks = {sizeof callbacks, nullptr, nullptr, nullptr, nullptr};
+    EXPECT_EQ(manifest.SetFileCallbacks(&callbacks), 0);
+    EXPECT_EQ(manifest.VerifyManifest(0, 0), VESK2_ERR_FILE_NOT_FOUND);
+    ++callbacks.size;
+    EXPECT_EQ(manifest.SetFileCallbacks(&callbacks), VESK2_ERR_INVALID_PARAM);
+  }
+}
+
 TEST_F(ManifestTest, ReadsWithoutTheChainAndHandsTheBodyOver) {
   std::filesystem::remove_all(store.File("acl"));
   parts.signer.revocation = revocation;

@@ -54,6 +54,12 @@ void SetIgnoredEntries(Manifest* manifest, const FileItem* list) {
   static_cast<void>(manifest->SetIgnoredEntries(list));
 }
 
+int SetFileCallbacks(Manifest* manifest, const Vesk2FileCallbacks* callbacks) {
+  return manifest->SetFileCallbacks(callbacks);
+}
+
+void SetStoreUpdate(Manifest* manifest, int update) { manifest->SetStoreUpdate(update != 0); }
+
 // ---- Verifying ----
 
 int VerifyManifest(Manifest* manifest, time_t notBefore, time_t notAfter) {

@@ -39,12 +39,19 @@ static void check_version(void) {
   check(strcmp(Vesk2ErrorMessage(VESK2_MAX_ERROR), "VESK_UNKNOWN_ERROR") == 0, "code 77");
 }
 
+static int end_it(void* user, const char* path, uint64_t bytes) {
+  return user == NULL && path != NULL && bytes > 0;
+}
+
 static void check_manifest(void) {
   Manifest* manifest = NULL;
   FileItem ignored;
+  Vesk2FileCallbacks callbacks;
   char name[] = "build";
   memset(&ignored, 0, sizeof ignored);
   ignored.name = name;
+  memset(&callbacks, 0, sizeof callbacks);
+  callbacks.fileStart = end_it;
   Vesk2HomeDirectory("/nonexistent");
   Vesk2GlobalDirectoryA("/nonexistent");
   check(CreateManifestContext(&manifest, "/nonexistent", "/nonexistent/m", "(install)") == 0,
@@ -52,6 +59,11 @@ static void check_manifest(void) {
   FailOnExtraEntries(manifest);
   SetExtraAclDirectory(manifest, "/nonexistent");
   SetIgnoredEntries(manifest, &ignored);
+  SetStoreUpdate(manifest, 0);
+  check(SetFileCallbacks(manifest, &callbacks) == VESK2_ERR_INVALID_PARAM, "a record of no size");
+  callbacks.size = sizeof callbacks;
+  check(SetFileCallbacks(manifest, &callbacks) == 0, "SetFileCallbacks");
+  check(SetFileCallbacks(manifest, NULL) == 0, "no callbacks");
   check(VerifyManifest(manifest, 0, 0) == VESK2_ERR_OPEN_MANIFEST_FILE, "VerifyManifest");
   check(CompareManifestA(manifest, "/m") == VESK2_ERR_OPEN_MANIFEST_FILE, "CompareManifestA");
   check(GetTimeOfSigning(manifest) == 0, "GetTimeOfSigning");
