@@ -6,24 +6,25 @@
 #include <atomic>
 #include <csignal>
 
+#include "tools/vesk2/line.h"
+
 namespace vesk2_command {
 namespace {
 
 std::atomic<const char*> unfinished = nullptr;
-std::atomic<bool> line = false;
-static_assert(decltype(unfinished)::is_always_lock_free && decltype(line)::is_always_lock_free);
+static_assert(decltype(unfinished)::is_always_lock_free);
 
 // SA_RESETHAND has put the default action back; the raised signal ends the process on return.
 void Tidy(int signal) {
   const char* path = unfinished.load();
   if (path != nullptr) (void)unlink(path);
-  if (line.load() && write(STDERR_FILENO, kEraseLine, sizeof kEraseLine - 1) < 0) {
-    // Nothing can be done about a terminal that is gone.
-  }
+  EraseLine();
   (void)raise(signal);
 }
 
-void Install() {
+}  // namespace
+
+void TidyOnInterrupt() {
   static bool installed = false;
   if (installed) return;
   installed = true;
@@ -38,18 +39,10 @@ void Install() {
   }
 }
 
-}  // namespace
-
 RemoveOnInterrupt::RemoveOnInterrupt(const std::string& path) : path_(path) {
-  Install();
+  TidyOnInterrupt();
   unfinished = path_.c_str();
 }
 RemoveOnInterrupt::~RemoveOnInterrupt() { unfinished = nullptr; }
-
-EraseLineOnInterrupt::EraseLineOnInterrupt() {
-  Install();
-  line = true;
-}
-EraseLineOnInterrupt::~EraseLineOnInterrupt() { line = false; }
 
 }  // namespace vesk2_command

@@ -7,6 +7,7 @@
 #include "tools/vesk2/explain.h"
 #include "tools/vesk2/files.h"
 #include "tools/vesk2/manifest_file.h"
+#include "tools/vesk2/progress.h"
 #include "tools/vesk2/report.h"
 #include "tools/vesk2/tree.h"
 
@@ -25,6 +26,7 @@ struct Options {
   std::string at;
   bool allowExtra = false;
   bool allowLinks = false;
+  bool noStoreUpdate = false;
   std::string aclDirectory;
   std::vector<std::string> ignored;
 };
@@ -39,6 +41,7 @@ void Configure(Manifest& manifest, const Options& options, const std::set<std::s
       manifest.Initialize(options.directory.c_str(), options.manifest.c_str(), options.tag.c_str()),
       "preparing");
   manifest.SetFailOnExtraEntries(!options.allowExtra);
+  manifest.SetStoreUpdate(!options.noStoreUpdate);
   if (!options.aclDirectory.empty()) manifest.SetExtraAclDirectory(NewText(options.aclDirectory));
   FileItem* list = nullptr;
   for (const std::string& name : ignored) {
@@ -199,6 +202,14 @@ ExitCode AnswerTree(const Options& options, const Manifest& manifest,
   return verdict;
 }
 
+int Verify(Manifest& manifest, const Options& options, long notBefore, long notAfter) {
+  const ProgressLine progress("verifying", options.directory);
+  Check(manifest.SetFileCallbacks(progress.Callbacks()), "preparing");
+  const int code = manifest.VerifyManifest(notBefore, notAfter);
+  Check(manifest.SetFileCallbacks(nullptr), "preparing");
+  return code;
+}
+
 ExitCode Run(const Options& options) {
   RealDirectory(options.directory);
   const Ref<SExpression> tag = ParseTag(options.tag);
@@ -210,7 +221,7 @@ ExitCode Run(const Options& options) {
 
   Manifest manifest(nullptr);
   Configure(manifest, options, ignored);
-  const int code = manifest.VerifyManifest(notBefore, notAfter);
+  const int code = Verify(manifest, options, notBefore, notAfter);
   if (JudgedTree(manifest, code)) return AnswerTree(options, manifest, ignored, code);
   return AnswerAuthority(options, manifest,
                          {options.manifest, tag.get(), std::move(period), options.aclDirectory},
@@ -230,6 +241,8 @@ Action DefineManifestVerify(CLI::App& app) {
       ->excludes("--not-after");
   app.add_flag("--allow-extra", options->allowExtra, "Accept entries that are not listed");
   app.add_flag("--allow-links", options->allowLinks, "Accept links that lead out of the tree");
+  app.add_flag("--no-store-update", options->noStoreUpdate,
+               "Write nothing: do not keep the revocation lists that the manifest carries");
   app.add_option("--acl-dir", options->aclDirectory, "Trust the entries of this directory too");
   app.add_option("--ignore", options->ignored, "Leave this entry out (a path below the directory)")
       ->allow_extra_args(false);

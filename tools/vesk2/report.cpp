@@ -7,6 +7,8 @@
 #include <cstring>
 #include <vector>
 
+#include "tools/vesk2/line.h"
+
 #include <vesk2.h>
 
 namespace vesk2_command {
@@ -65,6 +67,7 @@ std::string Colored(const std::string& word, const char* color) {
 }
 
 void WriteError(const std::string& line) {
+  EraseLine();
   std::fflush(stdout);  // keeps the order of lines where both go to one terminal
   std::fprintf(stderr, "%s\n", line.c_str());
 }
@@ -125,7 +128,9 @@ void StartReport(const std::string& command, const Style& style) {
 const Style& GetStyle() { return report.style; }
 
 void Say(const std::string& line) {
-  if (!report.style.json) std::printf("%s\n", line.c_str());
+  if (report.style.json) return;
+  EraseLine();
+  std::printf("%s\n", line.c_str());
 }
 
 void Note(const std::string& line) {
