@@ -55,6 +55,19 @@ Ref<AclEntry> MakeEntry(EntryText text) {
   return entry;
 }
 
+std::string FreeEntryName(AclEntry& entry, const std::string& name) {
+  const std::string bytes = Canonical(entry);
+  const auto isFree = [&](const std::string& each) {
+    const std::string path = EntryPath(each);
+    std::error_code error;
+    return !std::filesystem::exists(std::filesystem::symlink_status(path, error)) ||
+           IsAlready(path, bytes);
+  };
+  std::string result = name;
+  for (int number = 2; !isFree(result); ++number) result = name + "-" + std::to_string(number);
+  return result;
+}
+
 void GrantEntry(AclEntry& entry, const EntryPlace& place) {
   const std::string path = EntryPath(place.name);
   const std::string bytes = Canonical(entry);

@@ -27,6 +27,10 @@ struct EntryPlace {
   bool force = false;
   bool dryRun = false;
 };
+// FreeEntryName returns `name`, or `name`-2 and so on when another entry is there: one that none
+// but an equal entry has.
+std::string FreeEntryName(ZvVesk2::AclEntry& entry, const std::string& name);
+
 // GrantEntry checks an entry and writes it into the machine's store, which it makes if need be. An
 // equal entry of that name stays as it is.
 void GrantEntry(ZvVesk2::AclEntry& entry, const EntryPlace& place);

@@ -1,9 +1,9 @@
 // manifest_file.cpp: reading manifest files.
 #include "tools/vesk2/manifest_file.h"
 
+#include "tools/vesk2/files.h"
+#include "tools/vesk2/progress.h"
 #include "tools/vesk2/report.h"
-
-#include <vesk2/manifest.h>
 
 namespace vesk2_command {
 
@@ -27,6 +27,37 @@ std::unique_ptr<BodyDirectory> ReadListing(const std::string& path, const std::s
   const int parsed = root->ParseBody(body.get(), nullptr);
   if (parsed != 0) Malformed(path, start + body->Position(), "manifest", parsed);
   return root;
+}
+
+void IgnoreEntries(Manifest& manifest, const std::set<std::string>& names) {
+  FileItem* list = nullptr;
+  for (const std::string& name : names) {
+    FileItem* item = ZvVesk2::FileItemCreate(NewText(name), nullptr);
+    if (item == nullptr) throw std::bad_alloc();
+    item->next = list;
+    list = item;
+  }
+  const std::unique_ptr<FileItem, decltype(&ZvVesk2::FileItemDelete)> owner(
+      list, &ZvVesk2::FileItemDelete);
+  Check(manifest.SetIgnoredEntries(list), "preparing");
+}
+
+void CheckSigned(const std::string& path, const std::string& directory,
+                 const std::set<std::string>& ignored) {
+  Manifest manifest(nullptr);
+  Check(manifest.Initialize(directory.c_str(), path.c_str(), "none"), "preparing");
+  IgnoreEntries(manifest, ignored);
+  const ProgressLine progress("checking", directory);
+  Check(manifest.SetFileCallbacks(progress.Callbacks()), "preparing");
+  ZvBuffer* handed = nullptr;
+  const int code = manifest.ReadManifest(false, 0, 0, &handed);
+  const Buffer body(handed);
+  Check(code, "the new manifest could not be verified");
+  if (manifest.Verify(body.get(), directory.c_str()) == 0) return;
+  for (const FileItem* list : {manifest.GetInvalid(), manifest.GetMissing(), manifest.GetExtra()}) {
+    for (; list != nullptr; list = list->next) Note("changed meanwhile: " + Escape(list->name));
+  }
+  throw FileTrouble(directory, "changed while it was signed; nothing was signed", "tree-changed");
 }
 
 namespace {

@@ -5,9 +5,12 @@
 #include <filesystem>
 
 #include "tools/vesk2/command.h"
+#include "tools/vesk2/crl_file.h"
 #include "tools/vesk2/files.h"
+#include "tools/vesk2/grant.h"
 #include "tools/vesk2/issue.h"
 #include "tools/vesk2/manifest_file.h"
+#include "tools/vesk2/progress.h"
 #include "tools/vesk2/report.h"
 #include "tools/vesk2/tree.h"
 
@@ -27,8 +30,12 @@ struct Options {
   std::string at = "now";
   std::vector<std::string> ignored;
   bool allowLinks = false;
+  std::vector<std::string> crls;
+  bool allowEmpty = false;
+  std::string grant;
   std::string output;
   bool force = false;
+  bool dryRun = false;
 };
 
 // The signed elements that stand before the signature block, and the one inside it.
@@ -81,20 +88,54 @@ std::string SignersCerts(const Options& options, const PrivateKey& key) {
   return text;
 }
 
-Listing ListOrExplain(const Options& options, std::set<std::string> ignored) {
+std::set<std::string> Ignored(const Options& options) {
+  std::set<std::string> ignored;
+  for (const std::string& name : options.ignored) ignored.insert(PlainRelative(name));
+  return ignored;
+}
+
+// Lists the tree, with everything that is to be said of it before it is signed.
+Listing ListOrExplain(const Options& options) {
+  const std::set<std::string> ignored = Ignored(options);
+  const std::string output = options.output == kStandard ? "" : options.output;
+  const ProgressLine progress("hashing", options.directory);
   Listing listing =
-      ListTree(options.directory, {std::move(ignored), options.allowLinks, options.output});
+      ListTree(options.directory, {ignored, options.allowLinks, output, progress.Callbacks()});
   for (const std::string& problem : listing.problems) Note(problem);
   if (!listing.problems.empty()) {
     throw Trouble(std::to_string(listing.problems.size()) +
-                  " entries could not be verified later; nothing was signed (--ignore leaves an "
-                  "entry out)");
+                      " entries could not be verified later; nothing was signed (--ignore leaves "
+                      "an entry out)",
+                  "tree-unverifiable");
+  }
+  NoteRemarks(listing.remarks);
+  for (const std::string& name : ignored) {
+    if (listing.ignored.count(name) == 0) Note("warning: --ignore " + Escape(name) + ": not there");
+  }
+  if (listing.files == 0 && !options.allowEmpty) {
+    const char* why = listing.ignored.empty() ? "holds no file" : "holds no file but ignored ones";
+    throw FileTrouble(options.directory, std::string(why) + " (--allow-empty signs it)",
+                      "nothing-to-sign");
   }
   return listing;
 }
 
+// The lists that the manifest carries. One that is not as its issuer signed it helps nobody.
+std::string CarriedLists(const Options& options) {
+  std::string text;
+  for (const std::string& path : options.crls) {
+    const Ref<CrlSequence> list = ReadCrl(path);
+    if (const int code = CheckIssuerWord(*list); code != 0) {
+      throw FileTrouble(path, Reason(code), ReasonWord(code));
+    }
+    text += Canonical(*list);
+  }
+  return text;
+}
+
 // A manifest that lies below the root of its own tree would be an unlisted entry of it.
 void RefuseInside(const std::string& output, const std::string& directory) {
+  if (output == kStandard) return;
   std::error_code error;
   const auto parent = std::filesystem::path(output).parent_path();
   const std::string real =
@@ -105,29 +146,79 @@ void RefuseInside(const std::string& output, const std::string& directory) {
   }
 }
 
+void ShowListing(const Listing& listing) {
+  Json entries = Json::array();
+  for (const ListedEntry& entry : listing.entries) {
+    const std::string path = Escape(entry.path);
+    if (entry.digest.empty()) {
+      Say(std::string(64, '-') + "  -  " + path);
+      entries.push_back({{"path", path}, {"kind", "directory"}});
+      continue;
+    }
+    Say(entry.digest + "  " + std::to_string(entry.bytes) + "  " + path);
+    entries.push_back(
+        {{"path", path}, {"kind", "file"}, {"bytes", entry.bytes}, {"sha256", entry.digest}});
+  }
+  Result()["entries"] = entries;
+}
+
+std::string Totals(const Listing& listing) {
+  return std::to_string(listing.files) + " files, " + std::to_string(listing.bytes) + " bytes";
+}
+
+// All that goes into the manifest beside the tree; read before the tree, which may take long.
+struct Parts {
+  Head head;
+  Ref<SExpression> tag;
+  std::string signers;
+  std::string lists;
+};
+
+Parts Prepare(const Options& options, const PrivateKey& key) {
+  if (!options.grant.empty()) ParseTag(options.grant);
+  return {MakeHead(options), options.tag.empty() ? Ref<SExpression>() : ParseTag(options.tag),
+          SignersCerts(options, key), CarriedLists(options)};
+}
+
+std::string MakeManifest(const Parts& parts, const Listing& listing, const PrivateKey& key,
+                         const std::string& algorithm) {
+  const Head& head = parts.head;
+  const Ref<Hash> digest = Digest(head, listing.body);
+  const SignedCert signer = IssueCert(key, {digest.get(), false, parts.tag.get()}, algorithm);
+  return "(8:manifest" + head.version + head.type + "(15:signature-block" + head.time +
+         Pair(signer) + parts.signers + ")(3:crl" + parts.lists + ")" + listing.body + ")";
+}
+
+// The machine trusts the signing key for a tag from now on, as with acl grant.
+void WriteGrant(const Options& options, const PrivateKey& key) {
+  const Ref<ZvVesk2::AclEntry> entry = MakeEntry({key.Public(), true, ParseTag(options.grant)});
+  const std::string name = std::filesystem::path(options.signer.key).stem().string();
+  GrantEntry(*entry, {FreeEntryName(*entry, name), false, options.dryRun});
+}
+
 ExitCode Run(const Options& options) {
   RefuseExisting(options.output, options.force);
   RefuseInside(options.output, options.directory);
   const PrivateKey key = PrivateKey::Read(options.signer.key, options.signer.passphrase);
-  const Ref<SExpression> tag = options.tag.empty() ? Ref<SExpression>() : ParseTag(options.tag);
-  const std::string signers = SignersCerts(options, key);
-  const Head head = MakeHead(options);
-  std::set<std::string> ignored;
-  for (const std::string& name : options.ignored) ignored.insert(PlainRelative(name));
-  const Listing listing = ListOrExplain(options, std::move(ignored));
+  const Parts parts = Prepare(options, key);
+  const Listing listing = ListOrExplain(options);
+  if (options.dryRun) ShowListing(listing);
 
-  const Ref<Hash> digest = Digest(head, listing.body);
-  const SignedCert signer =
-      IssueCert(key, {digest.get(), false, tag.get()}, options.signer.algorithm);
-  const std::string manifest = "(8:manifest" + head.version + head.type + "(15:signature-block" +
-                               head.time + Pair(signer) + signers + ")(3:crl)" + listing.body + ")";
-  // What cannot be read back is not handed out.
-  const auto readBack = [&](const std::string& temporary) {
-    ReadListing(temporary, options.directory);
+  const std::string manifest = MakeManifest(parts, listing, key, options.signer.algorithm);
+  // What cannot be verified is not handed out.
+  const auto check = [&](const std::string& unnamed) {
+    CheckSigned(unnamed, options.directory, Ignored(options));
   };
-  WriteFile(options.output, manifest, {0666, options.force, readBack});
-  Note("wrote " + Escape(options.output) + ": " + std::to_string(listing.files) + " files, " +
-       std::to_string(listing.bytes) + " bytes, signed by " + Fingerprint(*key.Public()));
+  const std::string signer = Fingerprint(*key.Public());
+  if (WriteFile(options.output, manifest, {0666, options.force, check, options.dryRun})) {
+    Note("wrote " + Escape(options.output) + ": " + Totals(listing) + ", signed by " + signer);
+  } else {
+    Say(Totals(listing) + ", to be signed by " + signer);
+  }
+  Result()["files"] = listing.files;
+  Result()["bytes"] = listing.bytes;
+  Result()["signer"] = signer;
+  if (!options.grant.empty()) WriteGrant(options, key);
   return kYes;
 }
 
@@ -144,8 +235,14 @@ Action DefineManifestSign(CLI::App& app) {
   app.add_option("--ignore", options->ignored, "Leave this entry out (a path below the directory)")
       ->allow_extra_args(false);
   app.add_flag("--allow-links", options->allowLinks, "Follow links that lead out of the tree");
+  app.add_option("--crl", options->crls, "Carry this revocation list (may be repeated)")
+      ->allow_extra_args(false);
+  app.add_flag("--allow-empty", options->allowEmpty, "Sign a tree without files");
+  app.add_option("--grant", options->grant,
+                 "Trust the signing key for this tag on this machine, as acl grant --propagate");
   app.add_option("-o,--output", options->output, "The manifest file")->required();
   app.add_flag("-f,--force", options->force, "Replace an existing file");
+  app.add_flag("-n,--dry-run", options->dryRun, "Show what would be signed; write nothing");
   return [options] { return Run(*options); };
 }
 

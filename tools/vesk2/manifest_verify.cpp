@@ -43,16 +43,7 @@ void Configure(Manifest& manifest, const Options& options, const std::set<std::s
   manifest.SetFailOnExtraEntries(!options.allowExtra);
   manifest.SetStoreUpdate(!options.noStoreUpdate);
   if (!options.aclDirectory.empty()) manifest.SetExtraAclDirectory(NewText(options.aclDirectory));
-  FileItem* list = nullptr;
-  for (const std::string& name : ignored) {
-    FileItem* item = ZvVesk2::FileItemCreate(NewText(name), nullptr);
-    if (item == nullptr) throw std::bad_alloc();
-    item->next = list;
-    list = item;
-  }
-  const std::unique_ptr<FileItem, decltype(&ZvVesk2::FileItemDelete)> owner(
-      list, &ZvVesk2::FileItemDelete);
-  Check(manifest.SetIgnoredEntries(list), "preparing");
+  IgnoreEntries(manifest, ignored);
 }
 
 // ---- Findings about the tree ----

@@ -34,6 +34,11 @@ std::string Join(const std::string& directory, const std::string& name) {
   return directory.empty() || directory.ends_with('/') ? directory + name : directory + "/" + name;
 }
 
+bool IsLink(const std::string& path) {
+  struct stat status = {};
+  return lstat(path.c_str(), &status) == 0 && S_ISLNK(status.st_mode);
+}
+
 struct CloseDirectory {
   void operator()(DIR* stream) const { closedir(stream); }
 };
@@ -73,9 +78,10 @@ class Lister {
     const Identity identity(status.st_dev, status.st_ino);
     if (!open_.insert(identity).second) return Problem(path, "a link to a directory around it");
     if (depth > ZvVesk2::Limits::kMaxDepth) return Problem(path, "nested too deeply");
+    std::erase_if(names, [&](const std::string& name) { return IsIgnored(Join(relative, name)); });
+    RemarkOnNames(relative, names, listing_.remarks);
     for (const std::string& name : names) {
-      const std::string below = Join(relative, name);
-      if (options_.ignored.count(below) == 0) Entry(Join(path, name), name, below, depth);
+      Entry(Join(path, name), name, Join(relative, name), depth);
     }
     open_.erase(identity);
   }
@@ -84,6 +90,12 @@ class Lister {
 
  private:
   using Identity = std::pair<dev_t, ino_t>;
+
+  bool IsIgnored(const std::string& relative) {
+    if (options_.ignored.count(relative) == 0) return false;
+    listing_.ignored.insert(relative);
+    return true;
+  }
 
   void Problem(const std::string& path, const std::string& reason) {
     listing_.problems.push_back(Escape(path) + ": " + reason);
@@ -97,28 +109,35 @@ class Lister {
       return Problem(path, "a link that leads out of the tree (--allow-links follows it)");
     }
     if (stat(path.c_str(), &status) != 0) return Problem(path, std::strerror(errno));
+    if (IsLink(path)) {
+      listing_.remarks["a link; what it leads to is signed, not the link"].push_back(relative);
+    }
     if (S_ISDIR(status.st_mode)) {
+      listing_.entries.push_back({relative + "/", 0, ""});
       listing_.body += "(3:dir" + Atom(name) + Atom("");
       List(path, relative, depth + 1);
       listing_.body += ")";
     } else if (!S_ISREG(status.st_mode)) {
       Problem(path, "neither a file nor a directory");
     } else if (realOutput_.empty() || RealPath(path) != realOutput_) {
-      File(path, name, static_cast<uint64_t>(status.st_size));
+      File(path, name, {relative, static_cast<uint64_t>(status.st_size), ""});
     }
   }
 
-  void File(const std::string& path, const std::string& name, uint64_t size) {
+  void File(const std::string& path, const std::string& name, ListedEntry entry) {
     unsigned char digest[32];
     unsigned int length = sizeof digest;
-    const int code = ZvVesk2::Hash::HashFile(path.c_str(), digest, &length, nullptr);
+    const int code =
+        ZvVesk2::Hash::HashFile(path.c_str(), digest, &length, nullptr, options_.callbacks);
     if (code == VESK2_ERR_FILE_OPEN) return Problem(path, WhyUnreadable(path));
     if (code == VESK2_ERR_READ_FILE) return Problem(path, "unreadable, or changed while read");
     if (code != 0) return Problem(path, Reason(code));
-    listing_.body +=
-        "(4:file" + Atom(name) + Atom("") + Atom({reinterpret_cast<char*>(digest), length}) + ")";
+    const std::string_view bytes(reinterpret_cast<char*>(digest), length);
+    listing_.body += "(4:file" + Atom(name) + Atom("") + Atom(bytes) + ")";
     ++listing_.files;
-    listing_.bytes += size;
+    listing_.bytes += entry.bytes;
+    entry.digest = Hex(bytes);
+    listing_.entries.push_back(std::move(entry));
   }
 
   const ListingOptions& options_;
@@ -186,8 +205,7 @@ std::string RealDirectory(const std::string& directory) {
 }
 
 bool LeavesTree(const std::string& path, const std::string& realRoot) {
-  struct stat status = {};
-  if (lstat(path.c_str(), &status) != 0 || !S_ISLNK(status.st_mode)) return false;
+  if (!IsLink(path)) return false;
   const std::string target = RealPath(path);
   return target != realRoot && !target.starts_with(Join(realRoot, ""));
 }

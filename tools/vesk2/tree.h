@@ -10,6 +10,8 @@
 #include <string>
 #include <vector>
 
+#include "tools/vesk2/portable.h"
+
 #include <vesk2/manifest_body.h>
 
 namespace vesk2_command {
@@ -25,13 +27,23 @@ struct ListingOptions {
   std::set<std::string> ignored;  // paths relative to the root, without "./" and closing "/"
   bool allowLinks = false;        // list what links outside the tree lead to
   std::string output;             // a file that is not listed although it may lie in the root
+  const Vesk2FileCallbacks* callbacks = nullptr;  // told about the files, or null
+};
+
+struct ListedEntry {
+  std::string path;  // below the root; that of a directory ends in "/"
+  uint64_t bytes = 0;
+  std::string digest;  // SHA-256 in hexadecimal; empty for a directory
 };
 
 struct Listing {
   std::string body;  // the canonical body of a manifest
+  std::vector<ListedEntry> entries;
   uint64_t files = 0;
   uint64_t bytes = 0;
   std::vector<std::string> problems;  // entries that cannot be signed, with the reason
+  Remarks remarks;                    // on entries that can, but perhaps not verified elsewhere
+  std::set<std::string> ignored;      // what was left out
 };
 
 // ListTree reads and hashes the whole tree, in byte order of the names, and follows links. Entries
