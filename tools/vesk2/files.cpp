@@ -189,11 +189,8 @@ void WriteNamed(const std::string& path, std::string_view bytes, const WriteOpti
   RefuseExisting(path, options.force);
   std::error_code error;
   const std::filesystem::path directory = Directory(path);
-  if (options.dryRun) {
-    const bool there = options.makeDirectory || std::filesystem::is_directory(directory, error);
-    if (!there) Fail(path, ENOENT);
-    return CheckInMemory(bytes, options);
-  }
+  if (!options.makeDirectory) RequireDirectory(path);
+  if (options.dryRun) return CheckInMemory(bytes, options);
   if (options.makeDirectory && !std::filesystem::create_directories(directory, error) && error) {
     Fail(directory.string(), error.value());
   }
@@ -247,6 +244,13 @@ void RefuseExisting(const std::string& path, bool force) {
   // Renaming a file over it would replace a device, or the link to one.
   if (stat(path.c_str(), &status) == 0 && !S_ISREG(status.st_mode)) {
     throw FileTrouble(path, "not a file that could be replaced", "exists");
+  }
+}
+
+void RequireDirectory(const std::string& path) {
+  std::error_code error;
+  if (path != kStandard && !std::filesystem::is_directory(Directory(path), error)) {
+    Fail(path, error ? error.value() : ENOTDIR);
   }
 }
 

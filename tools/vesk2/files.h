@@ -32,6 +32,9 @@ std::string InputPath(const std::string& path);
 // Trouble if something is at `path`, unless `force`; what is no file is never replaced.
 void RefuseExisting(const std::string& path, bool force);
 
+// Trouble unless there is a directory for a file at `path`: asked before work that takes long.
+void RequireDirectory(const std::string& path);
+
 struct WriteOptions {
   mode_t mode = 0666;  // less the umask
   bool force = false;  // replace what is there

@@ -198,6 +198,7 @@ void WriteGrant(const Options& options, const PrivateKey& key) {
 
 ExitCode Run(const Options& options) {
   RefuseExisting(options.output, options.force);
+  RequireDirectory(options.output);
   RefuseInside(options.output, options.directory);
   const PrivateKey key = PrivateKey::Read(options.signer.key, options.signer.passphrase);
   const Parts parts = Prepare(options, key);
