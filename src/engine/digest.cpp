@@ -15,7 +15,7 @@ spki_status spki_digest_start(spki_engine* engine, spki_digest* digest, ZvclmHas
 }
 
 spki_status spki_digest_update(spki_digest* digest, const void* data, size_t length) {
-  if (digest == nullptr || data == nullptr || length == 0) return 0;
+  if (data == nullptr || length == 0) return 0;
   const auto* bytes = static_cast<const unsigned char*>(data);
   return spki_map_crypto_status(zvclm_HashUpdate(digest->context, bytes, length, digest->handle));
 }

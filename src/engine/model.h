@@ -55,6 +55,7 @@ struct spki_elem {
   spki_elem* next;            // counted
   const unsigned char* text;  // on a head: the "(" in the input; null for lists made from templates
   uint32_t text_length;       // on a head: bytes up to just behind the ")"
+  unsigned char* digest;      // on the head of a key: its SHA-256, once asked for; its own memory
   union {
     int32_t keyword;  // SPKI_ELEM_KEYWORD
     spki_atom* atom;  // SPKI_ELEM_HEAD, SPKI_ELEM_STRING; counted
@@ -81,6 +82,7 @@ inline constexpr size_t kSpkiBuckets = 256;
 // The state of one call. Zero-filled before use, held in the caller's frame.
 struct spki_engine {
   spki_bucket_entry* principals[kSpkiBuckets];  // by the first byte of a digest
+  bool keys_by_sha1;                            // whether keys stand there by their SHA-1 too
   spki_bucket_entry* name_definitions[kSpkiBuckets];
   spki_bucket_entry* name_users[kSpkiBuckets];
   spki_bucket_entry* acl_tuples;  // issued by the ACL itself, newest first
@@ -192,11 +194,6 @@ struct spki_input {
 spki_status spki_parse_list(spki_engine* engine, spki_elem** slot, spki_input* input);
 spki_status spki_parse_atom(spki_engine* engine, spki_atom** slot, spki_input* input);
 spki_status spki_parse_length(uint32_t* length, spki_input* input);
-
-// Feeds the canonical form of a chain to up to two digests (either may be null).
-struct spki_digest;  // src/engine/digest.h
-spki_status spki_write_canonical(spki_engine* engine, const spki_elem* chain, spki_digest* first,
-                                 spki_digest* second);
 
 // Folds a crypto result into an engine code; every unlisted value is success, deliberately.
 spki_status spki_map_crypto_status(int status);

@@ -8,6 +8,7 @@
 #include <cstring>
 
 #include "src/engine/chain.h"
+#include "src/engine/write.h"
 #include "src/frame/check.h"
 
 namespace ZvVesk2::Engine {
@@ -45,14 +46,45 @@ spki_status AddPrincipal(spki_engine* engine, const Digest& digest, spki_elem* k
   return 0;
 }
 
-spki_status DigestKey(spki_engine* engine, const spki_elem* key, Digest& sha256, Digest& sha1) {
-  spki_digest first;
-  spki_digest second;
-  VESK2_TRY(spki_digest_start(engine, &first, ZVCLM_HASH_SHA256));
-  VESK2_TRY(spki_digest_start(engine, &second, ZVCLM_HASH_SHA1));
-  VESK2_TRY(spki_write_canonical(engine, key, &first, &second));
-  VESK2_TRY(spki_digest_finish(&first, sha256));
-  return spki_digest_finish(&second, sha1);
+spki_status DigestKey(spki_engine* engine, const spki_elem* key, ZvclmHashID id, Digest& digest) {
+  spki_digest_sink sink;
+  VESK2_TRY(spki_digest_start(engine, &sink.digest, id));
+  VESK2_TRY(spki_write_pieces(key, &sink));
+  return spki_digest_finish(&sink.digest, digest);
+}
+
+// The key's SHA-256, which its head keeps: keys are registered first and looked for later.
+spki_status IdentifyKey(spki_engine* engine, spki_elem* key, Digest& digest) {
+  if (key->digest == nullptr) {
+    VESK2_TRY(DigestKey(engine, key, ZVCLM_HASH_SHA256, digest));
+    key->digest = static_cast<unsigned char*>(spki_allocate(engine, sizeof digest));
+    VESK2_REQUIRE(key->digest != nullptr, SPKI_ERR_NO_MEM);
+    std::memcpy(key->digest, digest, sizeof digest);
+  }
+  std::memcpy(digest, key->digest, sizeof digest);
+  return 0;
+}
+
+spki_status EnterBySha1(spki_engine* engine, spki_principal* principal) {
+  Digest digest;
+  VESK2_TRY(DigestKey(engine, principal->key, ZVCLM_HASH_SHA1, digest));
+  return EnterPrincipal(engine, digest, principal);
+}
+
+// Enters every key by its SHA-1 too, once a credential names one so; few ever do.
+spki_status EnterKeysBySha1(spki_engine* engine) {
+  if (engine->keys_by_sha1) return 0;
+  engine->keys_by_sha1 = true;
+  for (const spki_bucket_entry* entry : engine->principals) {
+    for (; entry != nullptr; entry = entry->next) {
+      spki_principal* principal = entry->principal;
+      const bool bySha256 =
+          std::memcmp(entry->digest, principal->digest, sizeof entry->digest) == 0;
+      if (!bySha256 || HeadKeyword(principal->key) != SPKI_KW_PUBLIC_KEY) continue;
+      VESK2_TRY(EnterBySha1(engine, principal));
+    }
+  }
+  return 0;
 }
 
 // The digest that (hash <algorithm> <value>) holds, zero-padded.
@@ -84,19 +116,18 @@ spki_status spki_register_keys(spki_engine* engine, spki_elem* list) {
 }
 
 spki_status spki_principal_of_key(spki_engine* engine, spki_elem* key, spki_principal** slot) {
-  Digest sha256;
-  Digest sha1;
-  VESK2_TRY(DigestKey(engine, key, sha256, sha1));
-  VESK2_TRY(FindPrincipal(engine, sha256, slot));
+  Digest digest;
+  VESK2_TRY(IdentifyKey(engine, key, digest));
+  VESK2_TRY(FindPrincipal(engine, digest, slot));
   if (*slot != nullptr) return 0;
-  VESK2_TRY(AddPrincipal(engine, sha256, key, slot));
-  // Credentials name keys by SHA-1 too.
-  return EnterPrincipal(engine, sha1, *slot);
+  VESK2_TRY(AddPrincipal(engine, digest, key, slot));
+  return engine->keys_by_sha1 ? EnterBySha1(engine, *slot) : 0;
 }
 
 spki_status spki_principal_of_hash(spki_engine* engine, spki_elem* hash, spki_principal** slot) {
   Digest digest;
   VESK2_TRY(ReadHash(hash, digest));
+  if (StringOf(hash->next)->keyword == SPKI_KW_SHA1) VESK2_TRY(EnterKeysBySha1(engine));
   VESK2_TRY(FindPrincipal(engine, digest, slot));
   // Entered, so that all credentials that name this hash mean one principal.
   return *slot != nullptr ? 0 : AddPrincipal(engine, digest, hash, slot);

@@ -69,6 +69,7 @@ void spki_elem_release(spki_engine* engine, spki_elem* elem) {
   while (elem != nullptr && Drop(elem)) {
     spki_elem* next = elem->next;
     ReleaseValue(engine, elem);
+    spki_free(engine, elem->digest);
     Return(elem, &engine->free_elems);
     elem = next;
   }

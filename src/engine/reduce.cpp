@@ -74,6 +74,7 @@ void ForgetTables(spki_engine* engine) {
   std::fill(std::begin(engine->principals), std::end(engine->principals), nullptr);
   std::fill(std::begin(engine->name_definitions), std::end(engine->name_definitions), nullptr);
   std::fill(std::begin(engine->name_users), std::end(engine->name_users), nullptr);
+  engine->keys_by_sha1 = false;
   engine->acl_tuples = nullptr;
 }
 

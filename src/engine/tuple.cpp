@@ -12,10 +12,15 @@
 namespace ZvVesk2::Engine {
 namespace {
 
-bool Equal(const spki_tuple* a, const spki_tuple* b) {
-  return a->reaches == b->reaches && a->propagate == b->propagate && a->member == b->member &&
-         a->issuer == b->issuer && a->subject == b->subject && a->threshold == b->threshold &&
-         std::memcmp(a->value, b->value, sizeof a->value) == 0;
+// Most tuples differ in what is no text; values are made for the others only.
+spki_status Compare(spki_engine* engine, spki_tuple* a, spki_tuple* b, bool* equal) {
+  *equal = a->reaches == b->reaches && a->propagate == b->propagate && a->member == b->member &&
+           a->issuer == b->issuer && a->subject == b->subject && a->threshold == b->threshold;
+  if (!*equal) return 0;
+  VESK2_TRY(spki_tuple_value(engine, a));
+  VESK2_TRY(spki_tuple_value(engine, b));
+  *equal = std::memcmp(a->value, b->value, sizeof a->value) == 0;
+  return 0;
 }
 
 }  // namespace
@@ -77,10 +82,12 @@ spki_status spki_tuple_push(spki_engine* engine, spki_bucket_entry** list, spki_
 spki_status spki_tuple_file(spki_engine* engine, spki_bucket_entry** list, spki_tuple* tuple,
                             bool* filed) {
   *filed = false;
-  VESK2_TRY(spki_tuple_value(engine, tuple, tuple->value));
+  VESK2_TRY(spki_tuple_charge(engine, tuple));
   for (const spki_bucket_entry* entry = *list; entry != nullptr; entry = entry->next) {
     VESK2_TRY(spki_charge_step(engine));
-    if (Equal(entry->tuple, tuple)) return 0;
+    bool equal = false;
+    VESK2_TRY(Compare(engine, entry->tuple, tuple, &equal));
+    if (equal) return 0;
   }
   VESK2_TRY(spki_tuple_push(engine, list, tuple));
   *filed = true;

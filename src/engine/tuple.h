@@ -31,6 +31,7 @@ struct spki_tuple {
   spki_elem* tag;             // the whole (tag ...) list
   spki_atom* not_before;
   spki_atom* not_after;
+  bool valued;                           // whether `value` was made
   unsigned char value[kSpkiDigestSize];  // see spki_tuple_file
 };
 

@@ -9,9 +9,11 @@ namespace ZvVesk2::Engine {
 // The SHA-256 of the principal's digest and the canonical name.
 spki_status spki_name_value(spki_engine* engine, const spki_principal* principal,
                             const spki_atom* name, unsigned char (&out)[kSpkiDigestSize]);
-// The SHA-256 of a tuple's lists and strings, each absent one marked.
-spki_status spki_tuple_value(spki_engine* engine, const spki_tuple* tuple,
-                             unsigned char (&out)[kSpkiDigestSize]);
+// Charges the walk through a tuple's lists and strings: what its value costs, once or never made.
+spki_status spki_tuple_charge(spki_engine* engine, const spki_tuple* tuple);
+// Makes `tuple->value`, the SHA-256 of a charged tuple's lists and strings, each absent one marked,
+// unless it is there.
+spki_status spki_tuple_value(spki_engine* engine, spki_tuple* tuple);
 
 }  // namespace ZvVesk2::Engine
 

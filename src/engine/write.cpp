@@ -8,22 +8,10 @@
 
 #include <charconv>
 
-#include "src/engine/digest.h"
 #include "src/frame/check.h"
 
 namespace ZvVesk2::Engine {
 namespace {
-
-struct DigestSink final : spki_sink {
-  spki_digest* first;
-  spki_digest* second;
-
-  DigestSink(spki_digest* a, spki_digest* b) : first(a), second(b) {}
-  spki_status Put(const void* data, size_t length) override {
-    VESK2_TRY(spki_digest_update(first, data, length));
-    return spki_digest_update(second, data, length);
-  }
-};
 
 // Length, colon and bytes.
 spki_status PutString(const void* data, uint32_t length, spki_sink* sink) {
@@ -66,12 +54,6 @@ spki_status spki_write_pieces(const spki_elem* chain, spki_sink* sink) {
     VESK2_TRY(PutElem(elem, sink));
   }
   return sink->Put(")", 1);
-}
-
-spki_status spki_write_canonical(spki_engine* /*engine*/, const spki_elem* chain,
-                                 spki_digest* first, spki_digest* second) {
-  DigestSink sink(first, second);
-  return spki_write_pieces(chain, &sink);
 }
 
 }  // namespace ZvVesk2::Engine

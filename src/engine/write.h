@@ -3,6 +3,7 @@
 #ifndef VESK2_SRC_ENGINE_WRITE_H
 #define VESK2_SRC_ENGINE_WRITE_H
 
+#include "src/engine/digest.h"
 #include "src/engine/model.h"
 
 namespace ZvVesk2::Engine {
@@ -13,6 +14,15 @@ struct spki_sink {
 
  protected:
   ~spki_sink() = default;
+};
+
+// Feeds the pieces to a digest.
+struct spki_digest_sink final : spki_sink {
+  spki_digest digest;
+
+  spki_status Put(const void* data, size_t length) override {
+    return spki_digest_update(&digest, data, length);
+  }
 };
 
 spki_status spki_write_pieces(const spki_elem* chain, spki_sink* sink);
