@@ -56,15 +56,9 @@ ZvBuffer* zv_buffer_wrap(const void* data, size_t size) {
 
 // The bytes are read, not mapped: a file that shrinks under a map kills the process that reads it.
 ZvBuffer* zv_buffer_wrap_file(const char* path) {
-  const ZvFileOwner file(zv_open(path, ZV_READ));
-  if (file == nullptr) return nullptr;
-  const auto size = static_cast<uint64_t>(file->opened.st_size);
-  if (size > ZvVesk2::Limits::kMaxFile) return nullptr;
-  std::unique_ptr<unsigned char[]> bytes(new (std::nothrow) unsigned char[size]);
-  if (bytes == nullptr) return NoMemory();
-  if (zv_read(file.get(), bytes.get(), size) != size) return nullptr;
-  unsigned char more = 0;
-  if (zv_read(file.get(), &more, 1) != 0 || zv_failed(file.get())) return nullptr;
+  size_t size = 0;
+  std::unique_ptr<unsigned char[]> bytes(zv_read_whole(path, ZvVesk2::Limits::kMaxFile, &size));
+  if (bytes == nullptr) return nullptr;
   ZvBuffer* buffer = new (std::nothrow) ZvBuffer(bytes.get(), size);
   if (buffer == nullptr) return NoMemory();
   bytes.release();

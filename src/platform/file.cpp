@@ -68,12 +68,18 @@ ZvFile* OpenForWriting(const char* path, int flags) {
   return file.release();
 }
 
-// Reads once, at most `length` bytes, counting them. 0 at the end and on an error.
-size_t ReadOnce(ZvFile* file, unsigned char* out, size_t length) {
+// Reads once, at most `length` bytes. 0 at the end, -1 for an error.
+ssize_t ReadDescriptor(int fd, unsigned char* out, size_t length) {
   ssize_t count;
   do {
-    count = read(file->fd, out, length);
+    count = read(fd, out, length);
   } while (count < 0 && errno == EINTR);
+  return count;
+}
+
+// The same with the bytes counted. 0 at the end and on an error.
+size_t ReadOnce(ZvFile* file, unsigned char* out, size_t length) {
+  const ssize_t count = ReadDescriptor(file->fd, out, length);
   if (count > 0) file->taken += static_cast<size_t>(count);
   file->failed = count < 0 || file->taken > static_cast<uint64_t>(file->opened.st_size);
   return file->failed ? 0 : static_cast<size_t>(count);
@@ -129,6 +135,28 @@ size_t zv_read_slow(ZvFile* file, unsigned char* out, size_t length) {
     }
   }
   return copied;
+}
+
+unsigned char* zv_read_whole(const char* path, uint64_t limit, size_t* size) {
+  if (!IsRegular(path)) return nullptr;
+  struct stat opened {};
+  const Descriptor fd(OpenRegular(path, O_RDONLY, &opened));
+  if (fd.get() < 0) return nullptr;
+  const auto held = static_cast<uint64_t>(opened.st_size);
+  if (held > limit) return nullptr;
+  // One byte more than it held is asked for, so that the read that gets it all meets the end.
+  std::unique_ptr<unsigned char[]> bytes(new (std::nothrow) unsigned char[held + 1]);
+  if (bytes == nullptr) return NoMemory();
+  size_t taken = 0;
+  do {
+    const ssize_t count = ReadDescriptor(fd.get(), bytes.get() + taken, held + 1 - taken);
+    if (count < 0) return nullptr;
+    if (count == 0) break;
+    taken += static_cast<size_t>(count);
+  } while (taken < held);
+  if (taken != held) return nullptr;
+  *size = taken;
+  return bytes.release();
 }
 
 bool zv_unchanged(const ZvFile* file) {

@@ -100,6 +100,11 @@ inline size_t zv_read(ZvReader& reader, unsigned char* out, size_t length) {
   return reader.Read(out, length);
 }
 
+// zv_read_whole reads a regular file of at most `limit` bytes into a new array (delete[]), without
+// the block of the readers above. Null as for zv_open, on a read error, and for a file that yields
+// other than the *size bytes that it held when it was opened.
+unsigned char* zv_read_whole(const char* path, uint64_t limit, size_t* size);
+
 inline bool zv_failed(const ZvFile* file) { return file->failed; }
 // Whether a file opened for reading is still the one that was opened: same inode, size and time.
 bool zv_unchanged(const ZvFile* file);
