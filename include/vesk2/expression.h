@@ -173,7 +173,12 @@ class VESK2_API ByteString : public DExpression {
 
   BsType type = BsNone;
   unsigned int length = 0;
-  unsigned char* data = nullptr;
+  unsigned char* data = nullptr;  // an array from new[], or `shortBytes`
+
+ private:
+  // The bytes of a short string: keywords, names and times need no array of their own.
+  static constexpr unsigned int kShort = 24;
+  unsigned char shortBytes[kShort];
 };
 
 // ---- SExpression -------------------------------------------------------------------------------
@@ -234,7 +239,11 @@ class VESK2_API SExpression : public DExpression {
   bool Contains(SExpression* x);
 
   // Walks the elements: for (auto it = list->Begin(); it; it.Next()) use(it.Value());
-  class Node;
+  struct Node {
+    Node* next = nullptr;
+    DExpression* value = nullptr;  // the list holds one reference
+    bool own = false;              // whether it stands in a list itself
+  };
   class VESK2_API Iterator {
    public:
     explicit Iterator(const Node* node) : node_(node) {}
@@ -338,9 +347,14 @@ class VESK2_API SExpression : public DExpression {
 
  private:
   StorageType storageType = StorageHome;
+  unsigned int ownUsed = 0;  // of ownNodes
   Node* first = nullptr;
   Node* last = nullptr;
   char* fileName = nullptr;
+
+  // The nodes of the first elements; most lists are short, and need no others.
+  static constexpr unsigned int kOwnNodes = 3;
+  Node ownNodes[kOwnNodes];
 };
 
 }  // namespace ZvVesk2

@@ -97,13 +97,11 @@ int TimeStamp::Set(long seconds) {
   // Always new storage: an imported or shortened stamp has less than a text and its terminator
   // need.
   Clear();
-  unsigned char* const storage = TryNewArray<unsigned char>(kLength + 1);
-  VESK2_REQUIRE(storage != nullptr, VESK2_ERR_MEM_ALLOC);
+  VESK2_TRY(Reserve(kLength + 1));
   char text[80];
   std::snprintf(text, sizeof(text), "%04d-%02d-%02d_%02d:%02d:%02d", fields.tm_year + 1900,
                 fields.tm_mon + 1, fields.tm_mday, fields.tm_hour, fields.tm_min, fields.tm_sec);
-  std::memcpy(storage, text, kLength + 1);
-  data = storage;
+  std::memcpy(data, text, kLength + 1);
   length = kLength;
   return 0;
 }

@@ -28,14 +28,16 @@ ByteString::ByteString(unsigned char* adopted, unsigned int size, BsType hint,
                        Vesk2ContextStruct* owner)
     : DExpression(owner), type(hint), length(adopted != nullptr ? size : 0), data(adopted) {}
 
-ByteString::~ByteString() { delete[] data; }
+ByteString::~ByteString() { Clear(); }
 
 int ByteString::Set(const unsigned char* bytes, unsigned int size, BsType hint) {
   VESK2_REQUIRE(bytes != nullptr && size != 0, VESK2_ERR_INVALID_PARAM);
   VESK2_REQUIRE(size <= Limits::kMaxByteString, VESK2_ERR_MAX_BYTE_STRING);
   // `bytes` may lie within the array that is replaced, so that one outlives the copy.
   std::unique_ptr<unsigned char[]> replaced;
-  if (!IsReusable(data, length, size)) replaced.reset(std::exchange(data, nullptr));
+  if (data != shortBytes && !IsReusable(data, length, size)) {
+    replaced.reset(std::exchange(data, nullptr));
+  }
   VESK2_TRY(Reserve(size));
   std::memmove(data, bytes, size);
   type = hint;
@@ -52,7 +54,7 @@ int ByteString::Set(const char* text, BsType hint) {
 int ByteString::Reserve(unsigned int size) {
   if (!IsReusable(data, length, size)) {
     Clear();
-    data = TryNewArray<unsigned char>(size);
+    data = size <= kShort ? shortBytes : TryNewArray<unsigned char>(size);
     VESK2_REQUIRE(data != nullptr, VESK2_ERR_MEM_ALLOC);
   }
   length = size;
@@ -60,7 +62,8 @@ int ByteString::Reserve(unsigned int size) {
 }
 
 void ByteString::Clear() {
-  delete[] std::exchange(data, nullptr);
+  if (data != shortBytes) delete[] data;
+  data = nullptr;
   length = 0;
 }
 

@@ -7,9 +7,15 @@
 #include <utility>
 
 #include "src/frame/check.h"
-#include "src/sexpr/node.h"
 
 namespace ZvVesk2 {
+namespace {
+
+void DeleteNode(SExpression::Node* node) {
+  if (!node->own) delete node;
+}
+
+}  // namespace
 
 SExpression::SExpression(Vesk2ContextStruct* owner) : DExpression(owner) {}
 
@@ -53,10 +59,10 @@ int SExpression::Create(SExpression*& out, const char* tag, Vesk2ContextStruct* 
 
 int SExpression::Insert(DExpression* value) {
   VESK2_REQUIRE(value != nullptr, VESK2_ERR_PARAM_NULL);
-  Node* node = TryNew<Node>();
+  const bool own = ownUsed < kOwnNodes;
+  Node* node = own ? &ownNodes[ownUsed++] : TryNew<Node>();
   VESK2_REQUIRE(node != nullptr, VESK2_ERR_MEM_ALLOC);
-  node->value = value;
-  node->prev = last;
+  *node = {nullptr, value, own};
   (first != nullptr ? last->next : first) = node;
   last = node;
   return 0;
@@ -74,34 +80,37 @@ int SExpression::Insert(const char* text) {
 
 int SExpression::Remove(DExpression* value) {
   VESK2_REQUIRE(value != nullptr, VESK2_ERR_PARAM_NULL);
+  Node* previous = nullptr;
   Node* node = first;
-  while (node != nullptr && node->value != value) node = node->next;
+  for (; node != nullptr && node->value != value; node = node->next) previous = node;
   VESK2_REQUIRE(node != nullptr, VESK2_ERR_NOT_IN_LIST);
-  const std::unique_ptr<Node> unlinked(node);
-  (node->prev != nullptr ? node->prev->next : first) = node->next;
-  (node->next != nullptr ? node->next->prev : last) = node->prev;
+  (previous != nullptr ? previous->next : first) = node->next;
+  if (node == last) last = previous;
+  DeleteNode(node);
   return 0;
 }
 
-// A list that only its parent holds gives its nodes to the chain before it is freed, so that no
-// destructor nests, however deeply the lists do.
+// The nodes of a list that only its parent holds go into the chain before it is freed, so that no
+// destructor nests, however deeply the lists do. Its own node comes again behind them, since some
+// stand in the list.
 void SExpression::DeleteNodes() {
   Node* chain = std::exchange(first, nullptr);
   last = nullptr;
   while (chain != nullptr) {
-    const std::unique_ptr<Node> node(chain);
-    chain = node->next;
-    DExpression* value = node->value;
+    DExpression* value = chain->value;
     if (value->IsSExpression() && value->GetRefCount() <= 1) {
       auto* list = static_cast<SExpression*>(value);
       if (list->last != nullptr) {
         list->last->next = chain;
         chain = std::exchange(list->first, nullptr);
         list->last = nullptr;
+        continue;
       }
     }
+    DeleteNode(std::exchange(chain, chain->next));
     value->Free();
   }
+  ownUsed = 0;
 }
 
 // ---- Reading ----

@@ -46,18 +46,21 @@ TEST(ByteString, SetTakes1To8192Bytes) {
 }
 
 TEST(ByteString, KeepsItsArrayForUpToSevenBytesLess) {
-  const std::string text = "abcdefghijklmnopqrst";
-  for (const auto& [length, kept] : {std::pair{13u, true}, {12u, false}, {21u, false}}) {
+  const std::string text = "abcdefghijklmnopqrstuvwxyz0123456789";  // long enough for an array
+  for (const auto& [length, kept] : {std::pair{29u, true}, {28u, false}, {37u, false}}) {
     const Ref<ByteString> string = Make(text);
     const unsigned char* before = string->GetData();
     ASSERT_EQ(string->Set(std::string(length, 'x').c_str(), ByteString::BsNone), 0);
     EXPECT_EQ(string->GetData() == before, kept) << length;
   }
   // The new bytes may be its own: within the array that is kept, and within one that is replaced.
-  for (const unsigned offset : {2u, 18u}) {
-    const Ref<ByteString> string = Make(text);
-    ASSERT_EQ(string->Set(string->GetData() + offset, 20 - offset, ByteString::BsNone), 0);
-    EXPECT_TRUE(string->IsEqual(text.c_str() + offset));
+  for (const std::string& whole : {text, text.substr(20)}) {
+    for (const unsigned offset : {2u, 14u}) {
+      const Ref<ByteString> string = Make(whole);
+      const auto left = static_cast<unsigned>(whole.size()) - offset;
+      ASSERT_EQ(string->Set(string->GetData() + offset, left, ByteString::BsNone), 0);
+      EXPECT_TRUE(string->IsEqual(whole.c_str() + offset));
+    }
   }
 }
 
