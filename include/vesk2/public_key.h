@@ -68,8 +68,8 @@ class VESK2_API PublicKey : public Principal {
   int32_t GetType() const { return keyType; }
   const char* GetAlgorithm() const { return algorithmName; }
   uint32_t GetLength() const { return keyLength; }
-  // The crypto key object, borrowed.
-  ZVCLMPublicKeyData* GetKey() const { return key; }
+  // The crypto key object, borrowed; null without memory.
+  ZVCLMPublicKeyData* GetKey() const;
 
  private:
   bool IsEmpty() const;
@@ -77,9 +77,13 @@ class VESK2_API PublicKey : public Principal {
   [[nodiscard]] int ImportNumbers(ZvBuffer* buffer);
   template <typename Form>
   [[nodiscard]] int SetNumbers(ZVCLMPublicKeyData* newKey);
+  [[nodiscard]] int MakeKey() const;
+  template <typename Form>
+  [[nodiscard]] int DefineKey() const;
 
   int32_t keyType = -1;
-  ZVCLMPublicKeyData* key = nullptr;
+  bool imported = false;                      // whether the list has all numbers of the key
+  mutable ZVCLMPublicKeyData* key = nullptr;  // of an imported key: null until it is used
   const char* algorithmName = nullptr;
   uint32_t keyLength = 0;
 };

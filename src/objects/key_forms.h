@@ -15,6 +15,7 @@ struct KeyNumber {
   ZVCLMBigInt* Record::*field;
 };
 
+// kLength is the number whose bits are the length of the key.
 struct RsaForm {
   using Record = ZVCLMRSAKeyData;
   static constexpr const char* kName = "rsa";
@@ -22,6 +23,7 @@ struct RsaForm {
   static constexpr int kDataId = ZVCLM_DATA_RSA;
   static constexpr std::array<KeyNumber<Record>, 2> kNumbers{
       {{"e", &Record::e}, {"n", &Record::n}}};
+  static constexpr ZVCLMBigInt* Record::*kLength = &Record::n;
   static int Init(Record* record) { return zvclm_RSAKeyStructInit(kDataId, record); }
   static void Wipe(Record* record) { zvclm_RSAKeyStructZeroize(kDataId, record); }
 };
@@ -34,6 +36,7 @@ struct DsaForm {
   // g before q: stored keys and their digests rely on this order.
   static constexpr std::array<KeyNumber<Record>, 4> kNumbers{
       {{"p", &Record::p}, {"g", &Record::g}, {"q", &Record::q}, {"y", &Record::y}}};
+  static constexpr ZVCLMBigInt* Record::*kLength = &Record::p;
   static constexpr uint32_t kParameterSize = 48;
   static int Init(Record* record) {
     return zvclm_DSSKeyStructInit(kDataId, record, kParameterSize);

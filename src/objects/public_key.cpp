@@ -2,6 +2,9 @@
 // it.
 #include <vesk2/public_key.h>
 
+#include <algorithm>
+#include <bit>
+
 #include "src/objects/build.h"
 #include "src/objects/key_forms.h"
 
@@ -20,6 +23,23 @@ int NumberText(Ref<ByteString>& out, const ZVCLMBigInt* number, Vesk2ContextStru
   VESK2_REQUIRE(out, VESK2_ERR_MEM_ALLOC);
   (void)bytes.release();
   return 0;
+}
+
+// The bits of a number, leading zeros not counted.
+uint32_t BitLength(const ByteString& number) {
+  const unsigned char* const end = number.GetData() + number.GetLength();
+  const unsigned char* const first =
+      std::find_if(number.GetData(), end, [](unsigned char byte) { return byte != 0; });
+  if (first == end) return 0;
+  const auto bytes = static_cast<uint32_t>(end - first);
+  return 8 * (bytes - 1) + static_cast<uint32_t>(std::bit_width(unsigned{*first}));
+}
+
+// The element behind `at`, which moves there, as a T; null when it is none.
+template <typename T>
+T* NextAs(SExpression::Iterator& at) {
+  if (at) at.Next();
+  return at ? dynamic_cast<T*>(at.Value()) : nullptr;
 }
 
 }  // namespace
@@ -80,27 +100,47 @@ int PublicKey::ImportNumbers(ZvBuffer* buffer) {
   algorithmName = Form::kName;
   keyType = Form::kType;
   VESK2_TRY(buffer->Expect(Form::kName));
-  KeyRecord<Form> record;
-  VESK2_TRY(record.Init());
   VESK2_TRY(Insert("public-key"));
   SExpression* numbers = nullptr;
   VESK2_TRY(AppendHead(this, Form::kName, numbers));
+  uint32_t length = 0;
   for (const auto& number : Form::kNumbers) {
     VESK2_TRY(buffer->Expect("(1:"));
     VESK2_TRY(buffer->Expect(number.name));
     Ref<ByteString> text;
     VESK2_TRY(ImportNew(text, buffer, GetContext()));
     VESK2_TRY(buffer->Expect(")"));
-    VESK2_TRY(zvclm_BigIntFromBuffer(&record.Number(number), text->GetData(), text->GetLength()));
+    if (number.field == Form::kLength) length = BitLength(*text);
     VESK2_TRY(AppendPair(numbers, number.name, std::move(text)));
   }
-  VESK2_TRY(
-      zvclm_PublicKeyDefine(&key, Form::kType, Form::kDataId, record.get(), 0, CryptoHandle()));
-  KeyRecord<Form> stored;
-  VESK2_TRY(stored.Init());
-  VESK2_TRY(zvclm_PublicKeyGetData(key, Form::kDataId, stored.get(), CryptoHandle()));
-  keyLength = stored->keyLength;
+  keyLength = length;
+  imported = true;
   return 0;
+}
+
+ZVCLMPublicKeyData* PublicKey::GetKey() const { return MakeKey() == 0 ? key : nullptr; }
+
+// A store has many keys, and a chain needs few of them for more than their text.
+int PublicKey::MakeKey() const {
+  if (key != nullptr || !imported) return 0;
+  return keyType == RsaForm::kType ? DefineKey<RsaForm>() : DefineKey<DsaForm>();
+}
+
+template <typename Form>
+int PublicKey::DefineKey() const {
+  KeyRecord<Form> record;
+  VESK2_TRY(record.Init());
+  auto at = Begin();
+  auto* const numbers = NextAs<SExpression>(at);
+  VESK2_REQUIRE(numbers != nullptr, VESK2_ERR_INVALID_PARAM);
+  auto pairs = numbers->Begin();
+  for (const auto& number : Form::kNumbers) {
+    auto* const pair = NextAs<SExpression>(pairs);
+    auto* const text = pair != nullptr ? dynamic_cast<ByteString*>(pair->Last()) : nullptr;
+    VESK2_REQUIRE(text != nullptr, VESK2_ERR_INVALID_PARAM);
+    VESK2_TRY(zvclm_BigIntFromBuffer(&record.Number(number), text->GetData(), text->GetLength()));
+  }
+  return zvclm_PublicKeyDefine(&key, Form::kType, Form::kDataId, record.get(), 0, CryptoHandle());
 }
 
 template <typename Form>

@@ -11,7 +11,6 @@ namespace {
 
 int ExportKey(const ZVCLMPublicKeyData* key, int format, unsigned char*& out, unsigned int& length,
               uint32_t handle) {
-  out = nullptr;
   // Asking for the size is answered with "too small".
   const int asked = zvclm_PublicKeyExport(key, format, 0, nullptr, &length, handle);
   VESK2_REQUIRE(asked == 0 || asked == ZVCLM_ERR_BUFFER_TOO_SMALL, asked);
@@ -23,10 +22,14 @@ int ExportKey(const ZVCLMPublicKeyData* key, int format, unsigned char*& out, un
 }  // namespace
 
 int PublicKey::SshExport(unsigned char*& out, unsigned int& length) {
+  out = nullptr;
+  VESK2_TRY(MakeKey());
   return ExportKey(key, ZVCLM_FORMAT_SSH, out, length, CryptoHandle());
 }
 
 int PublicKey::X509Export(unsigned char*& out, unsigned int& length) {
+  out = nullptr;
+  VESK2_TRY(MakeKey());
   return ExportKey(key, ZVCLM_FORMAT_X509, out, length, CryptoHandle());
 }
 
