@@ -77,6 +77,12 @@ struct spki_budget {
   spki_status spent;  // 0, SPKI_ERR_NO_MEM or SPKI_ERR_THRESHOLD
 };
 
+// What is left of the block that new records of one kind are cut from.
+struct spki_slab {
+  unsigned char* next;
+  uint32_t left;
+};
+
 inline constexpr size_t kSpkiBuckets = 256;
 
 // The state of one call. Zero-filled before use, held in the caller's frame.
@@ -88,6 +94,8 @@ struct spki_engine {
   spki_bucket_entry* acl_tuples;  // issued by the ACL itself, newest first
   spki_atom* free_atoms;
   spki_elem* free_elems;
+  spki_slab atom_slab;
+  spki_slab elem_slab;
   spki_tuple* free_tuples;
   void* pool;              // made by the memory callbacks at start
   uint32_t hash_provider;  // the context's crypto handle
@@ -106,6 +114,9 @@ void spki_engine_stop(spki_engine* engine, const spki_allocator* allocator);
 // none or the budget is spent.
 void* spki_allocate(spki_engine* engine, size_t size);
 void spki_free(spki_engine* engine, void* memory);
+// The same for a record of at most 255 bytes that stays with the engine until it stops: parsing
+// takes hundreds of them, so they are cut from larger blocks.
+void* spki_allocate_record(spki_engine* engine, spki_slab* slab, size_t size);
 
 // ---- Records ----
 

@@ -10,6 +10,8 @@ namespace {
 // What a block costs of the budget of live records: one, and one more for each of these bytes, so
 // that the budget bounds bytes as well.
 constexpr size_t kRecordBytes = 256;
+// Records of one block of a slab.
+constexpr uint32_t kSlabRecords = 64;
 
 // In front of each block's memory. The cost is kept for spki_free.
 struct Header {
@@ -54,6 +56,26 @@ void Destroy(void* pool) {
   }
 }
 
+// Whether the slab has a record left, if need be after a new block.
+bool Fill(spki_engine* engine, spki_slab* slab, size_t size) {
+  if (slab->left > 0) return true;
+  slab->next =
+      static_cast<unsigned char*>(kSpkiMemoryOps.allocate(kSlabRecords * size, engine->pool));
+  if (slab->next != nullptr) slab->left = kSlabRecords;
+  return slab->left > 0;
+}
+
+// Whoever asked may have to answer without the memory; the failure must not be forgotten, or a
+// grant could be reported that was only half worked out.
+void* Charged(spki_engine* engine, void* memory, size_t cost) {
+  if (memory == nullptr) {
+    engine->budget.spent = SPKI_ERR_NO_MEM;
+  } else {
+    engine->budget.live_records += static_cast<uint32_t>(cost);
+  }
+  return memory;
+}
+
 }  // namespace
 
 const spki_memory_ops kSpkiMemoryOps = {Allocate, Free, Create, Destroy};
@@ -87,14 +109,18 @@ void* spki_allocate(spki_engine* engine, size_t size) {
   if (cost <= Limits::kMaxRecords - engine->budget.live_records) {
     memory = kSpkiMemoryOps.allocate(size, engine->pool);
   }
-  // Whoever asked may have to answer without the record; the failure must not be forgotten, or a
-  // grant could be reported that was only half worked out.
-  if (memory == nullptr) {
-    engine->budget.spent = SPKI_ERR_NO_MEM;
-    return nullptr;
+  return Charged(engine, memory, cost);
+}
+
+void* spki_allocate_record(spki_engine* engine, spki_slab* slab, size_t size) {
+  if (engine->budget.spent != 0) return nullptr;
+  void* memory = nullptr;
+  if (engine->budget.live_records < Limits::kMaxRecords && Fill(engine, slab, size)) {
+    memory = slab->next;
+    slab->next += size;
+    --slab->left;
   }
-  engine->budget.live_records += static_cast<uint32_t>(cost);
-  return memory;
+  return Charged(engine, memory, 1);
 }
 
 void spki_free(spki_engine* engine, void* memory) {

@@ -10,12 +10,12 @@ constexpr uint32_t kSaturated = UINT32_MAX;
 
 // A record from its free list, else from the pool; one reference, all else zero.
 template <typename Record>
-Record* Take(spki_engine* engine, Record** free_list) {
+Record* Take(spki_engine* engine, Record** free_list, spki_slab* slab) {
   Record* record = *free_list;
   if (record != nullptr) {
     *free_list = record->link;
   } else {
-    record = static_cast<Record*>(spki_allocate(engine, sizeof(Record)));
+    record = static_cast<Record*>(spki_allocate_record(engine, slab, sizeof(Record)));
     if (record == nullptr) return nullptr;
   }
   *record = {};
@@ -60,8 +60,12 @@ void ReleaseValue(spki_engine* engine, const spki_elem* elem) {
 
 }  // namespace
 
-spki_elem* spki_elem_new(spki_engine* engine) { return Take(engine, &engine->free_elems); }
-spki_atom* spki_atom_new(spki_engine* engine) { return Take(engine, &engine->free_atoms); }
+spki_elem* spki_elem_new(spki_engine* engine) {
+  return Take(engine, &engine->free_elems, &engine->elem_slab);
+}
+spki_atom* spki_atom_new(spki_engine* engine) {
+  return Take(engine, &engine->free_atoms, &engine->atom_slab);
+}
 
 // Walks along the list and recurses into nested ones only, whose depth the parser bounds: a flat
 // list may have millions of elements.
