@@ -47,6 +47,7 @@ class VESK2_API ZvBuffer {
  private:
   friend VESK2_API ZvBuffer* zv_buffer_wrap(const void* data, size_t size);
   friend VESK2_API ZvBuffer* zv_buffer_wrap_file(const char* path);
+  friend ZvBuffer* zv_buffer_adopt(unsigned char* data, size_t size);
   friend VESK2_API void zv_buffer_free(ZvBuffer* buffer);
   ZvBuffer(unsigned char* data, size_t size) : data_(data), size_(size) {}
   ~ZvBuffer();

@@ -9,6 +9,7 @@
 #include <vesk2/platform.h>
 
 #include "src/platform/crypto.h"
+#include "src/platform/file.h"
 
 namespace ZvVesk2 {
 
@@ -19,10 +20,11 @@ using BufferOwner = std::unique_ptr<ZvBuffer, BufferFree>;
 
 // WrapFile reads a file into `out`. Returns `failure` when it cannot be read, but
 // VESK2_ERR_MEM_ALLOC for lack of memory: taken for a missing file, a revocation list would count
-// for nothing.
-[[nodiscard]] inline int WrapFile(BufferOwner& out, const char* path, int failure) {
+// for nothing. `listed`: a ZvDir says that it is a regular file.
+[[nodiscard]] inline int WrapFile(BufferOwner& out, const char* path, int failure,
+                                  bool listed = false) {
   errno = 0;
-  out.reset(ZVsysutil::zv_buffer_wrap_file(path));
+  out.reset(ZVsysutil::zv_buffer_wrap_file(path, listed));
   if (out != nullptr) return 0;
   return errno == ENOMEM ? VESK2_ERR_MEM_ALLOC : failure;
 }

@@ -46,24 +46,28 @@ size_t ZvBuffer::Skip(size_t length) {
 
 ZvBuffer* zv_buffer_wrap(const void* data, size_t size) {
   if (data == nullptr && size > 0) return nullptr;
-  std::unique_ptr<unsigned char[]> copy(new (std::nothrow) unsigned char[size]);
-  if (copy == nullptr) return nullptr;
-  if (size > 0) std::memcpy(copy.get(), data, size);
-  ZvBuffer* buffer = new (std::nothrow) ZvBuffer(copy.get(), size);
-  if (buffer != nullptr) copy.release();
-  return buffer;
+  auto* const copy = new (std::nothrow) unsigned char[size];
+  if (copy != nullptr && size > 0) std::memcpy(copy, data, size);
+  return zv_buffer_adopt(copy, size);
 }
 
-// The bytes are read, not mapped: a file that shrinks under a map kills the process that reads it.
-ZvBuffer* zv_buffer_wrap_file(const char* path) {
-  size_t size = 0;
-  std::unique_ptr<unsigned char[]> bytes(zv_read_whole(path, ZvVesk2::Limits::kMaxFile, &size));
+ZvBuffer* zv_buffer_adopt(unsigned char* data, size_t size) {
+  std::unique_ptr<unsigned char[]> bytes(data);
   if (bytes == nullptr) return nullptr;
   ZvBuffer* buffer = new (std::nothrow) ZvBuffer(bytes.get(), size);
   if (buffer == nullptr) return NoMemory();
   bytes.release();
   return buffer;
 }
+
+// The bytes are read, not mapped: a file that shrinks under a map kills the process that reads it.
+ZvBuffer* zv_buffer_wrap_file(const char* path, bool listed) {
+  size_t size = 0;
+  unsigned char* const bytes = zv_read_whole(path, ZvVesk2::Limits::kMaxFile, &size, listed);
+  return zv_buffer_adopt(bytes, size);
+}
+
+ZvBuffer* zv_buffer_wrap_file(const char* path) { return zv_buffer_wrap_file(path, false); }
 
 void zv_buffer_free(ZvBuffer* buffer) { delete buffer; }
 

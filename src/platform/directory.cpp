@@ -1,5 +1,6 @@
 // ZvDir: the names of one directory, all read and sorted when it is opened.
 #include <dirent.h>
+#include <algorithm>
 #include <cerrno>
 #include <cstring>
 #include <memory>
@@ -23,10 +24,6 @@ bool Matches(std::string_view pattern, std::string_view name) {
   return name.ends_with(pattern.substr(1));
 }
 
-int CompareNames(const void* a, const void* b) {
-  return std::strcmp(*static_cast<char* const*>(a), *static_cast<char* const*>(b));
-}
-
 }  // namespace
 
 int ZvDir::open(const char* directory, const char* pattern) {
@@ -45,35 +42,37 @@ int ZvDir::Load(const char* directory, const char* pattern) {
   errno = 0;
   while (const dirent* entry = readdir(dir.get())) {
     if (Matches(pattern, entry->d_name)) {
-      if (const int code = Add(entry->d_name)) return code;
+      if (const int code = Add(entry->d_name, entry->d_type == DT_REG)) return code;
     }
     errno = 0;
   }
   if (errno != 0) return VESK2_ERR_FIND_DIR;  // a list cut short would hide files
-  zv_sort(names_, count_, sizeof(char*), CompareNames);
+  zv_sort(entries_, count_, sizeof(Entry), [](const void* a, const void* b) {
+    return std::strcmp(static_cast<const Entry*>(a)->name, static_cast<const Entry*>(b)->name);
+  });
   return 0;
 }
 
-int ZvDir::Add(const char* name) {
+int ZvDir::Add(const char* name, bool regular) {
   if (count_ == capacity_) {
     const size_t larger = capacity_ > 0 ? 2 * capacity_ : 32;
-    char** names = new (std::nothrow) char*[larger];
-    if (names == nullptr) return VESK2_ERR_MEM_ALLOC;
-    if (count_ > 0) std::memcpy(names, names_, count_ * sizeof(char*));
-    delete[] names_;
-    names_ = names;
+    Entry* entries = new (std::nothrow) Entry[larger];
+    if (entries == nullptr) return VESK2_ERR_MEM_ALLOC;
+    std::copy_n(entries_, count_, entries);
+    delete[] entries_;
+    entries_ = entries;
     capacity_ = larger;
   }
   char* copy = zv_fstrdup(name);
   if (copy == nullptr) return VESK2_ERR_MEM_ALLOC;
-  names_[count_++] = copy;
+  entries_[count_++] = {copy, regular};
   return 0;
 }
 
 const char* ZvDir::read(bool fullPath) {
   failed_ = false;
   if (cursor_ == count_) return nullptr;
-  const char* name = names_[cursor_++];
+  const char* name = entries_[cursor_++].name;
   if (!fullPath) return name;
   delete[] path_;
   path_ = zv_concat_path(directory_, name);
@@ -82,11 +81,11 @@ const char* ZvDir::read(bool fullPath) {
 }
 
 void ZvDir::close() {
-  for (size_t i = 0; i < count_; ++i) delete[] names_[i];
-  delete[] names_;
+  for (size_t i = 0; i < count_; ++i) delete[] entries_[i].name;
+  delete[] entries_;
   delete[] directory_;
   delete[] path_;
-  names_ = nullptr;
+  entries_ = nullptr;
   directory_ = nullptr;
   path_ = nullptr;
   count_ = capacity_ = cursor_ = 0;

@@ -137,10 +137,11 @@ size_t zv_read_slow(ZvFile* file, unsigned char* out, size_t length) {
   return copied;
 }
 
-unsigned char* zv_read_whole(const char* path, uint64_t limit, size_t* size) {
-  if (!IsRegular(path)) return nullptr;
+unsigned char* zv_read_whole(const char* path, uint64_t limit, size_t* size, bool listed) {
+  if (!listed && !IsRegular(path)) return nullptr;
   struct stat opened {};
-  const Descriptor fd(OpenRegular(path, O_RDONLY, &opened));
+  // What was listed as a file is no link; one that took its place could lead to a device.
+  const Descriptor fd(OpenRegular(path, O_RDONLY | (listed ? O_NOFOLLOW : 0), &opened));
   if (fd.get() < 0) return nullptr;
   const auto held = static_cast<uint64_t>(opened.st_size);
   if (held > limit) return nullptr;

@@ -102,8 +102,14 @@ inline size_t zv_read(ZvReader& reader, unsigned char* out, size_t length) {
 
 // zv_read_whole reads a regular file of at most `limit` bytes into a new array (delete[]), without
 // the block of the readers above. Null as for zv_open, on a read error, and for a file that yields
-// other than the *size bytes that it held when it was opened.
-unsigned char* zv_read_whole(const char* path, uint64_t limit, size_t* size);
+// other than the *size bytes that it held when it was opened. `listed`: the directory just said
+// that it is a regular file, which spares the question before it is opened.
+unsigned char* zv_read_whole(const char* path, uint64_t limit, size_t* size, bool listed = false);
+// zv_buffer_adopt makes a buffer of an array from new[], which is deleted on failure. Null for
+// null, and without memory (errno is then ENOMEM).
+ZvBuffer* zv_buffer_adopt(unsigned char* data, size_t size);
+// zv_buffer_wrap_file of a path that may be `listed`, as above.
+ZvBuffer* zv_buffer_wrap_file(const char* path, bool listed);
 
 inline bool zv_failed(const ZvFile* file) { return file->failed; }
 // Whether a file opened for reading is still the one that was opened: same inode, size and time.
@@ -133,16 +139,23 @@ class ZvDir {
   // The next name (or "directory/name" with fullPath), borrowed until the next call; null at the
   // end or when memory runs out (see failed()).
   const char* read(bool fullPath);
+  // Whether the name that was read last is a regular file, and no link to one, as far as the
+  // directory itself knows.
+  bool isRegular() const { return cursor_ > 0 && entries_[cursor_ - 1].regular; }
   void close();
   // Whether the last null of read() was for lack of memory.
   bool failed() const { return failed_; }
 
  private:
+  struct Entry {
+    char* name;
+    bool regular;
+  };
   int Load(const char* directory, const char* pattern);
-  int Add(const char* name);
+  int Add(const char* name, bool regular);
 
   char* directory_ = nullptr;
-  char** names_ = nullptr;
+  Entry* entries_ = nullptr;
   size_t count_ = 0;
   size_t capacity_ = 0;
   size_t cursor_ = 0;

@@ -10,7 +10,9 @@ namespace ZvVesk2 {
 
 using ZVsysutil::ZvDir;
 
-int AclEntry::Import(const char* name) {
+int AclEntry::Import(const char* name) { return ImportFile(name, false); }
+
+int AclEntry::ImportFile(const char* name, bool listed) {
   VESK2_REQUIRE(name != nullptr && First() == nullptr, VESK2_ERR_INVALID_PARAM);
   if (std::strchr(name, '/') != nullptr) {
     SetStorageType(StoragePath);
@@ -20,30 +22,24 @@ int AclEntry::Import(const char* name) {
     VESK2_TRY(SetFileName(name));
   }
   BufferOwner buffer;
-  VESK2_TRY(WrapFile(buffer, GetFileName(), VESK2_ERR_FILE_OPEN));
+  VESK2_TRY(WrapFile(buffer, GetFileName(), VESK2_ERR_FILE_OPEN, listed));
   return Import(buffer.get());
 }
 
-namespace {
-
-// Appends every entry of a directory that can be read. The result is that of the last file handled:
-// a bad last file is reported although the others were loaded.
-int LoadDirectory(SExpression* list, const char* directory) {
+int AclEntry::LoadDirectory(SExpression* list, const char* directory) {
   ZvDir dir;
   VESK2_TRY(dir.open(directory, "*.acl"));
   int status = 0;
   while (const char* path = dir.read(true)) {
     Ref<AclEntry> entry(TryNew<AclEntry>(list->GetContext()));
     VESK2_REQUIRE(entry, VESK2_ERR_MEM_ALLOC);
-    status = entry->Import(path);
+    status = entry->ImportFile(path, dir.isRegular());
     if (status == 0) VESK2_TRY(Append(list, std::move(entry)));
     // An entry that is missing for lack of memory may be the one that names a revocation list.
     if (LacksMemory(status)) return VESK2_ERR_MEM_ALLOC;
   }
   return dir.failed() ? VESK2_ERR_MEM_ALLOC : status;
 }
-
-}  // namespace
 
 int AclEntry::Import(SExpression*& out, Vesk2ContextStruct* ctx, const char* extraDir) {
   VESK2_REQUIRE(out == nullptr, VESK2_ERR_INVALID_PARAM);
