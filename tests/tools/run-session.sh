@@ -8,6 +8,8 @@
 #   1> pattern    a line of standard output (shell pattern); every line must be expected
 #   2> pattern    a line of standard error; others may be there
 #   2! pattern    no line of standard error
+#   j> expression what is true of the answer for machines (see check-json.py); every such answer is
+#                 checked against its schema and the exit status, asked or not
 set -u
 
 session=$(cd "$(dirname "$2")" && pwd)/$(basename "$2")
@@ -47,8 +49,17 @@ all_expected() {
   done <"$work/1"
 }
 
+# Checks the answer for machines, with the expressions of this command.
+check_json() {
+  set --
+  while IFS= read -r expression; do set -- "$@" "$expression"; done <"$work/expressions"
+  "$TOOLS/check-json.py" "$TOOLS/../../docs/answer.schema.json" $answered "$work/1" "$@" \
+    >"$work/faults" 2>&1 || fail "$(cat "$work/faults")"
+}
+
 run() {
   : >"$work/expected"
+  : >"$work/expressions"
   sh -c "$command" >"$work/1" 2>"$work/2" </dev/null
   answered=$?
   wanted=0
@@ -59,7 +70,11 @@ judge() {
   [ -n "$command" ] && [ $judged = no ] || return 0
   judged=yes
   [ $answered -eq $wanted ] || fail "answered $answered, not $wanted"
-  all_expected || fail "an unexpected line on standard output"
+  if [ -s "$work/expressions" ] || grep -q '^{"schema"' "$work/1"; then
+    check_json
+  else
+    all_expected || fail "an unexpected line on standard output"
+  fi
 }
 
 command=
@@ -73,6 +88,7 @@ while IFS= read -r row || [ -n "$row" ]; do
       matches "$work/1" "$text" || fail "no such line: $row" ;;
     '2> '*) matches "$work/2" "$text" || fail "no such line: $row" ;;
     '2! '*) ! matches "$work/2" "$text" || fail "this line: $row" ;;
+    'j> '*) printf '%s\n' "$text" >>"$work/expressions" ;;
     *) echo "$session: not understood: $row"; exit 1 ;;
   esac
 done <"$session"
