@@ -54,10 +54,10 @@ int CheckIssuerWord(CrlSequence& list) {
 }
 
 std::string WhyNotVouched(CrlSequence& list, int code) {
-  if (code != VESK2_ERR_ACL_ENTRY_NOT_FOUND) return Reason(code);
+  if (code != VESK2_ERR_ACL_ENTRY_NOT_FOUND) return CodeWords(code);
   const Cert& cert = *list.GetCert();
   return "no ACL entry of exactly the tag " + TagText(cert.GetTag()) + " is for its issuer " +
-         SubjectText(*cert.GetIssuer()) + " (" + CodeName(code) + ")";
+         SubjectText(*cert.GetIssuer());
 }
 
 std::string CrlText(CrlSequence& list) {

@@ -23,7 +23,7 @@ Ref<CrlSequence> ReadCrl(const std::string& path);
 // CheckIssuerWord returns the code of a list's digest and signature, whoever its issuer is; 0 when
 // both hold.
 int CheckIssuerWord(CrlSequence& list);
-// Why the ACL entries do not vouch for a list, by the code of CrlSequence::VerifySelf.
+// Why the ACL entries do not vouch for a list, by the code of CrlSequence::VerifySelf, in words.
 std::string WhyNotVouched(CrlSequence& list, int code);
 // "TAG by ISSUER, from STAMP until STAMP".
 std::string CrlText(CrlSequence& list);

@@ -55,7 +55,7 @@ std::string WhyRefused(CrlSequence& list, SExpression* acls) {
   }
   const int code = list.VerifySelf(acls);
   if (code == VESK2_ERR_MEM_ALLOC) throw Trouble(Reason(code));
-  return code == 0 ? "" : WhyNotVouched(list, code);
+  return code == 0 ? "" : WhyNotVouched(list, code) + " (" + CodeName(code) + ")";
 }
 
 // Offer hands one list to the store and says whether it is there now.

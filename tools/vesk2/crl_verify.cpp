@@ -1,7 +1,6 @@
 // crl_verify.cpp: vesk2 crl verify.
 #include "tools/vesk2/command.h"
-#include "tools/vesk2/crl_file.h"
-#include "tools/vesk2/inspect.h"
+#include "tools/vesk2/describe.h"
 #include "tools/vesk2/report.h"
 
 namespace vesk2_command {
@@ -13,22 +12,26 @@ struct Options {
   std::string at = "now";
 };
 
-// Why the list does not count at the moment asked about; empty when it does.
-std::string WhyNot(CrlSequence& list, SExpression* tag, SExpression* acls, TimeStamp& at) {
+// The code, and why, of a list that does not count at the moment asked about.
+struct Refusal {
+  int code = 0;
+  std::string text;
+};
+
+Refusal Judge(CrlSequence& list, SExpression* tag, SExpression* acls, TimeStamp& at) {
   const ZvVesk2::Cert& cert = *list.GetCert();
   if (tag != nullptr && !tag->IsEqual(cert.GetTag())) {
-    return "it is of the source " + TagText(cert.GetTag()) + " (" +
-           CodeName(VESK2_ERR_NOT_AUTHORIZED) + ")";
+    return {VESK2_ERR_NOT_AUTHORIZED, "it is of the source " + TagText(cert.GetTag())};
   }
   const int vouched = list.VerifySelf(acls);
   if (vouched == VESK2_ERR_MEM_ALLOC) throw Trouble(Reason(vouched));
-  if (vouched != 0) return WhyNotVouched(list, vouched);
+  if (vouched != 0) return {vouched, WhyNotVouched(list, vouched)};
   long first = at.ToTime();
   long last = first;
   const int current = list.VerifyValidity(&first, &last);
-  if (current == 0) return "";
-  return "it is valid " + PeriodText(cert.GetNotBefore(), cert.GetNotAfter()) + ", asked was " +
-         StampText(at) + " (" + CodeName(current) + ")";
+  if (current == 0) return {};
+  return {current, "it is valid " + PeriodText(cert.GetNotBefore(), cert.GetNotAfter()) +
+                       ", asked was " + StampText(at)};
 }
 
 ExitCode Run(const Options& options) {
@@ -37,9 +40,9 @@ ExitCode Run(const Options& options) {
   const Ref<TimeStamp> at = ParseTime(options.at, false);
   const Ref<CrlSequence> list = ReadCrl(options.file);
   const Ref<SExpression> acls = LoadAcls();
-  const std::string reason = WhyNot(*list, tag.get(), acls.get(), *at);
-  Say(reason.empty() ? "yes: " + CrlText(*list) : "no: " + reason);
-  return reason.empty() ? kYes : kNo;
+  const Refusal refusal = Judge(*list, tag.get(), acls.get(), *at);
+  Result() = {{"list", DescribeCrl(*list).members()}, {"at", StampText(*at)}};
+  return refusal.code == 0 ? Yes(CrlText(*list)) : No(refusal.code, refusal.text);
 }
 
 }  // namespace

@@ -36,11 +36,10 @@ std::vector<ChainLink> ChainLinks(const CertChain& chain, const std::string& pat
 
 std::string SubjectText(Subject& subject) {
   if (const auto* hash = dynamic_cast<Hash*>(&subject)) {
-    const ByteString& digest = *hash->GetDigest();
     const char* name = hash->GetAlgorithm() == ZVCLM_HASH_SHA256 ? "sha256:"
                        : hash->GetAlgorithm() == ZVCLM_HASH_SHA1 ? "sha1:"
                                                                  : "rmd160:";
-    return name + Hex({reinterpret_cast<const char*>(digest.GetData()), digest.GetLength()});
+    return name + Hex(BytesOf(*hash->GetDigest()));
   }
   auto* threshold = dynamic_cast<ThresholdSubject*>(&subject);
   if (threshold == nullptr) return Fingerprint(subject);
@@ -65,13 +64,8 @@ std::string PeriodText(const TimeStamp* notBefore, const TimeStamp* notAfter) {
 std::string SourceText(SExpression& element) {
   const Ref<SExpression> source(element.Rest());
   if (!source) throw std::bad_alloc();
-  const Text text(source->ExportTag(""));
-  return text ? Escape(text.get()) : "()";
-}
-
-void SayRow(const std::string& name, const std::string& value) {
-  constexpr size_t kColumn = 13;
-  Say(name + std::string(kColumn - name.size(), ' ') + value);
+  const std::string text = AdvancedText(*source);
+  return text.substr(1, text.size() - 2);
 }
 
 Ref<SExpression> LoadAcls() {

@@ -26,9 +26,6 @@ std::string PeriodText(const TimeStamp* notBefore, const TimeStamp* notAfter);
 // What a revocation element says after its keyword: the tag of the lists to ask.
 std::string SourceText(SExpression& element);
 
-// SayRow writes a name and a value, in two columns.
-void SayRow(const std::string& name, const std::string& value);
-
 // LoadAcls returns the entries of the ACL store; Trouble, and the reasons noted, when there are
 // none.
 Ref<SExpression> LoadAcls();

@@ -86,10 +86,23 @@ std::string Fingerprint(DExpression& expression) {
   return "sha256:" + Hex({reinterpret_cast<char*>(digest), length});
 }
 
+std::string AdvancedText(SExpression& list, const std::string& keyword) {
+  const unsigned size = list.AdvancedLength();
+  if (size > ZvVesk2::Limits::kMaxExport) throw Trouble("an object too large to be written");
+  std::string text(size_t{size} + 1, '\0');
+  unsigned length = 0;
+  Check(list.ExportAdvanced(reinterpret_cast<unsigned char*>(text.data()), length, size),
+        "writing an object");
+  text.resize(length);
+  const std::string head = "(" + keyword + " ";
+  if (!keyword.empty() && text.starts_with(head)) {
+    text = text.substr(head.size(), text.size() - head.size() - 1);
+  }
+  return Escape(text);
+}
+
 std::string TagText(SExpression* tag) {
-  if (tag == nullptr) return "everything";
-  const Text text(tag->ExportTag("tag"));
-  return text ? Escape(text.get()) : "()";
+  return tag == nullptr ? "everything" : AdvancedText(*tag, "tag");
 }
 
 Ref<SExpression> ParseTag(const std::string& text, const char* keyword) {

@@ -41,6 +41,11 @@ void Check(int code, const std::string& what);
 [[noreturn]] void Malformed(const std::string& path, size_t offset, const std::string& kind,
                             int code);
 
+// The bytes of a byte string, borrowed.
+inline std::string_view BytesOf(const ByteString& word) {
+  return {reinterpret_cast<const char*>(word.GetData()), word.GetLength()};
+}
+
 // A new string from new[], for the setters that adopt one.
 char* NewText(const std::string& text);
 
@@ -50,7 +55,10 @@ std::string Atom(std::string_view bytes);
 std::string Canonical(DExpression& expression);
 // "sha256:" and the digest of the canonical form without hints: the identity of a key.
 std::string Fingerprint(DExpression& expression);
-// The advanced text of a tag's body, escaped: "(install (app calc))".
+// The advanced text of a list, escaped, with all of words that hold a 0 byte; what follows the
+// keyword when there is one and the list is headed by it, else the whole.
+std::string AdvancedText(SExpression& list, const std::string& keyword = "");
+// That of a tag's body: "(install (app calc))".
 std::string TagText(SExpression* tag);
 
 // ParseTag reads the body of a tag in advanced form. Trouble for what the library's reader refuses,

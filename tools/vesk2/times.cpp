@@ -3,6 +3,7 @@
 
 #include <ctime>
 
+#include "tools/vesk2/objects.h"
 #include "tools/vesk2/report.h"
 
 namespace vesk2_command {
@@ -33,8 +34,6 @@ Period ParsePeriod(const PeriodOptions& options) {
   return period;
 }
 
-std::string StampText(const TimeStamp& stamp) {
-  return Escape({reinterpret_cast<const char*>(stamp.GetData()), stamp.GetLength()});
-}
+std::string StampText(const TimeStamp& stamp) { return Escape(BytesOf(stamp)); }
 
 }  // namespace vesk2_command
