@@ -50,6 +50,8 @@ Action DefineCrlShow(CLI::App& app);
 Action DefineCrlVerify(CLI::App& app);
 Action DefineManifestSign(CLI::App& app);
 Action DefineManifestVerify(CLI::App& app);
+Action DefineManifestShow(CLI::App& app);
+Action DefineManifestCompare(CLI::App& app);
 Action DefineVersion(CLI::App& app);
 
 }  // namespace vesk2_command

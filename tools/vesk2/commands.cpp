@@ -52,6 +52,10 @@ constexpr Command kCommands[] = {
      DefineManifestSign},
     {"manifest", "verify", "Is a directory as signed, by someone authorized?",
      "vesk2 manifest verify app app.manifest --tag '(install (app calc))'", DefineManifestVerify},
+    {"manifest", "show", "Show who signed a manifest, and what it lists",
+     "vesk2 manifest show app.manifest --files", DefineManifestShow},
+    {"manifest", "compare", "Do two manifests list the same?",
+     "vesk2 manifest compare old.manifest new.manifest", DefineManifestCompare},
     {"version", "", "Show the version of the command and the library", "vesk2 version",
      DefineVersion},
 };

@@ -11,6 +11,7 @@
 
 #include "tools/vesk2/crl_file.h"
 #include "tools/vesk2/inspect.h"
+#include "tools/vesk2/manifest_file.h"
 #include "tools/vesk2/sheet.h"
 
 #include <vesk2/acl_entry.h>
@@ -30,6 +31,9 @@ Sheet DescribeChain(const std::vector<ChainLink>& links);
 // A bare list, and one with the certificate and the signature that vouch for it.
 Sheet DescribeCrl(const ZvVesk2::Crl& list);
 Sheet DescribeCrl(CrlSequence& list);
+
+// A manifest, `code` being what CheckManifest says of it.
+Sheet DescribeManifest(const SignatureBlock& block, int code);
 
 // Adds the row and the member "signature" for a checked signature's code.
 void AddSignature(Sheet& sheet, int code);

@@ -1,6 +1,8 @@
 // manifest_file.cpp: reading manifest files.
 #include "tools/vesk2/manifest_file.h"
 
+#include <algorithm>
+
 #include "tools/vesk2/files.h"
 #include "tools/vesk2/progress.h"
 #include "tools/vesk2/report.h"
@@ -63,50 +65,127 @@ void CheckSigned(const std::string& path, const std::string& directory,
 namespace {
 
 template <typename T>
-bool ReadInto(Ref<T>& out, ZvBuffer* buffer) {
+int ReadInto(Ref<T>& out, ZvBuffer* buffer) {
   Ref<T> object(new T(nullptr));
-  if (object->Import(buffer) != 0) return false;
-  out = std::move(object);
-  return true;
+  const int code = object->Import(buffer);
+  if (code == 0) out = std::move(object);
+  return code;
 }
 
-// The version's two texts, the type and the time of signing.
-bool ReadHead(ZvBuffer* buffer, SignatureBlock& block) {
-  Ref<ByteString> text;
-  return buffer->Accept("(8:manifest(7:version") && ReadInto(text, buffer) &&
-         ReadInto(text, buffer) && buffer->Accept(")(4:type") && ReadInto(text, buffer) &&
-         buffer->Accept(")(15:signature-block(15:time-of-signing") &&
-         ReadInto(block.signedAt, buffer) && buffer->Accept(")");
+// A literal and the value behind it.
+template <typename T>
+int ReadAfter(const char* literal, Ref<T>& out, ZvBuffer* buffer) {
+  const int code = buffer->Expect(literal);
+  return code != 0 ? code : ReadInto(out, buffer);
 }
 
-bool ReadCert(ZvBuffer* buffer, SignatureBlock& block) {
-  SignedCert each;
-  if (!ReadInto(each.cert, buffer) || !ReadInto(each.signature, buffer)) return false;
-  block.certs.push_back(std::move(each));
-  return true;
+int ReadHead(ZvBuffer* buffer, SignatureBlock& block) {
+  int code = ReadAfter("(8:manifest(7:version", block.version, buffer);
+  if (code == 0) code = ReadInto(block.creator, buffer);
+  if (code == 0) code = ReadAfter(")(4:type", block.type, buffer);
+  if (code == 0)
+    code = ReadAfter(")(15:signature-block(15:time-of-signing", block.signedAt, buffer);
+  return code == 0 ? buffer->Expect(")") : code;
+}
+
+int ReadCerts(ZvBuffer* buffer, SignatureBlock& block) {
+  while (buffer->Peek() == '(') {
+    SignedCert each;
+    int code = ReadInto(each.cert, buffer);
+    if (code == 0) code = ReadInto(each.signature, buffer);
+    if (code != 0) return code;
+    block.certs.push_back(std::move(each));
+  }
+  return buffer->Expect(")");
+}
+
+int ReadCrls(ZvBuffer* buffer, SignatureBlock& block) {
+  const int start = buffer->Expect("(3:crl");
+  if (start != 0) return start;
+  while (buffer->Peek() == '(') {
+    Ref<CrlSequence> crl;
+    const int code = ReadInto(crl, buffer);
+    if (code != 0) return code;
+    block.crls.push_back(std::move(crl));
+  }
+  return 0;
+}
+
+int ReadBody(ZvBuffer* buffer, SignatureBlock& block) {
+  block.listing = std::make_unique<BodyDirectory>(nullptr);
+  int code = buffer->Expect(")");
+  if (code == 0) code = block.listing->ParseBody(buffer, nullptr);
+  if (code == 0) code = buffer->Expect(")");
+  if (code != 0) block.damage = "byte " + std::to_string(buffer->Position()) + ": " + Reason(code);
+  return code;
 }
 
 }  // namespace
 
+int ReadSignatureBlock(ZvBuffer* buffer, SignatureBlock& block) {
+  for (const auto part : {ReadHead, ReadCerts, ReadCrls, ReadBody}) {
+    const int code = part(buffer, block);
+    if (code != 0) return code;
+  }
+  return 0;
+}
+
 SignatureBlock ReadSignatureBlock(const std::string& path) {
   SignatureBlock block;
-  const Buffer buffer = OpenBuffer(path);
-  if (!ReadHead(buffer.get(), block)) return block;
-  while (buffer->Peek() == '(') {
-    if (!ReadCert(buffer.get(), block)) return block;
-  }
-  if (!buffer->Accept(")(3:crl")) return block;
-  while (buffer->Peek() == '(') {
-    Ref<CrlSequence> crl;
-    if (!ReadInto(crl, buffer.get())) return block;
-    block.crls.push_back(std::move(crl));
-  }
-  BodyDirectory listing(nullptr);
-  int code = buffer->Expect(")");
-  if (code == 0) code = listing.ParseBody(buffer.get(), nullptr);
-  if (code == 0) code = buffer->Expect(")");
-  if (code != 0) block.damage = "byte " + std::to_string(buffer->Position()) + ": " + Reason(code);
+  (void)ReadSignatureBlock(OpenBuffer(path).get(), block);
   return block;
+}
+
+int CheckManifest(const std::string& path) {
+  Manifest manifest(nullptr);
+  Check(manifest.Initialize("", InputPath(path).c_str(), "none"), Escape(path));
+  const int code = manifest.ReadManifest(false, 0, 0, nullptr);
+  if (code != 0 && !IsRefusal(code)) ThrowUnreadable(path, manifest, code);
+  return code;
+}
+
+bool IsRefusal(int code) {
+  constexpr int kRefusals[] = {
+      VESK2_ERR_SIGNATURE_ID,       VESK2_ERR_NOT_IMPLEMENTED, VESK2_ERR_SIGNATURE,
+      VESK2_ERR_HASH_MISMATCH,      VESK2_ERR_NOT_AUTHORIZED,  VESK2_ERR_HASH_MATCH,
+      VESK2_ERR_SIGNING_CERT_ORDER, VESK2_ERR_CERT_REVOKED,    VESK2_ERR_PACKAGE_NOT_GRANTED,
+      VESK2_ERR_KEY_REVOKED,        VESK2_ERR_NOT_OBJECT_CERT, VESK2_ERR_CRL_NOT_FOUND,
+  };
+  return std::find(std::begin(kRefusals), std::end(kRefusals), code) != std::end(kRefusals);
+}
+
+void ThrowUnreadable(const std::string& path, const Manifest& manifest, int code) {
+  if (code == VESK2_ERR_OPEN_MANIFEST_FILE) throw FileTrouble(path, WhyUnreadable(path), "io");
+  if (code < 0 || code == VESK2_ERR_MEM_ALLOC) Check(code, Escape(path));
+  Malformed(path, manifest.GetReadPosition(), "manifest", code);
+}
+
+std::vector<std::string> FoundNames(const FileItem* list, const std::set<std::string>& parents) {
+  std::set<std::string> names;  // an unreadable directory is recorded twice
+  for (; list != nullptr; list = list->next) {
+    if (list->isDirectory == 0 || parents.count(list->name) == 0) names.insert(list->name);
+  }
+  return {names.begin(), names.end()};
+}
+
+std::set<std::string> FoundParents(const Manifest& manifest) {
+  std::set<std::string> parents;
+  for (const FileItem* list : {manifest.GetInvalid(), manifest.GetMissing(), manifest.GetExtra()}) {
+    for (; list != nullptr; list = list->next) {
+      std::string path = list->name;
+      for (size_t at = path.rfind('/'); at != std::string::npos; at = path.rfind('/')) {
+        path.resize(at);
+        if (!parents.insert(path).second) break;
+      }
+    }
+  }
+  return parents;
+}
+
+size_t CountFiles(const FileItem* list) {
+  size_t count = 0;
+  for (; list != nullptr; list = list->next) count += list->isDirectory == 0 ? 1 : 0;
+  return count;
 }
 
 }  // namespace vesk2_command

@@ -54,40 +54,15 @@ struct Finding {
   std::vector<std::string> entries;
 };
 
-// The names of a result list. Directories are recorded for what is inside them too: those with a
-// recorded entry below them are left out.
-std::vector<std::string> Names(const FileItem* list, const std::set<std::string>& parents) {
-  std::set<std::string> names;  // an unreadable directory is recorded twice
-  for (; list != nullptr; list = list->next) {
-    if (list->isDirectory == 0 || parents.count(list->name) == 0) names.insert(list->name);
-  }
-  return {names.begin(), names.end()};
-}
-
-// Every directory that has a finding below it.
-std::set<std::string> Parents(const Manifest& manifest) {
-  std::set<std::string> parents;
-  for (const FileItem* list : {manifest.GetInvalid(), manifest.GetMissing(), manifest.GetExtra()}) {
-    for (; list != nullptr; list = list->next) {
-      std::string path = list->name;
-      for (size_t at = path.rfind('/'); at != std::string::npos; at = path.rfind('/')) {
-        path.resize(at);
-        if (!parents.insert(path).second) break;
-      }
-    }
-  }
-  return parents;
-}
-
 std::vector<Finding> TreeFindings(const Manifest& manifest, const std::vector<std::string>& leaving,
                                   bool allowExtra) {
-  const std::set<std::string> parents = Parents(manifest);
+  const std::set<std::string> parents = FoundParents(manifest);
   std::vector<Finding> findings = {
-      {"changed", Names(manifest.GetInvalid(), parents)},
-      {"missing", Names(manifest.GetMissing(), parents)},
+      {"changed", FoundNames(manifest.GetInvalid(), parents)},
+      {"missing", FoundNames(manifest.GetMissing(), parents)},
       {"link out of the tree", leaving},
   };
-  if (!allowExtra) findings.push_back({"not listed", Names(manifest.GetExtra(), parents)});
+  if (!allowExtra) findings.push_back({"not listed", FoundNames(manifest.GetExtra(), parents)});
   return findings;
 }
 
@@ -106,12 +81,6 @@ void PrintFindings(const std::vector<Finding>& findings) {
   }
 }
 
-size_t CountFiles(const FileItem* list) {
-  size_t count = 0;
-  for (; list != nullptr; list = list->next) count += list->isDirectory == 0 ? 1 : 0;
-  return count;
-}
-
 std::string Summary(const std::vector<Finding>& findings) {
   std::string text;
   for (const Finding& finding : findings) {
@@ -124,31 +93,16 @@ std::string Summary(const std::vector<Finding>& findings) {
 
 // ---- Verdicts ----
 
-// The answers that are a no: the question was understood, and the answer is not yes.
-bool IsRefusal(int code) {
-  constexpr int kRefusals[] = {
-      VESK2_ERR_SIGNATURE_ID,       VESK2_ERR_NOT_IMPLEMENTED, VESK2_ERR_SIGNATURE,
-      VESK2_ERR_HASH_MISMATCH,      VESK2_ERR_NOT_AUTHORIZED,  VESK2_ERR_HASH_MATCH,
-      VESK2_ERR_SIGNING_CERT_ORDER, VESK2_ERR_CERT_REVOKED,    VESK2_ERR_PACKAGE_NOT_GRANTED,
-      VESK2_ERR_KEY_REVOKED,        VESK2_ERR_NOT_OBJECT_CERT, VESK2_ERR_CRL_NOT_FOUND,
-  };
-  return std::find(std::begin(kRefusals), std::end(kRefusals), code) != std::end(kRefusals);
-}
-
 bool JudgedTree(const Manifest& manifest, int code) {
   return code == 0 || manifest.GetInvalid() != nullptr || manifest.GetMissing() != nullptr ||
          (code == VESK2_ERR_EXTRA_FILES && manifest.GetExtra() != nullptr);
 }
 
 [[noreturn]] void ThrowTrouble(const Options& options, const Manifest& manifest, int code) {
-  if (code == VESK2_ERR_OPEN_MANIFEST_FILE) {
-    throw FileTrouble(options.manifest, WhyUnreadable(options.manifest), "io");
-  }
   if (code == VESK2_ERR_FILE_NOT_FOUND || code == VESK2_ERR_FIND_DIR) {
     ThrowNoStore(code);
   }
-  if (code < 0 || code == VESK2_ERR_MEM_ALLOC) Check(code, Escape(options.manifest));
-  Malformed(options.manifest, manifest.GetReadPosition(), "manifest", code);
+  ThrowUnreadable(options.manifest, manifest, code);
 }
 
 ExitCode AnswerAuthority(const Options& options, const Manifest& manifest, Question question,
