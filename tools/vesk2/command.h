@@ -52,6 +52,7 @@ Action DefineManifestSign(CLI::App& app);
 Action DefineManifestVerify(CLI::App& app);
 Action DefineManifestShow(CLI::App& app);
 Action DefineManifestCompare(CLI::App& app);
+Action DefineTagCheck(CLI::App& app);
 Action DefineVersion(CLI::App& app);
 
 }  // namespace vesk2_command

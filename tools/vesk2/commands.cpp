@@ -19,6 +19,9 @@ constexpr Noun kNouns[] = {
     {"manifest", "Sign a directory, and check one",
      "A manifest lists every file of a directory with its digest, and is signed. Verifying asks "
      "two things: is the directory as listed, and was the signer authorized?"},
+    {"tag", "Compare tags",
+     "A tag says what is granted, or asked. A longer list is narrower: who was granted (install) "
+     "may also (install (app calc)), not the other way round."},
     {"version", "Show the version of the command and the library", ""},
 };
 
@@ -56,6 +59,8 @@ constexpr Command kCommands[] = {
      "vesk2 manifest show app.manifest --files", DefineManifestShow},
     {"manifest", "compare", "Do two manifests list the same?",
      "vesk2 manifest compare old.manifest new.manifest", DefineManifestCompare},
+    {"tag", "check", "Does a tag lie within another, and where not?",
+     "vesk2 tag check '(install (app calc))' '(install)'", DefineTagCheck},
     {"version", "", "Show the version of the command and the library", "vesk2 version",
      DefineVersion},
 };
