@@ -53,6 +53,7 @@ Action DefineManifestVerify(CLI::App& app);
 Action DefineManifestShow(CLI::App& app);
 Action DefineManifestCompare(CLI::App& app);
 Action DefineTagCheck(CLI::App& app);
+Action DefineShow(CLI::App& app);
 Action DefineVersion(CLI::App& app);
 
 }  // namespace vesk2_command

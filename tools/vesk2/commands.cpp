@@ -22,6 +22,7 @@ constexpr Noun kNouns[] = {
     {"tag", "Compare tags",
      "A tag says what is granted, or asked. A longer list is narrower: who was granted (install) "
      "may also (install (app calc)), not the other way round."},
+    {"show", "Show any object", "Reads what any file of the system holds, in both its forms."},
     {"version", "Show the version of the command and the library", ""},
 };
 
@@ -61,6 +62,8 @@ constexpr Command kCommands[] = {
      "vesk2 manifest compare old.manifest new.manifest", DefineManifestCompare},
     {"tag", "check", "Does a tag lie within another, and where not?",
      "vesk2 tag check '(install (app calc))' '(install)'", DefineTagCheck},
+    {"show", "", "Show any object: a key, a certificate, a list, a manifest, a tag",
+     "vesk2 show signer.cert\nvesk2 show --json app.manifest\nvesk2 show --advanced -", DefineShow},
     {"version", "", "Show the version of the command and the library", "vesk2 version",
      DefineVersion},
 };
