@@ -33,6 +33,10 @@ using Number = Evp<BIGNUM, BN_free>;
 // Stands in libcrypto's error queue between the caller's entries and ours.
 constexpr int kOurs = 1;
 
+bool IsOurs(unsigned long entry) {
+  return ERR_GET_LIB(entry) == ERR_LIB_USER && ERR_GET_REASON(entry) == kOurs;
+}
+
 // The verdicts of the signature code, as opposed to troubles that any code can have. A number
 // without an inverse is a DSA signature's or key's own fault.
 bool IsVerdict(unsigned long entry) {
@@ -41,23 +45,22 @@ bool IsVerdict(unsigned long entry) {
   return (library == ERR_LIB_RSA || library == ERR_LIB_DSA) && !ERR_COMMON_ERROR(entry);
 }
 
-// Whether a verdict stands behind kOurs. The queue can only be read from its old end: the caller's
-// entries are taken out and put back, without their texts.
+// Whether a verdict stands behind kOurs, the last one: the caller may have such an entry too, and
+// old verdicts behind it. The queue can only be read from its old end: the caller's entries are
+// taken out and put back, without their texts.
 bool FindVerdict() {
-  std::array<unsigned long, ERR_NUM_ERRORS> callers;
+  std::array<unsigned long, ERR_NUM_ERRORS> entries;
   size_t count = 0;
-  bool ours = false;
-  bool found = false;
   while (const unsigned long entry = ERR_get_error()) {
-    if (ours) {
-      found = found || IsVerdict(entry);
-    } else if (ERR_GET_LIB(entry) == ERR_LIB_USER && ERR_GET_REASON(entry) == kOurs) {
-      ours = true;
-    } else if (count < callers.size()) {
-      callers[count++] = entry;
-    }
+    if (count < entries.size()) entries[count++] = entry;
   }
-  for (const unsigned long entry : std::span(callers).first(count)) {
+  bool found = false;
+  while (count > 0 && !IsOurs(entries[count - 1])) {
+    --count;
+    found = found || IsVerdict(entries[count]);
+  }
+  if (count == 0) return false;  // there was no memory for kOurs either
+  for (const unsigned long entry : std::span(entries).first(count - 1)) {
     ERR_raise(ERR_GET_LIB(entry), ERR_GET_REASON(entry));
   }
   ERR_set_mark();  // the one that was there has been read away
