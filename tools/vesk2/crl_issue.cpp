@@ -1,10 +1,9 @@
 // crl_issue.cpp: vesk2 crl issue.
-#include <algorithm>
-
 #include "tools/vesk2/command.h"
 #include "tools/vesk2/crl_file.h"
 #include "tools/vesk2/files.h"
 #include "tools/vesk2/inspect.h"
+#include "tools/vesk2/key_source.h"
 #include "tools/vesk2/report.h"
 
 #include <vesk2/limits.h>
@@ -48,22 +47,14 @@ std::string Digest(DExpression& object, const std::string& hash, bool ignoreHint
 
 // FILE or FILE:N: the digest of the first or N-th certificate of a file, as it stands there.
 std::string CertDigest(const std::string& argument, const std::string& hash) {
-  std::string path = argument;
-  size_t number = 1;
-  const size_t colon = argument.rfind(':');
-  const std::string digits = colon != std::string::npos ? argument.substr(colon + 1) : "";
-  const bool numbered =
-      !digits.empty() && digits.size() < 6 &&
-      std::all_of(digits.begin(), digits.end(), [](char c) { return c >= '0' && c <= '9'; });
-  if (numbered) {
-    path.resize(colon);
-    number = std::stoul(digits);
-  }
+  const Place place = ParsePlace(argument);
+  const std::string& path = place.path;
+  const size_t number = place.number != 0 ? place.number : 1;
   const CertChain chain = ReadCertChain(path);
   const std::vector<ChainLink> links = ChainLinks(chain, path);
-  if (number < 1 || number > links.size()) {
+  if (number > links.size()) {
     throw Trouble(Escape(path) + ": holds " + std::to_string(links.size()) +
-                  " certificates, no number " + digits);
+                  " certificates, no number " + std::to_string(number));
   }
   return Digest(*links[number - 1].cert, hash, false);
 }

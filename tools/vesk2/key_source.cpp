@@ -1,0 +1,64 @@
+// key_source.cpp: public keys named by where they stand.
+#include "tools/vesk2/key_source.h"
+
+#include <algorithm>
+#include <vector>
+
+#include "tools/vesk2/crl_file.h"
+#include "tools/vesk2/inspect.h"
+#include "tools/vesk2/manifest_file.h"
+#include "tools/vesk2/report.h"
+
+namespace vesk2_command {
+namespace {
+
+using ZvVesk2::Cert;
+
+std::vector<Ref<Cert>> CertsOf(const std::string& path) {
+  const Buffer buffer = OpenBuffer(path);
+  std::vector<Ref<Cert>> certs;
+  if (buffer->LooksAt("(8:manifest")) {
+    SignatureBlock block = ReadSignatureBlock(path);
+    for (SignedCert& each : block.certs) certs.push_back(std::move(each.cert));
+  } else if (buffer->LooksAt("(8:sequence(3:crl")) {
+    certs.push_back(Ref<Cert>::Share(ReadCrl(path)->GetCert()));
+  } else {
+    const CertChain chain = ReadCertChain(path);
+    for (const ChainLink& link : ChainLinks(chain, path)) {
+      certs.push_back(Ref<Cert>::Share(link.cert));
+    }
+  }
+  if (certs.empty()) throw Trouble(Escape(path) + ": holds no certificate");
+  return certs;
+}
+
+}  // namespace
+
+Place ParsePlace(const std::string& argument) {
+  const size_t colon = argument.rfind(':');
+  const std::string digits = colon != std::string::npos ? argument.substr(colon + 1) : "";
+  const bool numbered =
+      !digits.empty() && digits.size() < 6 &&
+      std::all_of(digits.begin(), digits.end(), [](char c) { return c >= '0' && c <= '9'; });
+  if (!numbered) return {argument};
+  const size_t number = std::stoul(digits);
+  if (number == 0) throw Trouble(Escape(argument) + ": certificates are counted from 1");
+  return {argument.substr(0, colon), number};
+}
+
+Ref<PublicKey> ReadKeyOf(const std::string& argument, bool issuer) {
+  const Place place = ParsePlace(argument);
+  const std::vector<Ref<Cert>> certs = CertsOf(place.path);
+  const size_t number = place.number != 0 ? place.number : issuer ? certs.size() : 1;
+  if (number > certs.size()) {
+    throw Trouble(Escape(place.path) + ": holds " + std::to_string(certs.size()) +
+                  " certificates, no number " + std::to_string(number));
+  }
+  const Cert& cert = *certs[number - 1];
+  auto* key = dynamic_cast<PublicKey*>(issuer ? cert.GetIssuer() : cert.GetSubject());
+  if (key != nullptr) return Ref<PublicKey>::Share(key);
+  throw Trouble(Escape(place.path) + ": the " + (issuer ? "issuer" : "subject") +
+                " of certificate " + std::to_string(number) + " is not a key");
+}
+
+}  // namespace vesk2_command
