@@ -41,6 +41,7 @@ Action DefineKeyNew(CLI::App& app);
 Action DefineKeyShow(CLI::App& app);
 Action DefineAclGrant(CLI::App& app);
 Action DefineCertIssue(CLI::App& app);
+Action DefineCertRenew(CLI::App& app);
 Action DefineCertShow(CLI::App& app);
 Action DefineCertVerify(CLI::App& app);
 Action DefineCertFind(CLI::App& app);

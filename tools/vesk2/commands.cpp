@@ -37,6 +37,9 @@ constexpr Command kCommands[] = {
      "vesk2 cert issue --key vendor.pem --subject signer.pub --tag '(install (app calc))' "
      "-o signer.cert",
      DefineCertIssue},
+    {"cert", "renew", "Issue a certificate of a chain or manifest again",
+     "vesk2 cert renew signer.cert:2 --key vendor.pem --not-after 2028 -o signer.cert --force",
+     DefineCertRenew},
     {"cert", "show", "Show the certificates of a chain", "vesk2 cert show signer.cert",
      DefineCertShow},
     {"cert", "verify", "Is the first subject of a chain authorized?",

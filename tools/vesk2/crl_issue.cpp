@@ -19,6 +19,7 @@ struct Options {
   std::string tag;
   std::vector<std::string> certs;
   std::vector<std::string> keys;
+  std::string itemsOf;
   std::string date = "now";
   PeriodOptions period;
   std::string hash = "sha256";
@@ -48,15 +49,19 @@ std::string Digest(DExpression& object, const std::string& hash, bool ignoreHint
 // FILE or FILE:N: the digest of the first or N-th certificate of a file, as it stands there.
 std::string CertDigest(const std::string& argument, const std::string& hash) {
   const Place place = ParsePlace(argument);
-  const std::string& path = place.path;
   const size_t number = place.number != 0 ? place.number : 1;
-  const CertChain chain = ReadCertChain(path);
-  const std::vector<ChainLink> links = ChainLinks(chain, path);
-  if (number > links.size()) {
-    throw Trouble(Escape(path) + ": holds " + std::to_string(links.size()) +
-                  " certificates, no number " + std::to_string(number));
+  const std::vector<SignedCert> certs = ReadCerts(place.path);
+  RequireCert(certs, number, place.path);
+  return Digest(*certs[number - 1].cert, hash, false);
+}
+
+// The items of a list, as they stand there.
+std::string ItemsOf(const SExpression& list) {
+  std::string items;
+  for (auto it = list.Begin(); it; it.Next()) {
+    if (it.Value()->IsSExpression()) items += Canonical(*it.Value());
   }
-  return Digest(*links[number - 1].cert, hash, false);
+  return items;
 }
 
 Ref<Crl> MakeList(const Options& options) {
@@ -68,6 +73,11 @@ Ref<Crl> MakeList(const Options& options) {
   }
   for (const std::string& path : options.keys) {
     keys += Item(options.hash, Digest(*ReadPublicKey(path), options.hash, true), *date);
+  }
+  if (!options.itemsOf.empty()) {
+    const Ref<CrlSequence> old = ReadCrl(options.itemsOf);
+    certs += ItemsOf(*old->GetCrl()->GetList1());
+    keys += ItemsOf(*old->GetCrl()->GetList2());
   }
   // A list without items counts as absent, and every certificate that depends on it as
   // undetermined. This item is the digest of nothing.
@@ -125,6 +135,8 @@ Action DefineCrlIssue(CLI::App& app) {
       ->allow_extra_args(false);
   app.add_option("--revoke-key", options->keys, "A public key that is revoked, at any time")
       ->allow_extra_args(false);
+  app.add_option("--items-of", options->itemsOf,
+                 "Revoke what this list revokes, too: the one that is replaced");
   app.add_option("--date", options->date, "From when on the certificates are revoked")
       ->capture_default_str();
   AddPeriodOptions(app, options->period);

@@ -16,6 +16,19 @@ void AddSignerOptions(CLI::App& app, SignerOptions& options) {
   AddPassphraseOptions(app, options.passphrase);
 }
 
+Grant Renewed(const Cert& old, const Renewal& renewal) {
+  Grant grant{old.GetSubject(), old.GetPropagate() || renewal.propagate};
+  grant.tag = renewal.tag ? renewal.tag.get() : old.GetTag();
+  const bool fresh = renewal.newPeriod;
+  grant.period.notBefore =
+      Ref<TimeStamp>::Share(fresh ? renewal.period.notBefore.get() : old.GetNotBefore());
+  grant.period.notAfter =
+      Ref<TimeStamp>::Share(fresh ? renewal.period.notAfter.get() : old.GetNotAfter());
+  grant.comment = renewal.comment ? renewal.comment.get() : old.GetComment();
+  grant.revocation = old.GetRevocationElement();
+  return grant;
+}
+
 SignedCert IssueCert(const PrivateKey& key, const Grant& grant, const std::string& algorithm) {
   const Ref<PublicKey> issuer = key.Public();
   SignedCert result{Ref<Cert>(new Cert(nullptr)), {}};

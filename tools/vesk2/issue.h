@@ -32,6 +32,16 @@ struct Grant {
   SExpression* revocation = nullptr;  // where lists tell whether the certificate is revoked
 };
 
+// What a certificate that replaces another says differently; what is not set stays as it was.
+struct Renewal {
+  Ref<SExpression> tag = {};
+  bool propagate = false;  // lets the subject pass it on
+  bool newPeriod = false;  // the whole period is replaced
+  Period period = {};
+  Ref<ByteString> comment = {};
+};
+Grant Renewed(const ZvVesk2::Cert& old, const Renewal& renewal);
+
 struct SignedCert {
   Ref<ZvVesk2::Cert> cert;
   Ref<ZvVesk2::Signature> signature;

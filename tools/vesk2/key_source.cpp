@@ -14,25 +14,35 @@ namespace {
 
 using ZvVesk2::Cert;
 
-std::vector<Ref<Cert>> CertsOf(const std::string& path) {
+SignedCert Share(Cert* cert, ZvVesk2::Signature* signature) {
+  return {Ref<Cert>::Share(cert), Ref<ZvVesk2::Signature>::Share(signature)};
+}
+
+}  // namespace
+
+std::vector<SignedCert> ReadCerts(const std::string& path) {
   const Buffer buffer = OpenBuffer(path);
-  std::vector<Ref<Cert>> certs;
+  std::vector<SignedCert> certs;
   if (buffer->LooksAt("(8:manifest")) {
-    SignatureBlock block = ReadSignatureBlock(path);
-    for (SignedCert& each : block.certs) certs.push_back(std::move(each.cert));
+    certs = ReadSignatureBlock(path).certs;
   } else if (buffer->LooksAt("(8:sequence(3:crl")) {
-    certs.push_back(Ref<Cert>::Share(ReadCrl(path)->GetCert()));
+    const Ref<CrlSequence> list = ReadCrl(path);
+    certs.push_back(Share(list->GetCert(), list->GetSignature()));
   } else {
     const CertChain chain = ReadCertChain(path);
     for (const ChainLink& link : ChainLinks(chain, path)) {
-      certs.push_back(Ref<Cert>::Share(link.cert));
+      certs.push_back(Share(link.cert, link.signature));
     }
   }
   if (certs.empty()) throw Trouble(Escape(path) + ": holds no certificate");
   return certs;
 }
 
-}  // namespace
+void RequireCert(const std::vector<SignedCert>& certs, size_t number, const std::string& path) {
+  if (number >= 1 && number <= certs.size()) return;
+  throw Trouble(Escape(path) + ": holds " + std::to_string(certs.size()) +
+                " certificates, no number " + std::to_string(number));
+}
 
 Place ParsePlace(const std::string& argument) {
   const size_t colon = argument.rfind(':');
@@ -48,13 +58,10 @@ Place ParsePlace(const std::string& argument) {
 
 Ref<PublicKey> ReadKeyOf(const std::string& argument, bool issuer) {
   const Place place = ParsePlace(argument);
-  const std::vector<Ref<Cert>> certs = CertsOf(place.path);
+  const std::vector<SignedCert> certs = ReadCerts(place.path);
   const size_t number = place.number != 0 ? place.number : issuer ? certs.size() : 1;
-  if (number > certs.size()) {
-    throw Trouble(Escape(place.path) + ": holds " + std::to_string(certs.size()) +
-                  " certificates, no number " + std::to_string(number));
-  }
-  const Cert& cert = *certs[number - 1];
+  RequireCert(certs, number, place.path);
+  const Cert& cert = *certs[number - 1].cert;
   auto* key = dynamic_cast<PublicKey*>(issuer ? cert.GetIssuer() : cert.GetSubject());
   if (key != nullptr) return Ref<PublicKey>::Share(key);
   throw Trouble(Escape(place.path) + ": the " + (issuer ? "issuer" : "subject") +

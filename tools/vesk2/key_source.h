@@ -4,8 +4,9 @@
 #define VESK2_TOOLS_KEY_SOURCE_H
 
 #include <string>
+#include <vector>
 
-#include "tools/vesk2/objects.h"
+#include "tools/vesk2/issue.h"
 
 namespace vesk2_command {
 
@@ -15,6 +16,12 @@ struct Place {
   size_t number = 0;
 };
 Place ParsePlace(const std::string& argument);
+
+// ReadCerts reads the certificates of a chain, a manifest or a revocation list, with their
+// signatures, in the order of the file. Trouble when there are none.
+std::vector<SignedCert> ReadCerts(const std::string& path);
+// RequireCert throws Trouble unless `certs`, of `path`, have a certificate of that number.
+void RequireCert(const std::vector<SignedCert>& certs, size_t number, const std::string& path);
 
 // ReadKeyOf reads the issuer or the subject of the N-th certificate of FILE[:N]: by default of the
 // last for an issuer, where a chain has its root, and of the first for a subject. Trouble when it
