@@ -1,19 +1,18 @@
 // cert_verify.cpp: vesk2 cert verify.
 #include "tools/vesk2/command.h"
+#include "tools/vesk2/explain.h"
 #include "tools/vesk2/inspect.h"
 #include "tools/vesk2/report.h"
-#include "tools/vesk2/stores.h"
 
 namespace vesk2_command {
 namespace {
-
-using ZvVesk2::Cert;
 
 struct Options {
   std::string file;
   std::string tag;
   std::string at;
   PeriodOptions period;
+  bool explain = false;
 };
 
 Period AskedPeriod(const Options& options) {
@@ -24,77 +23,45 @@ Period AskedPeriod(const Options& options) {
   return {ParseTime(at, false), ParseTime(at, false)};
 }
 
-// What the library's verification left in a certificate, and what its signature is worth.
-void ExplainLink(const ChainLink& link, const std::string& name) {
-  const Cert& cert = *link.cert;
-  const int code = link.signature->Verify(link.cert);
-  if (code != 0) Note(name + ": " + Reason(code));
-  switch (cert.GetRevocationStatus()) {
-    case Cert::RevokedByCrl:
-      return Note(name + " is revoked");
-    case Cert::KeyRevoked:
-      return Note(name + " is for a revoked key, " + SubjectText(*cert.GetSubject()));
-    case Cert::Undetermined: {
-      SExpression* source = cert.GetRevocationElement();
-      return Note(name + ": no current revocation list tells whether it is revoked" +
-                  (source != nullptr ? "; its source is " + SourceText(*source) : ""));
+// The answer about every member; the first refusal is the answer to all.
+int VerifyMembers(const CertChain& chain, const Question& question) {
+  const Request& request = *question.request;
+  int first = 0;
+  for (size_t i = 0; i < request.members.size(); ++i) {
+    const int code = chain->Verify(nullptr, request.members[i].tag.get(),
+                                   question.period.notBefore.get(), question.period.notAfter.get());
+    if (code < 0 || code == VESK2_ERR_MEM_ALLOC) {
+      ExplainUnreadable(question, code);
+      Check(code, Escape(question.file));
     }
-    default:
-      return;
+    TellMember(request, i, code);
+    if (first == 0) first = code;
   }
-}
-
-// The stamp of (not-before STAMP) or (not-after STAMP); null without one.
-const ByteString* StampOf(const Ref<SExpression>& limit) {
-  return limit ? dynamic_cast<ByteString*>(limit->Last()) : nullptr;
-}
-
-// What the chain does grant, beside what was asked for.
-void ExplainGrant(const CertChain& chain, const std::vector<ChainLink>& links, SExpression* asked,
-                  const Period& period) {
-  Ref<SExpression> tag;
-  Ref<SExpression> notBefore;
-  Ref<SExpression> notAfter;
-  if (chain->Verify2(tag.Out(), notBefore.Out(), notAfter.Out()) != 0) return;
-  if (tag) {
-    std::string limits;
-    for (const auto* limit : {&notBefore, &notAfter}) {
-      const ByteString* stamp = StampOf(*limit);
-      if (stamp == nullptr) continue;
-      limits += limit == &notBefore ? " from " : " until ";
-      limits += Escape({reinterpret_cast<const char*>(stamp->GetData()), stamp->GetLength()});
-    }
-    return Note("the chain grants " + TagText(tag.get()) + limits + ", asked was " +
-                TagText(asked) + " " + PeriodText(period.notBefore.get(), period.notAfter.get()));
-  }
-  for (size_t i = 1; i < links.size(); ++i) {
-    if (links[i].cert->GetPropagate()) continue;
-    Note("certificate " + std::to_string(i + 1) + " does not let its subject pass the grant on");
-  }
-  Note("the chain grants nothing: no ACL entry in " + Escape(AclDirectory()) +
-       " leads along it to " + SubjectText(*links[0].cert->GetSubject()));
+  return first;
 }
 
 ExitCode Run(const Options& options) {
-  const Ref<SExpression> tag = ParseTag(options.tag);
-  const Period period = AskedPeriod(options);
+  const Request request = ParseRequest(options.tag);
+  Question question;
+  question.file = options.file;
+  question.request = &request;
+  question.period = AskedPeriod(options);
   const CertChain chain = ReadCertChain(options.file);
   const std::vector<ChainLink> links = ChainLinks(chain, options.file);
   (void)LoadAcls();  // says why there is nothing to go by
 
-  const int code = chain->Verify(nullptr, tag.get(), period.notBefore.get(), period.notAfter.get());
-  if (code == 0) {
-    return Yes(SubjectText(*links[0].cert->GetSubject()) + " is granted " + TagText(tag.get()));
+  const std::string tag = TagText(request.tag.get());
+  const std::string subject = SubjectText(*links[0].cert->GetSubject());
+  Result()["subject"] = subject;
+  Result()["tag"] = tag;
+  const int code = VerifyMembers(chain, question);
+  if (code != 0) {
+    const ExitCode verdict = No(code, CodeWords(code));
+    ExplainRefusal(question, code);
+    return verdict;
   }
-  if (code < 0 || code == VESK2_ERR_MEM_ALLOC) Check(code, Escape(options.file));
-  const ExitCode verdict = No(code, CodeWords(code));
-  for (size_t i = 0; i < links.size(); ++i) {
-    ExplainLink(links[i], "certificate " + std::to_string(i + 1) + " (issuer " +
-                              SubjectText(*links[i].cert->GetIssuer()) + ")");
-  }
-  if (code == VESK2_ERR_NOT_AUTHORIZED || code == VESK2_ERR_PACKAGE_NOT_GRANTED) {
-    ExplainGrant(chain, links, tag.get(), period);
-  }
+  const ExitCode verdict = Yes(subject + " is granted " + tag);
+  if (options.explain) ExplainGrant(question);
   return verdict;
 }
 
@@ -103,12 +70,14 @@ ExitCode Run(const Options& options) {
 Action DefineCertVerify(CLI::App& app) {
   auto options = std::make_shared<Options>();
   app.add_option("file", options->file, "The certificate file: a chain")->required();
-  app.add_option("--tag", options->tag, "What its first subject must be authorized for")
+  app.add_option("--tag", options->tag,
+                 "What its first subject must be authorized for; of a set, every member")
       ->required();
   AddPeriodOptions(app, options->period);
   app.add_option("--at", options->at, "Authorized at this moment [now]")
       ->excludes("--not-before")
       ->excludes("--not-after");
+  app.add_flag("--explain", options->explain, "Tell why also when the answer is yes");
   return [options] { return Run(*options); };
 }
 

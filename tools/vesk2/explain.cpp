@@ -1,269 +1,314 @@
-// explain.cpp: why a manifest was refused, in words.
+// explain.cpp: the explanation of an answer, as lines and as JSON.
 #include "tools/vesk2/explain.h"
 
 #include <algorithm>
+#include <ctime>
 #include <filesystem>
 
-#include "tools/vesk2/manifest_file.h"
+#include "tools/vesk2/authority.h"
+#include "tools/vesk2/hypothesis.h"
+#include "tools/vesk2/inspect.h"
+#include "tools/vesk2/remedy.h"
 #include "tools/vesk2/report.h"
 #include "tools/vesk2/stores.h"
-
-#include <vesk2/acl_entry.h>
-#include <vesk2/hash.h>
-#include <vesk2/verify.h>
 
 namespace vesk2_command {
 namespace {
 
 using ZvVesk2::AclEntry;
 using ZvVesk2::Cert;
-using ZvVesk2::CrlSequence;
-using ZvVesk2::Hash;
-using ZvVesk2::Principal;
-using ZvVesk2::Subject;
-using ZvVesk2::ThresholdSubject;
 
-bool IsDigestOf(const Hash& hash, DExpression& key) {
-  unsigned char* digest = nullptr;
-  unsigned int length = 0;
-  if (key.ComputeHash(digest, length, hash.GetAlgorithm(), true) != 0) return false;
-  const std::unique_ptr<unsigned char[]> owner(digest);
-  const ByteString* named = hash.GetDigest();
-  return named != nullptr && named->GetLength() == length &&
-         std::equal(digest, digest + length, named->GetData());
+// Enough of a fingerprint to tell keys apart by eye.
+std::string Short(const std::string& fingerprint) {
+  constexpr size_t kDigits = 16;
+  std::string text;
+  for (size_t at = 0; at < fingerprint.size();) {
+    const size_t start = fingerprint.find(':', at);
+    if (start == std::string::npos) return text + fingerprint.substr(at);
+    const size_t end = std::min(fingerprint.find(' ', start), fingerprint.size());
+    text += fingerprint.substr(at, std::min(start + 1 + kDigits, end) - at);
+    at = end;
+  }
+  return text;
 }
 
-// Whether a subject is a key, names it by its digest or counts it among its k-of-n.
-bool Names(Subject* subject, Principal* key) {
-  if (subject->IsEqual(key)) return true;
-  if (const auto* hash = dynamic_cast<Hash*>(subject)) return IsDigestOf(*hash, *key);
-  auto* threshold = dynamic_cast<ThresholdSubject*>(subject);
-  return threshold != nullptr && threshold->HasMember(key);
+Json StampJson(const TimeStamp* stamp) {
+  return stamp != nullptr ? Json(StampText(*stamp)) : Json();
+}
+std::string CommentOf(const ByteString* comment) {
+  return comment == nullptr
+             ? ""
+             : Escape({reinterpret_cast<const char*>(comment->GetData()), comment->GetLength()});
 }
 
-std::string FileOf(AclEntry& entry) {
-  const Text name(entry.BaseName());
-  return "ACL entry " + (name ? Escape(name.get()) : "without a name");
+// ---- Revocation ----
+
+// The list that speaks for a certificate: of its source the one that ends last.
+Ref<CrlSequence> DecidingList(const Evidence& evidence, SExpression* source) {
+  const Ref<SExpression> entries = EntryList(AllEntries(evidence));
+  const Ref<SExpression> lists = LoadLists(evidence, entries.get());
+  Ref<CrlSequence> deciding;
+  for (auto it = lists->Begin(); it; it.Next()) {
+    auto* list = dynamic_cast<CrlSequence*>(it.Value());
+    if (list == nullptr || list->First() == nullptr) continue;
+    const TimeStamp* end = list->GetCert()->GetNotAfter();
+    if (end == nullptr || !list->GetCert()->GetTag() ||
+        !list->GetCert()->GetTag()->IsEqual(source) || list->VerifySelf(entries.get()) != 0) {
+      continue;
+    }
+    if (!deciding || end->IsAfter(deciding->GetCert()->GetNotAfter())) {
+      deciding = Ref<CrlSequence>::Share(list);
+    }
+  }
+  return deciding;
 }
 
-class Explanation {
- public:
-  explicit Explanation(const Question& question)
-      : question_(question), block_(ReadSignatureBlock(question.manifest)) {
-    const std::string& extra = question.aclDirectory;
-    const int code =
-        AclEntry::Import(acls_.Out(), nullptr, extra.empty() ? nullptr : extra.c_str());
-    if (code != 0) acls_.Reset();
-    const bool asked = question.period.notBefore || question.period.notAfter;
-    first_ = asked ? question.period.notBefore.get() : block_.signedAt.get();
-    last_ = asked ? question.period.notAfter.get() : block_.signedAt.get();
-  }
-
-  void Signatures() {
-    for (size_t i = 0; i < block_.certs.size(); ++i) {
-      const int code = block_.certs[i].signature->Verify(block_.certs[i].cert.get());
-      if (code != 0) Add(CertName(i) + ": " + Reason(code));
+// When a list was made, as far as it tells: its beginning, or the newest date in it.
+const TimeStamp* MadeAt(const CrlSequence& list, const TimeStamp& now) {
+  const TimeStamp* made = list.GetCert()->GetNotBefore();
+  for (const SExpression* items : {list.GetCrl()->GetList1(), list.GetCrl()->GetList2()}) {
+    for (auto it = items->Begin(); it; it.Next()) {
+      const auto* item = dynamic_cast<SExpression*>(it.Value());
+      const auto* date = item != nullptr ? dynamic_cast<TimeStamp*>(item->Last()) : nullptr;
+      if (date == nullptr || date->IsAfter(&now)) continue;
+      if (made == nullptr || date->IsAfter(made)) made = date;
     }
   }
+  return made;
+}
 
-  void Order() {
-    if (block_.certs.empty()) return;
-    Subject* first = block_.certs[0].cert->GetSubject();
-    if (!first->IsHash()) return Add(CertName(0) + " is not for the digest of a manifest");
-    if (block_.certs.size() < 2) return;
-    Principal* signer = block_.certs[0].cert->GetIssuer();
-    if (block_.certs[1].cert->GetSubject()->IsEqual(signer)) return;
-    Add(CertName(1) + " is for " + Fingerprint(*block_.certs[1].cert->GetSubject()) +
-        ", not for the signer " + Fingerprint(*signer));
+Json ListJson(const CrlSequence& list) {
+  Json json = {{"issuer", SubjectText(*list.GetCert()->GetIssuer())},
+               {"not_before", StampJson(list.GetCert()->GetNotBefore())},
+               {"not_after", StampJson(list.GetCert()->GetNotAfter())}};
+  const Ref<TimeStamp> now = ParseTime("now", false);
+  const TimeStamp* made = MadeAt(list, *now);
+  constexpr long kDay = 24L * 60 * 60;
+  json["made_at"] = StampJson(made);
+  json["age_days"] = made != nullptr ? Json((now->ToTime() - made->ToTime()) / kDay) : Json();
+  return json;
+}
+
+std::string ListText(const Json& list) {
+  std::string text =
+      "list by " + Short(list["issuer"]) + " until " + list["not_after"].get<std::string>();
+  if (!list["age_days"].is_null()) {
+    const long days = list["age_days"];
+    text += days == 0 ? ", made today" : ", " + std::to_string(days) + " days old";
   }
+  return text;
+}
 
-  void Content() {
-    if (!block_.damage.empty()) Add(Escape(question_.manifest) + ": " + block_.damage);
-    if (!block_.certs.empty()) Add(CertName(0) + " is for another version, time or listing");
+const char* StateWord(int32_t state) {
+  switch (state) {
+    case Cert::RevokedByCrl:
+      return "revoked";
+    case Cert::KeyRevoked:
+      return "key-revoked";
+    case Cert::Undetermined:
+      return "undetermined";
+    default:
+      return "not-revoked";
   }
+}
 
-  void Revocations() {
-    Ref<SExpression> lists;
-    if (!acls_ || CrlSequence::ImportStore(lists.Out(), acls_.get(), nullptr) != 0) return;
-    for (const auto& carried : block_.crls) {
-      auto shared = Ref<CrlSequence>::Share(carried.get());
-      if (lists->Insert(shared.get()) == 0) (void)shared.Release();
-    }
-    TimeStamp* from = first_ != nullptr ? first_ : block_.signedAt.get();
-    TimeStamp* to = last_ != nullptr ? last_ : block_.signedAt.get();
-    for (size_t i = 0; i < block_.certs.size(); ++i) {
-      Cert& cert = *block_.certs[i].cert;
-      bool revoked = false;
-      const int code = cert.IsRevoked(revoked, acls_.get(), lists.get(), from, to);
-      const int32_t status = cert.GetRevocationStatus();
-      if (status == Cert::RevokedByCrl) Add(CertName(i) + " is revoked");
-      if (status == Cert::KeyRevoked) {
-        Add(CertName(i) + " is for a revoked key, " + Fingerprint(*cert.GetSubject()));
+Json RevocationJson(const Evidence& evidence, size_t index, int32_t state) {
+  SExpression* source = evidence.certs[index].source.get();
+  Json json = {{"state", StateWord(state)},
+               {"source", source != nullptr ? Json(TagText(source)) : Json()},
+               {"list", Json()}};
+  if (source == nullptr) return json;
+  if (const Ref<CrlSequence> list = DecidingList(evidence, source)) {
+    json["list"] = ListJson(*list);
+  }
+  return json;
+}
+
+// ---- Facts ----
+
+template <typename Grant>  // a certificate or an ACL entry
+Json GrantJson(Grant& grant) {
+  return {{"subject", SubjectText(*grant.GetSubject())},
+          {"tag", TagText(grant.GetTag())},
+          {"propagate", grant.GetPropagate()},
+          {"not_before", StampJson(grant.GetNotBefore())},
+          {"not_after", StampJson(grant.GetNotAfter())},
+          {"comment", CommentOf(grant.GetComment())}};
+}
+
+Json CertJson(const Evidence& evidence, size_t index, int32_t state) {
+  const CertEvidence& each = evidence.certs[index];
+  Json json = {{"certificate", index + 1}, {"issuer", SubjectText(*each.cert->GetIssuer())}};
+  json.update(GrantJson(*each.cert));
+  json["signature"] = {
+      {"holds", each.code == 0}, {"reason", ReasonWord(each.code)}, {"code", each.code}};
+  json["revocation"] = RevocationJson(evidence, index, state);
+  return json;
+}
+
+// "SUBJECT (COMMENT) may TAG, PERIOD, and pass it on".
+template <typename Grant>
+std::string GrantText(Grant& grant) {
+  const std::string comment = CommentOf(grant.GetComment());
+  return Short(SubjectText(*grant.GetSubject())) + (comment.empty() ? "" : " (" + comment + ")") +
+         " for " + TagText(grant.GetTag()) + ", " +
+         PeriodText(grant.GetNotBefore(), grant.GetNotAfter()) +
+         (grant.GetPropagate() ? ", may pass it on" : "");
+}
+
+std::string CertText(const Evidence& evidence, size_t index, const Json& json) {
+  const CertEvidence& each = evidence.certs[index];
+  std::string text = "certificate " + std::to_string(index + 1) + ": " +
+                     Short(SubjectText(*each.cert->GetIssuer())) + " certifies " +
+                     GrantText(*each.cert);
+  text += each.code == 0 ? "; signature holds" : "; signature: " + CodeWords(each.code);
+  const Json& revocation = json["revocation"];
+  std::string state = revocation["state"];
+  std::replace(state.begin(), state.end(), '-', ' ');
+  text += "; " + state;
+  if (!revocation["source"].is_null()) text += " by " + revocation["source"].get<std::string>();
+  if (!revocation["list"].is_null()) text += " (" + ListText(revocation["list"]) + ")";
+  return text;
+}
+
+// The certificates, and the entries that name one of their keys.
+void TellFacts(const Evidence& evidence) {
+  const std::vector<int32_t> states = RevocationStates(evidence);
+  Json& chain = Result()["chain"] = Json::array();
+  for (size_t i = 0; i < evidence.certs.size(); ++i) {
+    chain.push_back(CertJson(evidence, i, states[i]));
+    Note(CertText(evidence, i, chain.back()));
+  }
+  Json& acl = Result()["acl"] = Json::array();
+  for (const EntryEvidence& each : evidence.entries) {
+    if (!IsRelevant(each, evidence)) continue;
+    Json json = {{"entry", Escape(each.file)}};
+    json.update(GrantJson(*each.entry));
+    acl.push_back(json);
+    Note(EntryName(each) + ": trusts " + GrantText(*each.entry));
+  }
+}
+
+// ---- Remedies ----
+
+// A word as a shell takes it.
+std::string Quoted(const std::string& word) {
+  const auto plain = [](char c) {
+    return std::isalnum(static_cast<unsigned char>(c)) != 0 ||
+           std::string_view("-_./:=,+@%").find(c) != std::string_view::npos;
+  };
+  if (!word.empty() && std::all_of(word.begin(), word.end(), plain)) return word;
+  std::string text = "'";
+  for (const char c : word) text += c == '\'' ? std::string("'\\''") : std::string(1, c);
+  return text + "'";
+}
+
+void TellRemedies(const std::vector<Remedy>& remedies) {
+  Json& list = Result()["remedies"] = Json::array();
+  const char* lead = "would pass: ";
+  for (const Remedy& remedy : remedies) {
+    Note((remedy.commands.empty() ? "to mend: " : lead) + remedy.text);
+    lead = "or: ";
+    Json commands = Json::array();
+    for (const auto& words : remedy.commands) {
+      Json command = Json::array();
+      std::string line;
+      for (const std::string& word : words) {
+        command.push_back(Escape(word));
+        line += (line.empty() ? "" : " ") + Escape(Quoted(word));
       }
-      if (status == Cert::Undetermined) {
-        Add(CertName(i) + ": no current revocation list tells whether it is revoked (" +
-            CodeName(code) + ")");
-      }
+      Note("  " + line);
+      commands.push_back(command);
     }
+    list.push_back({{"kind", remedy.kind},
+                    {"text", remedy.text},
+                    {"commands", commands},
+                    {"keys", remedy.keys}});
   }
+}
 
-  void Certificates() {
-    for (size_t i = 0; i < block_.certs.size(); ++i) {
-      const Cert& cert = *block_.certs[i].cert;
-      Period(CertName(i), cert.GetNotBefore(), cert.GetNotAfter());
-      Tag(CertName(i), cert.GetTag());
-      // The first speaks for the content, and the second is used as if it could be passed on.
-      if (i > 1 && !cert.GetPropagate()) {
-        Add(CertName(i) + " does not let its subject pass the grant on (no --propagate)");
-      }
-    }
+void TellLosses(const std::vector<Loss>& losses) {
+  Json& lost = Result()["lost"] = Json::array();
+  for (const Loss& loss : losses) {
+    Note(loss.text);
+    lost.push_back({{"kind", loss.kind}, {"text", loss.text}});
   }
+}
 
-  // ACL entries that name a key of the chain and do not help; none of it when one does.
-  void Roots() {
-    if (!acls_) return;
-    const std::vector<std::string> before = reasons_;
-    bool named = false;
-    for (auto it = acls_->Begin(); it; it.Next()) {
-      auto* entry = dynamic_cast<AclEntry*>(it.Value());
-      if (entry == nullptr || !NamesIssuer(*entry)) continue;
-      named = true;
-      const size_t count = reasons_.size();
-      const std::string name = FileOf(*entry);
-      if (!entry->GetPropagate()) Add(name + " does not let its key pass the grant on");
-      Period(name, entry->GetNotBefore(), entry->GetNotAfter());
-      Tag(name, entry->GetTag());
-      if (reasons_.size() == count) {
-        reasons_ = before;
-        return;
-      }
-    }
-    if (!named) Add("no ACL entry in " + Stores() + " names a key of this chain:" + Issuers());
+// ---- The path of a yes ----
+
+void TellPath(const Question& question, const Evidence& evidence) {
+  Json json = {{"path", Json::array()}, {"ends", Json()}, {"lists", Json::array()}};
+  const std::optional<AuthorityPath> path = FindPath(question, evidence);
+  if (!path) {
+    Note("authority comes by several ACL entries together");
+    Result()["authority"] = json;
+    return;
   }
-
-  // Credentials that the reduction cannot read; one of them is enough to stop it.
-  void Unreadable() {
-    for (size_t i = 0; i < block_.certs.size(); ++i) {
-      const int code = TryReduction("sequence", block_.certs[i].cert.get());
-      if (code < 0) Add(CertName(i) + ": " + Reason(code));
-    }
-    if (!acls_) return;
-    for (auto it = acls_->Begin(); it; it.Next()) {
-      auto* entry = dynamic_cast<AclEntry*>(it.Value());
-      const int code = entry != nullptr ? TryReduction("acl", entry) : 0;
-      if (code < 0) Add(FileOf(*entry) + ": " + Reason(code));
-    }
+  std::string text = EntryName(*path->entry);
+  json["path"].push_back(Escape(path->entry->file));
+  for (const size_t index : path->certs) {
+    text += " -> certificate " + std::to_string(index + 1);
+    json["path"].push_back(index + 1);
   }
-
-  std::vector<std::string> Take() { return std::move(reasons_); }
-
- private:
-  void Add(const std::string& reason) { reasons_.push_back(reason); }
-
-  std::string CertName(size_t index) const {
-    return "certificate " + std::to_string(index + 1) + " (issuer " +
-           Fingerprint(*block_.certs[index].cert->GetIssuer()) + ")";
+  json["ends"] = StampJson(path->ends);
+  Note("authority: " + text + " -> " + SubjectText(*evidence.certs[0].cert->GetSubject()));
+  Note(path->ends != nullptr ? "it ends at " + StampText(*path->ends) : "it has no end");
+  for (const size_t index : path->certs) {
+    SExpression* source = evidence.certs[index].source.get();
+    const Ref<CrlSequence> list =
+        source != nullptr ? DecidingList(evidence, source) : Ref<CrlSequence>();
+    if (!list) continue;
+    Json used = {{"source", TagText(source)}};
+    used.update(ListJson(*list));
+    json["lists"].push_back(used);
+    Note("it rests on " + TagText(source) + ": " + ListText(used));
   }
+  if (json["lists"].empty()) Note("no certificate of it asks for a revocation list");
+  Result()["authority"] = json;
+}
 
-  std::string Stores() const {
-    const std::string& extra = question_.aclDirectory;
-    return Escape(AclDirectory()) + (extra.empty() ? "" : " or " + Escape(extra));
+// An explanation that cannot be had must not stand in for the answer.
+template <typename Tell>
+void Explain(Tell&& tell) {
+  try {
+    tell();
+  } catch (const Trouble& trouble) {
+    Note(std::string("the explanation stops here: ") + trouble.what());
   }
-
-  std::string Asked() const {
-    if (first_ == block_.signedAt.get()) return "the manifest was signed at " + StampText(*first_);
-    const std::string from = first_ != nullptr ? " from " + StampText(*first_) : "";
-    const std::string to = last_ != nullptr ? " until " + StampText(*last_) : "";
-    return "asked was" + from + to;
-  }
-
-  void Period(const std::string& name, const TimeStamp* notBefore, const TimeStamp* notAfter) {
-    if (notAfter != nullptr && notAfter->IsBefore(first_)) {
-      Add(name + " was valid until " + StampText(*notAfter) + ", " + Asked());
-    }
-    if (notBefore != nullptr && notBefore->IsAfter(last_)) {
-      Add(name + " is not valid before " + StampText(*notBefore) + ", " + Asked());
-    }
-  }
-
-  void Tag(const std::string& name, SExpression* tag) {
-    if (tag == nullptr || question_.tag->IsSubset(tag)) return;
-    Add(name + " grants " + TagText(tag) + ", asked was " + TagText(question_.tag));
-  }
-
-  bool NamesIssuer(const AclEntry& entry) const {
-    return std::any_of(block_.certs.begin(), block_.certs.end(), [&](const SignedCert& each) {
-      return Names(entry.GetSubject(), each.cert->GetIssuer());
-    });
-  }
-
-  std::string Issuers() const {
-    std::string text;
-    for (const SignedCert& each : block_.certs) {
-      const std::string issuer = " " + Fingerprint(*each.cert->GetIssuer());
-      if (text.find(issuer) == std::string::npos) text += issuer;
-    }
-    return text;
-  }
-
-  // The engine's answer about one credential alone.
-  int TryReduction(const char* head, DExpression* credential) {
-    Ref<SExpression> lists[2];
-    if (SExpression::Create(lists[0].Out(), "acl", nullptr) != 0) return 0;
-    if (SExpression::Create(lists[1].Out(), "sequence", nullptr) != 0) return 0;
-    auto shared = Ref<DExpression>::Share(credential);
-    SExpression& list = *lists[std::string(head) == "acl" ? 0 : 1];
-    if (list.Insert(shared.get()) == 0) (void)shared.Release();
-    Ref<SExpression> tag;
-    Ref<SExpression> notBefore;
-    Ref<SExpression> notAfter;
-    return ZvVesk2::Verify::ReductB(nullptr, lists[0].get(), lists[1].get(),
-                                    block_.certs[0].cert->GetSubject(), tag.Out(), notBefore.Out(),
-                                    notAfter.Out());
-  }
-
-  const Question& question_;
-  SignatureBlock block_;
-  Ref<SExpression> acls_;
-  TimeStamp* first_;  // the period asked for; null where it is open
-  TimeStamp* last_;
-  std::vector<std::string> reasons_;
-};
-
-using Step = void (Explanation::*)();
-
-// Which of the questions above can have led to a code.
-constexpr struct {
-  int code;
-  Step steps[3];
-} kSteps[] = {
-    {VESK2_ERR_SIGNATURE, {&Explanation::Signatures}},
-    {VESK2_ERR_SIGNATURE_ID, {&Explanation::Signatures}},
-    {VESK2_ERR_HASH_MISMATCH, {&Explanation::Signatures}},
-    {VESK2_ERR_NOT_IMPLEMENTED, {&Explanation::Signatures}},
-    {VESK2_ERR_HASH_MATCH, {&Explanation::Content}},
-    {VESK2_ERR_NOT_OBJECT_CERT, {&Explanation::Order}},
-    {VESK2_ERR_SIGNING_CERT_ORDER, {&Explanation::Order, &Explanation::Revocations}},
-    {VESK2_ERR_CERT_REVOKED, {&Explanation::Revocations}},
-    {VESK2_ERR_CRL_NOT_FOUND, {&Explanation::Revocations}},
-    {VESK2_ERR_NOT_AUTHORIZED,
-     {&Explanation::Revocations, &Explanation::Certificates, &Explanation::Roots}},
-    {VESK2_ERR_PACKAGE_NOT_GRANTED,
-     {&Explanation::Revocations, &Explanation::Certificates, &Explanation::Roots}},
-};
+}
 
 }  // namespace
 
-std::vector<std::string> ExplainAuthority(const Question& question, int code) {
-  Explanation explanation(question);
-  for (const auto& row : kSteps) {
-    if (row.code != code) continue;
-    for (const Step step : row.steps) {
-      if (step != nullptr) (explanation.*step)();
+void ExplainRefusal(const Question& question, int code) {
+  Explain([&] {
+    const Evidence evidence = GatherEvidence(question);
+    TellFacts(evidence);
+    TellLosses(FindLosses(question, evidence, code));
+    TellRemedies(FindRemedies(question, evidence, code));
+  });
+}
+
+void ExplainTree(const Question& question) {
+  Explain([&] {
+    std::vector<Remedy> remedies = SignAgain(question, GatherEvidence(question));
+    for (Remedy& remedy : remedies) {
+      remedy.text = "what is named above as it was, or, if it is meant so, " + remedy.text;
     }
-  }
-  if (code < 0) explanation.Unreadable();
-  return explanation.Take();
+    TellRemedies(remedies);
+  });
+}
+
+void ExplainGrant(const Question& question) {
+  Explain([&] {
+    const Evidence evidence = GatherEvidence(question);
+    TellFacts(evidence);
+    TellPath(question, evidence);
+  });
+}
+
+void ExplainUnreadable(const Question& question, int code) {
+  Explain([&] { TellLosses(FindLosses(question, GatherEvidence(question), code)); });
 }
 
 std::vector<std::string> ExplainStore() {

@@ -1,29 +1,28 @@
-// explain.h: why a manifest was refused, in words.
+// explain.h: why an answer about authority is what it is, and what would make a refusal a yes: for
+// people as notes, for machines in Result().
 //
-// The library answers with one code. These functions look at the same files again, by the public
-// interface, and name the certificate, entry or file. They never change the verdict.
+// The verdict is the library's. These functions look at the same files again, by the public
+// interface, and never change it.
 #ifndef VESK2_TOOLS_EXPLAIN_H
 #define VESK2_TOOLS_EXPLAIN_H
 
 #include <string>
 #include <vector>
 
-#include "tools/vesk2/times.h"
-
-#include <vesk2/expression.h>
+#include "tools/vesk2/evidence.h"
 
 namespace vesk2_command {
 
-// What was asked about a manifest.
-struct Question {
-  std::string manifest;
-  ZvVesk2::SExpression* tag;
-  Period period;             // none: the time of signing
-  std::string aclDirectory;  // entries beside the store's, or empty
-};
-
-// One line a reason, most telling first; empty when nothing could be found out.
-std::vector<std::string> ExplainAuthority(const Question& question, int code);
+// ExplainRefusal tells of every certificate, where authority was lost, and of the smallest changes
+// that would turn the answer: "chain", "acl", "lost" and "remedies" of the result.
+void ExplainRefusal(const Question& question, int code);
+// ExplainTree names what mends a tree that is not as its authorized signer signed it.
+void ExplainTree(const Question& question);
+// ExplainGrant tells of every certificate, of the path of authority, when it ends, and how old the
+// revocation data is: "chain", "acl" and "authority" of the result.
+void ExplainGrant(const Question& question);
+// ExplainUnreadable names the credentials that the reduction cannot read.
+void ExplainUnreadable(const Question& question, int code);
 
 // Why the ACL store yields no entry.
 std::vector<std::string> ExplainStore();

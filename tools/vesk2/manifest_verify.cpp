@@ -29,6 +29,7 @@ struct Options {
   bool noStoreUpdate = false;
   std::string aclDirectory;
   std::vector<std::string> ignored;
+  bool explain = false;
 };
 
 Period AskedPeriod(const Options& options) {
@@ -36,10 +37,10 @@ Period AskedPeriod(const Options& options) {
   return {ParseTime(options.at, false), ParseTime(options.at, false)};
 }
 
-void Configure(Manifest& manifest, const Options& options, const std::set<std::string>& ignored) {
-  Check(
-      manifest.Initialize(options.directory.c_str(), options.manifest.c_str(), options.tag.c_str()),
-      "preparing");
+void Configure(Manifest& manifest, const Options& options, const std::string& tag,
+               const std::set<std::string>& ignored) {
+  Check(manifest.Initialize(options.directory.c_str(), options.manifest.c_str(), tag.c_str()),
+        "preparing");
   manifest.SetFailOnExtraEntries(!options.allowExtra);
   manifest.SetStoreUpdate(!options.noStoreUpdate);
   if (!options.aclDirectory.empty()) manifest.SetExtraAclDirectory(NewText(options.aclDirectory));
@@ -105,23 +106,18 @@ bool JudgedTree(const Manifest& manifest, int code) {
   ThrowUnreadable(options.manifest, manifest, code);
 }
 
-ExitCode AnswerAuthority(const Options& options, const Manifest& manifest, Question question,
+ExitCode AnswerAuthority(const Options& options, const Manifest& manifest, const Question& question,
                          int code) {
-  const std::vector<std::string> reasons = ExplainAuthority(question, code);
   if (!IsRefusal(code)) {
-    for (const std::string& reason : reasons) Note(reason);
+    if (code < 0) ExplainUnreadable(question, code);
     ThrowTrouble(options, manifest, code);
   }
   const ExitCode verdict = No(code, CodeWords(code));
-  for (const std::string& reason : reasons) Note(reason);
-  if (reasons.empty()) {
-    Note("the certificates and the ACL entries do not combine to what was asked, " +
-         TagText(question.tag));
-  }
+  ExplainRefusal(question, code);
   return verdict;
 }
 
-ExitCode AnswerTree(const Options& options, const Manifest& manifest,
+ExitCode AnswerTree(const Options& options, const Manifest& manifest, const Question& question,
                     const std::set<std::string>& ignored, int code) {
   const auto root = ReadListing(options.manifest, options.directory);
   const TreeNotes notes = InspectTree(*root, ignored);
@@ -138,7 +134,9 @@ ExitCode AnswerTree(const Options& options, const Manifest& manifest,
   } else {
     verdict = code != 0 ? No(code, summary) : No("link-leaves-tree", summary);
     PrintFindings(findings);
+    if (code != 0) ExplainTree(question);
   }
+  if (options.explain && verdict == kYes) ExplainGrant(question);
   if (!options.allowExtra) {
     for (const std::string& name : notes.unlisted) {
       Note("note: " + Escape(name) + " is not listed; the top directory may hold more");
@@ -155,22 +153,60 @@ int Verify(Manifest& manifest, const Options& options, long notBefore, long notA
   return code;
 }
 
+// How to sign the tree again as it was asked about.
+std::vector<std::string> SigningWords(const Options& options) {
+  std::vector<std::string> words = {options.directory};
+  for (const std::string& name : options.ignored) {
+    words.push_back("--ignore");
+    words.push_back(name);
+  }
+  if (options.allowLinks) words.push_back("--allow-links");
+  return words;
+}
+
+// The answers about the members of a set behind the first, for which the tree was compared.
+int VerifyOthers(const Options& options, const Question& question, long notBefore, long notAfter) {
+  const Request& request = *question.request;
+  int first = 0;
+  for (size_t i = 1; i < request.members.size(); ++i) {
+    Manifest manifest(nullptr);
+    Configure(manifest, options, request.members[i].text, {});
+    const int code = manifest.ReadManifest(true, notBefore, notAfter, nullptr);
+    if (code != 0 && !IsRefusal(code)) {
+      AnswerAuthority(options, manifest, question, code);
+    }
+    TellMember(request, i, code);
+    if (first == 0) first = code;
+  }
+  return first;
+}
+
 ExitCode Run(const Options& options) {
   RealDirectory(options.directory);
-  const Ref<SExpression> tag = ParseTag(options.tag);
-  Period period = AskedPeriod(options);
+  const Request request = ParseRequest(options.tag);
+  Question question;
+  question.file = options.manifest;
+  question.manifest = true;
+  question.request = &request;
+  question.period = AskedPeriod(options);
+  question.aclDirectory = options.aclDirectory;
+  question.signing = SigningWords(options);
+  const Period& period = question.period;
   const long notBefore = period.notBefore ? period.notBefore->ToTime() : 0;
   const long notAfter = period.notAfter ? period.notAfter->ToTime() : 0;
   std::set<std::string> ignored;
   for (const std::string& name : options.ignored) ignored.insert(PlainRelative(name));
 
   Manifest manifest(nullptr);
-  Configure(manifest, options, ignored);
+  Configure(manifest, options, request.members[0].text, ignored);
   const int code = Verify(manifest, options, notBefore, notAfter);
-  if (JudgedTree(manifest, code)) return AnswerTree(options, manifest, ignored, code);
-  return AnswerAuthority(options, manifest,
-                         {options.manifest, tag.get(), std::move(period), options.aclDirectory},
-                         code);
+  const bool judged = JudgedTree(manifest, code);
+  if (!judged && !IsRefusal(code)) return AnswerAuthority(options, manifest, question, code);
+  TellMember(request, 0, judged ? 0 : code);
+  const int others = VerifyOthers(options, question, notBefore, notAfter);
+  const int refused = judged ? others : code;
+  if (refused != 0) return AnswerAuthority(options, manifest, question, refused);
+  return AnswerTree(options, manifest, question, ignored, code);
 }
 
 }  // namespace
@@ -179,7 +215,9 @@ Action DefineManifestVerify(CLI::App& app) {
   auto options = std::make_shared<Options>();
   app.add_option("directory", options->directory, "The tree to check")->required();
   app.add_option("manifest", options->manifest, "The manifest file")->required();
-  app.add_option("--tag", options->tag, "What the signer must be authorized for")->required();
+  app.add_option("--tag", options->tag,
+                 "What the signer must be authorized for; of a set, every member")
+      ->required();
   AddPeriodOptions(app, options->period);
   app.add_option("--at", options->at, "Authorized at this moment [at the time of signing]")
       ->excludes("--not-before")
@@ -191,6 +229,7 @@ Action DefineManifestVerify(CLI::App& app) {
   app.add_option("--acl-dir", options->aclDirectory, "Trust the entries of this directory too");
   app.add_option("--ignore", options->ignored, "Leave this entry out (a path below the directory)")
       ->allow_extra_args(false);
+  app.add_flag("--explain", options->explain, "Tell why also when the answer is yes");
   return [options] { return Run(*options); };
 }
 

@@ -80,6 +80,16 @@ Request ParseRequest(const std::string& text) {
   return request;
 }
 
+void TellMember(const Request& request, size_t index, int code) {
+  if (request.members.size() < 2) return;
+  const std::string tag = Escape(request.members[index].text);
+  Say("member " + tag + ": " + (code == 0 ? "yes" : "no: " + Reason(code)));
+  Result()["members"].push_back({{"tag", tag},
+                                 {"verdict", code == 0 ? "yes" : "no"},
+                                 {"reason", ReasonWord(code)},
+                                 {"code", code}});
+}
+
 std::string ReadableTag(SExpression* tag) {
   if (tag == nullptr) return "";
   const Text text(tag->ExportTag("tag"));

@@ -26,6 +26,9 @@ struct Request {
 // member. Trouble for more than 64 members.
 Request ParseRequest(const std::string& text);
 
+// TellMember says the answer about one of several members, and adds it to "members" of the result.
+void TellMember(const Request& request, size_t index, int code);
+
 // The body of a tag as text that ParseTag reads back; empty when there is none, since the advanced
 // form has no quoting.
 std::string ReadableTag(SExpression* tag);
