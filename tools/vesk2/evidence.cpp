@@ -38,6 +38,7 @@ void ReadFileParts(const Question& question, Evidence& evidence) {
     certs = std::move(block.certs);
     evidence.signedAt = std::move(block.signedAt);
     evidence.damage = block.damage;
+    evidence.contentSigned = block.contentSigned && block.damage.empty();
     for (const auto& list : block.crls) evidence.carried.push_back(Canonical(*list));
   } else {
     certs = ReadCerts(question.file);

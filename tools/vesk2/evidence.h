@@ -44,6 +44,7 @@ struct Evidence {
   std::vector<EntryEvidence> entries;  // as the library loads them
   std::vector<std::string> carried;    // the canonical text of a manifest's lists
   Ref<TimeStamp> signedAt;             // of a manifest
+  bool contentSigned = true;           // a manifest's signer names the content that is there
   std::string damage;                  // where a manifest's listing stops making sense
   // The period asked about; null where it is open. Revocation is asked about the same, but the time
   // of signing stands in for an open end of a manifest's.

@@ -19,15 +19,14 @@ using ZvVesk2::AclEntry;
 using ZvVesk2::Cert;
 
 // Enough of a fingerprint to tell keys apart by eye.
-std::string Short(const std::string& fingerprint) {
+std::string Short(const std::string& fingerprints) {
   constexpr size_t kDigits = 16;
   std::string text;
-  for (size_t at = 0; at < fingerprint.size();) {
-    const size_t start = fingerprint.find(':', at);
-    if (start == std::string::npos) return text + fingerprint.substr(at);
-    const size_t end = std::min(fingerprint.find(' ', start), fingerprint.size());
-    text += fingerprint.substr(at, std::min(start + 1 + kDigits, end) - at);
-    at = end;
+  size_t digits = 0;
+  for (const char c : fingerprints) {
+    const bool hex = std::isxdigit(static_cast<unsigned char>(c)) != 0;
+    digits = hex ? digits + 1 : 0;
+    if (digits <= kDigits) text += c;
   }
   return text;
 }
@@ -212,12 +211,12 @@ void TellRemedies(const std::vector<Remedy>& remedies) {
     Json commands = Json::array();
     for (const auto& words : remedy.commands) {
       Json command = Json::array();
-      std::string line;
+      std::string line = " ";
       for (const std::string& word : words) {
         command.push_back(Escape(word));
-        line += (line.empty() ? "" : " ") + Escape(Quoted(word));
+        line.append(" ").append(Escape(Quoted(word)));
       }
-      Note("  " + line);
+      Note(line);
       commands.push_back(command);
     }
     list.push_back({{"kind", remedy.kind},

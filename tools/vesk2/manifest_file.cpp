@@ -7,11 +7,14 @@
 #include "tools/vesk2/progress.h"
 #include "tools/vesk2/report.h"
 
+#include <vesk2/hash.h>
+
 namespace vesk2_command {
 
 using ZvVesk2::BodyDirectory;
 using ZvVesk2::Cert;
 using ZvVesk2::CrlSequence;
+using ZvVesk2::Hash;
 using ZvVesk2::Manifest;
 using ZvVesk2::Signature;
 
@@ -111,9 +114,30 @@ int ReadCrls(ZvBuffer* buffer, SignatureBlock& block) {
   return 0;
 }
 
+// Whether the signer certificate is for what the file holds: the elements before the certificates,
+// and the text behind the lists up to the final ")".
+bool IsContentSigned(const SignatureBlock& block, std::string_view body) {
+  if (block.certs.empty() || body.empty()) return false;
+  auto* named = dynamic_cast<ZvVesk2::Hash*>(block.certs[0].cert->GetSubject());
+  const Ref<ZvVesk2::Hash> digest(new ZvVesk2::Hash(nullptr));
+  if (named == nullptr || digest->Init(named->GetAlgorithm()) != 0) return false;
+  const std::string head = "(" + Atom("version") + Canonical(*block.version) +
+                           Canonical(*block.creator) + ")(" + Atom("type") +
+                           Canonical(*block.type) + ")(" + Atom("time-of-signing") +
+                           Canonical(*block.signedAt) + ")";
+  body.remove_suffix(1);
+  for (const std::string_view text : {std::string_view(head), body}) {
+    const auto* bytes = reinterpret_cast<const unsigned char*>(text.data());
+    if (digest->Update(bytes, static_cast<unsigned>(text.size())) != 0) return false;
+  }
+  return digest->Finalize() == 0 && digest->IsEqual(named);
+}
+
 int ReadBody(ZvBuffer* buffer, SignatureBlock& block) {
   block.listing = std::make_unique<BodyDirectory>(nullptr);
   int code = buffer->Expect(")");
+  const auto* body = reinterpret_cast<const char*>(buffer->Data());
+  block.contentSigned = IsContentSigned(block, {body, buffer->Remaining()});
   if (code == 0) code = block.listing->ParseBody(buffer, nullptr);
   if (code == 0) code = buffer->Expect(")");
   if (code != 0) block.damage = "byte " + std::to_string(buffer->Position()) + ": " + Reason(code);

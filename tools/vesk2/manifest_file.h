@@ -38,6 +38,7 @@ struct SignatureBlock {
   std::vector<SignedCert> certs;  // the signer certificate first
   std::vector<Ref<ZvVesk2::CrlSequence>> crls;
   std::unique_ptr<ZvVesk2::BodyDirectory> listing;  // its root has no name
+  bool contentSigned = false;  // the digest that the signer certificate names is the file's
   std::string damage;  // where the listing stops making sense, and why; empty for a whole one
 };
 // ReadSignatureBlock reads as far as it can; what could not be read is missing. The buffer form

@@ -115,8 +115,13 @@ class Finder {
     for (size_t i = 0; i < certs; ++i) {
       maker_.GrantIssuer(optional_, i);
       if (IsRequired(i)) continue;
+      const size_t count = optional_.size();
       maker_.Renew(optional_, i, Reach::kAsked);
       maker_.Renew(optional_, i, Reach::kWholePeriod);
+      if (optional_.size() == count + 2 &&
+          optional_[count].remedy.commands == optional_.back().remedy.commands) {
+        optional_.pop_back();
+      }
       if (!question_.manifest || i == 0) continue;
       if (states_[i] == Cert::RevokedByCrl) maker_.Renew(optional_, i, Reach::kAsItIs);
       if (states_[i] == Cert::Undetermined) (void)Determine(optional_, i);
@@ -269,7 +274,7 @@ std::vector<Remedy> SignAgain(const Question& question, const Evidence& evidence
 
 std::vector<Remedy> FindRemedies(const Question& question, const Evidence& evidence, int code) {
   if (evidence.certs.empty()) return {};
-  if (code == VESK2_ERR_HASH_MATCH) return SignAgain(question, evidence);
+  if (!evidence.contentSigned) return SignAgain(question, evidence);
   // What cannot be reproduced from what lies there now cannot be mended either.
   if (Judge(question, evidence) != code) return {};
   std::vector<Remedy> remedies = Finder(question, evidence).Find();
