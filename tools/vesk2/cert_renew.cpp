@@ -7,8 +7,6 @@
 #include "tools/vesk2/key_source.h"
 #include "tools/vesk2/report.h"
 
-#include <vesk2/limits.h>
-
 namespace vesk2_command {
 namespace {
 
@@ -41,7 +39,8 @@ std::string Pair(const SignedCert& each) {
 // The file's text with certificate and signature of that number replaced.
 std::string Replace(const Place& place, const std::vector<SignedCert>& certs,
                     const SignedCert& renewed) {
-  std::string text = ReadFile(place.path, ZvVesk2::Limits::kMaxFile);
+  const Buffer buffer = OpenBuffer(place.path);
+  std::string text(reinterpret_cast<const char*>(buffer->Data()), buffer->Remaining());
   size_t at = 0;
   for (size_t i = 0; i < place.number; ++i) {
     const std::string old = Pair(certs[i]);
