@@ -70,21 +70,15 @@ ExitCode Run(const Options& options) {
   }
   const SignedCert renewed = IssueCert(key, Renewed(old, renewal), options.signer.algorithm);
   const std::string text = Replace(place, certs, renewed);
-  Result()["output"] = Escape(options.output);
-  Result()["certificate"] = place.number;
-  Result()["written"] = !options.dryRun;
-  if (options.dryRun) {
-    Note("would write " + Escape(options.output));
-    return kYes;
-  }
   const auto readBack = [&](const std::string& temporary) {
     const std::vector<SignedCert> again = ReadCerts(temporary);
     RequireCert(again, place.number, temporary);
     const SignedCert& written = again[place.number - 1];
     Check(written.signature->Verify(written.cert.get()), "checking the new certificate");
   };
-  WriteFile(options.output, text, {0666, options.force, readBack});
-  Note("wrote " + Escape(options.output));
+  Result()["certificate"] = place.number;
+  const WriteOptions how{0666, options.force, readBack, options.dryRun};
+  if (WriteFile(options.output, text, how)) Note("wrote " + Escape(options.output));
   return kYes;
 }
 

@@ -6,6 +6,7 @@
 #include <filesystem>
 
 #include "tools/vesk2/crl_file.h"
+#include "tools/vesk2/grant.h"
 #include "tools/vesk2/inspect.h"
 #include "tools/vesk2/report.h"
 #include "tools/vesk2/stores.h"
@@ -137,23 +138,6 @@ std::string LastYearOf(const TimeStamp* from, const CrlSequence* stored) {
   return after.empty() ? "" : std::max(year, after);
 }
 
-Ref<AclEntry> MakeEntry(DExpression* key, bool propagate, const std::string& tagText,
-                        const Period& period) {
-  auto subject = Ref<ZvVesk2::Subject>::Share(dynamic_cast<ZvVesk2::Subject*>(key));
-  Ref<SExpression> tag = ParseTag(tagText);
-  auto notBefore = Ref<TimeStamp>::Share(period.notBefore.get());
-  auto notAfter = Ref<TimeStamp>::Share(period.notAfter.get());
-  Ref<AclEntry> entry;
-  Check(AclEntry::Create(entry.Out(), subject.get(), propagate, tag.get(), notBefore.get(),
-                         notAfter.get(), 0, nullptr),
-        "building an ACL entry");
-  (void)subject.Release();
-  (void)tag.Release();
-  (void)notBefore.Release();
-  (void)notAfter.Release();
-  return entry;
-}
-
 // "with the tag X, valid until Y"; empty when nothing is different.
 std::string Differences(const std::string& tag, bool propagate, const Limits& limits) {
   std::string text;
@@ -250,7 +234,7 @@ void EditMaker::Widen(std::vector<Edit>& edits, const EntryEvidence& each) const
   const bool threshold = dynamic_cast<ThresholdSubject*>(old.GetSubject()) != nullptr;
   if (!each.inStore || threshold || old.GetGeneration() != 0) return;
   // The key has to be named by where it stands in the file.
-  DExpression* key = nullptr;
+  PublicKey* key = nullptr;
   Words who;
   for (size_t i = evidence_.certs.size(); i-- > 0 && key == nullptr;) {
     auto* issuer = dynamic_cast<PublicKey*>(evidence_.certs[i].cert->GetIssuer());
@@ -277,7 +261,8 @@ void EditMaker::Widen(std::vector<Edit>& edits, const EntryEvidence& each) const
 
   Edit edit;
   edit.target = edit.file = each.file;
-  edit.entry = MakeEntry(key, pass || old.GetPropagate(), tag, limits.Parse());
+  edit.entry = MakeEntry(
+      {Ref<PublicKey>::Share(key), pass || old.GetPropagate(), ParseTag(tag), limits.Parse()});
   edit.cost = retag ? 3 : 1;
   edit.remedy = {"acl-entry",
                  "replace " + EntryName(each) + ": " +
@@ -295,7 +280,7 @@ void EditMaker::Widen(std::vector<Edit>& edits, const EntryEvidence& each) const
   edits.push_back(std::move(edit));
 }
 
-void EditMaker::FillGrant(Edit& edit, DExpression* key, const Words& who, const std::string& tag,
+void EditMaker::FillGrant(Edit& edit, PublicKey* key, const Words& who, const std::string& tag,
                           bool propagate, const std::string& prefix) const {
   const std::string base = prefix + "-" + Digits(*key, 8);
   std::string name = base;
@@ -304,7 +289,7 @@ void EditMaker::FillGrant(Edit& edit, DExpression* key, const Words& who, const 
     name = base + "-" + std::to_string(i);
   }
   edit.file = name + kExtension;
-  edit.entry = MakeEntry(key, propagate, tag, {});
+  edit.entry = MakeEntry({Ref<PublicKey>::Share(key), propagate, ParseTag(tag)});
   Words command = {"vesk2", "acl", "grant"};
   Append(command, who);
   Append(command, {"--tag", tag});

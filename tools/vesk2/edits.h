@@ -50,7 +50,7 @@ class EditMaker {
   std::string At(size_t index) const;
   bool Covers(SExpression* tag) const;
   // Fills in a grant of `tag` to a key; `who` are the options that name it.
-  void FillGrant(Edit& edit, DExpression* key, const std::vector<std::string>& who,
+  void FillGrant(Edit& edit, PublicKey* key, const std::vector<std::string>& who,
                  const std::string& tag, bool propagate, const std::string& prefix) const;
 
   const Question& question_;
