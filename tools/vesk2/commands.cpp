@@ -23,6 +23,10 @@ constexpr Noun kNouns[] = {
      "A tag says what is granted, or asked. A longer list is narrower: who was granted (install) "
      "may also (install (app calc)), not the other way round."},
     {"show", "Show any object", "Reads what any file of the system holds, in both its forms."},
+    {"completion", "Write a script that completes commands in a shell",
+     "The scripts are written from the same table as the command line itself."},
+    {"manual", "Write a manual page",
+     "Pages are written in the language of man(7), so that man -l - shows them."},
     {"version", "Show the version of the command and the library", ""},
 };
 
@@ -67,6 +71,10 @@ constexpr Command kCommands[] = {
      "vesk2 tag check '(install (app calc))' '(install)'", DefineTagCheck},
     {"show", "", "Show any object: a key, a certificate, a list, a manifest, a tag",
      "vesk2 show signer.cert\nvesk2 show --json app.manifest\nvesk2 show --advanced -", DefineShow},
+    {"completion", "", "Write a script that completes commands in a shell",
+     "source <(vesk2 completion bash)", DefineCompletion},
+    {"manual", "", "Write a manual page: of the command, or of one group",
+     "vesk2 manual cert | man -l -", DefineManual},
     {"version", "", "Show the version of the command and the library", "vesk2 version",
      DefineVersion},
 };

@@ -5,23 +5,13 @@
 #include <cstdlib>
 #include <string>
 
-#include "tools/vesk2/command.h"
 #include "tools/vesk2/files.h"
-#include "tools/vesk2/report.h"
-#include "tools/vesk2/stores.h"
+#include "tools/vesk2/options.h"
 
 #include <vesk2.h>
 
 namespace vesk2_command {
 namespace {
-
-// What every subcommand takes.
-struct Common {
-  Style style;
-  bool noColor = false;
-  bool noProgress = false;
-  StoreOptions stores;
-};
 
 struct Choice {
   std::string command;  // "noun verb"
@@ -42,6 +32,16 @@ class HelpText : public CLI::Formatter {
     return text + "\n";
   }
 
+  std::string make_option_opts(const CLI::Option* option) const override {
+    const OptionText text = DescribeOption(*option);
+    const bool told = text.value.empty() || (option->get_positional() && text.choices.empty());
+    return (told ? "" : " " + text.value) + (text.repeats ? "..." : "") +
+           (text.required ? " (required)" : "");
+  }
+  std::string make_option_desc(const CLI::Option* option) const override {
+    return DescribeOption(*option).about;
+  }
+
  private:
   static std::string Indented(std::string_view lines) {
     std::string text = "  ";
@@ -50,31 +50,16 @@ class HelpText : public CLI::Formatter {
   }
 };
 
-void AddCommonOptions(CLI::App& app, Common& common) {
-  constexpr const char* kGroup = "Common options";
-  AddStoreOptions(app, common.stores);
-  app.add_flag("--json", common.style.json, "Answer with one JSON object")->group(kGroup);
-  app.add_flag("-q,--quiet", common.style.quiet, "No notes; the verdict and errors only")
-      ->group(kGroup);
-  app.add_flag("-v,--verbose", common.style.verbose, "More notes")
-      ->group(kGroup)
-      ->excludes("--quiet");
-  app.add_flag("--no-color", common.noColor, "No colour, on a terminal either")->group(kGroup);
-  app.add_flag("--no-progress", common.noProgress, "No progress line, on a terminal either")
-      ->group(kGroup);
-}
-
 void DefineCommand(CLI::App& app, const Command& command, Common& common, Choice& choice) {
-  const Action action = command.define(app);
-  AddCommonOptions(app, common);
-  std::string name = command.noun;
-  if (*command.verb != '\0') name.append(" ").append(command.verb);
-  app.callback([&choice, action, name] { choice = {name, action}; });
+  const Action action = DefineOptions(app, command, common);
+  app.callback([&choice, action, name = CommandName(command)] { choice = {name, action}; });
 }
 
 void Define(CLI::App& app, Common& common, Choice& choice) {
   app.formatter(std::make_shared<HelpText>());
-  app.set_version_flag("--version", "vesk2 " + LibraryVersion() + " (" + Vesk2VersionExtra() + ")");
+  app.set_help_flag("-h,--help", "Show this help");
+  app.set_version_flag("--version", "vesk2 " + LibraryVersion() + " (" + Vesk2VersionExtra() + ")",
+                       "Show the version");
   app.require_subcommand(1);
   for (const Noun& noun : Nouns()) {
     CLI::App* group = app.add_subcommand(noun.name, noun.about);
