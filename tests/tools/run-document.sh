@@ -1,0 +1,55 @@
+#!/bin/bash
+# run-document.sh COMMAND DOCUMENT: runs the commands that a document shows, one after the other in a
+# fresh directory with fresh stores, and compares what they print with what it shows:
+#
+#       $ command
+#       what it prints, on both streams
+#
+# in blocks indented by four. A line that begins with # is a remark; a command that ends with \ goes
+# on in the next line. Fingerprints and times of this run stand for the document's.
+set -u
+document=$(realpath "$2")
+work=$(mktemp -d) || exit 1
+trap 'rm -rf "$work"' EXIT
+mkdir "$work/run" "$work/bin" && ln -s "$(realpath "$1")" "$work/bin/vesk2" && cd "$work/run" || exit 1
+unset VESK2_HOME VESK2_GLOBAL
+export LC_ALL=C PATH=$work/bin:$PATH XDG_DATA_HOME=$work/data
+failures=0 command='' ran=0
+
+masked() {
+  sed -E 's/[0-9a-f]{64}/FINGERPRINT/g; s/[0-9a-f]{8,}(…|\.\.\.)/SHORT/g
+          s/20[0-9]{2}-[0-9]{2}-[0-9]{2}_[0-9:]{8}/TIME/g'
+}
+
+judge() {
+  [ -n "$command" ] || return
+  # In this shell, so that what a command sets stays set.
+  eval "$command" >"$work/printed" 2>&1 </dev/null
+  ran=$((ran + 1))
+  if ! diff <(masked <"$work/shown") <(masked <"$work/printed") >"$work/difference"; then
+    printf '%s: %s\n' "${document##*/}" "$command"
+    cat "$work/difference"
+    failures=$((failures + 1))
+  fi
+  command=''
+}
+
+goes_on=no
+while IFS= read -r line; do
+  text=${line#    }
+  case $line in
+    '    $ '*) judge; command=${text#??}; : >"$work/shown" ;;
+    '    # '*) ;;
+    '    '*)
+      if [ $goes_on = yes ]; then
+        command=${command%\\}${text#"${text%%[! ]*}"}
+      else
+        printf '%s\n' "$text" >>"$work/shown"
+      fi ;;
+    *) judge ;;
+  esac
+  case $line in '    '*\\) goes_on=yes ;; *) goes_on=no ;; esac
+done <"$document"
+judge
+echo "$ran commands of ${document##*/}"
+[ $ran -gt 0 ] && [ $failures -eq 0 ]
