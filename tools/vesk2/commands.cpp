@@ -7,26 +7,42 @@ namespace {
 constexpr Noun kNouns[] = {
     {"key", "Make and show keys",
      "Keys are the principals of the system: a grant names a key, and a key signs. The private "
-     "half is a PEM file (PKCS#8), the public half a canonical S-expression."},
+     "half is a PEM file (PKCS#8), if you wish under a passphrase; the public half is what others "
+     "need, a canonical S-expression.\n"
+     "A key is known by its fingerprint, the SHA-256 of its public half. File names and comments "
+     "do not count."},
     {"acl", "Decide what this machine trusts",
      "Every answer starts in the access-control entries of the machine's store. An entry trusts a "
-     "key for a tag, unsigned: whoever may write the store decides."},
+     "key for a tag, unsigned: whoever may write the store decides.\n"
+     "An entry that propagates lets its key pass the grant on, by certificates to other keys and "
+     "by "
+     "signing to the files of a manifest."},
     {"cert", "Pass authority on to another key, and check how it came",
-     "A certificate passes what its issuer was granted, or less, on to its subject."},
+     "A certificate passes what its issuer was granted, or less, on to its subject, for a time. A "
+     "certificate file holds a chain: the certificate of interest first, then those that lead up "
+     "to a key that this machine trusts.\n"
+     "Along a chain tags and periods only narrow, and every certificate but the first must let its "
+     "subject pass the grant on."},
     {"crl", "Take authority back",
      "A revocation list names certificates and keys that are not to be honoured any more. The "
-     "machine believes a list when its access-control entries let the signer revoke."},
+     "machine believes a list when an access-control entry of exactly its tag, which ends in "
+     "(revoke ...), is for its signer.\n"
+     "A revoked key is honoured nowhere. Certificates are looked up in the list that they name as "
+     "their source, and without a current one they are refused."},
     {"manifest", "Sign a directory, and check one",
-     "A manifest lists every file of a directory with its digest, and is signed. Verifying asks "
-     "two things: is the directory as listed, and was the signer authorized?"},
+     "A manifest lists every file of a directory with its digest, and is signed. It carries the "
+     "signer's certificates, so that whoever gets it needs nothing else. Verifying asks two "
+     "things: is the directory as listed, and was the signer authorized?\n"
+     "The second is asked about the time of signing, which is the signer's word; --at asks about "
+     "another moment."},
     {"tag", "Compare tags",
      "A tag says what is granted, or asked. A longer list is narrower: who was granted (install) "
      "may also (install (app calc)), not the other way round."},
     {"show", "Show any object", "Reads what any file of the system holds, in both its forms."},
+    {"version", "Show the version of the command and the library", ""},
     {"completion", "Write a script that completes commands in a shell",
-     "The scripts are written from the same table as the command line itself."},
-    {"manual", "Write a manual page",
-     "Pages are written in the language of man(7), so that man -l - shows them."},
+     "The scripts know what the command line knows: both come from one table."},
+    {"manual", "Write a manual page", "Pages are in the language of man(7), as man -l - reads it."},
     {"version", "Show the version of the command and the library", ""},
 };
 
