@@ -1,14 +1,15 @@
 #!/bin/bash
-# run-document.sh COMMAND DOCUMENT: runs the commands that a document shows, one after the other in a
+# run-document.sh COMMAND DOCUMENT [NEW]: runs the commands that a document shows, one after the other in a
 # fresh directory with fresh stores, and compares what they print with what it shows:
 #
 #       $ command
 #       what it prints, on both streams
 #
 # in blocks indented by four. A line that begins with # is a remark; a command that ends with \ goes
-# on in the next line. Fingerprints and times of this run stand for the document's.
+# on in the next line. Fingerprints and times of this run stand for the document's. NEW becomes the
+# document as it should be.
 set -u
-document=$(realpath "$2")
+document=$(realpath "$2") new=$(realpath -m "${3:-/dev/null}")
 work=$(mktemp -d) || exit 1
 trap 'rm -rf "$work"' EXIT
 mkdir "$work/run" "$work/bin" && ln -s "$(realpath "$1")" "$work/bin/vesk2" && cd "$work/run" || exit 1
@@ -31,6 +32,7 @@ judge() {
     cat "$work/difference"
     failures=$((failures + 1))
   fi
+  sed 's/^/    /' "$work/printed" >>"$work/new"
   command=''
 }
 
@@ -38,18 +40,25 @@ goes_on=no
 while IFS= read -r line; do
   text=${line#    }
   case $line in
-    '    $ '*) judge; command=${text#??}; : >"$work/shown" ;;
-    '    # '*) ;;
     '    '*)
       if [ $goes_on = yes ]; then
         command=${command%\\}${text#"${text%%[! ]*}"}
-      else
+      elif [[ $text = '$ '* ]]; then
+        judge
+        command=${text#??}
+        : >"$work/shown"
+      elif [[ -n $command && $text != '# '* ]]; then
         printf '%s\n' "$text" >>"$work/shown"
+        continue
+      else
+        judge
       fi ;;
     *) judge ;;
   esac
-  case $line in '    '*\\) goes_on=yes ;; *) goes_on=no ;; esac
+  printf '%s\n' "$line" >>"$work/new"
+  case $command in *\\) goes_on=yes ;; *) goes_on=no ;; esac
 done <"$document"
 judge
+cat "$work/new" >"$new"
 echo "$ran commands of ${document##*/}"
 [ $ran -gt 0 ] && [ $failures -eq 0 ]

@@ -11,16 +11,18 @@ constexpr const char* kCommonGroup = "Common options";
 
 // What the value of an option is; an option means the same wherever it is taken.
 constexpr struct {
-  const char* option;
   const char* value;
+  const char* options;  // and positionals
 } kValues[] = {
-    {"acl-dir", "DIR"},     {"at", "TIME"},         {"bits", "N"},
-    {"cert", "FILE"},       {"chain", "FILE"},      {"date", "TIME"},
-    {"global", "DIR"},      {"home", "DIR"},        {"ignore", "PATH"},
-    {"key", "FILE"},        {"name", "NAME"},       {"not-after", "TIME"},
-    {"not-before", "TIME"}, {"output", "FILE"},     {"passphrase-file", "FILE"},
-    {"revocation", "TAG"},  {"revoke-key", "FILE"}, {"revoke-cert", "FILE[:N]"},
-    {"subject", "FILE"},    {"tag", "TAG"},
+    {"COMMAND", " sign-with "},
+    {"DIR", " acl-dir global home "},
+    {"FILE", " cert chain crl items-of key output passphrase-file request revoke-key subject "},
+    {"FILE[:N]", " issuer-of revoke-cert subject-of "},
+    {"N", " bits passphrase-fd threshold "},
+    {"NAME", " name names "},
+    {"PATH", " ignore "},
+    {"TAG", " asked grant granted revocation tag "},
+    {"TIME", " at date not-after not-before "},
 };
 
 void AddCommonOptions(CLI::App& app, Common& common) {
@@ -36,7 +38,7 @@ std::string ValueOf(const CLI::Option& option) {
   const std::string& name =
       option.get_lnames().empty() ? option.get_name(true) : option.get_lnames().front();
   for (const auto& row : kValues) {
-    if (name == row.option) return row.value;
+    if (std::string(row.options).find(" " + name + " ") != std::string::npos) return row.value;
   }
   std::string value = option.get_positional() ? name : "TEXT";
   std::transform(value.begin(), value.end(), value.begin(), ::toupper);
@@ -78,7 +80,7 @@ OptionText DescribeOption(const CLI::Option& option) {
   if (option.get_expected_min() == 0) return text;  // a flag
   text.choices = ChoicesOf(option);
   text.value = text.choices.empty() ? ValueOf(option) : Join(text.choices, "|");
-  constexpr std::string_view kNoFiles[] = {"TAG", "TIME", "TEXT", "NAME", "N"};
+  constexpr std::string_view kNoFiles[] = {"TAG", "TIME", "TEXT", "NAME", "N", "COMMAND"};
   text.takesFile =
       text.choices.empty() && std::ranges::find(kNoFiles, text.value) == std::ranges::end(kNoFiles);
   return text;
