@@ -55,9 +55,9 @@ Action DefineManifestShow(CLI::App& app);
 Action DefineManifestCompare(CLI::App& app);
 Action DefineTagCheck(CLI::App& app);
 Action DefineShow(CLI::App& app);
+Action DefineVersion(CLI::App& app);
 Action DefineCompletion(CLI::App& app);
 Action DefineManual(CLI::App& app);
-Action DefineVersion(CLI::App& app);
 
 }  // namespace vesk2_command
 

@@ -14,9 +14,8 @@ constexpr Noun kNouns[] = {
     {"acl", "Decide what this machine trusts",
      "Every answer starts in the access-control entries of the machine's store. An entry trusts a "
      "key for a tag, unsigned: whoever may write the store decides.\n"
-     "An entry that propagates lets its key pass the grant on, by certificates to other keys and "
-     "by "
-     "signing to the files of a manifest."},
+     "An entry that propagates lets its key pass the grant on, by certificates to other keys "
+     "and by signing to the files of a manifest."},
     {"cert", "Pass authority on to another key, and check how it came",
      "A certificate passes what its issuer was granted, or less, on to its subject, for a time. A "
      "certificate file holds a chain: the certificate of interest first, then those that lead up "
@@ -43,7 +42,6 @@ constexpr Noun kNouns[] = {
     {"completion", "Write a script that completes commands in a shell",
      "The scripts know what the command line knows: both come from one table."},
     {"manual", "Write a manual page", "Pages are in the language of man(7), as man -l - reads it."},
-    {"version", "Show the version of the command and the library", ""},
 };
 
 constexpr Command kCommands[] = {
@@ -87,12 +85,12 @@ constexpr Command kCommands[] = {
      "vesk2 tag check '(install (app calc))' '(install)'", DefineTagCheck},
     {"show", "", "Show any object: a key, a certificate, a list, a manifest, a tag",
      "vesk2 show signer.cert\nvesk2 show --json app.manifest\nvesk2 show --advanced -", DefineShow},
+    {"version", "", "Show the version of the command and the library", "vesk2 version",
+     DefineVersion},
     {"completion", "", "Write a script that completes commands in a shell",
      "source <(vesk2 completion bash)", DefineCompletion},
     {"manual", "", "Write a manual page: of the command, or of one group",
      "vesk2 manual cert | man -l -", DefineManual},
-    {"version", "", "Show the version of the command and the library", "vesk2 version",
-     DefineVersion},
 };
 
 }  // namespace
