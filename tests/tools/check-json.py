@@ -50,5 +50,4 @@ def faults(schema, status, path, expressions):
 if __name__ == "__main__":
     with open(sys.argv[1], encoding="utf-8") as schema_file:
         result = faults(json.load(schema_file), int(sys.argv[2]), sys.argv[3], sys.argv[4:])
-    print("\n".join(result))
-    sys.exit(bool(result))
+    sys.exit("\n".join(result) or 0)
