@@ -2,7 +2,7 @@
 """check-json.py SCHEMA STATUS FILE [EXPRESSION...]: the answers for machines in a file, a line each.
 
 Every answer must match the schema and hold no control byte; the last must agree with the exit
-status, and every expression must be true of it: its members are names, so that
+status, if nothing was printed after it, and every expression must be true of it: its members are names, so that
 `result.members[0].verdict == "no"` and `len(notes) == 2` are expressions. Prints what is wrong.
 """
 import json
@@ -24,7 +24,8 @@ def texts(value):
 
 
 def faults(schema, status, path, expressions):
-    answers = [line for line in open(path, encoding="utf-8") if line.startswith('{"schema"')]
+    lines = open(path, encoding="utf-8").readlines()
+    answers = [line for line in lines if line.startswith('{"schema"')]
     if not answers:
         return ["no answer for machines"]
     found = []
@@ -34,7 +35,7 @@ def faults(schema, status, path, expressions):
                   for e in jsonschema.Draft202012Validator(schema).iter_errors(answer)]
         found += [f"a control byte: {text!r}" for text in texts(answer)
                   if any(ord(c) < 32 or ord(c) == 127 for c in text)]
-    if answer.get("exit") != status:
+    if answers[-1] == lines[-1] and answer.get("exit") != status:
         found.append(f"exit status {status}, but the answer says {answer.get('exit')}")
     names = vars(json.loads(answers[-1], object_hook=lambda members: SimpleNamespace(**members)))
     names |= {"true": True, "false": False, "null": None}
