@@ -2,8 +2,9 @@
 """check-json.py SCHEMA STATUS FILE [EXPRESSION...]: the answers for machines in a file, a line each.
 
 Every answer must match the schema and hold no control byte; the last must agree with the exit
-status, if nothing was printed after it, and every expression must be true of it: its members are names, so that
-`result.members[0].verdict == "no"` and `len(notes) == 2` are expressions. Prints what is wrong.
+status, if nothing was printed after it, and every expression must be true of it: its members are
+names, so that `result.members[0].verdict == "no"` and `len(notes) == 2` are expressions. Prints what
+is wrong.
 """
 import json
 import sys

@@ -18,7 +18,7 @@ export LC_ALL=C PATH=$work/bin:$PATH XDG_DATA_HOME=$work/data
 failures=0 command='' ran=0
 
 masked() {
-  sed -E 's/[0-9a-f]{64}/FINGERPRINT/g; s/[0-9a-f]{8,}(…|\.\.\.)/SHORT/g
+  sed -E 's/(sha256:|KEY-OF-|grant-)[0-9a-f]{8,64}/FINGERPRINT/g
           s/20[0-9]{2}-[0-9]{2}-[0-9]{2}_[0-9:]{8}/TIME/g'
 }
 
