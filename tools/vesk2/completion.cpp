@@ -107,7 +107,7 @@ std::string ZshValues(const OptionText& option) {
   return text + (IsDirectory(option) ? ":_files -/" : ":_files");
 }
 
-// A description inside the brackets of a specification.
+// A description inside brackets, as _arguments takes it.
 std::string ZshText(const std::string& text) {
   std::string out;
   for (const char c : text) {
