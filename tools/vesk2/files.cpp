@@ -261,4 +261,9 @@ bool WriteFile(const std::string& path, std::string_view bytes, const WriteOptio
   return !options.dryRun;
 }
 
+void AddWriteFlags(CLI::App& app, WriteFlags& flags) {
+  app.add_flag("-f,--force", flags.force, "Replace what is there");
+  app.add_flag("-n,--dry-run", flags.dryRun, "Say what would be written, and write nothing");
+}
+
 }  // namespace vesk2_command

@@ -4,6 +4,7 @@
 
 #include <sys/types.h>
 
+#include <CLI/CLI.hpp>
 #include <functional>
 #include <string>
 #include <string_view>
@@ -48,6 +49,13 @@ struct WriteOptions {
 // is the old file or the whole new one, whatever happens. Returns false for a dry run, which writes
 // nothing. The path goes into "written" of the answer, or into "would_write". Throws Trouble.
 bool WriteFile(const std::string& path, std::string_view bytes, const WriteOptions& options);
+
+// --force and --dry-run, of a command that writes.
+struct WriteFlags {
+  bool force = false;
+  bool dryRun = false;
+};
+void AddWriteFlags(CLI::App& app, WriteFlags& flags);
 
 }  // namespace vesk2_command
 

@@ -1,8 +1,11 @@
 // stores.cpp: the store roots.
 #include "tools/vesk2/stores.h"
 
+#include <algorithm>
 #include <cstdlib>
+#include <filesystem>
 
+#include "tools/vesk2/files.h"
 #include "tools/vesk2/report.h"
 
 #include <vesk2/context.h>
@@ -22,11 +25,16 @@ std::string DefaultHome() {
   return home.empty() ? "" : home + "/.local/share/vesk2";
 }
 
-std::string Root(const std::string& flag, const char* variable, const std::string& standard) {
-  std::string root = flag.empty() ? Environment(variable) : flag;
-  if (root.empty()) root = standard;
+StoreOptions used;
+
+// What is given first, of a flag, a variable and the standard place.
+StoreRoot Root(const StoreRoot& flag, const char* variable, const std::string& standard) {
+  StoreRoot root = flag.path.empty() ? StoreRoot{Environment(variable), variable} : flag;
+  if (root.path.empty()) root = {standard, "default"};
   // The library cuts a longer root, and would then look somewhere else.
-  if (root.size() >= ZvVesk2::Limits::kPathBuffer - 1) throw Trouble("a store root is too long");
+  if (root.path.size() >= ZvVesk2::Limits::kPathBuffer - 1) {
+    throw Trouble("a store root is too long");
+  }
   return root;
 }
 
@@ -38,12 +46,36 @@ void AddStoreOptions(CLI::App& app, StoreOptions& options) {
                  "Root of the machine's store, whose acl/ holds what is trusted [VESK2_GLOBAL]");
 }
 
-void UseStores(const StoreOptions& options) {
-  using ZvVesk2::VeskConf;
-  VeskConf::SetHomeDirectory(Root(options.home, "VESK2_HOME", DefaultHome()).c_str());
-  VeskConf::SetGlobalDirectory(Root(options.global, "VESK2_GLOBAL", "/etc/vesk2").c_str());
+StoreRoot HomeRoot(const StoreOptions& options) {
+  return Root({options.home, "--home"}, "VESK2_HOME", DefaultHome());
 }
 
+StoreRoot GlobalRoot(const StoreOptions& options) {
+  return Root({options.global, "--global"}, "VESK2_GLOBAL", "/etc/vesk2");
+}
+
+void UseStores(const StoreOptions& options) {
+  using ZvVesk2::VeskConf;
+  used = options;
+  VeskConf::SetHomeDirectory(HomeRoot(options).path.c_str());
+  VeskConf::SetGlobalDirectory(GlobalRoot(options).path.c_str());
+}
+
+const StoreOptions& GetStoreOptions() { return used; }
+
 std::string AclDirectory() { return std::string(ZvVesk2::VeskConf::GetGlobalDirectory()) + "/acl"; }
+
+std::vector<std::string> FilesOf(const std::string& directory, const std::string& extension) {
+  std::vector<std::string> files;
+  std::error_code error;
+  std::filesystem::directory_iterator entry(directory, error);
+  for (; !error && entry != std::filesystem::directory_iterator(); entry.increment(error)) {
+    const std::string path = entry->path().string();
+    if (path.ends_with(extension)) files.push_back(path);
+  }
+  if (error) throw FileTrouble(directory, error.message(), "io");
+  std::sort(files.begin(), files.end());
+  return files;
+}
 
 }  // namespace vesk2_command

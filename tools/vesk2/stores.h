@@ -5,6 +5,7 @@
 
 #include <CLI/CLI.hpp>
 #include <string>
+#include <vector>
 
 namespace vesk2_command {
 
@@ -14,11 +15,25 @@ struct StoreOptions {
 };
 void AddStoreOptions(CLI::App& app, StoreOptions& options);
 
+// A store's root, and who named it: "--home", "VESK2_HOME" or "default".
+struct StoreRoot {
+  std::string path;
+  std::string from;
+};
+StoreRoot HomeRoot(const StoreOptions& options);
+StoreRoot GlobalRoot(const StoreOptions& options);
+
 // Sets the library's store roots.
 void UseStores(const StoreOptions& options);
+// What UseStores was given.
+const StoreOptions& GetStoreOptions();
 
 // The directory of ACL entries below the global root.
 std::string AclDirectory();
+
+// The files of a directory whose names end in `extension`, in byte order. Trouble when the
+// directory cannot be read.
+std::vector<std::string> FilesOf(const std::string& directory, const std::string& extension);
 
 }  // namespace vesk2_command
 
