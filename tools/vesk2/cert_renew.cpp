@@ -62,13 +62,13 @@ ExitCode Run(const Options& options) {
   RequireCert(certs, place.number, place.path);
   ZvVesk2::Cert& old = *certs[place.number - 1].cert;
   const Renewal renewal = ReadRenewal(options);
-  const PrivateKey key = PrivateKey::Read(options.signer.key, options.signer.passphrase);
-  const Ref<PublicKey> issuer = key.Public();
+  const auto key = OpenSigner(options.signer);
+  const Ref<PublicKey> issuer = key->Public();
   if (!old.GetIssuer()->IsEqual(issuer.get())) {
     throw Trouble(Escape(options.place) + ": issued by " + Fingerprint(*old.GetIssuer()) +
                   ", not by the signing key " + Fingerprint(*issuer));
   }
-  const SignedCert renewed = IssueCert(key, Renewed(old, renewal), options.signer.algorithm);
+  const SignedCert renewed = IssueCert(*key, Renewed(old, renewal), options.signer.algorithm);
   const std::string text = Replace(place, certs, renewed);
   const auto readBack = [&](const std::string& temporary) {
     const std::vector<SignedCert> again = ReadCerts(temporary);

@@ -1,6 +1,6 @@
 // crl_issue.cpp: vesk2 crl issue.
 #include "tools/vesk2/command.h"
-#include "tools/vesk2/crl_file.h"
+#include "tools/vesk2/crl_store.h"
 #include "tools/vesk2/files.h"
 #include "tools/vesk2/inspect.h"
 #include "tools/vesk2/key_source.h"
@@ -24,7 +24,9 @@ struct Options {
   PeriodOptions period;
   std::string hash = "sha256";
   std::string output;
-  bool force = false;
+  bool grant = false;
+  bool import = false;
+  WriteFlags flags;
 };
 
 ZvclmHashID HashId(const std::string& name) {
@@ -99,27 +101,82 @@ Ref<Hash> HashOf(Crl& list, const std::string& name) {
   return hash;
 }
 
+// The list as a file holds it.
+std::string SignList(Crl& list, SExpression* tag, const SigningKey& key, const Options& options) {
+  const Ref<Hash> subject = HashOf(list, options.hash);
+  Grant grant{subject.get()};
+  grant.tag = tag;
+  grant.period = ParsePeriod(options.period);
+  const SignedCert issued = IssueCert(key, grant, options.signer.algorithm);
+  return "(" + Atom("sequence") + Canonical(list) + Canonical(*issued.cert) +
+         Canonical(*issued.signature) + ")";
+}
+
+// How many items the stored list has that its successor has not. Zeros name nothing.
+size_t CountDropped(CrlSequence& stored, const std::string& successor) {
+  size_t dropped = 0;
+  for (const SExpression* items : {stored.GetCrl()->GetList1(), stored.GetCrl()->GetList2()}) {
+    auto it = items->Begin();
+    for (it.Next(); it; it.Next()) {
+      auto at = dynamic_cast<SExpression*>(it.Value())->Begin();
+      at.Next();
+      const std::string named = Canonical(*at.Value());
+      const bool dummy = named.find(std::string(20, '\0')) != std::string::npos;
+      dropped += !dummy && successor.find(named) == std::string::npos ? 1 : 0;
+    }
+  }
+  return dropped;
+}
+
+// Puts the list into this machine's store, or says that it would.
+void Import(const std::string& bytes, const Options& options, const std::string& items) {
+  const Buffer buffer = WrapBytes(bytes);
+  const Ref<CrlSequence> list(new CrlSequence(nullptr));
+  Check(list->Import(buffer.get()), "storing the list");
+  if (const Ref<CrlSequence> stored = StoredCrl(*list)) {
+    const size_t dropped = CountDropped(*stored, bytes);
+    if (dropped > 0) {
+      Note("note: the stored list of this source revokes " + std::to_string(dropped) +
+           " more; this one takes its place, and they are revoked no longer (--items-of)");
+    }
+  }
+  if (options.flags.dryRun) return Note("would store " + CrlText(*list));
+  const std::string reason = StoreCrl(*list, LoadAcls().get(), "the list");
+  if (!reason.empty()) throw Trouble("the list was not stored: " + reason, "not-stored");
+  Note("stored " + CrlText(*list) + items);
+  Result()["stored"] = true;
+}
+
 ExitCode Run(const Options& options) {
+  if (options.output.empty() && !options.import) {
+    throw Trouble("nowhere to put the list: --output or --import", "usage");
+  }
   const Ref<SExpression> tag = ParseRevocationTag(options.tag);
   if (TagText(tag.get()).size() > ZvVesk2::Limits::kMaxStoreName) {
-    throw Trouble("--tag: too long; the store names the list's file by it");
+    throw Trouble("--tag: too long; the store names the list's file by it", "usage");
   }
-  Period period = ParsePeriod(options.period);
-  const PrivateKey key = PrivateKey::Read(options.signer.key, options.signer.passphrase);
+  const WriteFlags& flags = options.flags;
+  if (!options.output.empty()) RefuseExisting(options.output, flags.force);
+  const auto key = OpenSigner(options.signer);
   const Ref<Crl> list = MakeList(options);
-  const Ref<Hash> subject = HashOf(*list, options.hash);
-  Grant grant{subject.get()};
-  grant.tag = tag.get();
-  grant.period = std::move(period);
-  const SignedCert issued = IssueCert(key, grant, options.signer.algorithm);
-  const std::string bytes = "(" + Atom("sequence") + Canonical(*list) + Canonical(*issued.cert) +
-                            Canonical(*issued.signature) + ")";
+  const std::string bytes = SignList(*list, tag.get(), *key, options);
   const auto readBack = [](const std::string& temporary) {
     Check(CheckIssuerWord(*ReadCrl(temporary)), "checking the new list");
   };
-  WriteFile(options.output, bytes, {0666, options.force, readBack});
-  Note("wrote " + Escape(options.output) + "; revoked certificates: " +
-       std::to_string(options.certs.size()) + ", keys: " + std::to_string(options.keys.size()));
+  if (options.grant) {
+    TrustSource(*key->Public(), tag.get(), options.signer.keys[0], flags.dryRun);
+  }
+  const std::string items = "; revoked certificates: " + std::to_string(options.certs.size()) +
+                            ", keys: " + std::to_string(options.keys.size());
+  if (options.import) Import(bytes, options, items);
+  if (!options.output.empty() &&
+      WriteFile(options.output, bytes, {0666, flags.force, readBack, flags.dryRun})) {
+    Note("wrote " + Escape(options.output) + items);
+  }
+  Result()["tag"] = TagText(tag.get());
+  Result()["issuer"] = Fingerprint(*key->Public());
+  Result()["revoked_certificates"] = options.certs.size();
+  Result()["revoked_keys"] = options.keys.size();
   return kYes;
 }
 
@@ -145,8 +202,11 @@ Action DefineCrlIssue(CLI::App& app) {
   app.add_option("--hash", options->hash, "How the list and what it names are hashed")
       ->check(CLI::IsMember({"sha256", "sha1"}))
       ->capture_default_str();
-  app.add_option("-o,--output", options->output, "The revocation list file, .crl")->required();
-  app.add_flag("-f,--force", options->force, "Replace an existing file");
+  app.add_option("-o,--output", options->output, "The revocation list file, .crl");
+  app.add_flag("--import", options->import, "Put the list into this machine's store");
+  app.add_flag("--grant", options->grant,
+               "Let this machine believe the key's lists of this source: writes the ACL entry");
+  AddWriteFlags(app, options->flags);
   app.footer(
       "A list that revokes no certificate holds one dummy item, a digest of zeros: without any "
       "item\nit would count as absent.");

@@ -76,4 +76,9 @@ void GrantEntry(AclEntry& entry, const EntryPlace& place) {
   if (WriteFile(path, bytes, options)) Note("wrote " + Escape(path));
 }
 
+void RefuseTaken(AclEntry& entry, const EntryPlace& place) {
+  const std::string path = EntryPath(place.name);
+  if (!IsAlready(path, Canonical(entry))) RefuseExisting(path, place.force);
+}
+
 }  // namespace vesk2_command

@@ -12,9 +12,9 @@
 
 namespace vesk2_command {
 
-// MakeEntry builds the entry that trusts `subject`, which it shares, for a tag.
+// MakeEntry builds the entry that trusts `subject` for a tag.
 struct EntryText {
-  Ref<PublicKey> subject;
+  Ref<ZvVesk2::Subject> subject;
   bool propagate = false;
   Ref<SExpression> tag;
   Period period = {};
@@ -34,6 +34,8 @@ std::string FreeEntryName(ZvVesk2::AclEntry& entry, const std::string& name);
 // GrantEntry checks an entry and writes it into the machine's store, which it makes if need be. An
 // equal entry of that name stays as it is.
 void GrantEntry(ZvVesk2::AclEntry& entry, const EntryPlace& place);
+// RefuseTaken is Trouble where GrantEntry would not replace another entry.
+void RefuseTaken(ZvVesk2::AclEntry& entry, const EntryPlace& place);
 
 }  // namespace vesk2_command
 

@@ -100,8 +100,7 @@ Bio ReadOnly(const Secret& text) {
   return bio;
 }
 
-Ref<PublicKey> ReadPublicPem(const std::string& path) {
-  const Secret pem(ReadFile(path, kMaxPem));
+Ref<PublicKey> PublicFromPem(const Secret& pem, const std::string& path) {
   const Bio bio = ReadOnly(pem);
   const std::unique_ptr<EVP_PKEY, decltype(&EVP_PKEY_free)> key(
       PEM_read_bio_PUBKEY(bio.get(), nullptr, nullptr, nullptr), &EVP_PKEY_free);
@@ -109,11 +108,9 @@ Ref<PublicKey> ReadPublicPem(const std::string& path) {
   return MakePublicKey(key.get());
 }
 
-}  // namespace
-
-Ref<PublicKey> ReadPublicKey(const std::string& path) {
-  const Buffer buffer = OpenBuffer(path);
-  if (buffer->LooksAt("-----BEGIN ")) return ReadPublicPem(path);
+Ref<PublicKey> PublicFromText(const Secret& text, const std::string& path) {
+  const Buffer buffer = WrapBytes(text.text());
+  if (buffer->LooksAt("-----BEGIN ")) return PublicFromPem(text, path);
   Ref<PublicKey> key(new PublicKey(nullptr));
   int code = key->Import(buffer.get());
   if (code == 0 && buffer->Remaining() != 0) code = VESK2_ERR_PARSE_FILE;
@@ -121,31 +118,70 @@ Ref<PublicKey> ReadPublicKey(const std::string& path) {
   return key;
 }
 
+bool HoldsPrivateKey(const Secret& pem) {
+  return pem.text().find("PRIVATE KEY-----") != std::string::npos;
+}
+
+}  // namespace
+
+Ref<PublicKey> ReadPublicKey(const std::string& path) {
+  return PublicFromText(Secret(ReadFile(path, kMaxPem)), path);
+}
+
 bool IsPrivatePem(const std::string& path) {
-  const Secret text(ReadFile(path, kMaxPem));
-  return text.text().find("PRIVATE KEY-----") != std::string::npos;
+  return HoldsPrivateKey(Secret(ReadFile(path, kMaxPem)));
+}
+
+PublicHalf ReadPublicHalf(const std::string& path, const PassphraseOptions& options) {
+  const Secret text(ReadFile(path, kMaxPem));  // once: it may be standard input
+  const bool ofPrivate = HoldsPrivateKey(text);
+  return {
+      ofPrivate ? PrivateKey::FromPem(text, path, options).Public() : PublicFromText(text, path),
+      ofPrivate};
+}
+
+// ---- Private keys ----
+
+PrivateKey::PrivateKey(EVP_PKEY* key, const std::string& path)
+    : SigningKey(Escape(path), "signature"), key_(key, &EVP_PKEY_free) {}
+
+void PrivateKey::CheckBits(int bits) {
+  if (bits < 2048 || bits > ZvVesk2::Limits::kMaxRsaModulusBits) {
+    throw Trouble(
+        "--bits must lie between 2048 and " + std::to_string(ZvVesk2::Limits::kMaxRsaModulusBits),
+        "usage");
+  }
 }
 
 PrivateKey PrivateKey::Generate(int bits) {
-  if (bits < 2048 || bits > ZvVesk2::Limits::kMaxRsaModulusBits) {
-    throw Trouble("--bits must lie between 2048 and " +
-                  std::to_string(ZvVesk2::Limits::kMaxRsaModulusBits));
-  }
-  PrivateKey key(EVP_RSA_gen(static_cast<unsigned>(bits)));
+  CheckBits(bits);
+  PrivateKey key(EVP_RSA_gen(static_cast<unsigned>(bits)), "the new key");
   Require(key.key_ != nullptr, "making a key");
   return key;
 }
 
 PrivateKey PrivateKey::Read(const std::string& path, const PassphraseOptions& options) {
-  const Secret pem(ReadFile(path, kMaxPem));
+  return FromPem(Secret(ReadFile(path, kMaxPem)), path, options);
+}
+
+PrivateKey PrivateKey::FromPem(const Secret& pem, const std::string& path,
+                               const PassphraseOptions& options) {
   const Bio bio = ReadOnly(pem);
   Asking asking{options, path};
-  PrivateKey key(PEM_read_bio_PrivateKey(bio.get(), nullptr, &GivePassphrase, &asking));
+  PrivateKey key(PEM_read_bio_PrivateKey(bio.get(), nullptr, &GivePassphrase, &asking), path);
+  if (asking.problem) std::rethrow_exception(asking.problem);
   if (asking.failed) {
-    throw Trouble(Escape(path) + ": encrypted, and no passphrase was given (--passphrase-file)");
+    throw FileTrouble(path,
+                      "encrypted, and no passphrase was given (--passphrase-file, --passphrase-fd)",
+                      "passphrase");
   }
-  const char* what = asking.asked ? ": wrong passphrase, or no private key" : ": no private key";
-  Require(key.key_ != nullptr, Escape(path) + what);
+  if (key.key_ == nullptr) {
+    throw FileTrouble(
+        path,
+        (asking.asked ? "wrong passphrase, or no private key: " : "no private key: ") +
+            CryptoReason(),
+        asking.asked ? "wrong-passphrase" : "malformed");
+  }
   return key;
 }
 
@@ -192,8 +228,11 @@ std::string PrivateKey::SignDigest(std::string_view digest, const std::string& a
                                  : value;
 }
 
-Ref<Signature> PrivateKey::Sign(SExpression& object, const std::string& algorithm) const {
-  const bool dsa = EVP_PKEY_is_a(key_.get(), "DSA") == 1;
+// ---- Signing ----
+
+Ref<Signature> SigningKey::Sign(SExpression& object, const std::string& algorithm) const {
+  Ref<PublicKey> signer = Public();
+  const bool dsa = signer->GetType() != ZVCLM_KEY_RSA;
   const std::string name = dsa ? "dsa-sha1" : algorithm;
   Ref<Hash> hash(new Hash(nullptr));
   Check(hash->Init(dsa ? ZVCLM_HASH_SHA1 : ZVCLM_HASH_SHA256), "hashing");
@@ -203,7 +242,6 @@ Ref<Signature> PrivateKey::Sign(SExpression& object, const std::string& algorith
   std::string value =
       SignDigest({reinterpret_cast<const char*>(digest.GetData()), digest.GetLength()}, name);
 
-  Ref<PublicKey> signer = Public();
   Ref<Signature> signature;
   Check(Signature::Create(signature.Out(), hash.get(), signer.get(), name.c_str(),
                           reinterpret_cast<unsigned char*>(value.data()),
@@ -212,7 +250,8 @@ Ref<Signature> PrivateKey::Sign(SExpression& object, const std::string& algorith
   (void)hash.Release();
   (void)signer.Release();
   // A faulty signature can give the private key away; none leaves unchecked.
-  Check(signature->Verify(&object), "checking the new signature");
+  const int code = signature->Verify(&object);
+  if (code != 0) throw Trouble(source_ + ": made a wrong signature: " + Reason(code), reason_);
   return signature;
 }
 

@@ -70,7 +70,7 @@ std::string Pair(const SignedCert& each) {
 
 // The certificates that speak for the signer: those of the --cert file, or else one that the signer
 // issues to itself, which is worth what the ACL store grants its key.
-std::string SignersCerts(const Options& options, const PrivateKey& key) {
+std::string SignersCerts(const Options& options, const SigningKey& key) {
   const Ref<PublicKey> signer = key.Public();
   if (options.cert.empty()) {
     return Pair(IssueCert(key, {signer.get(), true}, options.signer.algorithm));
@@ -174,13 +174,13 @@ struct Parts {
   std::string lists;
 };
 
-Parts Prepare(const Options& options, const PrivateKey& key) {
+Parts Prepare(const Options& options, const SigningKey& key) {
   if (!options.grant.empty()) ParseTag(options.grant);
   return {MakeHead(options), options.tag.empty() ? Ref<SExpression>() : ParseTag(options.tag),
           SignersCerts(options, key), CarriedLists(options)};
 }
 
-std::string MakeManifest(const Parts& parts, const Listing& listing, const PrivateKey& key,
+std::string MakeManifest(const Parts& parts, const Listing& listing, const SigningKey& key,
                          const std::string& algorithm) {
   const Head& head = parts.head;
   const Ref<Hash> digest = Digest(head, listing.body);
@@ -190,9 +190,10 @@ std::string MakeManifest(const Parts& parts, const Listing& listing, const Priva
 }
 
 // The machine trusts the signing key for a tag from now on, as with acl grant.
-void WriteGrant(const Options& options, const PrivateKey& key) {
-  const Ref<ZvVesk2::AclEntry> entry = MakeEntry({key.Public(), true, ParseTag(options.grant)});
-  const std::string name = std::filesystem::path(options.signer.key).stem().string();
+void WriteGrant(const Options& options, const SigningKey& key) {
+  const Ref<ZvVesk2::AclEntry> entry =
+      MakeEntry({Ref<ZvVesk2::Subject>(key.Public().Release()), true, ParseTag(options.grant)});
+  const std::string name = std::filesystem::path(options.signer.keys[0]).stem().string();
   GrantEntry(*entry, {FreeEntryName(*entry, name), false, options.dryRun});
 }
 
@@ -200,7 +201,8 @@ ExitCode Run(const Options& options) {
   RefuseExisting(options.output, options.force);
   RequireDirectory(options.output);
   RefuseInside(options.output, options.directory);
-  const PrivateKey key = PrivateKey::Read(options.signer.key, options.signer.passphrase);
+  const std::unique_ptr<SigningKey> signing = OpenSigner(options.signer);
+  const SigningKey& key = *signing;
   const Parts parts = Prepare(options, key);
   const Listing listing = ListOrExplain(options);
   if (options.dryRun) ShowListing(listing);

@@ -1,4 +1,4 @@
-// passphrase.cpp: passphrases from files and from the terminal.
+// passphrase.cpp: passphrases from files, descriptors and the terminal.
 #include "tools/vesk2/passphrase.h"
 
 #include <fcntl.h>
@@ -6,6 +6,7 @@
 #include <openssl/evp.h>
 #include <unistd.h>
 
+#include <cerrno>
 #include <cstring>
 
 #include "tools/vesk2/files.h"
@@ -16,12 +17,38 @@ namespace {
 
 constexpr int kMaxPassphrase = 1024;
 
-std::unique_ptr<Secret> PassphraseFromFile(const std::string& path) {
-  const Secret text(ReadFile(path, kMaxPassphrase));
+// One byte at a time, so that what follows the line is left for its reader.
+std::string FirstLine(int descriptor) {
+  std::string line;
+  char byte = 0;
+  while (line.size() <= kMaxPassphrase) {
+    const ssize_t got = read(descriptor, &byte, 1);
+    if (got < 0 && errno == EINTR) continue;
+    if (got < 0) {
+      throw Trouble("--passphrase-fd " + std::to_string(descriptor) + ": " + std::strerror(errno),
+                    "passphrase");
+    }
+    if (got == 0 || byte == '\n') break;
+    line += byte;
+  }
+  return line;
+}
+
+// The passphrase that the options name.
+std::shared_ptr<const Secret> NamedPassphrase(const PassphraseOptions& options) {
+  if (options.given) return options.given;
+  const bool file = !options.file.empty();
+  const Secret text(file ? ReadFile(options.file, kMaxPassphrase) : FirstLine(options.descriptor));
   const size_t end = text.text().find_first_of("\r\n");
-  auto passphrase = std::make_unique<Secret>(text.text().substr(0, end));
-  if (passphrase->text().empty()) throw Trouble(Escape(path) + ": holds no passphrase");
-  return passphrase;
+  options.given = std::make_shared<const Secret>(text.text().substr(0, end));
+  const size_t size = options.given->text().size();
+  if (size == 0 || size > kMaxPassphrase) {
+    throw Trouble(
+        (file ? Escape(options.file) : "--passphrase-fd " + std::to_string(options.descriptor)) +
+            (size == 0 ? ": holds no passphrase" : ": too long for a passphrase"),
+        "passphrase");
+  }
+  return options.given;
 }
 
 // Without a terminal libcrypto would read standard input, where nobody was asked for anything.
@@ -37,9 +64,8 @@ int AskTerminal(char* out, int size, const std::string& prompt, bool twice) {
   return static_cast<int>(std::strlen(out));
 }
 
-int FromFile(char* out, int size, const std::string& path) {
-  const auto passphrase = PassphraseFromFile(path);
-  const std::string& text = passphrase->text();
+int FromOptions(char* out, int size, const PassphraseOptions& options) {
+  const std::string& text = NamedPassphrase(options)->text();
   if (text.size() > static_cast<size_t>(size)) return -1;
   std::memcpy(out, text.data(), text.size());
   return static_cast<int>(text.size());
@@ -48,19 +74,25 @@ int FromFile(char* out, int size, const std::string& path) {
 }  // namespace
 
 void AddPassphraseOptions(CLI::App& app, PassphraseOptions& options) {
-  app.add_option("--passphrase-file", options.file,
-                 "Take the private key's passphrase from the first line of this file");
+  auto* file = app.add_option("--passphrase-file", options.file,
+                              "Take the passphrase of private keys from this file's first line");
+  app.add_option("--passphrase-fd", options.descriptor,
+                 "Take it from the first line of this open file descriptor")
+      ->check(CLI::NonNegativeNumber)
+      ->excludes(file);
 }
 
 Secret::~Secret() { OPENSSL_cleanse(text_.data(), text_.size()); }
 
-std::unique_ptr<Secret> NewPassphrase(const PassphraseOptions& options) {
-  if (!options.file.empty()) return PassphraseFromFile(options.file);
+std::shared_ptr<const Secret> NewPassphrase(const PassphraseOptions& options) {
+  if (options.Named()) return NamedPassphrase(options);
   char typed[kMaxPassphrase] = "";
-  const int length = AskTerminal(typed, sizeof typed, "Passphrase of the new key: ", true);
-  auto passphrase = std::make_unique<Secret>(typed);
+  const int length = AskTerminal(typed, sizeof typed, "Passphrase: ", true);
+  auto passphrase = std::make_shared<const Secret>(typed);
   OPENSSL_cleanse(typed, sizeof typed);
-  if (length <= 0) throw Trouble("no passphrase was given");
+  if (length <= 0) {
+    throw Trouble("no passphrase was given (--passphrase-file, --passphrase-fd)", "passphrase");
+  }
   return passphrase;
 }
 
@@ -69,11 +101,11 @@ int GivePassphrase(char* out, int size, int /*writing*/, void* user) {
   asking.asked = true;
   int length = -1;
   try {  // libcrypto calls this, and nothing may be thrown through it
-    length = asking.options.file.empty()
-                 ? AskTerminal(out, size, "Passphrase of " + Escape(asking.path) + ": ", false)
-                 : FromFile(out, size, asking.options.file);
-  } catch (const std::exception& error) {
-    Note(std::string("vesk2: ") + error.what());
+    length = asking.options.Named()
+                 ? FromOptions(out, size, asking.options)
+                 : AskTerminal(out, size, "Passphrase of " + Escape(asking.path) + ": ", false);
+  } catch (...) {
+    asking.problem = std::current_exception();
   }
   asking.failed = length < 0;
   return length;

@@ -1,18 +1,15 @@
-// passphrase.h: passphrases of private keys: from the first line of a file, else from the terminal.
+// passphrase.h: passphrases of private keys: from the first line of a file or of an open
+// descriptor, else from the terminal.
 // Never from an argument or the environment, which other users of the machine can read.
 #ifndef VESK2_TOOLS_PASSPHRASE_H
 #define VESK2_TOOLS_PASSPHRASE_H
 
 #include <CLI/CLI.hpp>
+#include <exception>
 #include <memory>
 #include <string>
 
 namespace vesk2_command {
-
-struct PassphraseOptions {
-  std::string file;
-};
-void AddPassphraseOptions(CLI::App& app, PassphraseOptions& options);
 
 // A string that is wiped when it goes.
 class Secret {
@@ -27,15 +24,26 @@ class Secret {
   std::string text_;
 };
 
-// A passphrase for a new key, typed twice unless it comes from a file.
-std::unique_ptr<Secret> NewPassphrase(const PassphraseOptions& options);
+struct PassphraseOptions {
+  std::string file;
+  int descriptor = -1;
+  // What came of either: a pipe gives it only once, and several keys may be under it.
+  mutable std::shared_ptr<const Secret> given = nullptr;
+
+  bool Named() const { return !file.empty() || descriptor >= 0; }
+};
+void AddPassphraseOptions(CLI::App& app, PassphraseOptions& options);
+
+// A passphrase for new keys, typed twice unless the options name a source.
+std::shared_ptr<const Secret> NewPassphrase(const PassphraseOptions& options);
 
 // Asking is the user argument of GivePassphrase, libcrypto's callback for encrypted PEM.
 struct Asking {
   const PassphraseOptions& options;
   const std::string& path;
-  bool asked = false;   // the key is encrypted
-  bool failed = false;  // and no passphrase was to be had
+  bool asked = false;                    // the key is encrypted
+  bool failed = false;                   // and no passphrase was to be had
+  std::exception_ptr problem = nullptr;  // because of this
 };
 int GivePassphrase(char* out, int size, int writing, void* asking);
 
