@@ -15,16 +15,20 @@ struct Options {
 ExitCode Run(const Options& options) {
   const Ref<SExpression> tag = ParseTag(options.tag);
   const Text directory(CertSequence::CalcDir(ZvVesk2::StorageHome));
-  if (!directory) throw Trouble("there is no home store: --home names one");
+  if (!directory) throw Trouble("there is no home store: --home names one", "no-home-store");
   Ref<SExpression> names;
   Check(CertSequence::Find(names.Out(), tag.get()), Escape(directory.get()));
+  Result()["tag"] = TagText(tag.get());
+  Json& files = Result()["files"] = Json::array();
   for (auto it = names->Begin(); it; it.Next()) {
     const auto* name = dynamic_cast<ByteString*>(it.Value());
     // A name ends in the 0 byte that it is stored with.
-    Say(Escape(directory.get() + std::string("/") +
-               reinterpret_cast<const char*>(name->GetData())));
+    const std::string path =
+        Escape(directory.get() + std::string("/") + reinterpret_cast<const char*>(name->GetData()));
+    Say(path);
+    files.push_back(path);
   }
-  if (names->First() != nullptr) return kYes;
+  if (!files.empty()) return kYes;
   Note("no certificate in " + Escape(directory.get()) + " carries " + TagText(tag.get()));
   return kNo;
 }

@@ -38,6 +38,10 @@ constexpr Noun kNouns[] = {
      "A tag says what is granted, or asked. A longer list is narrower: who was granted (install) "
      "may also (install (app calc)), not the other way round."},
     {"show", "Show any object", "Reads what any file of the system holds, in both its forms."},
+    {"store", "Look at the stores of this machine",
+     "The machine's store holds what is trusted (acl) and the revocation lists; the user's store "
+     "holds certificates. --global and --home name them, else VESK2_GLOBAL and VESK2_HOME, else "
+     "/etc/vesk2 and $XDG_DATA_HOME/vesk2."},
     {"version", "Show the version of the command and the library", ""},
     {"completion", "Write a script that completes commands in a shell",
      "The scripts know what the command line knows: both come from one table."},
@@ -45,15 +49,31 @@ constexpr Noun kNouns[] = {
 };
 
 constexpr Command kCommands[] = {
-    {"key", "new", "Make a key pair: NAME.pem (private) and NAME.pub", "vesk2 key new -o vendor",
-     DefineKeyNew},
+    {"key", "new", "Make a key pair, or several: NAME.pem (private) and NAME.pub",
+     "vesk2 key new vendor\nvesk2 key new --encrypt alice bob carol", DefineKeyNew},
     {"key", "show", "Show type, size and fingerprint of a key", "vesk2 key show vendor.pub",
      DefineKeyShow},
+    {"key", "export", "Write a public key as other programs read it",
+     "vesk2 key export vendor.pub --format x509\nvesk2 key export vendor.pem --format ssh -o v.ssh",
+     DefineKeyExport},
     {"acl", "grant", "Write an entry into the ACL store: a root of trust",
-     "vesk2 acl grant --subject vendor.pub --tag '(install)' --propagate", DefineAclGrant},
+     "vesk2 acl grant --subject vendor.pub --tag '(install)' --propagate\n"
+     "vesk2 acl grant --threshold 2 --subject alice.pub --subject bob.pub --subject carol.pub "
+     "--tag '(install)' --propagate",
+     DefineAclGrant},
+    {"acl", "list", "Show what this machine trusts", "vesk2 acl list", DefineAclList},
+    {"acl", "install", "Copy entry files into the ACL store", "vesk2 acl install vendor.acl",
+     DefineAclInstall},
+    {"acl", "remove", "Trust an entry no longer", "vesk2 acl remove vendor", DefineAclRemove},
+    {"cert", "request", "Ask to be certified",
+     "vesk2 cert request --key signer.pem --tag '(install (app calc))' -o signer.req",
+     DefineCertRequest},
     {"cert", "issue", "Certify a key for a tag",
      "vesk2 cert issue --key vendor.pem --subject signer.pub --tag '(install (app calc))' "
-     "-o signer.cert",
+     "-o signer.cert\n"
+     "vesk2 cert issue --key vendor.pem --request signer.req -o signer.cert\n"
+     "vesk2 cert issue --key alice.pem --key bob.pem --subject signer.pub --tag '(install)' "
+     "--propagate -o signer.cert",
      DefineCertIssue},
     {"cert", "renew", "Issue a certificate of a chain or manifest again",
      "vesk2 cert renew signer.cert:2 --key vendor.pem --not-after 2028 -o signer.cert --force",
@@ -65,8 +85,10 @@ constexpr Command kCommands[] = {
     {"cert", "find", "Find stored chains for a tag", "vesk2 cert find --tag '(install (app calc))'",
      DefineCertFind},
     {"crl", "issue", "Sign a list of what is revoked",
-     "vesk2 crl issue --key vendor.pem --tag '(install (revoke all))' --revoke-key signer.pub "
-     "--not-after 2027 -o vendor.crl",
+     "vesk2 crl issue --key vendor.pem --tag 'install (revoke all)' --revoke-key signer.pub "
+     "--not-after 2027 -o vendor.crl\n"
+     "vesk2 crl issue --key vendor.pem --tag 'install (revoke all)' --revoke-key signer.pub "
+     "--not-after 2027 --grant --import",
      DefineCrlIssue},
     {"crl", "import", "Offer lists to the store", "vesk2 crl import vendor.crl", DefineCrlImport},
     {"crl", "show", "Show what a list revokes", "vesk2 crl show vendor.crl", DefineCrlShow},
@@ -85,6 +107,8 @@ constexpr Command kCommands[] = {
      "vesk2 tag check '(install (app calc))' '(install)'", DefineTagCheck},
     {"show", "", "Show any object: a key, a certificate, a list, a manifest, a tag",
      "vesk2 show signer.cert\nvesk2 show --json app.manifest\nvesk2 show --advanced -", DefineShow},
+    {"store", "show", "Show where the stores are and what they hold", "vesk2 store show",
+     DefineStoreShow},
     {"version", "", "Show the version of the command and the library", "vesk2 version",
      DefineVersion},
     {"completion", "", "Write a script that completes commands in a shell",
