@@ -262,7 +262,7 @@ void EditMaker::Widen(std::vector<Edit>& edits, const EntryEvidence& each) const
   Edit edit;
   edit.target = edit.file = each.file;
   edit.entry = MakeEntry(
-      {Ref<PublicKey>::Share(key), pass || old.GetPropagate(), ParseTag(tag), limits.Parse()});
+      {Ref<ZvVesk2::Subject>::Share(key), pass || old.GetPropagate(), ParseTag(tag), limits.Parse()});
   edit.cost = retag ? 3 : 1;
   edit.remedy = {"acl-entry",
                  "replace " + EntryName(each) + ": " +
@@ -289,7 +289,7 @@ void EditMaker::FillGrant(Edit& edit, PublicKey* key, const Words& who, const st
     name = base + "-" + std::to_string(i);
   }
   edit.file = name + kExtension;
-  edit.entry = MakeEntry({Ref<PublicKey>::Share(key), propagate, ParseTag(tag)});
+  edit.entry = MakeEntry({Ref<ZvVesk2::Subject>::Share(key), propagate, ParseTag(tag)});
   Words command = {"vesk2", "acl", "grant"};
   Append(command, who);
   Append(command, {"--tag", tag});
