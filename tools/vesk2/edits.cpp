@@ -261,8 +261,8 @@ void EditMaker::Widen(std::vector<Edit>& edits, const EntryEvidence& each) const
 
   Edit edit;
   edit.target = edit.file = each.file;
-  edit.entry = MakeEntry(
-      {Ref<ZvVesk2::Subject>::Share(key), pass || old.GetPropagate(), ParseTag(tag), limits.Parse()});
+  edit.entry = MakeEntry({Ref<ZvVesk2::Subject>::Share(key), pass || old.GetPropagate(),
+                          ParseTag(tag), limits.Parse()});
   edit.cost = retag ? 3 : 1;
   edit.remedy = {"acl-entry",
                  "replace " + EntryName(each) + ": " +

@@ -229,9 +229,11 @@ std::vector<Remedy> NewKeys(const Evidence& evidence) {
   std::vector<Remedy> remedies;
   for (size_t i = 0; i < states.size(); ++i) {
     if (states[i] != Cert::KeyRevoked) continue;
-    remedies.push_back({"new-key", SubjectText(*evidence.certs[i].cert->GetSubject()) +
-                                       " is revoked: its holder needs a new key, and "
-                                       "certificates for it"});
+    const std::string text = SubjectText(*evidence.certs[i].cert->GetSubject()) +
+                             " is revoked: its holder needs a new key, and certificates for it";
+    const bool named = std::any_of(remedies.begin(), remedies.end(),
+                                   [&](const Remedy& each) { return each.text == text; });
+    if (!named) remedies.push_back({"new-key", text});
   }
   return remedies;
 }
