@@ -236,7 +236,7 @@ std::string CodeWords(int code) {
       {VESK2_ERR_HASH_MATCH, "the listing is not the one that was signed"},
       {VESK2_ERR_RANDOM_TOKEN, "the random token is not of 4 bytes"},
       {VESK2_ERR_TIME_STAMP, "not a time"},
-      {VESK2_ERR_SIGNING_CERT_ORDER, "the second certificate is not the signer's own"},
+      {VESK2_ERR_SIGNING_CERT_ORDER, "the second certificate is revoked, or not the signer's own"},
       {VESK2_ERR_MANIFEST_VERSION, "a manifest version other than 1"},
       {VESK2_ERR_MANIFEST_TYPE, "a manifest type other than plain"},
       {VESK2_ERR_CERT_REVOKED, "a certificate that is needed is revoked"},
