@@ -1,7 +1,7 @@
-// AclEntry: building one entry, reading it from canonical text, and the reader of the reduction's
-// answer, which is a list of entries.
+// AclEntry: building one entry, and reading it from canonical text.
 #include <vesk2/acl_entry.h>
 
+#include "src/objects/granted_tag.h"
 #include "src/trust/lists.h"
 
 namespace ZvVesk2 {
@@ -160,27 +160,9 @@ int AclEntry::ImportRest(Parts& parts, ZvBuffer* buffer) const {
   return buffer->Expect(")");
 }
 
-// ---- The reduction's answer ----
-
-// (3:acl(5:entry SUBJECT [(9:propagate)] TAG ...)...). The reduction writes no version; where there
-// is one it is taken for the subject and the subject for the tag, and callers rely on that form
-// only.
 int AclEntry::ParseTagCanonical(SExpression*& out, unsigned char* data, unsigned int length,
                                 Vesk2ContextStruct* ctx) {
-  VESK2_REQUIRE(out == nullptr && data != nullptr && length != 0, VESK2_ERR_INVALID_PARAM);
-  unsigned int pos = 0;
-  VESK2_TRY(DExpression::Expect("(3:acl(5:entry", data, length, pos));
-  Ref<DExpression> subject;
-  VESK2_TRY(SExpression::ParseCanonical(subject.Out(), data, length, pos, ctx));
-  // One digit tells (9:propagate) from a tag.
-  if (length - pos > 1 && data[pos + 1] == '9') {
-    Ref<DExpression> flag;
-    VESK2_TRY(SExpression::ParseCanonical(flag.Out(), data, length, pos, ctx));
-  }
-  Ref<DExpression> tag;
-  VESK2_TRY(SExpression::ParseCanonical(tag.Out(), data, length, pos, ctx));
-  out = static_cast<SExpression*>(tag.Release());
-  return 0;
+  return ReadGrantedTag(out, data, length, ctx);
 }
 
 }  // namespace ZvVesk2

@@ -9,13 +9,13 @@
 #include <memory>
 #include <string_view>
 
-#include <vesk2/acl_entry.h>
 #include <vesk2/ref.h>
 
 #include "src/engine/interface/interface.h"
 #include "src/engine/owned.h"
 #include "src/engine/reduce.h"
 #include "src/frame/check.h"
+#include "src/objects/granted_tag.h"
 
 namespace ZvVesk2::Verify {
 namespace {
@@ -86,7 +86,7 @@ int ReductA(Vesk2ContextStruct* ctx, SExpression* acl, SExpression* sequence, SE
   VESK2_REQUIRE(!IsEmpty(granted), VESK2_ERR_NOT_AUTHORIZED);
   // The first entry decides, whatever the others grant.
   Ref<SExpression> tag;
-  VESK2_TRY(AclEntry::ParseTagCanonical(tag.Out(), granted.bytes.get(), granted.length, ctx));
+  VESK2_TRY(ReadGrantedTag(tag.Out(), granted.bytes.get(), granted.length, ctx));
   return requestedTag->IsSubset(tag.get()) ? 0 : VESK2_ERR_PACKAGE_NOT_GRANTED;
 }
 
