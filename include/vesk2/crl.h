@@ -20,6 +20,8 @@
 
 namespace ZvVesk2 {
 
+class Hash;
+
 class VESK2_API Crl : public SExpression {
  public:
   explicit Crl(Vesk2ContextStruct* context);
@@ -35,6 +37,17 @@ class VESK2_API Crl : public SExpression {
   // BuildSExpression rebuilds the list from the fields. VESK2_ERR_PARAM_NULL while they are empty.
   [[nodiscard]] int BuildSExpression();
 
+  // Create makes a list that revokes nothing yet; `out` must be null. RevokeCertificate and
+  // RevokeKey add (item <digest> <date>) to list1 and list2, sharing both: the digest of the
+  // certificate as it stands in its file, of the key without display hints, by any algorithm of
+  // Hash. A list that was verified counts as unverified again. VESK2_ERR_INVALID_PARAM,
+  // VESK2_ERR_MEM_ALLOC.
+  [[nodiscard]] static int Create(Crl*& out, Vesk2ContextStruct* context);
+  [[nodiscard]] int RevokeCertificate(Hash* digest, TimeStamp* from);
+  [[nodiscard]] int RevokeKey(Hash* digest, TimeStamp* from);
+  // RevokeAllOf adds the items of another list, shared.
+  [[nodiscard]] int RevokeAllOf(const Crl* other);
+
   // The two lists, borrowed; each is headed by its keyword.
   SExpression* GetList1() const { return list1; }
   SExpression* GetList2() const { return list2; }
@@ -44,6 +57,7 @@ class VESK2_API Crl : public SExpression {
 
  private:
   friend class CrlSequence;
+  void ForgetVoucher();
   SExpression* list1 = nullptr;
   SExpression* list2 = nullptr;
   SExpression* issuerTag = nullptr;
@@ -74,6 +88,10 @@ class VESK2_API CrlSequence : public SExpression {
   [[nodiscard]] int Import(const char* path);
   [[nodiscard]] int Import(ZvBuffer* buffer);
   using SExpression::Import;
+  // Create puts a list, the certificate for its hash and that certificate's signature together, all
+  // shared; nothing is checked. `out` must be null. VESK2_ERR_INVALID_PARAM, VESK2_ERR_MEM_ALLOC.
+  [[nodiscard]] static int Create(CrlSequence*& out, Crl* crl, Cert* cert, Signature* signature,
+                                  Vesk2ContextStruct* context);
   // BuildSExpression rebuilds the list from the fields. VESK2_ERR_PARAM_NULL while they are empty.
   [[nodiscard]] int BuildSExpression();
 
