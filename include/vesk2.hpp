@@ -14,6 +14,7 @@
 #include <vesk2/limits.h>
 #include <vesk2/manifest.h>
 #include <vesk2/manifest_body.h>
+#include <vesk2/manifest_writer.h>
 #include <vesk2/platform.h>
 #include <vesk2/pointer_array.h>
 #include <vesk2/public_key.h>
