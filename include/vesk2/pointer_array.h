@@ -19,8 +19,8 @@ class VESK2_API PointerArray {
   PointerArray(const PointerArray&) = delete;
   PointerArray& operator=(const PointerArray&) = delete;
 
-  // push appends and takes ownership; grows by 32 slots. 1, or 0 without memory (the element is
-  // then still the caller's).
+  // push appends and takes ownership. 1, or 0 without memory (the element is then still the
+  // caller's).
   int push(T* element);
   // get(0): the element at the cursor. Negative: that element, then the cursor moves on. Positive:
   // the cursor moves on, then its element. Null at and past the end.
@@ -36,13 +36,14 @@ class VESK2_API PointerArray {
   void clear();
 
   uint32_t GetCount() const { return count; }
-  uint32_t GetCapacity() const { return capacity; }
+  // GetCapacity grows by steps of 32 with the count; the memory beneath grows by doubling.
+  uint32_t GetCapacity() const { return (count + 31) / 32 * 32; }
   uint32_t GetCursor() const { return cursor; }
 
  private:
   T** items = nullptr;
   uint32_t count = 0;
-  uint32_t capacity = 0;
+  uint32_t slots = 0;  // that `items` has
   uint32_t cursor = 0;
   bool ownsArrays = false;
 };

@@ -1,5 +1,5 @@
-// PointerArray: the growable arrays of a manifest body. Growth is by a fixed step, not by doubling:
-// the capacity is visible to callers.
+// PointerArray: the growable arrays of a manifest body. Callers see a capacity that grows by a
+// fixed step; memory that did would be copied once for every 32 files of a directory.
 #include <vesk2/pointer_array.h>
 
 #include <algorithm>
@@ -13,19 +13,21 @@
 namespace ZvVesk2 {
 namespace {
 
-constexpr uint32_t kGrowth = 32;
+constexpr uint32_t kFirstSlots = 8;  // most directories are small
 
 }  // namespace
 
 template <typename T>
 int PointerArray<T>::push(T* element) {
-  if (count == capacity) {
-    T** const grown = TryNewArray<T*>(size_t{capacity} + kGrowth);
+  if (count == slots) {
+    if (slots > UINT32_MAX / 2) return 0;
+    const uint32_t more = slots > 0 ? 2 * slots : kFirstSlots;
+    T** const grown = TryNewArray<T*>(more);
     if (grown == nullptr) return 0;
     std::copy_n(items, count, grown);
     delete[] items;
     items = grown;
-    capacity += kGrowth;
+    slots = more;
   }
   items[count++] = element;
   return 1;
@@ -61,7 +63,7 @@ void PointerArray<T>::clear() {
   }
   delete[] items;
   items = nullptr;
-  count = capacity = cursor = 0;
+  count = slots = cursor = 0;
 }
 
 template class PointerArray<BodyObject>;
