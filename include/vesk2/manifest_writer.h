@@ -9,8 +9,9 @@
 //   writer.OpenDirectory("lib"); ... writer.CloseDirectory();
 //   writer.EndBody();
 //   writer.SignedDigest(subject, ZVCLM_HASH_SHA256);
-//   writer.AddCertificate(cert, signature);      // for `subject`, then those that speak for its
-//   issuer writer.AddList(list); writer.Write(stream);
+//   writer.AddCertificate(cert, signature);      // for `subject`; then those for its issuer
+//   writer.AddList(list);
+//   writer.Write(stream);
 //
 // What it writes is what Manifest reads; it refuses what Manifest would refuse by its form.
 #ifndef VESK2_MANIFEST_WRITER_H
