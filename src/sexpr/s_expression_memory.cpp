@@ -72,16 +72,9 @@ class MemoryReader {
       VESK2_TRY(Look());
       if (buf_[pos_] == ')') return DExpression::Expect(")", buf_, size_, pos_);
       const bool nested = buf_[pos_] == '(';
-      SExpression* const foundBefore = search_ != nullptr ? search_->found : nullptr;
       VESK2_TRY(nested ? ReadList(element, level + 1) : ReadString(element));
-      if (const int code = list.Insert(element.get())) {
-        if (search_ == nullptr) return code;
-        // A search goes on without an element that could not be kept, and without what was found
-        // in it.
-        search_->found = foundBefore;
-        element.Reset();
-        continue;
-      }
+      // A list that lost an element would be another one, and as a tag a wider one.
+      VESK2_TRY(list.Insert(element.get()));
       if (nested && search_ != nullptr) search_->Test(element.get());
       (void)element.Release();
     }
