@@ -84,8 +84,8 @@ class VESK2_API DExpression {
   void IncrementRefCount();
   void Free();
 
-  // IsEqual tells whether both have the same canonical encoding without hints (their SHA-256
-  // digests are compared). False for null, and when hashing fails.
+  // IsEqual tells whether both have the same canonical encoding without hints. False for null; a
+  // list nested too deeply equals nothing, not even itself.
   bool IsEqual(DExpression* other);
 
   // ComputeHash makes a new array with the digest of the canonical bytes; free it with Vesk2Free.
@@ -277,7 +277,7 @@ class VESK2_API SExpression : public DExpression {
   [[nodiscard]] static int ParseCanonical(DExpression*& out, unsigned char* buf, unsigned int size,
                                           unsigned int& pos, Vesk2ContextStruct* context);
   // ParseCanonical2 also points `found` (borrowed) at the last nested list, in the order in which
-  // lists close, whose first element is `tag`.
+  // lists close, whose first element is `tag`. After a failure `found` is as it was.
   [[nodiscard]] static int ParseCanonical2(DExpression*& out, unsigned char* buf, unsigned int size,
                                            unsigned int& pos, const char* tag, SExpression*& found,
                                            Vesk2ContextStruct* context);

@@ -1,5 +1,5 @@
-// What byte strings and lists have in common: counting, equality by digest, and the literal match
-// of the memory readers.
+// What byte strings and lists have in common: counting, equality, digests, and the literal match of
+// the memory readers.
 #include <vesk2/expression.h>
 
 #include <cstring>
@@ -8,6 +8,7 @@
 #include "src/frame/check.h"
 #include "src/frame/handles.h"
 #include "src/sexpr/same.h"
+#include "src/sexpr/walk.h"
 
 namespace ZvVesk2 {
 
@@ -26,18 +27,37 @@ bool DExpression::IsEqual(DExpression* other) {
   return CompareValues(equal, this, other) == 0 && equal;
 }
 
+namespace {
+
+bool SameBytes(const DExpression* a, const DExpression* b) {
+  const auto* first = static_cast<const ByteString*>(a);
+  const auto* second = static_cast<const ByteString*>(b);
+  if (first->GetLength() != second->GetLength()) return false;
+  return first->GetLength() == 0 ||
+         std::memcmp(first->GetData(), second->GetData(), first->GetLength()) == 0;
+}
+
+}  // namespace
+
+// Equal structure and equal encoding without hints are one: every length is written before its
+// bytes. So both are walked in step, up to the first difference.
 int CompareValues(bool& equal, DExpression* a, DExpression* b) {
   equal = false;
-  if (a == nullptr || b == nullptr) return 0;
-  // Equal encodings are equally long; this spares most comparisons two digests.
-  if (a->CanonicalLength() != b->CanonicalLength()) return 0;
-  unsigned char* digests[2] = {};
-  unsigned int lengths[2] = {};
-  VESK2_TRY(a->ComputeHash(digests[0], lengths[0], ZVCLM_HASH_SHA256, true));
-  const std::unique_ptr<unsigned char[]> first(digests[0]);
-  VESK2_TRY(b->ComputeHash(digests[1], lengths[1], ZVCLM_HASH_SHA256, true));
-  const std::unique_ptr<unsigned char[]> second(digests[1]);
-  equal = lengths[0] == lengths[1] && std::memcmp(digests[0], digests[1], lengths[0]) == 0;
+  if (a == nullptr || b == nullptr || a->IsSExpression() != b->IsSExpression()) return 0;
+  if (!a->IsSExpression()) {
+    equal = SameBytes(a, b);
+    return 0;
+  }
+  Walk first(static_cast<SExpression*>(a));
+  Walk second(static_cast<SExpression*>(b));
+  while (true) {
+    const Walk::Step step = first.Next();
+    if (second.Next() != step) return 0;
+    VESK2_REQUIRE(step != Walk::Step::TooDeep, VESK2_ERR_BUFFER_OVERFLOW);
+    if (step == Walk::Step::End) break;
+    if (step == Walk::Step::Atom && !SameBytes(first.Value(), second.Value())) return 0;
+  }
+  equal = true;
   return 0;
 }
 

@@ -6,8 +6,10 @@
 
 namespace ZvVesk2 {
 
-// CompareValues is DExpression::IsEqual with the failures of hashing reported: where "not equal"
-// would mean "not revoked", a lack of memory must not pass for it. Null equals nothing.
+// CompareValues is DExpression::IsEqual, but says when it cannot tell: where "not equal" would mean
+// "not revoked", that must not pass for it. It allocates nothing and stops at the first difference;
+// values that are the same down to lists nested too deeply give VESK2_ERR_BUFFER_OVERFLOW. Null
+// equals nothing.
 [[nodiscard]] int CompareValues(bool& equal, DExpression* a, DExpression* b);
 
 }  // namespace ZvVesk2

@@ -1,6 +1,6 @@
 // The one walk over a list and all lists within it. Every operation on a whole expression (hashing,
-// measuring, writing) is a loop over its steps, so none of them recurses: readers bound how deeply
-// lists nest, but a caller can insert list into list without end.
+// measuring, writing, comparing) is a loop over its steps, so none of them recurses: readers bound
+// how deeply lists nest, but a caller can insert list into list without end.
 #ifndef VESK2_SRC_SEXPR_WALK_H
 #define VESK2_SRC_SEXPR_WALK_H
 

@@ -11,6 +11,7 @@
 
 #include <gtest/gtest.h>
 
+#include "src/sexpr/same.h"
 #include "tests/support/test_object.h"
 #include "tests/support/test_text.h"
 
@@ -111,7 +112,52 @@ TEST(SExpression, ElementsAreShared) {
   EXPECT_EQ(Canonical(shared), "(1:b(1:c))") << "it keeps its own elements";
 }
 
+// The digests of the texts without hints are the oracle.
+TEST(SExpression, EqualityIsThatOfTheCanonicalTextWithoutHints) {
+  const char* const texts[] = {kHinted,
+                               kPlain,
+                               "()",
+                               "(0:)",
+                               "(())",
+                               "(()())",
+                               "((()))",
+                               "(1:a)",
+                               "([num]1:a)",
+                               "((1:a))",
+                               "(1:b)",
+                               "(2:ab)",
+                               "(1:a1:b)",
+                               "(1:a1:b())",
+                               "(1:a(1:b))",
+                               "((1:a)1:b)",
+                               "((1:a1:b))",
+                               "((1:a)(1:b))",
+                               "([bin]1:a([utf-8]1:b))",
+                               "(3:1:a)",
+                               "(0:1:a)",
+                               "(1:a0:)"};
+  for (const char* left : texts) {
+    for (const char* right : texts) {
+      const Ref<SExpression> lists[] = {Parse(left), Parse(right)};
+      std::string digests[2];
+      for (const int i : {0, 1}) {
+        unsigned char* out = nullptr;
+        unsigned length = 0;
+        ASSERT_EQ(lists[i]->ComputeHash(out, length, ZVCLM_HASH_SHA256, true), 0);
+        digests[i] = Text(out, length);
+      }
+      EXPECT_EQ(lists[0]->IsEqual(lists[1].get()), digests[0] == digests[1]) << left << right;
+    }
+  }
+  const Ref<SExpression> list = Parse("(1:a)");
+  const Ref<ByteString> text = Make("(1:a)");
+  EXPECT_FALSE(list->IsEqual(text.get()) || text->IsEqual(list.get()));
+  EXPECT_FALSE(list->IsEqual(list->First()) || list->First()->IsEqual(list.get()));
+  EXPECT_FALSE(list->IsEqual((DExpression*)nullptr));
+}
+
 TEST(SExpression, NestingThatACallerBuildsIsRefusedNotFollowed) {
+  const Ref<SExpression> flat = Parse("(1:x)");
   for (const int levels : {256, 257, 100000}) {
     Ref<SExpression> list(new SExpression(nullptr));
     for (int i = 1; i < levels; ++i) {
@@ -125,7 +171,17 @@ TEST(SExpression, NestingThatACallerBuildsIsRefusedNotFollowed) {
     EXPECT_EQ(list->Export(buffer, pos, sizeof buffer), expected);
     EXPECT_EQ(list->Export(out, length), expected);
     delete[] out;
+    // Not even itself; but what differs before the depth is different for certain.
+    bool equal = true;
+    EXPECT_EQ(CompareValues(equal, list.get(), list.get()), expected);
+    EXPECT_EQ(equal, expected == 0);
     EXPECT_EQ(list->IsEqual(list.get()), expected == 0);
+    for (const bool swapped : {false, true}) {
+      equal = true;
+      EXPECT_EQ(CompareValues(equal, (swapped ? flat : list).get(), (swapped ? list : flat).get()),
+                0);
+      EXPECT_FALSE(equal);
+    }
     EXPECT_EQ(std::unique_ptr<char[]>(list->ExportTag(nullptr)) != nullptr, expected == 0);
     list->PrintAdvanced([](const char*, unsigned, void*) { return 0; }, nullptr, 0);
   }  // freed here, however deep
