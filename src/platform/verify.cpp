@@ -1,10 +1,11 @@
-// Signature checks. The answer is "not valid" until libcrypto says otherwise, in one place.
+// Signature checks. The answer is "not valid" until it is proved otherwise.
 //
 // libcrypto answers a bad signature and a lack of memory alike, with "no". Taken for "not valid",
 // the second would leave a revocation list unread, and the keys on it in use. So a key or signature
 // that cannot be good is refused here, by its numbers, before libcrypto sees it (they could also
-// keep its arithmetic busy for minutes). What libcrypto then fails to prepare is a lack of memory,
-// and its "no" counts only with the reason that a bad signature leaves behind.
+// keep its arithmetic busy for minutes). What libcrypto then fails to prepare is a lack of memory.
+// Of a PKCS #1 signature libcrypto only takes the block out, which cannot fail otherwise; in the
+// other schemes its "no" counts only with the reason that a bad signature leaves behind.
 #include <openssl/bn.h>
 #include <openssl/dsa.h>
 #include <openssl/rsa.h>
@@ -12,6 +13,7 @@
 #include <algorithm>
 #include <array>
 #include <span>
+#include <string_view>
 
 #include <vesk2/limits.h>
 
@@ -67,7 +69,7 @@ bool FindVerdict() {
   return found;
 }
 
-// The DSA code answers 0 for a bad signature only, and leaves no reason; the RSA code for anything.
+// The DSA code answers 0 for a bad signature only, and leaves no reason; the PSS code for anything.
 enum class Zero { kIsNo, kNeedsReason };
 
 int Ask(bool* good, EVP_PKEY_CTX* context, Bytes digest, Bytes signature, Zero zero) {
@@ -79,11 +81,15 @@ int Ask(bool* good, EVP_PKEY_CTX* context, Bytes digest, Bytes signature, Zero z
   return told ? 0 : ZVCLM_ERR_NO_MEM;
 }
 
+PkeyContext MakeContext(const ZVCLMPublicKeyData& key) {
+  const PkeyOwner pkey = MakePkey(key);
+  return PkeyContext(pkey != nullptr ? EVP_PKEY_CTX_new_from_pkey(nullptr, pkey.get(), nullptr)
+                                     : nullptr);
+}
+
 // A context that is ready to verify with `key`, which libcrypto takes whatever its numbers are.
 PkeyContext StartVerify(const ZVCLMPublicKeyData& key) {
-  const PkeyOwner pkey = MakePkey(key);
-  if (pkey == nullptr) return nullptr;
-  PkeyContext context(EVP_PKEY_CTX_new_from_pkey(nullptr, pkey.get(), nullptr));
+  PkeyContext context = MakeContext(key);
   if (context == nullptr || EVP_PKEY_verify_init(context.get()) != 1) return nullptr;
   return context;
 }
@@ -107,27 +113,85 @@ bool FitsModulus(Bytes signature, const BIGNUM* n) {
          std::ranges::lexicographical_compare(signature, Bytes(modulus).first(length));
 }
 
+// ---- RSA, PKCS #1 version 1.5 ----
+
+// What stands before the digest in a signed block: the hash's name in DER, its parameters NULL.
+struct DigestName {
+  uint32_t hash;
+  std::string_view der;
+};
+constexpr DigestName kDigestNames[] = {
+    {ZVCLM_HASH_SHA1, {"\x30\x21\x30\x09\x06\x05\x2b\x0e\x03\x02\x1a\x05\x00\x04\x14", 15}},
+    {ZVCLM_HASH_SHA256,
+     {"\x30\x31\x30\x0d\x06\x09\x60\x86\x48\x01\x65\x03\x04\x02\x01\x05\x00\x04\x20", 19}},
+    {ZVCLM_HASH_RMD160, {"\x30\x21\x30\x09\x06\x05\x2b\x24\x03\x02\x01\x05\x00\x04\x14", 15}}};
+
+using Block = std::array<unsigned char, kMaxModulus>;
+
+// Whether the block is the one that there is for the digest:
+//   00 01 ff...ff 00 <name> <digest>      with eight or more ff
+// Nothing of it is parsed: there is no second way to write it that somebody could hide in.
+bool IsBlockOf(Bytes block, uint32_t hash, Bytes digest) {
+  constexpr size_t kFrame = 3 + 8;
+  const auto* const name = std::ranges::find(kDigestNames, hash, &DigestName::hash);
+  if (name == std::end(kDigestNames)) return false;
+  const size_t content = name->der.size() + digest.size();
+  if (block.size() < kFrame + content) return false;
+  Block expected;
+  expected.fill(0xff);
+  unsigned char* at = expected.data() + block.size() - content;
+  expected[0] = 0;
+  expected[1] = 1;
+  at[-1] = 0;
+  at = std::ranges::copy(name->der, at).out;
+  std::ranges::copy(digest, at);
+  return std::ranges::equal(block, Bytes(expected).first(block.size()));
+}
+
+int VerifyPkcs1(bool* good, const ZVCLMPublicKeyData& key, uint32_t hash, Bytes digest,
+                Bytes signature) {
+  const PkeyContext context = MakeContext(key);
+  if (context == nullptr || EVP_PKEY_verify_recover_init(context.get()) != 1 ||
+      EVP_PKEY_CTX_set_rsa_padding(context.get(), RSA_NO_PADDING) != 1) {
+    return ZVCLM_ERR_NO_MEM;
+  }
+  Block block;
+  size_t length = block.size();
+  if (EVP_PKEY_verify_recover(context.get(), block.data(), &length, signature.data(),
+                              signature.size()) != 1) {
+    return ZVCLM_ERR_NO_MEM;
+  }
+  *good = IsBlockOf(Bytes(block).first(length), hash, digest);
+  return 0;
+}
+
+// ---- RSA, PSS ----
+
 // Any salt length is taken: the signer chose it. The mask uses the digest's hash.
-bool SetRsaScheme(EVP_PKEY_CTX* context, int scheme, const EVP_MD* hash) {
-  const bool pss = scheme == ZVCLM_SCHEME_RSA_PSS;
-  const int padding = pss ? RSA_PKCS1_PSS_PADDING : RSA_PKCS1_PADDING;
-  if (EVP_PKEY_CTX_set_rsa_padding(context, padding) != 1) return false;
-  if (EVP_PKEY_CTX_set_signature_md(context, hash) != 1) return false;
-  if (!pss) return true;
-  return EVP_PKEY_CTX_set_rsa_mgf1_md(context, hash) == 1 &&
+bool SetPss(EVP_PKEY_CTX* context, const EVP_MD* hash) {
+  return EVP_PKEY_CTX_set_rsa_padding(context, RSA_PKCS1_PSS_PADDING) == 1 &&
+         EVP_PKEY_CTX_set_signature_md(context, hash) == 1 &&
+         EVP_PKEY_CTX_set_rsa_mgf1_md(context, hash) == 1 &&
          EVP_PKEY_CTX_set_rsa_pss_saltlen(context, RSA_PSS_SALTLEN_AUTO) == 1;
+}
+
+int VerifyPss(bool* good, const ZVCLMPublicKeyData& key, uint32_t hashId, Bytes digest,
+              Bytes signature) {
+  const MdOwner hash(EVP_MD_fetch(nullptr, HashName(hashId), nullptr));
+  const PkeyContext context = StartVerify(key);
+  if (hash == nullptr || context == nullptr) return ZVCLM_ERR_NO_MEM;
+  if (!SetPss(context.get(), hash.get())) return ZVCLM_ERR_NO_MEM;
+  return Ask(good, context.get(), digest, signature, Zero::kNeedsReason);
 }
 
 int VerifyRsa(bool* good, const ZVCLMPublicKeyData& key, int scheme,
               const ZVCLMRSAParameters& parameters, Bytes digest, Bytes signature) {
-  const uint32_t hashId = parameters.words[3];
-  if (!WithinRsaLimits(key) || digest.empty() || digest.size() != HashLength(hashId)) return 0;
+  const uint32_t hash = parameters.words[3];
+  if (!WithinRsaLimits(key) || digest.empty() || digest.size() != HashLength(hash)) return 0;
   if (!FitsModulus(signature, key.number(kRsaN))) return 0;
-  const MdOwner hash(EVP_MD_fetch(nullptr, HashName(hashId), nullptr));
-  const PkeyContext context = StartVerify(key);
-  if (hash == nullptr || context == nullptr) return ZVCLM_ERR_NO_MEM;
-  if (!SetRsaScheme(context.get(), scheme, hash.get())) return ZVCLM_ERR_NO_MEM;
-  return Ask(good, context.get(), digest, signature, Zero::kNeedsReason);
+  const bool pss = scheme == ZVCLM_SCHEME_RSA_PSS;
+  return pss ? VerifyPss(good, key, hash, digest, signature)
+             : VerifyPkcs1(good, key, hash, digest, signature);
 }
 
 // ---- DSA ----

@@ -31,6 +31,10 @@ Big Parameter(const TestKey& key, const char* name) {
   EXPECT_EQ(EVP_PKEY_get_bn_param(key.Pkey(), name, &number), 1);
   return {number, BN_free};
 }
+Big ToNumber(const std::string& bytes) {
+  const auto* data = reinterpret_cast<const unsigned char*>(bytes.data());
+  return {BN_bin2bn(data, static_cast<int>(bytes.size()), nullptr), BN_free};
+}
 
 std::string ToBytes(const Big& number) {
   std::string bytes(static_cast<size_t>(BN_num_bytes(number.get())), '\0');
@@ -151,6 +155,128 @@ TEST(KeyTest, TellsANoFromALackOfMemory) {
       }
     }
   }
+}
+
+// A key that signs any block, whatever is in it. One prime is modulus enough: a check cannot tell.
+class BlockKey {
+ public:
+  explicit BlockKey(size_t size) : size_(size) {
+    const Big order(BN_new(), BN_free);
+    do {
+      BN_generate_prime_ex(n_.get(), static_cast<int>(8 * size), 0, nullptr, nullptr, nullptr);
+      BN_sub(order.get(), n_.get(), BN_value_one());
+    } while (BN_mod_word(order.get(), 65537) == 0);
+    BN_mod_inverse(d_.get(), ToNumber(kE).get(), order.get(), context_.get());
+    key_ = Define({ToBytes(n_), kE});
+  }
+  // Whether the signature that opens to `block` is good.
+  bool Takes(const std::string& block, int scheme, const std::string& digest) const {
+    const Big number(BN_new(), BN_free);
+    BN_mod_exp(number.get(), ToNumber(block).get(), d_.get(), n_.get(), context_.get());
+    std::string signature(size_, '\0');
+    BN_bn2binpad(number.get(), reinterpret_cast<unsigned char*>(signature.data()),
+                 static_cast<int>(size_));
+    return Valid(key_, scheme, ZVCLM_HASH_SHA256, digest, signature);
+  }
+
+ private:
+  inline static const std::string kE = "\1\0\1"s;
+  size_t size_;
+  Big n_{BN_new(), BN_free}, d_{BN_new(), BN_free};
+  std::unique_ptr<BN_CTX, decltype(&BN_CTX_free)> context_{BN_CTX_new(), BN_CTX_free};
+  Key key_;
+};
+
+// The one good block is taken, and no other with anything of it changed.
+void ExpectNoOther(const BlockKey& key, int scheme, std::string block, const std::string& digest) {
+  EXPECT_TRUE(key.Takes(block, scheme, digest));
+  // The top bit of a block is not free: it must stay below the modulus.
+  for (size_t bit = 1; bit < 8 * block.size(); ++bit) {
+    char& byte = block[bit / 8];
+    const char flip = static_cast<char>(0x80 >> bit % 8);
+    byte = static_cast<char>(byte ^ flip);
+    EXPECT_FALSE(key.Takes(block, scheme, digest)) << "bit " << bit;
+    byte = static_cast<char>(byte ^ flip);
+  }
+}
+
+// "00 <type> ff...ff <content>" of `size` bytes.
+std::string Block(size_t size, const std::string& content, char type = 1) {
+  return "\0"s + type + std::string(size - 2 - content.size(), '\xff') + content;
+}
+
+TEST(KeyTest, TakesOnePkcs1BlockOnly) {
+  const std::string digest = Digest("object");
+  const std::string oid = "\x06\x09\x60\x86\x48\x01\x65\x03\x04\x02\x01";
+  const std::string info = "\x30\x31\x30\x0d"s + oid + "\x05\0\x04\x20"s + digest;
+  const std::string sha512 = "\x30\x31\x30\x0d"s + oid.substr(0, 10) + "\x03\x05\0\x04\x20"s;
+  const std::string sha1 = "\x30\x21\x30\x09\x06\x05\x2b\x0e\x03\x02\x1a\x05\0\x04\x14"s;
+  constexpr size_t kSize = 64;
+  const BlockKey key(kSize);
+  const std::string good = Block(kSize, "\0"s + info);
+  ExpectNoOther(key, ZVCLM_SCHEME_RSA_PKCS1, good, digest);
+  const std::pair<const char*, std::string> blocks[] = {
+      {"nothing", Block(kSize, "\0"s)},
+      {"padding only", Block(kSize, "")},
+      {"a bare digest", Block(kSize, "\0"s + digest)},
+      {"no digest", Block(kSize, "\0"s + info.substr(0, 19))},
+      {"a truncated digest", Block(kSize, "\0"s + info.substr(0, info.size() - 1))},
+      {"garbage behind", Block(kSize, "\0"s + info + "x")},
+      {"garbage for padding", Block(kSize, "\0"s + info + std::string(9, 'x'))},
+      {"short padding", Block(kSize, "\0"s + info + "xyz")},
+      {"shorter padding", "\0\1\0"s + info + std::string(kSize - 3 - info.size(), '\0')},
+      {"an encrypted block", Block(kSize, "\0"s + info, 2)},
+      {"type 0", "\0"s + std::string(kSize - 1 - info.size(), '\0') + info},
+      {"no first byte", good.substr(1) + '\0'},
+      {"no NULL", Block(kSize, "\0\x30\x2f\x30\x0b"s + oid + "\x04\x20" + digest)},
+      {"another NULL", Block(kSize, "\0\x30\x32\x30\x0e"s + oid + "\x05\1\0\x04\x20"s + digest)},
+      {"a long length", Block(kSize, "\0\x30\x81\x31"s + info.substr(2))},
+      {"SHA-512's name", Block(kSize, "\0"s + sha512 + digest)},
+      {"SHA-1's name", Block(kSize, "\0"s + sha1 + digest.substr(0, 20))},
+      {"another digest", Block(kSize, "\0"s + info.substr(0, 19) + Digest("other"))},
+      {"zeros", std::string(kSize, '\0')}};
+  for (const auto& [name, block] : blocks) {
+    EXPECT_FALSE(key.Takes(block, ZVCLM_SCHEME_RSA_PKCS1, digest)) << name;
+    EXPECT_FALSE(key.Takes(block, ZVCLM_SCHEME_RSA_PSS, digest)) << name;
+  }
+  // Eight bytes of padding are needed, and fill a block of 62 bytes.
+  for (const size_t size : {61u, 62u}) {
+    const std::string full = Block(size, "\0"s + info);
+    EXPECT_EQ(BlockKey(size).Takes(full, ZVCLM_SCHEME_RSA_PKCS1, digest), size == 62);
+  }
+}
+
+// A PSS block: a mask over zeros, 1 and the salt; the hash of digest and salt; "bc".
+std::string PssBlock(size_t size, const std::string& digest, const std::string& salt,
+                     const char* maskHash = "sha256") {
+  const std::string hash = Digest(std::string(8, '\0') + digest + salt);
+  std::string block(size - hash.size() - salt.size() - 2, '\0');
+  block += '\1' + salt;
+  std::string mask;
+  for (char i = 0; mask.size() < block.size(); ++i) mask += Digest(hash + "\0\0\0"s + i, maskHash);
+  for (size_t i = 0; i < block.size(); ++i) block[i] = static_cast<char>(block[i] ^ mask[i]);
+  block[0] = static_cast<char>(block[0] & 0x7f);
+  return block + hash + '\xbc';
+}
+
+TEST(KeyTest, TakesPssBlocksOfAnySaltOnly) {
+  const std::string digest = Digest("object");
+  constexpr size_t kSize = 72;
+  const BlockKey key(kSize);
+  const auto takes = [&](const std::string& block) {
+    return key.Takes(block, ZVCLM_SCHEME_RSA_PSS, digest);
+  };
+  for (const size_t salt : {0, 20, 38}) {
+    const std::string block = PssBlock(kSize, digest, std::string(salt, 's'));
+    ExpectNoOther(key, ZVCLM_SCHEME_RSA_PSS, block, digest);
+    EXPECT_FALSE(key.Takes(block, ZVCLM_SCHEME_RSA_PKCS1, digest));
+  }
+  EXPECT_FALSE(takes(PssBlock(kSize, digest, "salt", "sha1"))) << "another mask";
+  EXPECT_FALSE(takes(PssBlock(kSize, Digest("other"), "salt")));
+  EXPECT_FALSE(takes('\0' + PssBlock(kSize - 1, digest, "salt"))) << "too short a block";
+  std::string trailer = PssBlock(kSize, digest, "salt");
+  trailer.back() = '\xcc';
+  EXPECT_FALSE(takes(trailer)) << "a trailer that names the hash";
 }
 
 TEST(KeyTest, LeavesTheCallersErrors) {
