@@ -87,13 +87,14 @@ class VESK2_API ThresholdSubject : public Subject {
   ~ThresholdSubject() override;
 
  public:
-  // Import reads exactly n members, which must be public keys.
+  // Import reads exactly n members, which must be public keys. k and n come out as Set writes them,
+  // whatever hint their text had: a signature over counts without the hint "[num]" does not verify.
   int Import(ZvBuffer* buffer) override;
   bool IsThresholdSubject() const override;
   using Subject::Import;
 
-  // Set writes the head of an empty object: the low bytes of k and n go into the list, the full
-  // values into the fields. Insert the members afterwards.
+  // Set writes the head of an empty object: the low bytes of k and n go into the list, with the
+  // hint BsNum, the full values into the fields. Insert the members afterwards.
   [[nodiscard]] int Set(unsigned int k, unsigned int n);
   bool HasMember(Principal* principal);
   // GetSubjects makes a new list that shares the members; the caller frees it.
@@ -103,9 +104,6 @@ class VESK2_API ThresholdSubject : public Subject {
   unsigned int GetN() const { return n; }
 
  private:
-  [[nodiscard]] int SetHead(unsigned int newK, ByteString::BsType hintK, unsigned int newN,
-                            ByteString::BsType hintN);
-
   unsigned int k = 0;
   unsigned int n = 0;
 };

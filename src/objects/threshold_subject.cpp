@@ -15,16 +15,11 @@ SExpression::Iterator Members(const SExpression& list) {
   return element;
 }
 
-// One count: a raw byte, with whatever display hint its text has.
-struct RawCount {
-  unsigned char value;
-  ByteString::BsType hint;
-};
-
-int ReadCount(RawCount& count, ZvBuffer* buffer, ByteString* text) {
+// One count: a raw byte, the first of its text.
+int ReadCount(unsigned int& count, ZvBuffer* buffer, ByteString* text) {
   VESK2_TRY(text->Import(buffer));
   VESK2_REQUIRE(text->GetLength() > 0, VESK2_ERR_PARSE_FILE);
-  count = {text->GetData()[0], text->GetType()};
+  count = text->GetData()[0];
   return 0;
 }
 
@@ -37,19 +32,14 @@ ThresholdSubject::~ThresholdSubject() = default;
 bool ThresholdSubject::IsThresholdSubject() const { return true; }
 
 int ThresholdSubject::Set(unsigned int newK, unsigned int newN) {
-  return SetHead(newK, ByteString::BsNum, newN, ByteString::BsNum);
-}
-
-int ThresholdSubject::SetHead(unsigned int newK, ByteString::BsType hintK, unsigned int newN,
-                              ByteString::BsType hintN) {
   VESK2_REQUIRE(First() == nullptr, VESK2_ERR_INVALID_PARAM);
   const auto byteK = static_cast<unsigned char>(newK);
   const auto byteN = static_cast<unsigned char>(newN);
   Ref<ByteString> textK(TryNew<ByteString>(GetContext()));
   Ref<ByteString> textN(TryNew<ByteString>(GetContext()));
   VESK2_REQUIRE(textK && textN, VESK2_ERR_MEM_ALLOC);
-  VESK2_TRY(textK->Set(&byteK, 1, hintK));
-  VESK2_TRY(textN->Set(&byteN, 1, hintN));
+  VESK2_TRY(textK->Set(&byteK, 1, ByteString::BsNum));
+  VESK2_TRY(textN->Set(&byteN, 1, ByteString::BsNum));
   VESK2_TRY(Insert("k-of-n"));
   VESK2_TRY(Append(this, std::move(textK)));
   VESK2_TRY(Append(this, std::move(textN)));
@@ -59,17 +49,18 @@ int ThresholdSubject::SetHead(unsigned int newK, ByteString::BsType hintK, unsig
 }
 
 // (k-of-n <k> <n> <key>...): "(6:k-of-n" <k> <n> n public keys ")". Only the first byte of each
-// count is read. The hints are kept, since they are part of what was signed.
+// count is read, and the list is the one that Set writes: a certificate verifies when its signer
+// hashed the counts in that form.
 int ThresholdSubject::Import(ZvBuffer* buffer) {
   VESK2_REQUIRE(buffer != nullptr && First() == nullptr, VESK2_ERR_INVALID_PARAM);
   VESK2_TRY(buffer->Expect("(6:k-of-n"));
   Ref<ByteString> text(TryNew<ByteString>(GetContext()));
   VESK2_REQUIRE(text, VESK2_ERR_MEM_ALLOC);
-  RawCount countK{};
-  RawCount countN{};
-  VESK2_TRY(ReadCount(countK, buffer, text.get()));
-  VESK2_TRY(ReadCount(countN, buffer, text.get()));
-  VESK2_TRY(SetHead(countK.value, countK.hint, countN.value, countN.hint));
+  unsigned int newK = 0;
+  unsigned int newN = 0;
+  VESK2_TRY(ReadCount(newK, buffer, text.get()));
+  VESK2_TRY(ReadCount(newN, buffer, text.get()));
+  VESK2_TRY(Set(newK, newN));
   for (unsigned int i = 0; i < n; ++i) {
     Ref<PublicKey> member;
     VESK2_TRY(ImportNew(member, buffer, GetContext()));

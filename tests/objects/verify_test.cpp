@@ -139,8 +139,16 @@ TEST(SignatureTest, OfACertificateIsItsIssuers) {
   const TestKey& key = TestKey::Rsa(0);
   const std::string text = Cert({.issuer = key.Public(), .subject = HashOf("s")});
   const std::string byHash = Cert({.issuer = HashOf(key.Public()), .subject = HashOf("s")});
+  // The counts of a k-of-n are hashed with the hint that they are read into.
+  const auto forAny = [&key](const char* counts) {
+    return Cert({.issuer = key.Public(), .subject = List({Str("k-of-n"), counts, key.Public()})});
+  };
+  const std::string hinted = forAny("[num]1:\1[num]1:\1"), plain = forAny("1:\0011:\1");
   const std::tuple<std::string, std::string, int> cases[] = {
       {text, key.Sign(text), 0},
+      {hinted, key.Sign(hinted), 0},
+      {plain, key.Sign(hinted), 0},
+      {plain, key.Sign(plain), VESK2_ERR_HASH_MISMATCH},
       {text, key.Sign(text + " "), VESK2_ERR_HASH_MISMATCH},
       {text, TestKey::Rsa(1).Sign(text), VESK2_ERR_SIGNATURE},
       // Told apart before any arithmetic: this value is none.

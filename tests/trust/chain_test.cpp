@@ -56,7 +56,7 @@ TEST_F(Chain, Answers) {
   // The reduction would not even read this element.
   const std::string lost = Link(1, Grant(1, KeyText(2), "(ftp)", "1:y0:"));
   const std::string revoked = Link(1, listed), spent = Link(0, 5);
-  const std::string anyOf = Link(0, Grant(0, "(6:k-of-n1:\1" + Str("\1") + KeyText(3) + ")"));
+  const std::string anyOf = Link(0, Grant(0, "(6:k-of-n[num]1:\1[num]1:\1" + KeyText(3) + ")"));
   const std::string another = cert + TestKey::Rsa(1).Sign(cert) + "()";
   const std::string elsewhere = cert + TestKey::Rsa(2).Sign(listed) + "()";
   Revoke(Item(HashOf(listed)), Item(HashOf(KeyText(5))));
