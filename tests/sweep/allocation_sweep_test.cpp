@@ -3,6 +3,7 @@
 // outputs null and leak nothing (the asan preset looks). It answers what it answers with all the
 // memory it wants, or that memory was lacking: never "no" instead of "yes" or the reverse.
 #include <gtest/gtest.h>
+#include <openssl/err.h>
 
 #include <vesk2/platform.h>
 #include <algorithm>
@@ -565,11 +566,16 @@ void Sweep(const Case& row, Shortage shortage) {
   const long sparse = shortage == Shortage::kLasting ? 10 : kMost;
   for (long n = 0; fired != Fired::kNot && n < kMost; n += 1 + n / sparse) {
     const Operation operation = row.prepare();
+    constexpr int kCallers = 8;
+    ERR_raise(ERR_LIB_USER, kCallers);
     Arm(n, shortage);
     const Outcome outcome = operation();
     fired = Disarm();
     SCOPED_TRACE("allocation " + std::to_string(n) + ", code " + std::to_string(outcome.code));
     EXPECT_TRUE(outcome.outputsFit);
+    // What libcrypto told the library stays inside it.
+    EXPECT_EQ(ERR_GET_REASON(ERR_get_error()), kCallers);
+    EXPECT_EQ(ERR_get_error(), 0u);
     // libcrypto has another way to the same answer here and there.
     const bool mayPass = fired != Fired::kLibrary || row.manages;
     EXPECT_TRUE(outcome.code == 0 ? mayPass : TellsOfShortage(outcome.code));
