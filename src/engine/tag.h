@@ -2,7 +2,9 @@
 //
 // "(*)" allows everything, (* set ...) what a member allows, (* prefix ...) and (* range ...)
 // strings; a longer list is narrower than its own beginning. Two sets never compare as equal or
-// within one another; the algebra only ever errs towards granting less.
+// within one another: that errs towards granting less. A bound of more than two items does not:
+// (* range numeric (le 5 x)) allows no string, but, as if the x were not there, the range
+// (* range numeric (ge 1) (le 3)).
 #ifndef VESK2_SRC_ENGINE_TAG_H
 #define VESK2_SRC_ENGINE_TAG_H
 

@@ -80,6 +80,7 @@ TEST_F(Tags, RelationsAndIntersections) {
        "03));"
        "(* prefix ab) | (* range alpha (ge abc)) | (* range alpha (ge abc) (l ac))"},
       {1, 2,
+       "(* range numeric (ge 1) (le 3)) | (* range numeric (le 5 x));"
        "(* range numeric (g 5)) | (* range numeric (ge 5)); (* range date (ge 2010)) | (* range "
        "date);"
        "(* range binary (l 5)) | (* range binary (le 5)); (* range alpha (ge b)) | (* range alpha "
@@ -113,6 +114,21 @@ TEST_F(Tags, RelationsAndIntersections) {
   EXPECT_EQ(SPKI_REL_DISJOINT, Relation(set, nullptr));
   EXPECT_EQ(nullptr, spki_intersect_set(&engine_, Elem("(x)"), Elem("(*)")));
   EXPECT_EQ(nullptr, spki_intersect_elem(&engine_, nullptr, set));
+}
+
+// What the value of an element holds goes by its kind, whatever would fit the bits.
+TEST_F(Tags, NoKeywordIsReadOutOfAnotherKind) {
+  const spki_elem* set = Elem("(* set a)");
+  spki_elem* word = set->value.list->next;
+  word->kind = SPKI_ELEM_LIST;
+  EXPECT_EQ(SPKI_TAG_LIST, spki_classify(set));
+  word->kind = SPKI_ELEM_STRING;
+  EXPECT_EQ(SPKI_TAG_SET, spki_classify(set));
+  const spki_elem* bound = Elem("(ge 5)");
+  bound->value.list->kind = SPKI_ELEM_HEAD;
+  EXPECT_EQ(nullptr, spki_read_bound(bound).value);
+  bound->value.list->kind = SPKI_ELEM_KEYWORD;
+  EXPECT_EQ(SPKI_KW_GE, spki_read_bound(bound).op);
 }
 
 // Inputs come back as they are, new lists without a reference.
@@ -216,6 +232,7 @@ TEST_F(Tags, MembersOfRanges) {
       {"(* range date (ge 2010))", "2010-01-15", "2009 2010-03-15"},
       {"(* range date (ge 2010-03-15))", "", "2010-04-15"},
       {"(* range time (l 12))", "11:59", "12:00 24"},
+      {"(* range numeric (le 5 x))", "", "2"},  // of a range it takes the 5: see the relations
   };
   for (const auto& c : cases) {
     for (const bool in : {true, false}) {
