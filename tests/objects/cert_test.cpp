@@ -147,6 +147,17 @@ TEST(ThresholdTest, ReadsRawCountsAndExactlyNKeys) {
   for (const auto& text : refused) ExpectRead<ThresholdSubject>(text, VESK2_ERR_PARSE_FILE);
 }
 
+TEST(ThresholdTest, OfAnEmptyObject) {
+  const Ref<ThresholdSubject> empty(new ThresholdSubject(nullptr));
+  EXPECT_EQ(empty->Import(static_cast<ZvBuffer*>(nullptr)), VESK2_ERR_INVALID_PARAM);
+  EXPECT_FALSE(empty->HasMember(nullptr) || empty->HasMember(Read<PublicKey>(kKey).get()));
+  Ref<SExpression> members;
+  EXPECT_EQ(empty->GetSubjects(members.Out()), 0);
+  SExpression* taken = members.get();
+  EXPECT_EQ(empty->GetSubjects(taken), VESK2_ERR_INVALID_PARAM);
+  EXPECT_EQ(Canonical(members), "()");
+}
+
 TEST(ThresholdTest, SetWritesLowBytesAndSharesMembers) {
   const Ref<ThresholdSubject> subject(new ThresholdSubject(nullptr));
   ASSERT_EQ(subject->Set(2, 300), 0);

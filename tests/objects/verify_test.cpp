@@ -161,6 +161,38 @@ TEST(SignatureTest, OfACertificateIsItsIssuers) {
   }
 }
 
+TEST(SignatureTest, RefusesWhatIsMissing) {
+  const Ref<Hash> hash = Read<Hash>(HashOf("x"));
+  const Ref<PublicKey> key = Read<PublicKey>(TestKey::Rsa(0).Public());
+  unsigned char value[] = {1};
+  const std::tuple<Hash*, Principal*, const char*, unsigned char*, unsigned> parts[] = {
+      {nullptr, key.get(), "a", value, 1},
+      {hash.get(), nullptr, "a", value, 1},
+      {hash.get(), key.get(), nullptr, value, 1},
+      {hash.get(), key.get(), "a", nullptr, 1},
+      {hash.get(), key.get(), "a", value, 0}};
+  for (const auto& [from, by, algorithm, bytes, length] : parts) {
+    Ref<Signature> made;
+    EXPECT_EQ(Signature::Create(made.Out(), from, by, algorithm, bytes, length, nullptr),
+              VESK2_ERR_INVALID_PARAM);
+    EXPECT_FALSE(made);
+  }
+  const Ref<Signature> empty(new Signature(nullptr));
+  Signature* taken = empty.get();
+  EXPECT_EQ(Signature::Create(taken, hash.get(), key.get(), "a", value, 1, nullptr),
+            VESK2_ERR_INVALID_PARAM);
+  EXPECT_TRUE(taken == empty.get() && hash->GetRefCount() + key->GetRefCount() == 2);
+  EXPECT_EQ(empty->Import(static_cast<ZvBuffer*>(nullptr)), VESK2_ERR_INVALID_PARAM);
+  EXPECT_EQ(empty->Verify(static_cast<ZvVesk2::Cert*>(nullptr)), VESK2_ERR_PARAM_NULL);
+  EXPECT_EQ(empty->Verify(static_cast<SExpression*>(nullptr)), VESK2_ERR_PARAM_NULL);
+  // Nobody signed with an object that was never read.
+  EXPECT_EQ(empty->Verify(hash.get()), VESK2_ERR_SIGNATURE);
+  EXPECT_EQ(empty->Verify(Read<ZvVesk2::Cert>(
+                              Cert({.issuer = TestKey::Rsa(0).Public(), .subject = HashOf("s")}))
+                              .get()),
+            VESK2_ERR_SIGNATURE);
+}
+
 // Create over a hash that was computed, whose value field is empty, and over one without a digest.
 TEST(SignatureTest, CreatesFromParts) {
   const TestKey& test = TestKey::Rsa(0);

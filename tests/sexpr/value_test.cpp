@@ -153,7 +153,9 @@ TEST(SExpression, EqualityIsThatOfTheCanonicalTextWithoutHints) {
   const Ref<ByteString> text = Make("(1:a)");
   EXPECT_FALSE(list->IsEqual(text.get()) || text->IsEqual(list.get()));
   EXPECT_FALSE(list->IsEqual(list->First()) || list->First()->IsEqual(list.get()));
-  EXPECT_FALSE(list->IsEqual((DExpression*)nullptr));
+  bool equal = true;
+  EXPECT_EQ(CompareValues(equal, nullptr, nullptr), 0);
+  EXPECT_FALSE(equal || list->IsEqual((DExpression*)nullptr)) << "null equals nothing";
 }
 
 TEST(SExpression, NestingThatACallerBuildsIsRefusedNotFollowed) {

@@ -72,6 +72,7 @@ TEST(CrlSequence, VerifySelf) {
       {text, Parse("()"), kInvalid},
       {text, Ref<SExpression>(), kInvalid},
       {forKey, Acls({Root()}), VESK2_ERR_HASH_ID},
+      {CrlSequenceText(0, "", kCrl), Acls({Root()}), kNoEntry},  // no entry is for no tag
       // Changed after signing: the list, the certificate.
       {With(text, kMiddle, kPast), Acls({Root()}), VESK2_ERR_SIGNATURE},
       {With(text, kFuture, kFarFuture), Acls({Root()}), VESK2_ERR_HASH_MISMATCH},
@@ -282,6 +283,7 @@ TEST_F(CrlStore, TagsNameFiles) {
     std::filesystem::remove_all(global.File("cert"));
     std::filesystem::create_directory(global.File("cert"));
   }
+  EXPECT_EQ(Offer(Sequence(""), Tag("a")), kInvalid);
 }
 
 TEST_F(CrlStore, UpdateRules) {
@@ -297,6 +299,7 @@ TEST_F(CrlStore, UpdateRules) {
       {"damaged, not begun", "damaged", Sequence(tag, kFuture), true},
       {"unverified", Sequence(tag), Sequence(tag, kPast, kFarFuture, 1), false},
       {"another tag", Sequence(Tag("other")), Sequence(tag, kPast, kFarFuture), false},
+      {"stored without tag", Sequence(""), Sequence(tag, kPast, kFarFuture), false},
   };
   for (const auto& [what, stored, fresh, replaces] : cases) {
     global.Write("cert/sym.crl", stored);
@@ -366,6 +369,7 @@ TEST_F(CrlStore, Find) {
   EXPECT_FALSE(found);
   global.Write("cert/0.crl", Sequence(Tag("a (revoke)")));
   global.Write("cert/1.crl", "damaged");
+  global.Write("cert/2.crl", Sequence(""));
   EXPECT_EQ(CrlSequence::Find(found.Out(), tag.get()), 0);
   EXPECT_EQ(Canonical(found), Sequence(Tag("a (revoke)")));
   // The last candidate is handed out though it is not the one.

@@ -43,6 +43,21 @@ TEST_F(SequenceFind, ByTheTagOfTheFirstCertificate) {
   check(web, VESK2_ERR_PARSE_FILE, nullptr, "bc");
 }
 
+TEST_F(SequenceFind, RefusesWhatIsMissingOrInUse) {
+  home.Write("cert/a.cert", List({Str("sequence"), Triple(Tag("a"))}));
+  const Ref<SExpression> tag = Parse(Tag("a"));
+  char* none = nullptr;
+  char text[] = "taken";
+  char* file = text;
+  SExpression* names = nullptr;
+  SExpression* taken = tag.get();
+  EXPECT_EQ(CertSequence::Find(none, nullptr), kInvalid);
+  EXPECT_EQ(CertSequence::Find(file, tag.get()), kInvalid);
+  EXPECT_EQ(CertSequence::Find(names, nullptr), kInvalid);
+  EXPECT_EQ(CertSequence::Find(taken, tag.get()), kInvalid);
+  EXPECT_TRUE(none == nullptr && file == text && names == nullptr && taken == tag.get());
+}
+
 TEST_F(SequenceFind, Pairs) {
   const std::string three = Triple(Tag("a")) + Triple(Tag("b")) + Triple("");
   constexpr int kFails = VESK2_ERR_PARSE_FILE;

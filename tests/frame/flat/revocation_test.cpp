@@ -170,6 +170,8 @@ TEST_F(RevocationLists, Verify) {
       {text(zero), nullptr, 0, 0, 0},
       {text("(3:any1:x)"), "x", 0, 0, VESK2_ERR_AUTH_TAG_MISSING},
       {text("(3:any1:x)"), nullptr, 0, 0, 0},
+      {text(""), "", 0, 0, VESK2_ERR_AUTH_TAG_MISSING},
+      {text(""), nullptr, 0, 0, VESK2_ERR_ACL_ENTRY_NOT_FOUND},
       {text(Tag(kSource), 6), nullptr, 0, 0, VESK2_ERR_ACL_ENTRY_NOT_FOUND},
       // The period of the list: the names of the codes are crossed.
       {good, nullptr, kEnd, kStart, 0},
