@@ -35,7 +35,7 @@ class VESK2_API Signature : public SExpression {
 
   // Verify checks the signature over `object` with the signing principal: see Principal::Verify.
   // For a certificate the issuer must be the signer (VESK2_ERR_SIGNATURE). VESK2_ERR_PARAM_NULL for
-  // null.
+  // null. A lack of memory is VESK2_ERR_MEM_ALLOC, the crypto layer's too.
   [[nodiscard]] int Verify(Cert* cert);
   [[nodiscard]] int Verify(SExpression* object);
 

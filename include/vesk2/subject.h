@@ -38,7 +38,7 @@ class VESK2_API Principal : public Subject {
   // Verify checks a signature over `signedObject`, whose digest must be `hash`.
   //   VESK2_ERR_INVALID_PARAM, VESK2_ERR_SIGNATURE_ID (unknown algorithm), VESK2_ERR_HASH_MISMATCH
   //   (the object is not what was signed), VESK2_ERR_SIGNATURE, VESK2_ERR_NOT_IMPLEMENTED (not a
-  //   key).
+  //   key), the crypto layer's: ZVCLM_ERR_NO_MEM.
   [[nodiscard]] virtual int Verify(ByteString* algorithm, ByteString* signatureValue, Hash* hash,
                                    SExpression* signedObject) = 0;
   // VerifyMobile checks a raw 54-byte block of the mobile format (14-byte header, r, s) over

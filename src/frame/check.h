@@ -29,6 +29,12 @@ namespace ZvVesk2 {
   return code == VESK2_ERR_MEM_ALLOC || code == kCryptoNoMemory;
 }
 
+// InOwnWords turns the crypto layer's lack of memory into the library's: whoever asks the library
+// for a verdict knows one code for it, whichever layer ran short.
+[[nodiscard]] constexpr int InOwnWords(int code) {
+  return LacksMemory(code) ? VESK2_ERR_MEM_ALLOC : code;
+}
+
 // The library is built without exceptions: memory that cannot be had is a null pointer, tested
 // where it is asked for.
 template <typename T, typename... Args>

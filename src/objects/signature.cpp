@@ -78,7 +78,7 @@ int Signature::Verify(Cert* cert) {
 int Signature::Verify(SExpression* object) {
   VESK2_REQUIRE(object != nullptr, VESK2_ERR_PARAM_NULL);
   VESK2_REQUIRE(principal != nullptr, VESK2_ERR_SIGNATURE);
-  return principal->Verify(algorithm, value, hash, object);
+  return InOwnWords(principal->Verify(algorithm, value, hash, object));
 }
 
 }  // namespace ZvVesk2

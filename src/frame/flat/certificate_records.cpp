@@ -38,7 +38,7 @@ int ReadRecord(Vesk2CertInfoStruct& record, Cert* cert, Signature* signature, SE
   VESK2_TRY(ReadHash(record, signature->GetHash()));
   // A hash or a group of keys has no key data, and is a good subject all the same.
   auto* const key = dynamic_cast<PublicKey*>(cert->GetSubject());
-  return key != nullptr ? key->X509Export(record.keyData, record.keyLength) : 0;
+  return key != nullptr ? InOwnWords(key->X509Export(record.keyData, record.keyLength)) : 0;
 }
 
 // The records of all triples behind the keyword. None holds the sequence yet.

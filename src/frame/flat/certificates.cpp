@@ -34,7 +34,7 @@ int VerifySequence(CertSequence* sequence, const char* tagText, time_t notBefore
   VESK2_TRY(MakeStamp(from, notBefore, context));
   VESK2_TRY(MakeStamp(to, notAfter, context));
   // No subject: the chain is presented for whoever its first certificate is about.
-  return sequence->Verify(nullptr, tag.get(), from.get(), to.get());
+  return InOwnWords(sequence->Verify(nullptr, tag.get(), from.get(), to.get()));
 }
 
 }  // namespace

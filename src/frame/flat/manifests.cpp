@@ -63,11 +63,11 @@ void SetStoreUpdate(Manifest* manifest, int update) { manifest->SetStoreUpdate(u
 // ---- Verifying ----
 
 int VerifyManifest(Manifest* manifest, time_t notBefore, time_t notAfter) {
-  return manifest->VerifyManifest(notBefore, notAfter);
+  return ZvVesk2::InOwnWords(manifest->VerifyManifest(notBefore, notAfter));
 }
 
 int CompareManifest(Manifest* manifest, const char* otherManifestPath) {
-  return manifest->CompareManifest(otherManifestPath);
+  return ZvVesk2::InOwnWords(manifest->CompareManifest(otherManifestPath));
 }
 
 int CompareManifestA(Manifest* manifest, const char* otherManifestPath) {

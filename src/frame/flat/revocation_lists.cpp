@@ -125,7 +125,7 @@ int Vesk2CrlVerify(Vesk2CrlInfoStruct* record, const char* tagText, time_t from,
   if (tagText != nullptr) VESK2_TRY(RequireTag(*record, tagText));
   Ref<SExpression> acls;
   VESK2_TRY(AclEntry::Import(acls.Out(), record->crl->GetContext(), nullptr));
-  VESK2_TRY(record->crl->VerifySelf(acls.get()));
+  VESK2_TRY(InOwnWords(record->crl->VerifySelf(acls.get())));
   if (from == 0 || to == 0) return 0;
   // The names of the two codes are crossed; callers know them so.
   VESK2_REQUIRE(record->notBefore <= to, VESK2_ERR_NOT_AFTER);
