@@ -1,11 +1,11 @@
-// Signature checks. The answer is "not valid" until it is proved otherwise.
+// Signature checks. The answer is "not valid" until libcrypto says otherwise, in one place.
 //
 // libcrypto answers a bad signature and a lack of memory alike, with "no". Taken for "not valid",
 // the second would leave a revocation list unread, and the keys on it in use. So a key or signature
 // that cannot be good is refused here, by its numbers, before libcrypto sees it (they could also
-// keep its arithmetic busy for minutes). What libcrypto then fails to prepare is a lack of memory.
-// Of a PKCS #1 signature libcrypto only takes the block out, which cannot fail otherwise; in the
-// other schemes its "no" counts only with the reason that a bad signature leaves behind.
+// keep its arithmetic busy for minutes). What libcrypto then fails to prepare is a lack of memory,
+// and its "no" counts only with the reason that a bad signature leaves behind, or when it is seen
+// otherwise that the signature cannot be good.
 #include <openssl/bn.h>
 #include <openssl/dsa.h>
 #include <openssl/rsa.h>
@@ -69,7 +69,7 @@ bool FindVerdict() {
   return found;
 }
 
-// The DSA code answers 0 for a bad signature only, and leaves no reason; the PSS code for anything.
+// The DSA code answers 0 for a bad signature only, and leaves no reason; the RSA code for anything.
 enum class Zero { kIsNo, kNeedsReason };
 
 int Ask(bool* good, EVP_PKEY_CTX* context, Bytes digest, Bytes signature, Zero zero) {
@@ -116,7 +116,7 @@ bool FitsModulus(Bytes signature, const BIGNUM* n) {
          std::ranges::lexicographical_compare(signature, Bytes(modulus).first(length));
 }
 
-// ---- RSA, PKCS #1 version 1.5 ----
+// ---- RSA: blocks of PKCS #1 version 1.5 ----
 
 // What stands before the digest in a signed block: the hash's name in DER, its parameters NULL.
 struct DigestName {
@@ -133,7 +133,6 @@ using Block = std::array<unsigned char, kMaxModulus>;
 
 // Whether the block is the one that there is for the digest:
 //   00 01 ff...ff 00 <name> <digest>      with eight or more ff
-// Nothing of it is parsed: there is no second way to write it that somebody could hide in.
 bool IsBlockOf(Bytes block, uint32_t hash, Bytes digest) {
   constexpr size_t kFrame = 3 + 8;
   const auto* const name = std::ranges::find(kDigestNames, hash, &DigestName::hash);
@@ -151,8 +150,9 @@ bool IsBlockOf(Bytes block, uint32_t hash, Bytes digest) {
   return std::ranges::equal(block, Bytes(expected).first(block.size()));
 }
 
-int VerifyPkcs1(bool* good, const ZVCLMPublicKeyData& key, uint32_t hash, Bytes digest,
-                Bytes signature) {
+// libcrypto gave no reason for its "no": some malformed blocks leave none. The block is taken out
+// of the signature again, which needs memory only, and looked at. 0 when it cannot be good.
+int ExplainPkcs1No(const ZVCLMPublicKeyData& key, uint32_t hash, Bytes digest, Bytes signature) {
   const PkeyContext context = MakeContext(key);
   if (context == nullptr || EVP_PKEY_verify_recover_init(context.get()) != 1 ||
       EVP_PKEY_CTX_set_rsa_padding(context.get(), RSA_NO_PADDING) != 1) {
@@ -164,37 +164,34 @@ int VerifyPkcs1(bool* good, const ZVCLMPublicKeyData& key, uint32_t hash, Bytes 
                               signature.size()) != 1) {
     return ZVCLM_ERR_NO_MEM;
   }
-  *good = IsBlockOf(Bytes(block).first(length), hash, digest);
-  return 0;
+  return IsBlockOf(Bytes(block).first(length), hash, digest) ? ZVCLM_ERR_NO_MEM : 0;
 }
 
-// ---- RSA, PSS ----
+// ---- RSA ----
 
 // Any salt length is taken: the signer chose it. The mask uses the digest's hash.
-bool SetPss(EVP_PKEY_CTX* context, const EVP_MD* hash) {
-  return EVP_PKEY_CTX_set_rsa_padding(context, RSA_PKCS1_PSS_PADDING) == 1 &&
-         EVP_PKEY_CTX_set_signature_md(context, hash) == 1 &&
-         EVP_PKEY_CTX_set_rsa_mgf1_md(context, hash) == 1 &&
+bool SetRsaScheme(EVP_PKEY_CTX* context, int scheme, const EVP_MD* hash) {
+  const bool pss = scheme == ZVCLM_SCHEME_RSA_PSS;
+  const int padding = pss ? RSA_PKCS1_PSS_PADDING : RSA_PKCS1_PADDING;
+  if (EVP_PKEY_CTX_set_rsa_padding(context, padding) != 1) return false;
+  if (EVP_PKEY_CTX_set_signature_md(context, hash) != 1) return false;
+  if (!pss) return true;
+  return EVP_PKEY_CTX_set_rsa_mgf1_md(context, hash) == 1 &&
          EVP_PKEY_CTX_set_rsa_pss_saltlen(context, RSA_PSS_SALTLEN_AUTO) == 1;
-}
-
-int VerifyPss(bool* good, const ZVCLMPublicKeyData& key, uint32_t hashId, Bytes digest,
-              Bytes signature) {
-  const MdOwner hash(EVP_MD_fetch(nullptr, HashName(hashId), nullptr));
-  const PkeyContext context = StartVerify(key);
-  if (hash == nullptr || context == nullptr) return ZVCLM_ERR_NO_MEM;
-  if (!SetPss(context.get(), hash.get())) return ZVCLM_ERR_NO_MEM;
-  return Ask(good, context.get(), digest, signature, Zero::kNeedsReason);
 }
 
 int VerifyRsa(bool* good, const ZVCLMPublicKeyData& key, int scheme,
               const ZVCLMRSAParameters& parameters, Bytes digest, Bytes signature) {
-  const uint32_t hash = parameters.words[3];
-  if (!WithinRsaLimits(key) || digest.empty() || digest.size() != HashLength(hash)) return 0;
+  const uint32_t hashId = parameters.words[3];
+  if (!WithinRsaLimits(key) || digest.empty() || digest.size() != HashLength(hashId)) return 0;
   if (!FitsModulus(signature, key.number(kRsaN))) return 0;
-  const bool pss = scheme == ZVCLM_SCHEME_RSA_PSS;
-  return pss ? VerifyPss(good, key, hash, digest, signature)
-             : VerifyPkcs1(good, key, hash, digest, signature);
+  const MdOwner hash(EVP_MD_fetch(nullptr, HashName(hashId), nullptr));
+  const PkeyContext context = StartVerify(key);
+  if (hash == nullptr || context == nullptr) return ZVCLM_ERR_NO_MEM;
+  if (!SetRsaScheme(context.get(), scheme, hash.get())) return ZVCLM_ERR_NO_MEM;
+  const int code = Ask(good, context.get(), digest, signature, Zero::kNeedsReason);
+  const bool explained = code == 0 || scheme == ZVCLM_SCHEME_RSA_PSS;
+  return explained ? code : ExplainPkcs1No(key, hashId, digest, signature);
 }
 
 // ---- DSA ----
