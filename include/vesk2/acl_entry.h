@@ -44,14 +44,18 @@ class VESK2_API AclEntry : public SExpression {
   using SExpression::Create;
 
   // Import reads one entry from a file: a name with a "/" is a path, any other is looked up in the
-  // store. VESK2_ERR_INVALID_PARAM, VESK2_ERR_FILE_OPEN and the buffer form's.
+  // store. VESK2_ERR_INVALID_PARAM, VESK2_ERR_FILE_OPEN (also: no root, no such path),
+  // VESK2_ERR_READ_FILE (another process held it for Limits::kMaxHeldWait), and the buffer form's.
   [[nodiscard]] int Import(const char* name);
   // Import reads one entry from a buffer into an empty object. An entry that ends right after its
   // tag leaves its ")" unread. After a failure the object is of no use: free it.
   [[nodiscard]] int Import(ZvBuffer* buffer);
   // Import loads every entry of the store and then of `extraDir` (may be null) into a new list
   // (acl <entry>...). VESK2_ERR_INVALID_PARAM; VESK2_ERR_FILE_NOT_FOUND when nothing was loaded, or
-  // when the last file of the store could not be read and there is no `extraDir`.
+  // when the last file of the store could not be read and there is no `extraDir`. An entry that was
+  // not read for want of memory or descriptors (VESK2_ERR_MEM_ALLOC), or because another process
+  // held its file (VESK2_ERR_READ_FILE), may be the one that names a revocation list: it is never
+  // passed over, here and in the searches below.
   [[nodiscard]] static int Import(SExpression*& out, Vesk2ContextStruct* ctx, const char* extraDir);
   // No context. (A bare nullptr would not tell this from the readers of plain expressions.)
   [[nodiscard]] static int Import(SExpression*& out, std::nullptr_t, const char* extraDir) {
@@ -69,7 +73,7 @@ class VESK2_API AclEntry : public SExpression {
   // and not consulted. `k` receives the threshold of a k-of-n subject, else 0.
   //   0; VESK2_ERR_AUTH_TAGS_ARE_EQUAL, a success that tells an exact match;
   //   VESK2_ERR_ACL_ENTRY_NOT_FOUND (the principal was seen), VESK2_ERR_ACL_KEY_NOT_FOUND;
-  //   VESK2_ERR_PARAM_NULL, VESK2_ERR_FIND_DIR.
+  //   VESK2_ERR_PARAM_NULL (`k` is as it was), VESK2_ERR_FIND_DIR.
   [[nodiscard]] static int Find(Principal* principal, SExpression* tag, TimeStamp* notBefore,
                                 TimeStamp* notAfter, unsigned int& k);
   // FindThresholdEntry is Find among entries whose k-of-n subject has `principal` as a member.

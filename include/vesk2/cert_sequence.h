@@ -35,7 +35,8 @@ class VESK2_API CertSequence : public SExpression {
   [[nodiscard]] int Init();
 
   // Import reads a whole sequence. VESK2_ERR_INVALID_PARAM, VESK2_ERR_MEM_ALLOC (also: no such
-  // path), VESK2_ERR_FILE_OPEN, and what the readers of the items report.
+  // path), VESK2_ERR_FILE_OPEN, VESK2_ERR_READ_FILE (another process held the file for
+  // Limits::kMaxHeldWait), and what the readers of the items report.
   [[nodiscard]] static int Import(CertSequence*& out, ZvBuffer* buffer, Vesk2ContextStruct* ctx);
   [[nodiscard]] static int Import(CertSequence*& out, const char* name, bool usePath,
                                   Vesk2ContextStruct* ctx);
@@ -86,7 +87,9 @@ class VESK2_API CertSequence : public SExpression {
   // SPKI_ERR_KEY_OR_HASH_EXPECTED). Times may be null.
   //   VESK2_ERR_INVALID_SEQUENCE (empty, or not whole triples), Signature::Verify's,
   //   VESK2_ERR_CERT_REVOKED, VESK2_ERR_CRL_NOT_FOUND (undetermined), VESK2_ERR_ACL_ENTRY_NOT_FOUND
-  //   (no ACL store), Verify::ReductA's.
+  //   (no ACL store), VESK2_ERR_MEM_ALLOC and VESK2_ERR_READ_FILE (a file of a store could not be
+  //   read for want of memory or descriptors, or because another process held it),
+  //   Verify::ReductA's.
   [[nodiscard]] int Verify(Subject* subject, SExpression* tag, TimeStamp* notBefore,
                            TimeStamp* notAfter);
   // The same for a sequence file. VESK2_ERR_PARAM_NULL for a null name.
@@ -134,7 +137,7 @@ class VESK2_API CertRequest : public CertSequence {
                                   const char* file, Vesk2ContextStruct* context);
   using CertSequence::Import;
   // Export writes the request to the file, by the same rule. VESK2_ERR_INVALID_PARAM for a null or
-  // empty name, VESK2_ERR_FILE_OPEN, VESK2_ERR_WRITE_FILE.
+  // empty name, VESK2_ERR_FILE_OPEN (also: a name that is too long), VESK2_ERR_WRITE_FILE.
   [[nodiscard]] int Export(const char* file);
   using SExpression::Export;
 };

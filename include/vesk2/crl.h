@@ -109,8 +109,10 @@ class VESK2_API CrlSequence : public SExpression {
   // ---- The store ----
 
   // ImportStore loads the stored list of every revocation source among `aclEntries` (null: the ACL
-  // store) into a new list. A list that is missing or unreadable is absent from it.
-  // VESK2_ERR_INVALID_PARAM (no elements), VESK2_ERR_MEM_ALLOC, AclEntry::Import's.
+  // store) into a new list. A list that is missing or unreadable is absent from it, but not one for
+  // which memory or descriptors ran out (VESK2_ERR_MEM_ALLOC), that another process holds
+  // (VESK2_ERR_READ_FILE) or whose path is too long (VESK2_ERR_FILE_OPEN): with a list that counts
+  // as absent goes what it revokes. VESK2_ERR_INVALID_PARAM (no elements), AclEntry::Import's.
   [[nodiscard]] static int ImportStore(SExpression*& store, SExpression* aclEntries,
                                        Vesk2ContextStruct* ctx);
   // UpdateStore writes this sequence to the store when it verifies and is newer than what is there.
@@ -119,15 +121,15 @@ class VESK2_API CrlSequence : public SExpression {
   [[nodiscard]] int UpdateStore(SExpression* aclEntries);
   // ImportDir loads every "*.crl" file of a directory that can be read. VESK2_ERR_INVALID_PARAM,
   // VESK2_ERR_FILE_NOT_FOUND (no directory), VESK2_ERR_CRL_NOT_FOUND (no list),
-  // VESK2_ERR_MEM_ALLOC.
+  // VESK2_ERR_MEM_ALLOC, VESK2_ERR_READ_FILE (see ImportStore).
   [[nodiscard]] static int ImportDir(SExpression*& list, const char* dir, StorageType type,
                                      Vesk2ContextStruct* ctx);
   // ImportDirAndStore offers every list of a directory to the store. Errors of loading only.
   [[nodiscard]] static int ImportDirAndStore(const char* dir, Vesk2ContextStruct* ctx);
   // Find returns the stored list whose certificate has the tag. VESK2_ERR_PARAM_NOT_NULL,
-  // VESK2_ERR_PARAM_NULL, VESK2_ERR_FIND_DIR, VESK2_ERR_MEM_ALLOC; VESK2_ERR_ACL_ENTRY_NOT_FOUND
-  // when none has, `out` then holding the last one read, for the caller to free. An empty store
-  // gives 0 and null.
+  // VESK2_ERR_PARAM_NULL, VESK2_ERR_FIND_DIR, VESK2_ERR_MEM_ALLOC, VESK2_ERR_READ_FILE (see
+  // ImportStore); VESK2_ERR_ACL_ENTRY_NOT_FOUND when none has, `out` then holding the last one
+  // read, for the caller to free. An empty store gives 0 and null.
   [[nodiscard]] static int Find(CrlSequence*& out, SExpression* tag);
 
   // CheckStatusCritical asks list2 of every sequence in `store` (with the tag, when one is given)

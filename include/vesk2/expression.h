@@ -266,7 +266,8 @@ class VESK2_API SExpression : public DExpression {
 
   // Import reads one list, with hints, from a buffer or a file. VESK2_ERR_INVALID_PARAM (buffer
   // form) or VESK2_ERR_PARAM_NOT_NULL and VESK2_ERR_PARAM_NULL (file form) for misplaced arguments,
-  // VESK2_ERR_FILE_OPEN, VESK2_ERR_PARSE_FILE, VESK2_ERR_MAX_BYTE_STRING, VESK2_ERR_MEM_ALLOC.
+  // VESK2_ERR_FILE_OPEN, VESK2_ERR_READ_FILE (another process held the file for
+  // Limits::kMaxHeldWait), VESK2_ERR_PARSE_FILE, VESK2_ERR_MAX_BYTE_STRING, VESK2_ERR_MEM_ALLOC.
   [[nodiscard]] static int Import(SExpression*& out, ZvBuffer* buffer, Vesk2ContextStruct* context);
   [[nodiscard]] static int Import(SExpression*& out, const char* path, Vesk2ContextStruct* context);
 
@@ -313,7 +314,8 @@ class VESK2_API SExpression : public DExpression {
   // ---- Storage ----
 
   // CalcDir returns the directory of a store as a new string: "." for StoragePath or without a
-  // directory name, else root/dirName. Null when the root is not set, or without memory.
+  // directory name, else root/dirName. Null when the root is not set, the path is too
+  // long, or without memory.
   static char* CalcDir(const char* dirName, StorageType type);
   // CalcPath returns the path of an object as a new string. With StoragePath or without a directory
   // name it is `name`; otherwise only the last component of `name` counts, below the store
@@ -327,7 +329,8 @@ class VESK2_API SExpression : public DExpression {
   // VESK2_ERR_MEM_ALLOC when there is no such path. Set the storage type first.
   [[nodiscard]] int SetFileName(const char* name);
   // CreateFileDirectory makes the object's store directory. VESK2_ERR_FIND_DIR for a storage type
-  // that is none and when the root is not set, VESK2_ERR_MEM_ALLOC, VESK2_ERR_CREATE_DIR.
+  // that is none and when the root is not set or too long, VESK2_ERR_MEM_ALLOC,
+  // VESK2_ERR_CREATE_DIR.
   [[nodiscard]] int CreateFileDirectory();
   // Export writes the object, with hints, to its file: to SetFileName(name) when a name is given.
   // VESK2_ERR_FILE_OPEN, VESK2_ERR_WRITE_FILE (the file is left as far as it was written) and those

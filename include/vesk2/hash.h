@@ -49,8 +49,9 @@ class VESK2_API Hash : public Principal {
 
   // HashFile writes the SHA-256 of a regular file to `digest` and 32 to *digestLength, which on
   // entry gives the room (0: not tested). VESK2_ERR_INVALID_PARAM, VESK2_ERR_BUFFER_OVERFLOW (room
-  // under 32), VESK2_ERR_FILE_OPEN, VESK2_ERR_READ_FILE (a read error, or the file changed
-  // meanwhile), VESK2_ERR_MEM_ALLOC; *digestLength is 0 after a failure (except of the room test).
+  // under 32), VESK2_ERR_FILE_OPEN, VESK2_ERR_READ_FILE (a read error, the file changed
+  // meanwhile, or another process held it for Limits::kMaxHeldWait), VESK2_ERR_MEM_ALLOC;
+  // *digestLength is 0 after a failure (except of the room test).
   [[nodiscard]] static int HashFile(const char* path, unsigned char* digest,
                                     unsigned int* digestLength, Vesk2ContextStruct* context);
   // The same, telling `callbacks` (may be null) about it. VESK2_ERR_USER_INTERRUPT when they end

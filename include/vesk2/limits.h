@@ -28,7 +28,12 @@ inline constexpr uint64_t kMaxExport = uint64_t{1} << 31;
 
 // A path, with its terminator. A path that had to be cut is never used.
 inline constexpr size_t kPathBuffer = 4097;
-// A path inside a manifest body; longer ones could not be opened, and deep trees cost their square.
+// Milliseconds that one call waits, in all, for files that other processes hold by leases: they
+// must not read as absent, and hundreds of them must not stop a verification for hours. The kernel
+// takes a lease that is not given back away, after 45 seconds unless it was told otherwise.
+inline constexpr uint32_t kMaxHeldWait = 60'000;
+
+// A path inside a manifest body, counted from the body's root; deep trees cost their square.
 inline constexpr size_t kMaxBodyPath = 4096;
 // The text of a revocation tag that names a stored file: a file name holds 255 bytes.
 inline constexpr size_t kMaxStoreName = 250;

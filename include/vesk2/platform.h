@@ -62,8 +62,8 @@ class VESK2_API ZvBuffer {
 VESK2_API ZvBuffer* zv_buffer_wrap(const void* data, size_t size);
 
 // zv_buffer_wrap_file reads a whole regular file into a new buffer. Null on any failure: no such
-// file, not a regular file, over 256 MiB, a read error, no memory (errno is then ENOMEM). Free with
-// zv_buffer_free.
+// file, not a regular file, over 256 MiB, a read error, no memory, or held by another process for
+// Limits::kMaxHeldWait. Free with zv_buffer_free.
 VESK2_API ZvBuffer* zv_buffer_wrap_file(const char* path);
 
 // zv_buffer_free releases a buffer and its bytes; null is allowed.

@@ -35,6 +35,12 @@ namespace ZvVesk2 {
   return LacksMemory(code) ? VESK2_ERR_MEM_ALLOC : code;
 }
 
+// Whether what failed with `code` may not be passed over as if it were absent: it lacked memory, or
+// it is a file that is there and that another process holds (VESK2_ERR_READ_FILE).
+[[nodiscard]] constexpr bool IsNoAbsence(int code) {
+  return LacksMemory(code) || code == VESK2_ERR_READ_FILE;
+}
+
 // The library is built without exceptions: memory that cannot be had is a null pointer, tested
 // where it is asked for.
 template <typename T, typename... Args>

@@ -2,12 +2,12 @@
 #ifndef VESK2_SRC_FRAME_HANDLES_H
 #define VESK2_SRC_FRAME_HANDLES_H
 
-#include <cerrno>
 #include <cstdint>
 #include <memory>
 
 #include <vesk2/platform.h>
 
+#include "src/frame/check.h"
 #include "src/platform/crypto.h"
 #include "src/platform/file.h"
 
@@ -19,14 +19,16 @@ struct BufferFree {
 using BufferOwner = std::unique_ptr<ZvBuffer, BufferFree>;
 
 // WrapFile reads a file into `out`. Returns `failure` when it cannot be read, but
-// VESK2_ERR_MEM_ALLOC for lack of memory: taken for a missing file, a revocation list would count
-// for nothing. `listed`: a ZvDir says that it is a regular file.
+// VESK2_ERR_MEM_ALLOC and VESK2_ERR_READ_FILE (held by another process) as they are: taken for a
+// missing file, a revocation list would count for nothing. `listed`: a ZvDir says that it is a
+// regular file.
 [[nodiscard]] inline int WrapFile(BufferOwner& out, const char* path, int failure,
                                   bool listed = false) {
-  errno = 0;
-  out.reset(ZVsysutil::zv_buffer_wrap_file(path, listed));
-  if (out != nullptr) return 0;
-  return errno == ENOMEM ? VESK2_ERR_MEM_ALLOC : failure;
+  ZvBuffer* read = nullptr;
+  const int code = ZVsysutil::zv_buffer_read_file(&read, path, listed);
+  out.reset(read);
+  if (code == 0 || IsNoAbsence(code)) return code;
+  return failure;
 }
 
 struct HashFree {

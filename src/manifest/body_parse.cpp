@@ -19,8 +19,8 @@
 namespace ZvVesk2 {
 namespace {
 
-using ZVsysutil::zv_concat_path;
 using ZVsysutil::zv_filenamencmp;
+using ZVsysutil::zv_join_path;
 
 constexpr unsigned kTokenLength = 4;
 constexpr unsigned kDigestLength = 32;
@@ -124,7 +124,7 @@ int BodyDirectory::ParseSubdirectory(ZvBuffer* buffer, PointerArray<char>* ignor
   VESK2_TRY(ParseName(buffer, bare));
   std::unique_ptr<BodyDirectory> directory(TryNew<BodyDirectory>(GetContext()));
   VESK2_REQUIRE(directory, VESK2_ERR_MEM_ALLOC);
-  directory->SetName(zv_concat_path(GetName(), bare.get()));
+  directory->SetName(zv_join_path(GetName(), bare.get()));
   VESK2_REQUIRE(directory->GetName() != nullptr, VESK2_ERR_MEM_ALLOC);
   VESK2_TRY(directory->ParseEntries(buffer, ignoreList, depth));
   VESK2_REQUIRE(subdirectories.push(directory.get()), VESK2_ERR_MEM_ALLOC);

@@ -21,9 +21,9 @@
 namespace ZvVesk2 {
 namespace {
 
-using ZVsysutil::zv_concat_path;
 using ZVsysutil::zv_filenamecmp;
 using ZVsysutil::zv_fstrdup;
+using ZVsysutil::zv_join_path;
 using ZVsysutil::ZvDir;
 
 // The two kinds of directory entries, each in ascending order of names, each with its own merges.
@@ -87,7 +87,7 @@ int DiskCheck::Files(BodyDirectory& directory, StatusSet& statuses) {
   PointerArray<BodyObject>& files = directory.GetFiles();
   for (BodyObject* entry = files.begin(); entry != nullptr; entry = files.next()) {
     if (ignore.Ignores(entry->GetName())) continue;
-    std::unique_ptr<char[]> path(zv_concat_path(directory.GetName(), entry->GetName()));
+    std::unique_ptr<char[]> path(zv_join_path(directory.GetName(), entry->GetName()));
     VESK2_REQUIRE(path, VESK2_ERR_MEM_ALLOC);
     uint32_t status = BodyObject::Invalid;
     VESK2_TRY(StatusOf(status, static_cast<const BodyFile&>(*entry), path.get()));

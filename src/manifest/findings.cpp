@@ -19,7 +19,7 @@ int StatusSet::Code() const {
 
 int Findings::AddFile(const BodyDirectory& directory, const char* name, uint32_t status,
                       StatusSet& statuses) {
-  std::unique_ptr<char[]> path(ZVsysutil::zv_concat_path(directory.GetName(), name));
+  std::unique_ptr<char[]> path(ZVsysutil::zv_join_path(directory.GetName(), name));
   return Add(std::move(path), false, status, statuses);
 }
 

@@ -11,9 +11,9 @@
 namespace ZvVesk2 {
 namespace {
 
-using ZVsysutil::zv_concat_path;
 using ZVsysutil::zv_filenamecmp;
 using ZVsysutil::zv_fstrdup;
+using ZVsysutil::zv_join_path;
 using ZVsysutil::zv_strdup;
 
 int ComparePaths(const void* a, const void* b) {
@@ -78,7 +78,7 @@ int Manifest::SetFileCallbacks(const Vesk2FileCallbacks* callbacks) {
 
 int Manifest::BuildIgnoreList(const char* base, PointerArray<char>& list) const {
   for (const FileItem* item = ignoredEntries.get(); item != nullptr; item = item->next) {
-    std::unique_ptr<char[]> path(zv_concat_path(base, item->name));
+    std::unique_ptr<char[]> path(zv_join_path(base, item->name));
     VESK2_REQUIRE(path && list.push(path.get()), VESK2_ERR_MEM_ALLOC);
     static_cast<void>(path.release());
   }

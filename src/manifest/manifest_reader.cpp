@@ -19,6 +19,7 @@
 #include "src/frame/check.h"
 #include "src/manifest/manifest_authority.h"
 #include "src/objects/build.h"
+#include "src/platform/wait.h"
 #include "src/sexpr/same.h"
 
 namespace ZvVesk2 {
@@ -31,7 +32,11 @@ constexpr unsigned kStampLength = 19;
 int ManifestReader::Read(ZvBuffer** body) {
   if (body != nullptr) *body = nullptr;
   manifest_.ClearRead();
-  VESK2_TRY(WrapFile(buffer_, manifest_.manifestPath.get(), VESK2_ERR_OPEN_MANIFEST_FILE));
+  const ZVsysutil::ZvCall call;
+  const char* const path = manifest_.manifestPath.get();
+  const int opened = WrapFile(buffer_, path, VESK2_ERR_OPEN_MANIFEST_FILE);
+  VESK2_REQUIRE(opened != VESK2_ERR_READ_FILE, VESK2_ERR_OPEN_MANIFEST_FILE);
+  VESK2_TRY(opened);
   const int code = ReadFile(body);
   manifest_.readPosition = buffer_->Position();
   VESK2_TRY(code);

@@ -1,8 +1,8 @@
 // Hash::HashFile: the SHA-256 of a file, the loop that most of a manifest's verification time goes
 // through.
-#include <vesk2/hash.h>
+#include "src/objects/hash_file.h"
 
-#include <cerrno>
+#include <algorithm>
 #include <memory>
 #include <utility>
 
@@ -20,10 +20,6 @@ using ZVsysutil::ZvFile;
 // this small, and the layer below makes them cheap.
 constexpr size_t kReadSize = 4;
 constexpr size_t kBufferSize = 1024;
-
-struct FileClose {
-  void operator()(ZvFile* file) const { ZVsysutil::zv_close(file); }
-};
 
 // What a loop that nobody watches tells: the calls of it cost nothing.
 struct Unwatched {
@@ -75,17 +71,20 @@ int DigestOpened(ZvFile* file, unsigned char* digest, uint32_t handle,
                                  : FeedFile(hash.get(), file, handle, Watched(*callbacks)));
   // A torn file must not pass for a whole one: neither the prefix before a read error nor a mixture
   // of two versions.
-  VESK2_REQUIRE(!ZVsysutil::zv_failed(file) && ZVsysutil::zv_unchanged(file), VESK2_ERR_READ_FILE);
+  VESK2_TRY(ZVsysutil::zv_read_error(file));
+  VESK2_TRY(ZVsysutil::zv_check_unchanged(file));
   return zvclm_HashFinal(hash.get(), digest, handle);
 }
 
-int DigestFile(const char* path, unsigned char* digest, uint32_t handle,
-               const Vesk2FileCallbacks* callbacks) {
-  errno = 0;
-  const std::unique_ptr<ZvFile, FileClose> file(ZVsysutil::zv_open(path, ZVsysutil::ZV_READ));
-  // A file that there was no memory for is not a missing one.
-  VESK2_REQUIRE(file || errno != ENOMEM, VESK2_ERR_MEM_ALLOC);
-  VESK2_REQUIRE(file, VESK2_ERR_FILE_OPEN);
+}  // namespace
+
+int DigestFile(const char* path, unsigned char (&digest)[kFileDigestSize], bool& held,
+               Vesk2ContextStruct* context, const Vesk2FileCallbacks* callbacks) {
+  const uint32_t handle = context != nullptr ? context->cryptoHandle : 0;
+  ZVsysutil::ZvFileOwner file;
+  const int opened = ZVsysutil::zv_open(file, path, ZVsysutil::ZV_READ);
+  held = opened == VESK2_ERR_READ_FILE;
+  VESK2_TRY(opened);
   if (callbacks == nullptr) return DigestOpened(file.get(), digest, handle, nullptr);
   const auto bytes = static_cast<uint64_t>(file->opened.st_size);
   const bool wanted =
@@ -96,8 +95,6 @@ int DigestFile(const char* path, unsigned char* digest, uint32_t handle,
   return code;
 }
 
-}  // namespace
-
 int Hash::HashFile(const char* path, unsigned char* digest, unsigned int* digestLength,
                    Vesk2ContextStruct* context) {
   return HashFile(path, digest, digestLength, context, nullptr);
@@ -107,14 +104,12 @@ int Hash::HashFile(const char* path, unsigned char* digest, unsigned int* digest
                    Vesk2ContextStruct* context, const Vesk2FileCallbacks* callbacks) {
   VESK2_REQUIRE(path != nullptr && digest != nullptr && digestLength != nullptr,
                 VESK2_ERR_INVALID_PARAM);
-  ZVCLMHashInfo info{};
-  info.size = sizeof(info);
-  VESK2_TRY(zvclm_HashInfo(ZVCLM_HASH_SHA256, &info));
-  VESK2_REQUIRE(*digestLength == 0 || *digestLength >= info.digestLength,
-                VESK2_ERR_BUFFER_OVERFLOW);
-  const uint32_t handle = context != nullptr ? context->cryptoHandle : 0;
-  const int code = DigestFile(path, digest, handle, callbacks);
-  *digestLength = code == 0 ? info.digestLength : 0;
+  VESK2_REQUIRE(*digestLength == 0 || *digestLength >= kFileDigestSize, VESK2_ERR_BUFFER_OVERFLOW);
+  unsigned char made[kFileDigestSize];
+  bool held = false;
+  const int code = DigestFile(path, made, held, context, callbacks);
+  if (code == 0) std::copy_n(made, kFileDigestSize, digest);
+  *digestLength = code == 0 ? kFileDigestSize : 0;
   return code;
 }
 

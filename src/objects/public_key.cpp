@@ -7,6 +7,7 @@
 
 #include "src/objects/build.h"
 #include "src/objects/key_forms.h"
+#include "src/sexpr/storage.h"
 
 namespace ZvVesk2 {
 namespace {
@@ -75,7 +76,8 @@ int PublicKey::Import(ZvBuffer* buffer) {
 
 int PublicKey::Import(const char* name) {
   VESK2_REQUIRE(name != nullptr, VESK2_ERR_INVALID_PARAM);
-  const std::unique_ptr<char[]> path(CalcPath(DirectoryName(), ExtensionName(), name, StoragePath));
+  std::unique_ptr<char[]> path;
+  VESK2_TRY(FilePath(path, DirectoryName(), ExtensionName(), name, StoragePath));
   BufferOwner buffer;
   VESK2_TRY(WrapFile(buffer, path.get(), VESK2_ERR_FILE_OPEN));
   VESK2_TRY(Import(buffer.get()));

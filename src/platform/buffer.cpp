@@ -55,19 +55,25 @@ ZvBuffer* zv_buffer_adopt(unsigned char* data, size_t size) {
   std::unique_ptr<unsigned char[]> bytes(data);
   if (bytes == nullptr) return nullptr;
   ZvBuffer* buffer = new (std::nothrow) ZvBuffer(bytes.get(), size);
-  if (buffer == nullptr) return NoMemory();
-  bytes.release();
+  if (buffer != nullptr) bytes.release();
   return buffer;
 }
 
 // The bytes are read, not mapped: a file that shrinks under a map kills the process that reads it.
-ZvBuffer* zv_buffer_wrap_file(const char* path, bool listed) {
+int zv_buffer_read_file(ZvBuffer** out, const char* path, bool listed) {
+  *out = nullptr;
   size_t size = 0;
-  unsigned char* const bytes = zv_read_whole(path, ZvVesk2::Limits::kMaxFile, &size, listed);
-  return zv_buffer_adopt(bytes, size);
+  std::unique_ptr<unsigned char[]> bytes;
+  const uint64_t limit = ZvVesk2::Limits::kMaxFile;
+  if (const int code = zv_read_whole(bytes, &size, path, limit, listed)) return code;
+  *out = zv_buffer_adopt(bytes.release(), size);
+  return *out != nullptr ? 0 : VESK2_ERR_MEM_ALLOC;
 }
 
-ZvBuffer* zv_buffer_wrap_file(const char* path) { return zv_buffer_wrap_file(path, false); }
+ZvBuffer* zv_buffer_wrap_file(const char* path) {
+  ZvBuffer* buffer = nullptr;
+  return zv_buffer_read_file(&buffer, path, false) == 0 ? buffer : nullptr;
+}
 
 void zv_buffer_free(ZvBuffer* buffer) { delete buffer; }
 

@@ -36,7 +36,7 @@ int ZvDir::open(const char* directory, const char* pattern) {
 int ZvDir::Load(const char* directory, const char* pattern) {
   if (directory == nullptr || pattern == nullptr) return VESK2_ERR_FIND_DIR;
   const std::unique_ptr<DIR, DirCloser> dir(opendir(directory));
-  if (dir == nullptr) return VESK2_ERR_FIND_DIR;
+  if (dir == nullptr) return zv_error_code(errno, VESK2_ERR_FIND_DIR);
   directory_ = zv_fstrdup(directory);
   if (directory_ == nullptr) return VESK2_ERR_MEM_ALLOC;
   errno = 0;
@@ -46,7 +46,8 @@ int ZvDir::Load(const char* directory, const char* pattern) {
     }
     errno = 0;
   }
-  if (errno != 0) return VESK2_ERR_FIND_DIR;  // a list cut short would hide files
+  // A list cut short would hide files.
+  if (errno != 0) return zv_error_code(errno, VESK2_ERR_FIND_DIR);
   zv_sort(entries_, count_, sizeof(Entry), [](const void* a, const void* b) {
     return std::strcmp(static_cast<const Entry*>(a)->name, static_cast<const Entry*>(b)->name);
   });
@@ -75,7 +76,7 @@ const char* ZvDir::read(bool fullPath) {
   const char* name = entries_[cursor_++].name;
   if (!fullPath) return name;
   delete[] path_;
-  path_ = zv_concat_path(directory_, name);
+  path_ = zv_join_path(directory_, name);
   failed_ = path_ == nullptr;
   return path_;
 }

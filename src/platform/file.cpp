@@ -8,64 +8,106 @@
 #include <new>
 #include <utility>
 
+#include "src/platform/wait.h"
+
 namespace ZVsysutil {
 namespace {
 
 constexpr size_t kReadBlock = size_t{64} << 10;
 constexpr mode_t kFileMode = 0666;
 
+// The pauses between attempts to open a file that is held, in milliseconds.
+constexpr uint32_t kFirstPause = 1;
+constexpr uint32_t kLongestPause = 100;
+
 // A descriptor that is closed unless it is handed over.
 class Descriptor {
  public:
-  explicit Descriptor(int fd) : fd_(fd) {}
-  ~Descriptor() {
-    if (fd_ >= 0) close(fd_);
-  }
+  Descriptor() = default;
+  ~Descriptor() { Reset(-1); }
   Descriptor(const Descriptor&) = delete;
   Descriptor& operator=(const Descriptor&) = delete;
   int get() const { return fd_; }
   int release() { return std::exchange(fd_, -1); }
+  void Reset(int fd) {
+    if (fd_ >= 0) close(fd_);
+    fd_ = fd;
+  }
 
  private:
-  int fd_;
+  int fd_ = -1;
 };
 
-// O_NONBLOCK keeps the open itself from waiting on a FIFO or a device; on a regular file it means
-// nothing. What was opened is judged by its descriptor, so nobody can swap it in between.
-int OpenRegular(const char* path, int flags, struct stat* opened) {
-  if (path == nullptr) return -1;
-  Descriptor fd(open(path, flags | O_NONBLOCK | O_CLOEXEC | O_NOCTTY, kFileMode));
-  if (fd.get() < 0 || fstat(fd.get(), opened) != 0 || !S_ISREG(opened->st_mode)) return -1;
-  return fd.release();
-}
+int OpenError() { return zv_error_code(errno, VESK2_ERR_FILE_OPEN); }
 
-// Opening a device can do something by itself, so what is no regular file is not even opened.
-bool IsRegular(const char* path) {
+// 0 for a regular file. Opening a device can do something by itself, so what is none is not even
+// opened.
+int RequireRegular(const char* path) {
   struct stat about {};
-  return path != nullptr && stat(path, &about) == 0 && S_ISREG(about.st_mode);
+  if (path == nullptr) return VESK2_ERR_FILE_OPEN;
+  if (stat(path, &about) != 0) return OpenError();
+  return S_ISREG(about.st_mode) ? 0 : VESK2_ERR_FILE_OPEN;
 }
 
-ZvFile* OpenForReading(const char* path) {
-  if (!IsRegular(path)) return nullptr;
-  std::unique_ptr<ZvFile> file(new (std::nothrow) ZvFile);
-  std::unique_ptr<unsigned char[]> block(new (std::nothrow) unsigned char[kReadBlock]);
-  if (file == nullptr || block == nullptr) return NoMemory();
-  file->fd = OpenRegular(path, O_RDONLY, &file->opened);
-  if (file->fd < 0) return nullptr;
-  file->block = block.release();
+int OpenNow(Descriptor& out, const char* path, int flags) {
+  do {
+    out.Reset(open(path, flags | O_NONBLOCK | O_CLOEXEC | O_NOCTTY, kFileMode));
+  } while (out.get() < 0 && errno == EINTR);
+  if (out.get() >= 0) return 0;
+  return errno == EAGAIN ? VESK2_ERR_READ_FILE : OpenError();
+}
+
+// Opens a file, waiting for one that is held. Every attempt is made without blocking, and only
+// after a look that it is still a regular file: a FIFO or a device can take its place meanwhile.
+int OpenOrWait(Descriptor& out, const char* path, int flags) {
+  int code = OpenNow(out, path, flags);
+  if (code != VESK2_ERR_READ_FILE) return code;
+  ZvCall call;
+  uint32_t pause = kFirstPause;
+  while (code == VESK2_ERR_READ_FILE) {
+    const bool again = call.Pause(pause);
+    if (const int gone = RequireRegular(path)) return gone;
+    if (!again) break;
+    pause = std::min(2 * pause, kLongestPause);
+    code = OpenNow(out, path, flags);
+  }
+  return code;
+}
+
+// O_NONBLOCK keeps the open itself from waiting on a FIFO or a device, or for the holder of a
+// lease. What was opened is judged by its descriptor, so nobody can swap it in between.
+int OpenRegular(Descriptor& out, const char* path, int flags, struct stat* opened) {
+  if (path == nullptr) return VESK2_ERR_FILE_OPEN;
+  if (const int code = OpenOrWait(out, path, flags)) return code;
+  if (fstat(out.get(), opened) != 0) return OpenError();
+  return S_ISREG(opened->st_mode) ? 0 : VESK2_ERR_FILE_OPEN;
+}
+
+int OpenForReading(ZvFileOwner& out, const char* path) {
+  if (const int code = RequireRegular(path)) return code;
+  ZvFileOwner file(new (std::nothrow) ZvFile);
+  if (file == nullptr) return VESK2_ERR_MEM_ALLOC;
+  file->block = new (std::nothrow) unsigned char[kReadBlock];
+  if (file->block == nullptr) return VESK2_ERR_MEM_ALLOC;
+  Descriptor fd;
+  if (const int code = OpenRegular(fd, path, O_RDONLY, &file->opened)) return code;
+  file->fd = fd.release();
   file->next = file->end = file->block;
-  return file.release();
+  out = std::move(file);
+  return 0;
 }
 
-ZvFile* OpenForWriting(const char* path, int flags) {
-  std::unique_ptr<ZvFile> file(new (std::nothrow) ZvFile);
-  if (file == nullptr) return NoMemory();
-  Descriptor fd(OpenRegular(path, O_WRONLY | O_CREAT | O_NOFOLLOW | flags, &file->opened));
-  if (fd.get() < 0) return nullptr;
+int OpenForWriting(ZvFileOwner& out, const char* path, int flags) {
+  ZvFileOwner file(new (std::nothrow) ZvFile);
+  if (file == nullptr) return VESK2_ERR_MEM_ALLOC;
+  Descriptor fd;
+  const int forWriting = O_WRONLY | O_CREAT | O_NOFOLLOW | flags;
+  if (const int code = OpenRegular(fd, path, forWriting, &file->opened)) return code;
   file->stream = fdopen(fd.get(), "w");
-  if (file->stream == nullptr) return nullptr;
-  fd.release();  // the stream's now
-  return file.release();
+  if (file->stream == nullptr) return OpenError();
+  static_cast<void>(fd.release());  // the stream's now
+  out = std::move(file);
+  return 0;
 }
 
 // Reads once, at most `length` bytes. 0 at the end, -1 for an error.
@@ -81,19 +123,32 @@ ssize_t ReadDescriptor(int fd, unsigned char* out, size_t length) {
 size_t ReadOnce(ZvFile* file, unsigned char* out, size_t length) {
   const ssize_t count = ReadDescriptor(file->fd, out, length);
   if (count > 0) file->taken += static_cast<size_t>(count);
-  file->failed = count < 0 || file->taken > static_cast<uint64_t>(file->opened.st_size);
-  return file->failed ? 0 : static_cast<size_t>(count);
+  if (count < 0) {
+    file->failure = zv_error_code(errno, VESK2_ERR_READ_FILE);
+  } else if (file->taken > static_cast<uint64_t>(file->opened.st_size)) {
+    file->failure = VESK2_ERR_READ_FILE;
+  }
+  return file->failure != 0 ? 0 : static_cast<size_t>(count);
 }
 
 }  // namespace
 
-ZvFile* zv_open(const char* path, int mode) {
-  if (mode == ZV_READ) return OpenForReading(path);
-  if (mode == ZV_WRITE) return OpenForWriting(path, O_TRUNC);
-  return nullptr;
+int zv_error_code(int error, int otherwise) {
+  const bool ranOut = error == ENOMEM || error == EMFILE || error == ENFILE;
+  return ranOut ? VESK2_ERR_MEM_ALLOC : otherwise;
 }
 
-ZvFile* zv_create_new(const char* path) { return OpenForWriting(path, O_EXCL); }
+int zv_open(ZvFileOwner& out, const char* path, int mode) {
+  out.reset();
+  if (mode == ZV_READ) return OpenForReading(out, path);
+  if (mode == ZV_WRITE) return OpenForWriting(out, path, O_TRUNC);
+  return VESK2_ERR_FILE_OPEN;
+}
+
+ZvFile* zv_create_new(const char* path) {
+  ZvFileOwner file;
+  return OpenForWriting(file, path, O_EXCL) == 0 ? file.release() : nullptr;
+}
 
 int zv_close(ZvFile* file) {
   if (file == nullptr) return 0;
@@ -122,7 +177,7 @@ size_t zv_read_slow(ZvFile* file, unsigned char* out, size_t length) {
       copied += count;
       continue;
     }
-    if (file->failed || file->block == nullptr) break;
+    if (file->failure != 0 || file->block == nullptr) break;
     const bool whole = length - copied >= kReadBlock;  // as much as a block needs no block
     const size_t count = whole ? ReadOnce(file, out + copied, length - copied)
                                : ReadOnce(file, file->block, kReadBlock);
@@ -137,35 +192,41 @@ size_t zv_read_slow(ZvFile* file, unsigned char* out, size_t length) {
   return copied;
 }
 
-unsigned char* zv_read_whole(const char* path, uint64_t limit, size_t* size, bool listed) {
-  if (!listed && !IsRegular(path)) return nullptr;
+int zv_read_whole(std::unique_ptr<unsigned char[]>& out, size_t* size, const char* path,
+                  uint64_t limit, bool listed) {
+  if (!listed)
+    if (const int code = RequireRegular(path)) return code;
   struct stat opened {};
   // What was listed as a file is no link; one that took its place could lead to a device.
-  const Descriptor fd(OpenRegular(path, O_RDONLY | (listed ? O_NOFOLLOW : 0), &opened));
-  if (fd.get() < 0) return nullptr;
+  Descriptor fd;
+  if (const int code = OpenRegular(fd, path, O_RDONLY | (listed ? O_NOFOLLOW : 0), &opened))
+    return code;
   const auto held = static_cast<uint64_t>(opened.st_size);
-  if (held > limit) return nullptr;
+  if (held > limit) return VESK2_ERR_FILE_OPEN;
   // One byte more than it held is asked for, so that the read that gets it all meets the end.
   std::unique_ptr<unsigned char[]> bytes(new (std::nothrow) unsigned char[held + 1]);
-  if (bytes == nullptr) return NoMemory();
+  if (bytes == nullptr) return VESK2_ERR_MEM_ALLOC;
   size_t taken = 0;
   do {
     const ssize_t count = ReadDescriptor(fd.get(), bytes.get() + taken, held + 1 - taken);
-    if (count < 0) return nullptr;
+    if (count < 0) return OpenError();
     if (count == 0) break;
     taken += static_cast<size_t>(count);
   } while (taken < held);
-  if (taken != held) return nullptr;
+  if (taken != held) return VESK2_ERR_FILE_OPEN;
   *size = taken;
-  return bytes.release();
+  out = std::move(bytes);
+  return 0;
 }
 
-bool zv_unchanged(const ZvFile* file) {
+int zv_check_unchanged(const ZvFile* file) {
   struct stat now {};
-  if (fstat(file->fd, &now) != 0) return false;
+  if (fstat(file->fd, &now) != 0) return zv_error_code(errno, VESK2_ERR_READ_FILE);
   const struct stat& then = file->opened;
-  return now.st_dev == then.st_dev && now.st_ino == then.st_ino && now.st_size == then.st_size &&
-         now.st_mtim.tv_sec == then.st_mtim.tv_sec && now.st_mtim.tv_nsec == then.st_mtim.tv_nsec;
+  const bool same = now.st_dev == then.st_dev && now.st_ino == then.st_ino &&
+                    now.st_size == then.st_size && now.st_mtim.tv_sec == then.st_mtim.tv_sec &&
+                    now.st_mtim.tv_nsec == then.st_mtim.tv_nsec;
+  return same ? 0 : VESK2_ERR_READ_FILE;
 }
 
 size_t zv_write(FILE* stream, const void* data, size_t length) {
@@ -173,7 +234,8 @@ size_t zv_write(FILE* stream, const void* data, size_t length) {
 }
 
 int zv_stat(const char* path, struct stat* out) {
-  return path != nullptr && stat(path, out) == 0 ? 0 : VESK2_ERR_STAT_FILE;
+  if (path == nullptr) return VESK2_ERR_STAT_FILE;
+  return stat(path, out) == 0 ? 0 : zv_error_code(errno, VESK2_ERR_STAT_FILE);
 }
 
 int zv_mkdir(const char* path, mode_t mode) {

@@ -1,11 +1,14 @@
 // Files and directories over POSIX. Only regular files are opened for reading: a FIFO, socket or
 // device in a tree that is being judged must neither block nor feed us without end.
+//
+// What fails tells so by its code alone. VESK2_ERR_MEM_ALLOC is a resource that ran out, memory or
+// descriptors; opening a file answers VESK2_ERR_READ_FILE when the file is there and another
+// process held it until the wait was over (wait.h). Neither says that there is no such file.
 #ifndef VESK2_SRC_PLATFORM_FILE_H
 #define VESK2_SRC_PLATFORM_FILE_H
 
 #include <sys/stat.h>
 
-#include <cerrno>
 #include <cstddef>
 #include <cstdint>
 #include <cstdio>
@@ -23,22 +26,17 @@ struct ZvFile {
   unsigned char* block = nullptr;
   int fd = -1;
   uint64_t taken = 0;      // bytes read from the file so far
-  bool failed = false;     // a read error happened
+  int failure = 0;         // the code of a read error that happened
   FILE* stream = nullptr;  // writing only
   struct stat opened {};   // reading only: the file as it was when it was opened
 };
 
 enum ZvOpenMode : int { ZV_WRITE = 1, ZV_READ = 2 };
 
-// The null pointer of an operation that lacked memory; errno tells so.
-inline std::nullptr_t NoMemory() {
-  errno = ENOMEM;
-  return nullptr;
-}
+// zv_error_code is the code of a system call that failed with `error`: VESK2_ERR_MEM_ALLOC where a
+// resource ran out, else `otherwise`. No other place reads errno.
+int zv_error_code(int error, int otherwise);
 
-// zv_open opens for writing (create or truncate) or for reading. Null for a null path, for anything
-// but a regular file, and on failure.
-ZvFile* zv_open(const char* path, int mode);
 // zv_create_new opens for writing a file that must not exist yet and is no link. Null on failure.
 ZvFile* zv_create_new(const char* path);
 // zv_close closes, flushing first. 0, or VESK2_ERR_WRITE_FILE when written bytes could not be kept.
@@ -48,14 +46,18 @@ struct ZvFileCloser {
 };
 // Owns an open file on the paths where the result of closing does not matter.
 using ZvFileOwner = std::unique_ptr<ZvFile, ZvFileCloser>;
+// zv_open opens for writing (create or truncate) or for reading. 0; VESK2_ERR_MEM_ALLOC;
+// VESK2_ERR_READ_FILE (see above); VESK2_ERR_FILE_OPEN for a null path, for anything but a regular
+// file, and for all else that fails. `out` is null after a failure.
+[[nodiscard]] int zv_open(ZvFileOwner& out, const char* path, int mode);
 // zv_sync flushes a written file down to the disk. 0 or VESK2_ERR_WRITE_FILE.
 int zv_sync(ZvFile* file);
 // The stream behind a file opened for writing, for PrintCanonical.
 inline FILE* zv_stream(ZvFile* file) { return file->stream; }
 
 // zv_read copies up to `length` bytes and returns how many; 0 at the end and on an error, which
-// zv_failed then tells. A file that yields more bytes than it held when it was opened is an error:
-// it could grow as fast as we read. Small reads stay inline; a loop of them goes through a
+// zv_read_error then tells. A file that yields more bytes than it held when it was opened is an
+// error: it could grow as fast as we read. Small reads stay inline; a loop of them goes through a
 // ZvReader.
 size_t zv_read_slow(ZvFile* file, unsigned char* out, size_t length);
 inline size_t zv_read(ZvFile* file, unsigned char* out, size_t length) {
@@ -100,26 +102,30 @@ inline size_t zv_read(ZvReader& reader, unsigned char* out, size_t length) {
   return reader.Read(out, length);
 }
 
-// zv_read_whole reads a regular file of at most `limit` bytes into a new array (delete[]), without
-// the block of the readers above. Null as for zv_open, on a read error, and for a file that yields
+// zv_read_whole reads a regular file of at most `limit` bytes, without the block of the readers
+// above. Codes of zv_open; VESK2_ERR_FILE_OPEN also for a read error, and for a file that yields
 // other than the *size bytes that it held when it was opened. `listed`: the directory just said
 // that it is a regular file, which spares the question before it is opened.
-unsigned char* zv_read_whole(const char* path, uint64_t limit, size_t* size, bool listed = false);
+[[nodiscard]] int zv_read_whole(std::unique_ptr<unsigned char[]>& out, size_t* size,
+                                const char* path, uint64_t limit, bool listed);
 // zv_buffer_adopt makes a buffer of an array from new[], which is deleted on failure. Null for
-// null, and without memory (errno is then ENOMEM).
+// null, and without memory.
 ZvBuffer* zv_buffer_adopt(unsigned char* data, size_t size);
-// zv_buffer_wrap_file of a path that may be `listed`, as above.
-ZvBuffer* zv_buffer_wrap_file(const char* path, bool listed);
+// zv_buffer_read_file is zv_buffer_wrap_file with the codes of zv_read_whole; *out is null after a
+// failure.
+[[nodiscard]] int zv_buffer_read_file(ZvBuffer** out, const char* path, bool listed);
 
-inline bool zv_failed(const ZvFile* file) { return file->failed; }
-// Whether a file opened for reading is still the one that was opened: same inode, size and time.
-bool zv_unchanged(const ZvFile* file);
+// The code of a read error that happened, else 0: VESK2_ERR_READ_FILE, VESK2_ERR_MEM_ALLOC.
+inline int zv_read_error(const ZvFile* file) { return file->failure; }
+// Whether a file opened for reading is still the one that was opened: same inode, size and time. 0;
+// VESK2_ERR_READ_FILE; VESK2_ERR_MEM_ALLOC when it cannot be told.
+[[nodiscard]] int zv_check_unchanged(const ZvFile* file);
 
 // zv_write writes to a stream and returns the bytes written (short on an error).
 size_t zv_write(FILE* stream, const void* data, size_t length);
 
-// zv_stat fills *out, following links. 0, or VESK2_ERR_STAT_FILE.
-int zv_stat(const char* path, struct stat* out);
+// zv_stat fills *out, following links. 0, VESK2_ERR_STAT_FILE, VESK2_ERR_MEM_ALLOC.
+[[nodiscard]] int zv_stat(const char* path, struct stat* out);
 // zv_mkdir makes one directory (mode `mode` less the umask). 0 when it is there already, else
 // VESK2_ERR_CREATE_DIR.
 int zv_mkdir(const char* path, mode_t mode = 0777);
@@ -134,8 +140,9 @@ class ZvDir {
   ZvDir(const ZvDir&) = delete;
   ZvDir& operator=(const ZvDir&) = delete;
 
-  // 0; VESK2_ERR_FIND_DIR for a null, absent or unreadable directory; VESK2_ERR_MEM_ALLOC.
-  int open(const char* directory, const char* pattern);
+  // 0; VESK2_ERR_FIND_DIR for a null, absent or unreadable directory, or one that stopped being
+  // readable half-way; VESK2_ERR_MEM_ALLOC.
+  [[nodiscard]] int open(const char* directory, const char* pattern);
   // The next name (or "directory/name" with fullPath), borrowed until the next call; null at the
   // end or when memory runs out (see failed()).
   const char* read(bool fullPath);

@@ -101,10 +101,8 @@ char* zv_concat_string(const char* a, const char* b) {
   return joined;
 }
 
-char* zv_concat_path(const char* a, const char* b) {
-  if (a == nullptr && b == nullptr) return nullptr;
+char* zv_join_path(const char* a, const char* b) {
   const Join join(a, b);
-  if (join.size() >= ZvVesk2::Limits::kPathBuffer) return nullptr;
   char* joined = new (std::nothrow) char[join.size() + 1];
   if (joined != nullptr) join.Write(joined);
   return joined;

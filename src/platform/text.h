@@ -33,9 +33,9 @@ char* zv_ftoa_copy_n(const void* text, size_t length);
 int zv_filenamecmp(const char* a, const char* b);
 int zv_filenamencmp(const char* a, const char* b, size_t length);
 char* zv_concat_string(const char* a, const char* b);
-// "a/b" with one separator; an empty or null `a` gives `b`, a null `b` gives `a`. Null when longer
-// than a path may be.
-char* zv_concat_path(const char* a, const char* b);
+// "a/b" with one separator; an empty or null `a` gives `b`, a null `b` gives `a`. Of any length:
+// what opens the path judges that.
+char* zv_join_path(const char* a, const char* b);
 // The same into `out` of `size` bytes; when it does not fit, `out` is empty and the result false.
 bool zv_concat_path_to(char* out, size_t size, const char* a, const char* b);
 // The last component, after trailing separators are taken off; "/" for the root itself. The

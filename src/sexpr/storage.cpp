@@ -14,6 +14,7 @@
 #include "src/frame/check.h"
 #include "src/platform/file.h"
 #include "src/platform/text.h"
+#include "src/sexpr/storage.h"
 
 namespace ZvVesk2 {
 namespace {
@@ -42,8 +43,12 @@ bool IsFileName(const char* name) {
   return true;
 }
 
-// Writes the path of `name` in a store, without extension, and makes the store's directory. False
-// when there is no such path, or it would have to be cut: a cut path is another file's.
+bool HasStore(const char* dirName, StorageType type) {
+  return type != StoragePath && !IsEmpty(dirName);
+}
+
+// Writes the path of `name` in a store, without extension. False when there is no such path, or it
+// would have to be cut: a cut path is another file's.
 bool StorePath(char (&path)[Limits::kPathBuffer], const char* dirName, const char* name,
                StorageType type) {
   char base[Limits::kPathBuffer];
@@ -51,7 +56,6 @@ bool StorePath(char (&path)[Limits::kPathBuffer], const char* dirName, const cha
   const char* root = Root(type);
   if (IsEmpty(root)) return false;  // never the current directory instead
   if (!ZVsysutil::zv_concat_path_to(path, kStoreDirectoryBuffer, root, dirName)) return false;
-  (void)MakeDirectory(path, type);  // where it cannot be made, opening the file tells
   size_t length = std::strlen(path);
   path[length++] = '/';
   return ZVsysutil::zv_fstrcpy(path + length, sizeof path - length, base);
@@ -59,26 +63,46 @@ bool StorePath(char (&path)[Limits::kPathBuffer], const char* dirName, const cha
 
 }  // namespace
 
+int StoreDirectory(std::unique_ptr<char[]>& out, const char* dirName, StorageType type) {
+  char path[Limits::kPathBuffer] = ".";
+  if (HasStore(dirName, type)) {
+    const char* root = Root(type);
+    VESK2_REQUIRE(!IsEmpty(root), VESK2_ERR_FIND_DIR);
+    VESK2_REQUIRE(ZVsysutil::zv_concat_path_to(path, sizeof path, root, dirName),
+                  VESK2_ERR_FIND_DIR);
+  }
+  out.reset(ZVsysutil::zv_fstrdup(path));
+  return out ? 0 : VESK2_ERR_MEM_ALLOC;
+}
+
+int FilePath(std::unique_ptr<char[]>& out, const char* dirName, const char* extension,
+             const char* name, StorageType type) {
+  VESK2_REQUIRE(name != nullptr && extension != nullptr, VESK2_ERR_FILE_OPEN);
+  char path[Limits::kPathBuffer];
+  const bool whole = HasStore(dirName, type) ? StorePath(path, dirName, name, type)
+                                             : ZVsysutil::zv_fstrcpy(path, sizeof path, name);
+  VESK2_REQUIRE(whole, VESK2_ERR_FILE_OPEN);
+  const char* present = ZVsysutil::zv_extname(path);
+  const bool extended = present != nullptr && ZVsysutil::zv_filenamecmp(present, extension) == 0;
+  out.reset(extended ? ZVsysutil::zv_fstrdup(path) : ZVsysutil::zv_concat_string(path, extension));
+  return out ? 0 : VESK2_ERR_MEM_ALLOC;
+}
+
 char* SExpression::CalcDir(const char* dirName, StorageType type) {
-  if (type == StoragePath || IsEmpty(dirName)) return ZVsysutil::zv_fstrdup(".");
-  const char* root = Root(type);
-  if (IsEmpty(root)) return nullptr;
-  return ZVsysutil::zv_concat_path(root, dirName);
+  std::unique_ptr<char[]> directory;
+  return StoreDirectory(directory, dirName, type) == 0 ? directory.release() : nullptr;
 }
 
 char* SExpression::CalcPath(const char* dirName, const char* extension, const char* name,
                             StorageType type) {
-  if (name == nullptr || extension == nullptr) return nullptr;
-  char path[Limits::kPathBuffer];
-  const bool isOwnPath = type == StoragePath || IsEmpty(dirName);
-  const bool whole = isOwnPath ? ZVsysutil::zv_fstrcpy(path, sizeof path, name)
-                               : StorePath(path, dirName, name, type);
-  if (!whole) return nullptr;
-  const char* present = ZVsysutil::zv_extname(path);
-  if (present != nullptr && ZVsysutil::zv_filenamecmp(present, extension) == 0) {
-    return ZVsysutil::zv_fstrdup(path);
+  std::unique_ptr<char[]> path;
+  if (FilePath(path, dirName, extension, name, type) != 0) return nullptr;
+  if (HasStore(dirName, type)) {
+    std::unique_ptr<char[]> directory;
+    if (StoreDirectory(directory, dirName, type) != 0) return nullptr;
+    (void)MakeDirectory(directory.get(), type);  // where it cannot be made, opening the file tells
   }
-  return ZVsysutil::zv_concat_string(path, extension);
+  return path.release();
 }
 
 void SExpression::SetStorageType(StorageType type) { storageType = type; }
@@ -102,19 +126,20 @@ int SExpression::CreateFileDirectory() {
   if (storageType == StoragePath) return 0;
   VESK2_REQUIRE(storageType == StorageGlobal || storageType == StorageHome, VESK2_ERR_FIND_DIR);
   if (IsEmpty(DirectoryName())) return 0;
-  VESK2_REQUIRE(!IsEmpty(Root(storageType)), VESK2_ERR_FIND_DIR);
-  const std::unique_ptr<char[]> directory(CalcDir(DirectoryName(), storageType));
-  VESK2_REQUIRE(directory != nullptr, VESK2_ERR_MEM_ALLOC);
+  std::unique_ptr<char[]> directory;
+  VESK2_TRY(StoreDirectory(directory, DirectoryName(), storageType));
   return MakeDirectory(directory.get(), storageType);
 }
 
 int SExpression::Export(const char* name) {
   VESK2_TRY(CreateFileDirectory());
   if (name != nullptr) VESK2_TRY(SetFileName(name));
-  ZVsysutil::ZvFile* file = ZVsysutil::zv_open(fileName, ZVsysutil::ZV_WRITE);
-  VESK2_REQUIRE(file != nullptr, VESK2_ERR_FILE_OPEN);
-  const int printed = PrintCanonical(ZVsysutil::zv_stream(file));
-  const int closed = ZVsysutil::zv_close(file);
+  ZVsysutil::ZvFileOwner file;
+  const int opened = ZVsysutil::zv_open(file, fileName, ZVsysutil::ZV_WRITE);
+  VESK2_REQUIRE(opened != VESK2_ERR_MEM_ALLOC, VESK2_ERR_MEM_ALLOC);
+  VESK2_REQUIRE(opened == 0, VESK2_ERR_FILE_OPEN);
+  const int printed = PrintCanonical(ZVsysutil::zv_stream(file.get()));
+  const int closed = ZVsysutil::zv_close(file.release());
   return printed ? printed : closed;
 }
 

@@ -3,47 +3,36 @@
 #include <vesk2/acl_entry.h>
 #include <vesk2/cert.h>
 
-#include "src/platform/file.h"
 #include "src/trust/lists.h"
+#include "src/trust/scan.h"
 
 namespace ZvVesk2 {
 namespace {
 
-// Scan hands out the readable entries of the store, one at a time, in byte order of their names.
-class Scan {
+// Hands out the readable entries of the store, one at a time.
+class EntryScan {
  public:
-  explicit Scan(Vesk2ContextStruct* ctx) : context_(ctx) {}
+  explicit EntryScan(Vesk2ContextStruct* ctx) : context_(ctx) {}
 
-  int Open() {
-    const TextPtr path(AclEntry::CalcDir(StorageGlobal));
-    VESK2_REQUIRE(path, VESK2_ERR_FIND_DIR);
-    return directory_.open(path.get(), "*.acl");
+  [[nodiscard]] int Open() {
+    return scan_.OpenStore(AclEntry::DirectoryName(true), "*.acl", StorageGlobal);
   }
-
-  // Next moves on to another entry; false at the end, and when memory runs out, see Result.
-  bool Next() {
-    while (const char* name = directory_.read(false)) {
+  // Next moves on to another entry; false at the end, and when the scan was ended.
+  [[nodiscard]] bool Next() {
+    while (scan_.Next()) {
       entry_.Reset(TryNew<AclEntry>(context_));
-      const int code = entry_ ? entry_->Import(name) : VESK2_ERR_MEM_ALLOC;
-      if (code == 0) return true;
-      failed_ = LacksMemory(code);
-      if (failed_) return false;
+      if (scan_.Took(entry_ ? entry_->Import(scan_.Path()) : VESK2_ERR_MEM_ALLOC)) return true;
     }
     return false;
   }
-
   AclEntry* Entry() const { return entry_.get(); }
-
-  // The result of a scan that came to its end: `notFound`, unless it was cut short.
-  int Result(int notFound) const {
-    return failed_ || directory_.failed() ? VESK2_ERR_MEM_ALLOC : notFound;
-  }
+  // See Scan.
+  [[nodiscard]] int Result(int notFound) const { return scan_.Result(notFound); }
 
  private:
   Vesk2ContextStruct* context_;
-  ZVsysutil::ZvDir directory_;
+  Scan scan_;
   Ref<AclEntry> entry_;
-  bool failed_ = false;
 };
 
 bool IsGrantee(AclEntry* entry, Principal* principal) {
@@ -93,9 +82,9 @@ void WalkSigners(ThresholdSubject* threshold, SExpression* signers) {
 
 int AclEntry::Find(Principal* principal, SExpression* tag, TimeStamp* notBefore, TimeStamp*,
                    unsigned int& k) {
-  k = 0;
   VESK2_REQUIRE(tag != nullptr, VESK2_ERR_PARAM_NULL);
-  Scan scan(tag->GetContext());
+  k = 0;
+  EntryScan scan(tag->GetContext());
   VESK2_TRY(scan.Open());
   Ref<TimeStamp> now;
   VESK2_TRY(MakeNow(now, tag->GetContext()));
@@ -119,9 +108,9 @@ int AclEntry::Find(Principal* principal, SExpression* tag, TimeStamp* notBefore,
 
 int AclEntry::FindThresholdEntry(Principal* principal, SExpression* signers, SExpression* tag,
                                  TimeStamp* notBefore, TimeStamp*, unsigned int& k) {
-  k = 0;
   VESK2_REQUIRE(principal != nullptr && tag != nullptr, VESK2_ERR_PARAM_NULL);
-  Scan scan(tag->GetContext());
+  k = 0;
+  EntryScan scan(tag->GetContext());
   VESK2_TRY(scan.Open());
   Ref<TimeStamp> now;
   VESK2_TRY(MakeNow(now, tag->GetContext()));
@@ -144,7 +133,7 @@ int AclEntry::FindThresholdEntry(Principal* principal, SExpression* signers, SEx
 
 int AclEntry::Find(SExpression* tag) {
   VESK2_REQUIRE(tag != nullptr, VESK2_ERR_PARAM_NULL);
-  Scan scan(tag->GetContext());
+  EntryScan scan(tag->GetContext());
   VESK2_TRY(scan.Open());
   while (scan.Next()) {
     if (scan.Entry()->GetPropagate() && tag->IsEqual(scan.Entry()->GetTag())) return 0;
@@ -154,7 +143,7 @@ int AclEntry::Find(SExpression* tag) {
 
 int AclEntry::FindSuperSet(SExpression* tag, bool needPropagate) {
   VESK2_REQUIRE(tag != nullptr, VESK2_ERR_INVALID_PARAM);
-  Scan scan(tag->GetContext());
+  EntryScan scan(tag->GetContext());
   VESK2_TRY(scan.Open());
   while (scan.Next()) {
     if (needPropagate && !scan.Entry()->GetPropagate()) continue;

@@ -3,12 +3,10 @@
 
 #include <cstring>
 
-#include "src/platform/file.h"
 #include "src/trust/lists.h"
+#include "src/trust/scan.h"
 
 namespace ZvVesk2 {
-
-using ZVsysutil::ZvDir;
 
 int AclEntry::Import(const char* name) { return ImportFile(name, false); }
 
@@ -19,7 +17,9 @@ int AclEntry::ImportFile(const char* name, bool listed) {
     VESK2_TRY(SetFilePath(name));
   } else {
     SetStorageType(StorageGlobal);
-    VESK2_TRY(SetFileName(name));
+    TextPtr path;
+    VESK2_TRY(FilePath(path, DirectoryName(), ExtensionName(), name, StorageGlobal));
+    VESK2_TRY(SetFilePath(path.get()));
   }
   BufferOwner buffer;
   VESK2_TRY(WrapFile(buffer, GetFileName(), VESK2_ERR_FILE_OPEN, listed));
@@ -27,31 +27,31 @@ int AclEntry::ImportFile(const char* name, bool listed) {
 }
 
 int AclEntry::LoadDirectory(SExpression* list, const char* directory) {
-  ZvDir dir;
-  VESK2_TRY(dir.open(directory, "*.acl"));
-  int status = 0;
-  while (const char* path = dir.read(true)) {
+  Scan scan;
+  VESK2_TRY(scan.Open(directory, "*.acl"));
+  while (scan.Next()) {
     Ref<AclEntry> entry(TryNew<AclEntry>(list->GetContext()));
     VESK2_REQUIRE(entry, VESK2_ERR_MEM_ALLOC);
-    status = entry->ImportFile(path, dir.isRegular());
-    if (status == 0) VESK2_TRY(Append(list, std::move(entry)));
-    // An entry that is missing for lack of memory may be the one that names a revocation list.
-    if (LacksMemory(status)) return VESK2_ERR_MEM_ALLOC;
+    if (!scan.Took(entry->ImportFile(scan.Path(), scan.IsListed()))) continue;
+    VESK2_TRY(Append(list, std::move(entry)));
   }
-  return dir.failed() ? VESK2_ERR_MEM_ALLOC : status;
+  return scan.Result(scan.Last());
 }
 
 int AclEntry::Import(SExpression*& out, Vesk2ContextStruct* ctx, const char* extraDir) {
   VESK2_REQUIRE(out == nullptr, VESK2_ERR_INVALID_PARAM);
+  const ZVsysutil::ZvCall call;
   Ref<SExpression> list;
   VESK2_TRY(SExpression::Create(list.Out(), "acl", ctx));
 
-  const TextPtr store(CalcDir(StorageGlobal));
-  const int stored = LoadDirectory(list.get(), store.get());
-  VESK2_REQUIRE(stored != VESK2_ERR_MEM_ALLOC, VESK2_ERR_MEM_ALLOC);
+  TextPtr store;
+  int stored = StoreDirectory(store, DirectoryName(true), StorageGlobal);
+  if (stored == 0) stored = LoadDirectory(list.get(), store.get());
+  VESK2_REQUIRE(!IsNoAbsence(stored), stored);
   VESK2_REQUIRE(stored == 0 || extraDir != nullptr, VESK2_ERR_FILE_NOT_FOUND);
   if (extraDir != nullptr) {
-    VESK2_REQUIRE(LoadDirectory(list.get(), extraDir) != VESK2_ERR_MEM_ALLOC, VESK2_ERR_MEM_ALLOC);
+    const int extra = LoadDirectory(list.get(), extraDir);
+    VESK2_REQUIRE(!IsNoAbsence(extra), extra);
   }
   VESK2_REQUIRE(list->Count() > 1, VESK2_ERR_FILE_NOT_FOUND);
   out = list.Release();

@@ -1,6 +1,7 @@
 // CertRequest: a certificate sequence in a ".req" file, outside every store.
 #include <vesk2/cert_sequence.h>
 
+#include "src/sexpr/storage.h"
 #include "src/trust/lists.h"
 
 namespace ZvVesk2 {
@@ -17,8 +18,8 @@ int CertRequest::Import(Cert*& cert, Signature*& signature, SExpression*& sequen
                         const char* file, Vesk2ContextStruct* context) {
   VESK2_REQUIRE(cert == nullptr && signature == nullptr && sequence == nullptr && file != nullptr,
                 VESK2_ERR_INVALID_PARAM);
-  const TextPtr path(SExpression::CalcPath("", ".req", file, StoragePath));
-  VESK2_REQUIRE(path, VESK2_ERR_MEM_ALLOC);
+  TextPtr path;
+  VESK2_TRY(FilePath(path, "", ".req", file, StoragePath));
   BufferOwner buffer;
   VESK2_TRY(WrapFile(buffer, path.get(), VESK2_ERR_FILE_OPEN));
   return CertSequence::Import(cert, signature, sequence, buffer.get(), context);
@@ -27,6 +28,9 @@ int CertRequest::Import(Cert*& cert, Signature*& signature, SExpression*& sequen
 int CertRequest::Export(const char* file) {
   VESK2_REQUIRE(file != nullptr && *file != '\0', VESK2_ERR_INVALID_PARAM);
   SetStorageType(StoragePath);
+  // A name that no file can have, told apart here from a lack of memory.
+  TextPtr path;
+  VESK2_TRY(FilePath(path, DirectoryName(), ExtensionName(), file, StoragePath));
   return SExpression::Export(file);
 }
 

@@ -5,6 +5,7 @@
 #include <vesk2/acl_entry.h>
 #include <vesk2/crl.h>
 
+#include "src/platform/wait.h"
 #include "src/trust/lists.h"
 
 namespace ZvVesk2 {
@@ -52,6 +53,7 @@ int Cert::IsRevoked(bool& revoked, SExpression* acls, SExpression* crls, TimeSta
 int Cert::IsRevoked(bool& revoked) {
   revoked = false;
   revocationStatus = Undetermined;
+  const ZVsysutil::ZvCall call;
   Ref<SExpression> acls;
   VESK2_TRY(AclEntry::Import(acls.Out(), GetContext(), nullptr));
   Ref<SExpression> crls;

@@ -1,6 +1,7 @@
 // CertSequence: reading a chain of certificates, whole, triple by triple, or only its first triple.
 #include <vesk2/cert_sequence.h>
 
+#include "src/sexpr/storage.h"
 #include "src/trust/lists.h"
 
 namespace ZvVesk2 {
@@ -49,8 +50,10 @@ struct Triple {
 
 // Finds and reads the file of a sequence.
 int OpenFile(BufferOwner& buffer, TextPtr& path, const char* name, bool usePath) {
-  path.reset(CertSequence::CalcPath(name, usePath ? StoragePath : StorageHome));
-  VESK2_REQUIRE(path, VESK2_ERR_MEM_ALLOC);
+  const int code =
+      FilePath(path, CertSequence::DirectoryName(true), CertSequence::ExtensionName(true), name,
+               usePath ? StoragePath : StorageHome);
+  VESK2_REQUIRE(code == 0, VESK2_ERR_MEM_ALLOC);  // callers know a name without a path so
   return WrapFile(buffer, path.get(), VESK2_ERR_FILE_OPEN);
 }
 

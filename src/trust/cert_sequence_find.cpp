@@ -3,27 +3,31 @@
 
 #include <cstring>
 
-#include "src/platform/file.h"
 #include "src/platform/text.h"
 #include "src/sexpr/same.h"
 #include "src/trust/lists.h"
+#include "src/trust/scan.h"
 
 namespace ZvVesk2 {
 namespace {
 
-using ZVsysutil::ZvDir;
-
-int OpenStore(ZvDir& directory) {
-  const TextPtr path(CertSequence::CalcDir(StorageHome));
-  VESK2_REQUIRE(path, VESK2_ERR_MEM_ALLOC);
-  return directory.open(path.get(), "*.cert");
+int OpenStore(Scan& scan) {
+  TextPtr directory;
+  VESK2_REQUIRE(StoreDirectory(directory, CertSequence::DirectoryName(true), StorageHome) == 0,
+                VESK2_ERR_MEM_ALLOC);
+  return scan.Open(directory.get(), "*.cert");
 }
 
-int ReadFirst(Ref<Cert>& cert, const char* name, Vesk2ContextStruct* ctx) {
+int ReadFirst(Ref<Cert>& cert, const char* path, Vesk2ContextStruct* ctx) {
+  BufferOwner buffer;
+  VESK2_TRY(WrapFile(buffer, path, VESK2_ERR_FILE_OPEN));
   Ref<Signature> signature;
   Ref<SExpression> extra;
-  return CertSequence::Import(cert.Out(), signature.Out(), extra.Out(), name, false, ctx);
+  return CertSequence::Import(cert.Out(), signature.Out(), extra.Out(), buffer.get(), ctx);
 }
+
+// The bare name of what was found.
+const char* NameOf(const char* path) { return std::strrchr(path, '/') + 1; }
 
 // Appends the name together with its terminating 0 byte: callers print the bytes as a C string.
 int AppendName(SExpression* names, const char* name) {
@@ -38,23 +42,23 @@ int AppendName(SExpression* names, const char* name) {
 
 int CertSequence::Find(char*& fileName, SExpression* tag) {
   VESK2_REQUIRE(fileName == nullptr && tag != nullptr, VESK2_ERR_INVALID_PARAM);
-  ZvDir directory;
-  VESK2_TRY(OpenStore(directory));
+  Scan scan;
+  VESK2_TRY(OpenStore(scan));
   TextPtr found;
   int status = VESK2_ERR_FILE_NOT_FOUND;
-  while (const char* name = directory.read(false)) {
+  while (scan.Next()) {
     // A file that cannot be read might carry the tag too: the answer would not be the only one.
     Ref<Cert> cert;
-    VESK2_TRY(ReadFirst(cert, name, tag->GetContext()));
+    VESK2_TRY(ReadFirst(cert, scan.Path(), tag->GetContext()));
     bool equal = false;
     VESK2_TRY(CompareValues(equal, cert->GetTag(), tag));
     if (!equal) continue;
     status = found ? VESK2_ERR_MULTI_AUTH_MATCH : 0;
     if (found) continue;
-    found.reset(ZVsysutil::zv_strdup(name));
+    found.reset(ZVsysutil::zv_strdup(NameOf(scan.Path())));
     VESK2_REQUIRE(found, VESK2_ERR_MEM_ALLOC);
   }
-  VESK2_REQUIRE(!directory.failed(), VESK2_ERR_MEM_ALLOC);
+  VESK2_TRY(scan.Result(0));
   fileName = found.release();
   return status;
 }
@@ -63,16 +67,15 @@ int CertSequence::Find(SExpression*& names, SExpression* tag) {
   VESK2_REQUIRE(names == nullptr && tag != nullptr, VESK2_ERR_INVALID_PARAM);
   Ref<SExpression> list(TryNew<SExpression>(tag->GetContext()));
   VESK2_REQUIRE(list, VESK2_ERR_MEM_ALLOC);
-  ZvDir directory;
-  VESK2_TRY(OpenStore(directory));
-  while (const char* name = directory.read(false)) {
+  Scan scan;
+  VESK2_TRY(OpenStore(scan));
+  while (scan.Next()) {
     Ref<Cert> cert;
-    const int code = ReadFirst(cert, name, tag->GetContext());
-    VESK2_REQUIRE(!LacksMemory(code), VESK2_ERR_MEM_ALLOC);
-    if (code != 0 || !tag->IsSubset(cert->GetTag())) continue;
-    VESK2_TRY(AppendName(list.get(), name));
+    if (!scan.Took(ReadFirst(cert, scan.Path(), tag->GetContext()))) continue;
+    if (!tag->IsSubset(cert->GetTag())) continue;
+    VESK2_TRY(AppendName(list.get(), NameOf(scan.Path())));
   }
-  VESK2_REQUIRE(!directory.failed(), VESK2_ERR_MEM_ALLOC);
+  VESK2_TRY(scan.Result(0));
   names = list.Release();
   return 0;
 }

@@ -2,6 +2,7 @@
 #include <vesk2/cert_sequence.h>
 #include <vesk2/verify.h>
 
+#include "src/platform/wait.h"
 #include "src/trust/chain.h"
 #include "src/trust/lists.h"
 
@@ -11,6 +12,7 @@ int CertSequence::Verify(Subject* subject, SExpression* tag, TimeStamp* notBefor
                          TimeStamp* notAfter, const char* name, bool usePath,
                          Vesk2ContextStruct* ctx) {
   VESK2_REQUIRE(name != nullptr, VESK2_ERR_PARAM_NULL);
+  const ZVsysutil::ZvCall call;
   Ref<CertSequence> sequence;
   VESK2_TRY(Import(sequence.Out(), name, usePath, ctx));
   return sequence->Verify(subject, tag, notBefore, notAfter);
@@ -18,6 +20,7 @@ int CertSequence::Verify(Subject* subject, SExpression* tag, TimeStamp* notBefor
 
 int CertSequence::Verify(Subject* subject, SExpression* tag, TimeStamp* notBefore,
                          TimeStamp* notAfter) {
+  const ZVsysutil::ZvCall call;
   VESK2_TRY(VerifySignatures());
   VESK2_TRY(VerifyRevocations(notBefore, notAfter));
   return VerifyChain(subject, tag, notBefore, notAfter);
@@ -35,6 +38,7 @@ int CertSequence::VerifySignatures() {
 }
 
 int CertSequence::VerifyRevocations(TimeStamp* notBefore, TimeStamp* notAfter) {
+  const ZVsysutil::ZvCall call;
   auto at = FirstItem(this);
   VESK2_REQUIRE(at, VESK2_ERR_INVALID_SEQUENCE);
   Ref<SExpression> certs(TryNew<SExpression>(GetContext()));

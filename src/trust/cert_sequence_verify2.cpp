@@ -3,6 +3,7 @@
 #include <vesk2/cert_sequence.h>
 #include <vesk2/verify.h>
 
+#include "src/platform/wait.h"
 #include "src/trust/chain.h"
 #include "src/trust/lists.h"
 
@@ -16,6 +17,7 @@ int VerifyLink(const ChainLink& link) {
 
 // Replaces the lists by what is not revoked of them. Both are as they were after a failure.
 int DropRevoked(Ref<SExpression>& certs, Ref<SExpression>& extras, Vesk2ContextStruct* ctx) {
+  const ZVsysutil::ZvCall call;
   Ref<SExpression> acls;
   VESK2_TRY(AclEntry::Import(acls.Out(), ctx, nullptr));
   VESK2_TRY(MarkRevoked(certs.get(), acls.get(), nullptr, nullptr));
@@ -43,6 +45,7 @@ int DropRevoked(Ref<SExpression>& certs, Ref<SExpression>& extras, Vesk2ContextS
 int CertSequence::Verify2(SExpression*& tag, SExpression*& notBefore, SExpression*& notAfter) {
   VESK2_REQUIRE(tag == nullptr && notBefore == nullptr && notAfter == nullptr,
                 VESK2_ERR_INVALID_PARAM);
+  const ZVsysutil::ZvCall call;
   Ref<SExpression> certs(TryNew<SExpression>(GetContext()));
   Ref<SExpression> extras(TryNew<SExpression>(GetContext()));
   VESK2_REQUIRE(certs && extras, VESK2_ERR_MEM_ALLOC);

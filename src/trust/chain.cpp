@@ -34,8 +34,8 @@ int ReadWholeLink(ChainLink& link, SExpression::Iterator& at) {
 }
 
 int LoadRoots(Ref<SExpression>& acls, Vesk2ContextStruct* ctx) {
-  VESK2_REQUIRE(AclEntry::Import(acls.Out(), ctx, nullptr) == 0, VESK2_ERR_ACL_ENTRY_NOT_FOUND);
-  return 0;
+  const int code = AclEntry::Import(acls.Out(), ctx, nullptr);
+  return code == 0 || IsNoAbsence(code) ? code : VESK2_ERR_ACL_ENTRY_NOT_FOUND;
 }
 
 int MarkRevoked(SExpression* certs, SExpression* acls, TimeStamp* notBefore, TimeStamp* notAfter) {

@@ -25,8 +25,9 @@ SExpression::Iterator FirstItem(const SExpression* sequence);
 // triple.
 [[nodiscard]] int ReadWholeLink(ChainLink& link, SExpression::Iterator& at);
 
-// LoadRoots loads the ACL store. Whatever fails is VESK2_ERR_ACL_ENTRY_NOT_FOUND: without all of
-// its roots a machine trusts nobody.
+// LoadRoots loads the ACL store. A store that is absent or has a file that cannot be read is
+// VESK2_ERR_ACL_ENTRY_NOT_FOUND: without all of its roots a machine trusts nobody. A lack of memory
+// and a file that another process holds (VESK2_ERR_READ_FILE) are no absence and come through.
 [[nodiscard]] int LoadRoots(Ref<SExpression>& acls, Vesk2ContextStruct* ctx);
 
 // MarkRevoked asks the CRL store, vouched for by `acls`, about each certificate of the list, and

@@ -9,14 +9,12 @@
 #include <vesk2/acl_entry.h>
 #include <vesk2/context.h>
 
-#include "src/platform/file.h"
-#include "src/platform/text.h"
+#include "src/sexpr/storage.h"
 #include "src/trust/lists.h"
+#include "src/trust/scan.h"
 #include "src/trust/store_write.h"
 
 namespace ZvVesk2 {
-
-using ZVsysutil::ZvDir;
 
 namespace {
 
@@ -72,26 +70,25 @@ int StoreName(TextPtr& name, SExpression* tag) {
 
 // ---- Loading ----
 
-// The path of a stored list, without the store's directory being made: a verification only reads.
-TextPtr StoredPath(const char* name) {
-  const TextPtr directory(CrlSequence::CalcDir(StorageGlobal));
-  if (!directory) return nullptr;
-  const TextPtr path(ZVsysutil::zv_concat_path(directory.get(), name));
-  return TextPtr(path ? CrlSequence::CalcPath(path.get(), StoragePath) : nullptr);
+// The path of a stored list.
+int StoredPath(TextPtr& path, const char* name) {
+  const char* const extension = CrlSequence::ExtensionName(true);
+  return FilePath(path, CrlSequence::DirectoryName(true), extension, name, StorageGlobal);
 }
 
-// Appends the stored list of one source, if it can be read. A lack of memory is never taken for a
-// missing list: that would bring revoked keys back.
+// Appends the stored list of one source, if it can be read. A list that is there but could not be
+// read for want of memory, or because another process holds it, is never taken for a missing one:
+// that would bring revoked keys back.
 int LoadSource(SExpression* store, SExpression* tag) {
   TextPtr name;
   VESK2_TRY(StoreName(name, tag));
   if (!name || *VeskConf::GetGlobalDirectory() == '\0') return 0;
-  const TextPtr path = StoredPath(name.get());
-  VESK2_REQUIRE(path, VESK2_ERR_MEM_ALLOC);
+  TextPtr path;
+  VESK2_TRY(StoredPath(path, name.get()));
   Ref<CrlSequence> sequence(TryNew<CrlSequence>(store->GetContext()));
   VESK2_REQUIRE(sequence, VESK2_ERR_MEM_ALLOC);
   const int code = sequence->Import(path.get());
-  VESK2_REQUIRE(!LacksMemory(code), VESK2_ERR_MEM_ALLOC);
+  VESK2_REQUIRE(!IsNoAbsence(code), code);
   return code == 0 ? Append(store, std::move(sequence)) : 0;
 }
 
@@ -100,6 +97,7 @@ int LoadSource(SExpression* store, SExpression* tag) {
 int CrlSequence::ImportStore(SExpression*& store, SExpression* aclEntries,
                              Vesk2ContextStruct* ctx) {
   store = nullptr;
+  const ZVsysutil::ZvCall call;
   Ref<SExpression> loaded;
   if (aclEntries == nullptr) {
     VESK2_TRY(AclEntry::Import(loaded.Out(), ctx, nullptr));
@@ -121,31 +119,27 @@ int CrlSequence::ImportStore(SExpression*& store, SExpression* aclEntries,
 int CrlSequence::ImportDir(SExpression*& list, const char* dir, StorageType type,
                            Vesk2ContextStruct* ctx) {
   VESK2_REQUIRE(list == nullptr, VESK2_ERR_INVALID_PARAM);
-  ZvDir directory;
-  VESK2_REQUIRE(directory.open(dir, "*.crl") == 0, VESK2_ERR_FILE_NOT_FOUND);
+  Scan scan;
+  const int opened = scan.Open(dir, "*.crl");
+  VESK2_REQUIRE(!IsNoAbsence(opened), opened);
+  VESK2_REQUIRE(opened == 0, VESK2_ERR_FILE_NOT_FOUND);
   Ref<SExpression> loaded(TryNew<SExpression>(ctx));
   VESK2_REQUIRE(loaded, VESK2_ERR_MEM_ALLOC);
-  while (const char* path = directory.read(true)) {
-    BufferOwner buffer;
-    const int opened = WrapFile(buffer, path, VESK2_ERR_FILE_NOT_FOUND);
-    VESK2_REQUIRE(opened != VESK2_ERR_MEM_ALLOC, opened);
-    if (opened != 0) continue;
+  while (scan.Next()) {
     Ref<CrlSequence> sequence(TryNew<CrlSequence>(ctx));
     VESK2_REQUIRE(sequence, VESK2_ERR_MEM_ALLOC);
+    if (!scan.Took(sequence->Import(scan.Path()))) continue;
     sequence->SetStorageType(type);
-    VESK2_TRY(sequence->SetFilePath(path));
-    const int code = sequence->Import(buffer.get());
-    VESK2_REQUIRE(!LacksMemory(code), VESK2_ERR_MEM_ALLOC);
-    if (code != 0) continue;
     VESK2_TRY(Append(loaded.get(), std::move(sequence)));
   }
-  VESK2_REQUIRE(!directory.failed(), VESK2_ERR_MEM_ALLOC);
+  VESK2_TRY(scan.Result(0));
   VESK2_REQUIRE(loaded->First() != nullptr, VESK2_ERR_CRL_NOT_FOUND);
   list = loaded.Release();
   return 0;
 }
 
 int CrlSequence::ImportDirAndStore(const char* dir, Vesk2ContextStruct* ctx) {
+  const ZVsysutil::ZvCall call;
   Ref<SExpression> acls;
   VESK2_TRY(AclEntry::Import(acls.Out(), ctx, nullptr));
   Ref<SExpression> sequences;
@@ -163,31 +157,25 @@ int CrlSequence::Find(CrlSequence*& out, SExpression* tag) {
   VESK2_REQUIRE(tag != nullptr, VESK2_ERR_PARAM_NULL);
   Ref<SExpression> wanted;
   VESK2_TRY(MakeTag(wanted, tag));
-  const TextPtr path(CalcDir(StorageGlobal));
-  VESK2_REQUIRE(path, VESK2_ERR_FIND_DIR);
-  ZvDir directory;
-  VESK2_TRY(directory.open(path.get(), "*.crl"));
+  Scan scan;
+  VESK2_TRY(scan.OpenStore(DirectoryName(true), "*.crl", StorageGlobal));
 
   int status = 0;
   Ref<CrlSequence> candidate;
-  while (const char* name = directory.read(false)) {
-    candidate.Reset();
-    const TextPtr file(CalcPath(name, StorageGlobal));
-    VESK2_REQUIRE(file, VESK2_ERR_MEM_ALLOC);
+  while (scan.Next()) {
     candidate.Reset(TryNew<CrlSequence>(tag->GetContext()));
     VESK2_REQUIRE(candidate, VESK2_ERR_MEM_ALLOC);
     status = VESK2_ERR_ACL_ENTRY_NOT_FOUND;
-    const int code = candidate->Import(file.get());
-    VESK2_REQUIRE(!LacksMemory(code), VESK2_ERR_MEM_ALLOC);
-    if (code != 0) continue;
+    if (!scan.Took(candidate->Import(scan.Path()))) continue;
     if (wanted->IsEqual(candidate->GetCert()->GetTag())) {
       status = 0;
       break;
     }
   }
+  VESK2_TRY(scan.Result(0));
   // Found or not, callers expect the last candidate, and free it.
   out = candidate.Release();
-  return directory.failed() ? VESK2_ERR_MEM_ALLOC : status;
+  return status;
 }
 
 // ---- Storing ----

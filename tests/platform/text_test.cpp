@@ -22,12 +22,8 @@ std::string Take(char* text) {
 TEST(TextTest, JoinsWithOneSeparator) {
   const std::tuple<const char*, const char*, const char*> cases[] = {
       {"/a/", "b", "/a/b"}, {"a", "/b", "a/b"},  {"a/", "/b", "a/b"}, {"a//", "b", "a//b"},
-      {"", "/b", "/b"},     {nullptr, "b", "b"}, {"a", nullptr, "a"}, {nullptr, nullptr, "null"}};
-  for (const auto& [a, b, joined] : cases) EXPECT_EQ(Take(zv_concat_path(a, b)), joined);
-  // A path with its terminator is 4097 bytes at most.
-  const std::string longest(4096 - 2, 'x');
-  EXPECT_EQ(Take(zv_concat_path("a", longest.c_str())), "a/" + longest);
-  EXPECT_EQ(Take(zv_concat_path("ab", longest.c_str())), "null");
+      {"", "/b", "/b"},     {nullptr, "b", "b"}, {"a", nullptr, "a"}, {nullptr, nullptr, ""}};
+  for (const auto& [a, b, joined] : cases) EXPECT_EQ(Take(zv_join_path(a, b)), joined);
   char out[4];
   EXPECT_TRUE(zv_concat_path_to(out, sizeof out, "a", "b") && std::string(out) == "a/b");
   EXPECT_FALSE(zv_concat_path_to(out, sizeof out, "a", "bc"));

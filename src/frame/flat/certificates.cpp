@@ -8,6 +8,7 @@
 #include "src/frame/flat/ascii_text.h"
 #include "src/platform/file.h"
 #include "src/platform/text.h"
+#include "src/platform/wait.h"
 
 using namespace ZvVesk2;
 
@@ -47,6 +48,7 @@ int Vesk2CertVerify(Vesk2CertInfoStruct* chain, const char* tagText, time_t notB
 
 int Vesk2CertVerifyFile(const char* path, const char* tagText, time_t notBefore, time_t notAfter) {
   VESK2_REQUIRE(path != nullptr, VESK2_ERR_PARAM_NULL);
+  const ZVsysutil::ZvCall call;
   Ref<CertSequence> sequence;
   VESK2_TRY(CertSequence::Import(sequence.Out(), path, true, nullptr));
   return VerifySequence(sequence.get(), tagText, notBefore, notAfter);

@@ -9,6 +9,8 @@
 #include "src/frame/flat/ascii_text.h"
 #include "src/frame/flat/tag_text.h"
 #include "src/frame/handles.h"
+#include "src/platform/wait.h"
+#include "src/sexpr/storage.h"
 
 using namespace ZvVesk2;
 
@@ -60,7 +62,11 @@ int Vesk2CrlRead(Vesk2CrlInfoStruct** out, const char* path, Vesk2ContextStruct*
   VESK2_REQUIRE(sequence, VESK2_ERR_MEM_ALLOC);
   sequence->SetStorageType(StoragePath);
   // A path that cannot be one is a file that cannot be found.
-  static_cast<void>(sequence->SetFileName(path));
+  std::unique_ptr<char[]> file;
+  const int code = FilePath(file, "", CrlSequence::ExtensionName(true), path, StoragePath);
+  VESK2_REQUIRE(code != VESK2_ERR_FILE_OPEN, VESK2_ERR_FILE_NOT_FOUND);
+  VESK2_TRY(code);
+  VESK2_TRY(sequence->SetFileName(path));
   BufferOwner buffer;
   VESK2_TRY(WrapFile(buffer, sequence->GetFileName(), VESK2_ERR_FILE_NOT_FOUND));
   VESK2_TRY(sequence->Import(buffer.get()));
@@ -135,6 +141,7 @@ int Vesk2CrlVerify(Vesk2CrlInfoStruct* record, const char* tagText, time_t from,
 
 int Vesk2CrlVerifyFile(const char* path, const char* tagText, time_t from, time_t to,
                        Vesk2ContextStruct* context) {
+  const ZVsysutil::ZvCall call;
   Vesk2CrlInfoStruct* read = nullptr;
   VESK2_TRY(Vesk2CrlRead(&read, path, context));
   const RecordOwner record(read);

@@ -1,0 +1,50 @@
+// See wait.h.
+#include "src/platform/wait.h"
+
+#include <algorithm>
+#include <atomic>
+#include <cerrno>
+#include <ctime>
+
+#include <vesk2/limits.h>
+
+namespace ZVsysutil {
+namespace {
+
+// In the block that every thread has from its start: storage that is made on demand cannot be
+// refused, so without memory the process would end.
+__attribute__((tls_model("initial-exec"))) thread_local ZvCall* outermost = nullptr;
+
+std::atomic<uint32_t> allowance{ZvVesk2::Limits::kMaxHeldWait};
+
+void Sleep(uint32_t milliseconds) {
+  timespec left{};
+  left.tv_sec = static_cast<time_t>(milliseconds / 1000);
+  left.tv_nsec = static_cast<long>(milliseconds % 1000) * 1'000'000;
+  while (clock_nanosleep(CLOCK_MONOTONIC, 0, &left, &left) == EINTR) {
+  }
+}
+
+}  // namespace
+
+ZvCall::ZvCall() : shared_(outermost != nullptr ? outermost : this) { outermost = shared_; }
+
+ZvCall::~ZvCall() {
+  if (shared_ == this) outermost = nullptr;
+}
+
+bool ZvCall::Pause(uint32_t milliseconds) {
+  uint32_t& waited = shared_->waited_;
+  const uint32_t most = allowance;
+  const uint32_t pause = std::min(milliseconds, most - std::min(most, waited));
+  if (pause == 0) return false;
+  Sleep(pause);
+  waited += pause;
+  return true;
+}
+
+void zv_limit_waits(uint32_t milliseconds) {
+  allowance = milliseconds != 0 ? milliseconds : ZvVesk2::Limits::kMaxHeldWait;
+}
+
+}  // namespace ZVsysutil

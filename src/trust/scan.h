@@ -1,0 +1,66 @@
+// Scan: the files of a directory whose names match a pattern, one at a time, in byte order of the
+// names. Every search of a store goes by the same rule: a file that cannot be read is passed over,
+// but not one that was not read for want of memory or because another process holds it. It may be
+// the one that matters, so it ends the scan, and the search with it.
+//
+//   Scan scan;
+//   VESK2_TRY(scan.OpenStore(AclEntry::DirectoryName(true), "*.acl", StorageGlobal));
+//   while (scan.Next()) {
+//     if (!scan.Took(<read scan.Path(), or an object in it>)) continue;
+//     ...
+//   }
+//   return scan.Result(<what it means that there is no more>);
+#ifndef VESK2_SRC_TRUST_SCAN_H
+#define VESK2_SRC_TRUST_SCAN_H
+
+#include "src/frame/check.h"
+#include "src/platform/file.h"
+#include "src/platform/wait.h"
+#include "src/sexpr/storage.h"
+
+namespace ZvVesk2 {
+
+class Scan {
+ public:
+  // VESK2_ERR_FIND_DIR for a null, absent or unreadable directory, VESK2_ERR_MEM_ALLOC.
+  [[nodiscard]] int Open(const char* directory, const char* pattern) {
+    return files_.open(directory, pattern);
+  }
+  // The same of a store. VESK2_ERR_FIND_DIR also when its root is not set.
+  [[nodiscard]] int OpenStore(const char* name, const char* pattern, StorageType type) {
+    std::unique_ptr<char[]> directory;
+    VESK2_TRY(StoreDirectory(directory, name, type));
+    return Open(directory.get(), pattern);
+  }
+
+  // Next moves on to another file; false at the end, and when the scan was ended.
+  [[nodiscard]] bool Next() {
+    path_ = IsNoAbsence(last_) ? nullptr : files_.read(true);
+    if (files_.failed()) last_ = VESK2_ERR_MEM_ALLOC;
+    return path_ != nullptr;
+  }
+  // Took hears how reading the file went, and tells whether there is something to look at.
+  [[nodiscard]] bool Took(int code) {
+    last_ = code;
+    return code == 0;
+  }
+
+  // The file's path, borrowed until the next call of Next, and whether the directory says that it
+  // is a regular file.
+  const char* Path() const { return path_; }
+  bool IsListed() const { return files_.isRegular(); }
+  // The code of the file read last.
+  int Last() const { return last_; }
+  // What a scan that came to its end answers: `atEnd`, unless it was ended before.
+  [[nodiscard]] int Result(int atEnd) const { return IsNoAbsence(last_) ? last_ : atEnd; }
+
+ private:
+  ZVsysutil::ZvCall call_;  // one wait for all files
+  ZVsysutil::ZvDir files_;
+  const char* path_ = nullptr;
+  int last_ = 0;
+};
+
+}  // namespace ZvVesk2
+
+#endif  // VESK2_SRC_TRUST_SCAN_H
