@@ -54,6 +54,12 @@ class VESK2_API Manifest {
   [[nodiscard]] int Verify(ZvBuffer* body, const char* directory);
   [[nodiscard]] int Compare(ZvBuffer* body1, ZvBuffer* body2);
 
+  // Why an entry of a result list was not compared.
+  struct Reason {
+    const FileItem* entry;
+    int code;
+  };
+
   // ---- Settings; see vesk2.h ----
   void SetFailOnExtraEntries(bool value) { failOnExtraEntries = value; }
   // Takes over `owned`, an array from new[], or null.
@@ -79,6 +85,14 @@ class VESK2_API Manifest {
   FileItem* GetInvalid() const { return invalid.get(); }
   FileItem* GetMissing() const { return missing.get(); }
   FileItem* GetExtra() const { return extra.get(); }
+  // GetReason tells why an entry of the lists above is there although it was not compared:
+  //   VESK2_ERR_FILE_OPEN  it could not be opened; a changed file that could not be opened is
+  //   there,
+  //                        and another process held it for Limits::kMaxHeldWait
+  //   VESK2_ERR_READ_FILE  it could not be read to its end, or changed meanwhile
+  //   VESK2_ERR_FIND_DIR   the directory is missing, or its entries could not be read
+  // 0 when it was compared, and for any other entry.
+  int GetReason(const FileItem* entry) const;
   FileItem* GetIgnoredEntries() const { return ignoredEntries.get(); }
   // Null before and after a failed read.
   SExpression* GetVersion() const { return version.get(); }
@@ -95,6 +109,9 @@ class VESK2_API Manifest {
   [[nodiscard]] int BuildIgnoreList(const char* base, PointerArray<char>& list) const;
   // Moves the records of a comparison to the front of the four lists.
   [[nodiscard]] int Publish(Findings& findings);
+  // Makes a chain of items, and the reasons of those items, in the order of the records.
+  [[nodiscard]] static int MakeItems(Findings& findings, FileItemList& made);
+  [[nodiscard]] int MakeReasons(Findings& findings, const FileItem* made);
   FileItemList& ListOf(uint32_t status);
 
   Vesk2ContextStruct* context;
@@ -107,6 +124,8 @@ class VESK2_API Manifest {
   FileItemList invalid;
   FileItemList missing;
   FileItemList extra;
+  std::unique_ptr<Reason[]> reasons;  // sorted by entry
+  uint32_t reasonCount = 0;
   FileItemList ignoredEntries;
   Ref<SExpression> version;
   Ref<SExpression> type;

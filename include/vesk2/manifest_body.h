@@ -75,8 +75,9 @@ class VESK2_API BodyDirectory : public BodyObject {
   // ParseBody reads a whole body into this directory, ParseDir the entries up to and including the
   // closing ")". `ignoreList`, sorted paths, may be null. Children end up sorted by name.
   //   VESK2_ERR_PARAM_NULL, VESK2_ERR_RANDOM_TOKEN, VESK2_ERR_PARSE_FILE (also: a name that is
-  //   refused, a path over 4096 bytes, nested too deeply), VESK2_ERR_UNKNOWN_HASH_ID (a digest that
-  //   is not of 32 bytes), VESK2_ERR_MAX_BYTE_STRING, VESK2_ERR_MEM_ALLOC.
+  //   refused, a path of over 4096 bytes within the body, nested too deeply),
+  //   VESK2_ERR_UNKNOWN_HASH_ID (a digest that is not of 32 bytes), VESK2_ERR_MAX_BYTE_STRING,
+  //   VESK2_ERR_MEM_ALLOC.
   [[nodiscard]] int ParseBody(ZvBuffer* buffer, PointerArray<char>* ignoreList);
   [[nodiscard]] int ParseDir(ZvBuffer* buffer, PointerArray<char>* ignoreList);
 
@@ -85,12 +86,15 @@ class VESK2_API BodyDirectory : public BodyObject {
   PointerArray<char>& GetIgnored() { return ignored; }
 
  private:
-  [[nodiscard]] int ParseEntries(ZvBuffer* buffer, PointerArray<char>* ignoreList, unsigned depth);
-  [[nodiscard]] int ParseEntry(ZvBuffer* buffer, PointerArray<char>* ignoreList, unsigned depth);
-  [[nodiscard]] int ParseName(ZvBuffer* buffer, std::unique_ptr<char[]>& bare);
-  [[nodiscard]] int ParseFile(ZvBuffer* buffer);
+  // `length` is that of this directory's path within the body.
+  [[nodiscard]] int ParseEntries(ZvBuffer* buffer, PointerArray<char>* ignoreList, unsigned depth,
+                                 size_t length);
+  [[nodiscard]] int ParseEntry(ZvBuffer* buffer, PointerArray<char>* ignoreList, unsigned depth,
+                               size_t length);
+  [[nodiscard]] int ParseName(ZvBuffer* buffer, std::unique_ptr<char[]>& bare, size_t& length);
+  [[nodiscard]] int ParseFile(ZvBuffer* buffer, size_t length);
   [[nodiscard]] int ParseSubdirectory(ZvBuffer* buffer, PointerArray<char>* ignoreList,
-                                      unsigned depth);
+                                      unsigned depth, size_t length);
   [[nodiscard]] int CollectIgnored(PointerArray<char>* ignoreList);
 
   PointerArray<BodyObject> files;

@@ -20,7 +20,6 @@ namespace ZvVesk2 {
 namespace {
 
 using ZVsysutil::zv_filenamencmp;
-using ZVsysutil::zv_join_path;
 
 constexpr unsigned kTokenLength = 4;
 constexpr unsigned kDigestLength = 32;
@@ -35,12 +34,6 @@ bool IsBareName(std::string_view name) {
   return !name.empty() && name != "." && name != ".." &&
          name.find(kSeparator) == std::string_view::npos &&
          name.find('\0') == std::string_view::npos;
-}
-
-size_t JoinedLength(const char* directory, size_t name) {
-  const std::string_view head = directory != nullptr ? directory : "";
-  const bool separator = !head.empty() && head.back() != kSeparator;
-  return head.size() + (separator ? 1 : 0) + name;
 }
 
 // The part of an ignored path that names something directly inside `directory` or below it; null
@@ -69,13 +62,14 @@ int BodyDirectory::ParseBody(ZvBuffer* buffer, PointerArray<char>* ignoreList) {
 
 int BodyDirectory::ParseDir(ZvBuffer* buffer, PointerArray<char>* ignoreList) {
   VESK2_REQUIRE(buffer != nullptr, VESK2_ERR_PARAM_NULL);
-  return ParseEntries(buffer, ignoreList, 1);
+  return ParseEntries(buffer, ignoreList, 1, 0);
 }
 
-int BodyDirectory::ParseEntries(ZvBuffer* buffer, PointerArray<char>* ignoreList, unsigned depth) {
+int BodyDirectory::ParseEntries(ZvBuffer* buffer, PointerArray<char>* ignoreList, unsigned depth,
+                                size_t length) {
   VESK2_REQUIRE(depth <= Limits::kMaxDepth, VESK2_ERR_PARSE_FILE);
   while (buffer->Peek() != ')' && buffer->Peek() >= 0) {
-    VESK2_TRY(ParseEntry(buffer, ignoreList, depth));
+    VESK2_TRY(ParseEntry(buffer, ignoreList, depth, length));
   }
   VESK2_TRY(buffer->Expect(")"));
   subdirectories.sort(BodyObject::Cmp);
@@ -83,28 +77,31 @@ int BodyDirectory::ParseEntries(ZvBuffer* buffer, PointerArray<char>* ignoreList
   return ignoreList != nullptr ? CollectIgnored(ignoreList) : 0;
 }
 
-int BodyDirectory::ParseEntry(ZvBuffer* buffer, PointerArray<char>* ignoreList, unsigned depth) {
-  if (buffer->Accept("(3:dir")) return ParseSubdirectory(buffer, ignoreList, depth + 1);
+int BodyDirectory::ParseEntry(ZvBuffer* buffer, PointerArray<char>* ignoreList, unsigned depth,
+                              size_t length) {
+  if (buffer->Accept("(3:dir")) return ParseSubdirectory(buffer, ignoreList, depth + 1, length);
   VESK2_TRY(buffer->Expect("(4:file"));
-  return ParseFile(buffer);
+  return ParseFile(buffer, length);
 }
 
-// Reads an entry's name and the byte string after it, whose meaning is the signer's.
-int BodyDirectory::ParseName(ZvBuffer* buffer, std::unique_ptr<char[]>& bare) {
+// Reads an entry's name and the byte string after it, whose meaning is the signer's. `length` is
+// that of the directory's path within the body, and becomes the entry's.
+int BodyDirectory::ParseName(ZvBuffer* buffer, std::unique_ptr<char[]>& bare, size_t& length) {
   Ref<ByteString> text;
   VESK2_TRY(ImportNew(text, buffer, GetContext()));
   VESK2_REQUIRE(IsBareName(Text(*text)), VESK2_ERR_PARSE_FILE);
-  VESK2_REQUIRE(JoinedLength(GetName(), text->GetLength()) <= Limits::kMaxBodyPath,
-                VESK2_ERR_PARSE_FILE);
+  // Counted from the body's root: where the tree lies has no say in what is well-formed.
+  length += (length > 0 ? 1 : 0) + text->GetLength();
+  VESK2_REQUIRE(length <= Limits::kMaxBodyPath, VESK2_ERR_PARSE_FILE);
   bare.reset(text->ToString());
   VESK2_REQUIRE(bare, VESK2_ERR_MEM_ALLOC);
   Ref<ByteString> ignoredString;
   return ImportNew(ignoredString, buffer, GetContext());
 }
 
-int BodyDirectory::ParseFile(ZvBuffer* buffer) {
+int BodyDirectory::ParseFile(ZvBuffer* buffer, size_t length) {
   std::unique_ptr<char[]> bare;
-  VESK2_TRY(ParseName(buffer, bare));
+  VESK2_TRY(ParseName(buffer, bare, length));
   Ref<ByteString> digest;
   VESK2_TRY(ImportNew(digest, buffer, GetContext()));
   std::unique_ptr<BodyFile> file(TryNew<BodyFile>(GetContext()));
@@ -119,14 +116,14 @@ int BodyDirectory::ParseFile(ZvBuffer* buffer) {
 }
 
 int BodyDirectory::ParseSubdirectory(ZvBuffer* buffer, PointerArray<char>* ignoreList,
-                                     unsigned depth) {
+                                     unsigned depth, size_t length) {
   std::unique_ptr<char[]> bare;
-  VESK2_TRY(ParseName(buffer, bare));
+  VESK2_TRY(ParseName(buffer, bare, length));
   std::unique_ptr<BodyDirectory> directory(TryNew<BodyDirectory>(GetContext()));
   VESK2_REQUIRE(directory, VESK2_ERR_MEM_ALLOC);
-  directory->SetName(zv_join_path(GetName(), bare.get()));
+  directory->SetName(ZVsysutil::zv_join_path(GetName(), bare.get()));
   VESK2_REQUIRE(directory->GetName() != nullptr, VESK2_ERR_MEM_ALLOC);
-  VESK2_TRY(directory->ParseEntries(buffer, ignoreList, depth));
+  VESK2_TRY(directory->ParseEntries(buffer, ignoreList, depth, length));
   VESK2_REQUIRE(subdirectories.push(directory.get()), VESK2_ERR_MEM_ALLOC);
   static_cast<void>(directory.release());
   return 0;

@@ -8,15 +8,16 @@
 #include <memory>
 #include <utility>
 
-#include <vesk2/hash.h>
 #include <vesk2/manifest.h>
 #include <vesk2/manifest_body.h>
 
 #include "src/frame/check.h"
 #include "src/manifest/findings.h"
 #include "src/manifest/ignore.h"
+#include "src/objects/hash_file.h"
 #include "src/platform/file.h"
 #include "src/platform/text.h"
+#include "src/platform/wait.h"
 
 namespace ZvVesk2 {
 namespace {
@@ -63,22 +64,23 @@ class DiskCheck {
   int Subdirectories(BodyDirectory& directory, unsigned depth, StatusSet& statuses);
   int Unlisted(BodyDirectory& directory, StatusSet& statuses);
   int ReadEntries(ZvDir& disk, PointerArray<BodyObject>& entries);
-  int StatusOf(uint32_t& status, const BodyFile& file, const char* path);
+  int StatusOf(uint32_t& status, int& reason, const BodyFile& file, const char* path);
 
   Vesk2ContextStruct* context_;
   Findings& findings_;
   const Vesk2FileCallbacks* callbacks_;
 };
 
-int DiskCheck::StatusOf(uint32_t& status, const BodyFile& file, const char* path) {
-  unsigned char digest[32];
-  unsigned int length = sizeof digest;
-  const int code = Hash::HashFile(path, digest, &length, context_, callbacks_);
+int DiskCheck::StatusOf(uint32_t& status, int& reason, const BodyFile& file, const char* path) {
+  unsigned char digest[kFileDigestSize];
+  bool held = false;
+  const int code = DigestFile(path, digest, held, context_, callbacks_);
   VESK2_REQUIRE(code != VESK2_ERR_USER_INTERRUPT, code);
   VESK2_REQUIRE(!LacksMemory(code), VESK2_ERR_MEM_ALLOC);
-  const bool same = code == 0 && file.Equal(digest, static_cast<int>(length));
+  const bool same = code == 0 && file.Equal(digest, static_cast<int>(kFileDigestSize));
   status = same ? BodyObject::Valid : BodyObject::Invalid;
   if (code == VESK2_ERR_FILE_OPEN) status = BodyObject::Missing;
+  reason = held ? VESK2_ERR_FILE_OPEN : code;
   return 0;
 }
 
@@ -90,8 +92,9 @@ int DiskCheck::Files(BodyDirectory& directory, StatusSet& statuses) {
     std::unique_ptr<char[]> path(zv_join_path(directory.GetName(), entry->GetName()));
     VESK2_REQUIRE(path, VESK2_ERR_MEM_ALLOC);
     uint32_t status = BodyObject::Invalid;
-    VESK2_TRY(StatusOf(status, static_cast<const BodyFile&>(*entry), path.get()));
-    VESK2_TRY(findings_.AddFile(directory, entry->GetName(), status, statuses));
+    int reason = 0;
+    VESK2_TRY(StatusOf(status, reason, static_cast<const BodyFile&>(*entry), path.get()));
+    VESK2_TRY(findings_.AddFile(directory, entry->GetName(), status, statuses, reason));
   }
   return 0;
 }
@@ -119,7 +122,9 @@ int DiskCheck::Subdirectories(BodyDirectory& directory, unsigned depth, StatusSe
 int DiskCheck::ReadEntries(ZvDir& disk, PointerArray<BodyObject>& entries) {
   while (const char* const path = disk.read(true)) {
     struct stat about {};
-    const bool isDirectory = ZVsysutil::zv_stat(path, &about) == 0 && S_ISDIR(about.st_mode);
+    const int code = ZVsysutil::zv_stat(path, &about);
+    VESK2_REQUIRE(code != VESK2_ERR_MEM_ALLOC, code);
+    const bool isDirectory = code == 0 && S_ISDIR(about.st_mode);
     std::unique_ptr<BodyObject> entry(TryNew<BodyObject>(context_));
     VESK2_REQUIRE(entry, VESK2_ERR_MEM_ALLOC);
     entry->SetIsDirectory(isDirectory);
@@ -140,7 +145,7 @@ int DiskCheck::Unlisted(BodyDirectory& directory, StatusSet& statuses) {
     VESK2_REQUIRE(code != VESK2_ERR_MEM_ALLOC, code);
     // The parent records it once more: callers see such a directory twice.
     if (code != 0) {
-      return findings_.AddDirectory(directory.GetName(), BodyObject::Invalid, statuses);
+      return findings_.AddDirectory(directory.GetName(), BodyObject::Invalid, statuses, code);
     }
     VESK2_TRY(ReadEntries(disk, entries));
   }
@@ -161,6 +166,7 @@ int DiskCheck::Unlisted(BodyDirectory& directory, StatusSet& statuses) {
 
 int Manifest::Verify(ZvBuffer* body, const char* directoryPath) {
   VESK2_REQUIRE(body != nullptr && directoryPath != nullptr, VESK2_ERR_PARAM_NULL);
+  const ZVsysutil::ZvCall call;
   PointerArray<char> ignoreList;
   VESK2_TRY(BuildIgnoreList(directoryPath, ignoreList));
   BodyDirectory root(context);

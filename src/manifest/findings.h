@@ -20,24 +20,35 @@ class StatusSet {
   uint32_t statuses_ = 0;
 };
 
+// One found entry.
+class Finding : public BodyObject {
+ public:
+  explicit Finding(Vesk2ContextStruct* ctx) : BodyObject(ctx) {}
+  ~Finding() override;
+  // See Manifest::GetReason.
+  int reason = 0;
+};
+
 class Findings {
  public:
   explicit Findings(Vesk2ContextStruct* context) : context_(context) {}
 
-  // Each records an entry and adds its status to `statuses`, the directory's. 0 or
-  // VESK2_ERR_MEM_ALLOC.
+  // Each records an entry and adds its status to `statuses`, the directory's. `reason`: see
+  // Manifest::GetReason. 0 or VESK2_ERR_MEM_ALLOC.
   [[nodiscard]] int AddFile(const BodyDirectory& directory, const char* name, uint32_t status,
-                            StatusSet& statuses);
-  [[nodiscard]] int AddDirectory(const char* path, uint32_t status, StatusSet& statuses);
+                            StatusSet& statuses, int reason = 0);
+  [[nodiscard]] int AddDirectory(const char* path, uint32_t status, StatusSet& statuses,
+                                 int reason = 0);
 
-  PointerArray<BodyObject>& Records() { return records_; }
+  uint32_t Count() const { return records_.GetCount(); }
+  Finding& At(uint32_t index) { return static_cast<Finding&>(*records_.at(index)); }
 
  private:
   [[nodiscard]] int Add(std::unique_ptr<char[]> name, bool isDirectory, uint32_t status,
-                        StatusSet& statuses);
+                        StatusSet& statuses, int reason);
 
   Vesk2ContextStruct* context_;
-  PointerArray<BodyObject> records_;
+  PointerArray<BodyObject> records_;  // each a Finding
 };
 
 }  // namespace ZvVesk2

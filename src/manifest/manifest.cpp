@@ -7,6 +7,7 @@
 #include "src/frame/handles.h"
 #include "src/manifest/manifest_reader.h"
 #include "src/platform/text.h"
+#include "src/platform/wait.h"
 
 namespace ZvVesk2 {
 namespace {
@@ -98,6 +99,8 @@ void Manifest::ClearResults() {
   invalid.reset();
   missing.reset();
   extra.reset();
+  reasons.reset();
+  reasonCount = 0;
 }
 
 int Manifest::ReadManifest(bool verifyChain, long notBefore, long notAfter, ZvBuffer** body) {
@@ -105,6 +108,7 @@ int Manifest::ReadManifest(bool verifyChain, long notBefore, long notAfter, ZvBu
 }
 
 int Manifest::VerifyManifest(long notBefore, long notAfter) {
+  const ZVsysutil::ZvCall call;
   // A failure on the way must not leave the findings of an earlier verification to be read.
   ClearResults();
   BufferOwner body;
@@ -118,6 +122,7 @@ int Manifest::VerifyManifest(long notBefore, long notAfter) {
 }
 
 int Manifest::CompareManifest(const char* otherManifestPath) {
+  const ZVsysutil::ZvCall call;
   BufferOwner body1;
   VESK2_TRY(ReadBody(*this, false, 0, 0, body1));
   BufferOwner body2;

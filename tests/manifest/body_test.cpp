@@ -132,9 +132,11 @@ TEST(BodyParse, BoundsDepthAndPaths) {
   EXPECT_EQ(Parse(Body(DirEntry("d", deep))), VESK2_ERR_PARSE_FILE);
 
   const std::string most(ZvVesk2::Limits::kMaxBodyPath - 2, 'n');
-  EXPECT_EQ(Parse(Body(FileEntry(most, "") + DirEntry(most, "")), "r"), 0);
-  EXPECT_EQ(Parse(Body(FileEntry(most, "")), "rr"), VESK2_ERR_PARSE_FILE);
-  EXPECT_EQ(Parse(Body(DirEntry(most, "")), "rr"), VESK2_ERR_PARSE_FILE);
+  for (const char* root : {"", "r", "a root of any length"}) {
+    EXPECT_EQ(Parse(Body(DirEntry("d", FileEntry(most, "") + DirEntry(most, ""))), root), 0);
+    EXPECT_EQ(Parse(Body(DirEntry("dd", FileEntry(most, ""))), root), VESK2_ERR_PARSE_FILE);
+    EXPECT_EQ(Parse(Body(DirEntry("dd", DirEntry(most, ""))), root), VESK2_ERR_PARSE_FILE);
+  }
 }
 
 TEST(BodyParse, NamesDirectoriesByPathAndSorts) {

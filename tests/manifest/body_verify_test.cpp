@@ -2,13 +2,16 @@
 #include <gtest/gtest.h>
 #include <sys/stat.h>
 
+#include <algorithm>
 #include <filesystem>
+#include <fstream>
 #include <sstream>
 #include <string>
 
 #include <vesk2/manifest.h>
 
 #include "tests/manifest/result_text.h"
+#include "tests/support/held_file.h"
 #include "tests/support/temp_dir.h"
 #include "tests/support/test_manifest.h"
 #include "tests/support/test_object.h"
@@ -103,6 +106,88 @@ TEST(BodyVerify, DuplicatesAreCheckedEachAndIgnoredOneByOne) {
   EXPECT_EQ(manifest.Verify(Wrap(Body(twice + FileEntry("a", ""))).get(), dir.Path().c_str()),
             kDiffers);
   EXPECT_EQ(Findings(manifest, dir.Path() + "/"), "V:b a I:a M: X:");
+}
+
+// The reason of the entry whose path ends in `name`, of whichever list.
+int ReasonOf(const Manifest& manifest, const std::string& name) {
+  int reason = -1;
+  for (const ZvVesk2::FileItem* item :
+       {manifest.GetValid(), manifest.GetInvalid(), manifest.GetMissing(), manifest.GetExtra()}) {
+    for (; item != nullptr; item = item->next) {
+      const std::string path = item->name;
+      if (!path.ends_with(name)) continue;
+      reason = std::max(reason, manifest.GetReason(item));
+    }
+  }
+  return reason;
+}
+
+TEST(BodyVerify, TellsWhatWasNotCompared) {
+  TempDir dir;
+  for (const char* name : {"a", "b", "c", "d", "s/f", "t/f"}) dir.Write(name, name);
+  const std::string body = BodyOf(dir.Path());
+  fs::remove(dir.File("b"));
+  dir.Write("c", "C");
+  fs::remove_all(dir.File("s"));
+  const HeldFiles held({dir.File("a")});
+  Manifest manifest(nullptr);
+  ZVsysutil::ZvCall call;
+  for (int run = 1; run <= 2; ++run) {  // the second adds to the first
+    EXPECT_EQ(manifest.Verify(Wrap(body).get(), dir.Path().c_str()), kDiffers);
+    EXPECT_EQ(call.Waited(), HeldFiles::kWait);
+    const std::pair<const char*, int> reasons[] = {
+        {"/a", VESK2_ERR_FILE_OPEN},
+        {"/b", VESK2_ERR_FILE_OPEN},
+        {"/c", 0},
+        {"/d", 0},
+        {"/s", VESK2_ERR_FIND_DIR},
+        {"/t", 0},
+        {"/t/f", 0},
+    };
+    for (const auto& [name, reason] : reasons) EXPECT_EQ(ReasonOf(manifest, name), reason) << name;
+  }
+  EXPECT_TRUE(Findings(manifest, dir.Path() + "/").ends_with(" M:s/f b s/f b X:"));
+  EXPECT_EQ(manifest.GetReason(nullptr), 0);
+}
+
+// Paths that are too long to be opened are findings like others, and the search goes on.
+TEST(BodyVerify, GoesOnBehindLongPaths) {
+  const std::string part(250, 'd'), longest(255, 'x');
+  TempDir dir;
+  std::string inside = FileEntry("f", "f");
+  std::string path = dir.Path() + "/s";
+  fs::create_directory(path);
+  dir.Write("extra/y", "y");
+  size_t levels = 0;
+  for (; path.size() + part.size() + 1 < 3900; path += "/" + part, ++levels) {
+    fs::create_directory(path + "/" + part);
+  }
+  std::ofstream(path + "/f") << "f";
+  fs::current_path(path);
+  std::ofstream(std::string(longest)) << "x";
+  fs::current_path("/");
+  for (size_t i = 0; i < levels; ++i) inside = DirEntry(part, inside);
+  const std::string body = Body(DirEntry("s", inside) + DirEntry("extra", ""));
+  {
+    Manifest manifest(nullptr);
+    Ignore(manifest, std::string(5000, 'i'));
+    EXPECT_EQ(manifest.Verify(Wrap(body).get(), dir.Path().c_str()), kExtra);
+    EXPECT_EQ(std::string(manifest.GetValid()->name), path + "/f");
+    EXPECT_EQ(std::string(manifest.GetExtra()->name), dir.Path() + "/s");
+    EXPECT_NE(Findings(manifest).find(path + "/" + longest), std::string::npos);
+    EXPECT_NE(Findings(manifest).find("/extra/y"), std::string::npos);
+  }
+  // From a root that is long itself, all below is missing, and the body no more malformed than
+  // from "/".
+  Manifest manifest(nullptr);
+  EXPECT_EQ(manifest.Verify(Wrap(body).get(), path.c_str()), kDiffers);
+  EXPECT_EQ(std::string(manifest.GetMissing()->name).substr(path.size(), 3), "/s/");
+  // Listed directories that nobody can open are changed.
+  EXPECT_EQ(manifest.Verify(Wrap(Body(DirEntry(longest, ""))).get(), path.c_str()), kDiffers);
+  // Without the names that are too long, TempDir could not remove its own.
+  fs::current_path(path);
+  fs::remove(longest);
+  fs::current_path("/");
 }
 
 TEST(BodyVerify, RefusesNull) {
