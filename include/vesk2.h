@@ -353,6 +353,8 @@ VESK2_API void SetStoreUpdate(Manifest* manifest, int update);
  *   VESK2_ERR_NOT_AUTHORIZED      nothing is granted; VESK2_ERR_PACKAGE_NOT_GRANTED not the tag
  *   VESK2_ERR_CERT_REVOKED, VESK2_ERR_CRL_NOT_FOUND   the signer certificate was dropped
  *   VESK2_ERR_USER_INTERRUPT      a callback ended it (SetFileCallbacks)
+ *   VESK2_ERR_MEM_ALLOC           memory or descriptors ran out: nothing was decided
+ *   VESK2_ERR_READ_FILE           another process held a file of a store for a minute: the same
  *   VESK2_ERR_OPEN_MANIFEST_FILE and the codes of its readers for a malformed file. */
 VESK2_API int VerifyManifest(Manifest* manifest, time_t notBefore, time_t notAfter);
 
@@ -400,6 +402,7 @@ VESK2_API int Vesk2CertFree(Vesk2CertInfoStruct* chain);
  *   VESK2_ERR_CRL_NOT_FOUND        a revocation state could not be determined
  *   VESK2_ERR_ACL_ENTRY_NOT_FOUND  there is no ACL store
  *   VESK2_ERR_NOT_AUTHORIZED       nothing is granted; VESK2_ERR_PACKAGE_NOT_GRANTED not the tag
+ *   VESK2_ERR_MEM_ALLOC, VESK2_ERR_READ_FILE   as in VerifyManifest
  *   VESK2_ERR_TIME_STAMP           a time that has no text; the codes of the tag's parser;
  * SPKI_ERR_* */
 VESK2_API int Vesk2CertVerify(Vesk2CertInfoStruct* chain, const char* tagText, time_t notBefore,

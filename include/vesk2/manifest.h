@@ -109,9 +109,6 @@ class VESK2_API Manifest {
   [[nodiscard]] int BuildIgnoreList(const char* base, PointerArray<char>& list) const;
   // Moves the records of a comparison to the front of the four lists.
   [[nodiscard]] int Publish(Findings& findings);
-  // Makes a chain of items, and the reasons of those items, in the order of the records.
-  [[nodiscard]] static int MakeItems(Findings& findings, FileItemList& made);
-  [[nodiscard]] int MakeReasons(Findings& findings, const FileItem* made);
   FileItemList& ListOf(uint32_t status);
 
   Vesk2ContextStruct* context;

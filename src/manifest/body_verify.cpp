@@ -112,7 +112,7 @@ int DiskCheck::Subdirectories(BodyDirectory& directory, unsigned depth, StatusSe
     uint32_t status = BodyObject::Invalid;
     if (inside.Code() == VESK2_ERR_EXTRA_FILES) status = BodyObject::Extra;
     if (inside.Code() == 0) status = BodyObject::Valid;
-    VESK2_TRY(findings_.AddDirectory(entry->GetName(), status, statuses));
+    VESK2_TRY(findings_.AddDirectory(entry->GetName(), status, statuses, inside.reason));
   }
   return 0;
 }
@@ -145,6 +145,7 @@ int DiskCheck::Unlisted(BodyDirectory& directory, StatusSet& statuses) {
     VESK2_REQUIRE(code != VESK2_ERR_MEM_ALLOC, code);
     // The parent records it once more: callers see such a directory twice.
     if (code != 0) {
+      statuses.reason = code;
       return findings_.AddDirectory(directory.GetName(), BodyObject::Invalid, statuses, code);
     }
     VESK2_TRY(ReadEntries(disk, entries));

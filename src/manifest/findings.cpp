@@ -2,7 +2,6 @@
 #include "src/manifest/findings.h"
 
 #include <algorithm>
-#include <functional>
 #include <utility>
 
 #include <vesk2/manifest.h>
@@ -55,16 +54,8 @@ FileItemList& Manifest::ListOf(uint32_t status) {
 
 namespace {
 
-int CompareEntries(const void* a, const void* b) {
-  const FileItem* const left = static_cast<const Manifest::Reason*>(a)->entry;
-  const FileItem* const right = static_cast<const Manifest::Reason*>(b)->entry;
-  if (left == right) return 0;
-  return std::less<>()(left, right) ? -1 : 1;
-}
-
-}  // namespace
-
-int Manifest::MakeItems(Findings& findings, FileItemList& made) {
+// Makes a chain of items in the order of the findings.
+int MakeItems(Findings& findings, FileItemList& made) {
   FileItem** tail = nullptr;
   for (uint32_t i = 0; i < findings.Count(); ++i) {
     Finding& record = findings.At(i);
@@ -83,26 +74,37 @@ int Manifest::MakeItems(Findings& findings, FileItemList& made) {
   return 0;
 }
 
-int Manifest::MakeReasons(Findings& findings, const FileItem* item) {
-  uint32_t count = reasonCount;
-  for (uint32_t i = 0; i < findings.Count(); ++i) count += findings.At(i).reason != 0 ? 1 : 0;
-  std::unique_ptr<Reason[]> made(TryNewArray<Reason>(count));
+int CompareEntries(const void* a, const void* b) {
+  const FileItem* const left = static_cast<const Manifest::Reason*>(a)->entry;
+  const FileItem* const right = static_cast<const Manifest::Reason*>(b)->entry;
+  if (left == right) return 0;
+  return left < right ? -1 : 1;
+}
+
+// Adds the reasons of the findings to the `count` there are; `item` is the first of their chain.
+int AddReasons(std::unique_ptr<Manifest::Reason[]>& reasons, uint32_t& count, Findings& findings,
+               const FileItem* item) {
+  uint32_t size = count;
+  for (uint32_t i = 0; i < findings.Count(); ++i) size += findings.At(i).reason != 0 ? 1 : 0;
+  std::unique_ptr<Manifest::Reason[]> made(TryNewArray<Manifest::Reason>(size));
   VESK2_REQUIRE(made, VESK2_ERR_MEM_ALLOC);
-  Reason* end = std::copy_n(reasons.get(), reasonCount, made.get());
+  Manifest::Reason* end = std::copy_n(reasons.get(), count, made.get());
   for (uint32_t i = 0; i < findings.Count(); ++i, item = item->next) {
     if (findings.At(i).reason != 0) *end++ = {item, findings.At(i).reason};
   }
-  ZVsysutil::zv_sort(made.get(), count, sizeof(Reason), CompareEntries);
+  ZVsysutil::zv_sort(made.get(), size, sizeof(Manifest::Reason), CompareEntries);
   reasons = std::move(made);
-  reasonCount = count;
+  count = size;
   return 0;
 }
+
+}  // namespace
 
 int Manifest::Publish(Findings& findings) {
   // All is made before anything is handed over: the lists change whole or not at all.
   FileItemList made;
   VESK2_TRY(MakeItems(findings, made));
-  VESK2_TRY(MakeReasons(findings, made.get()));
+  VESK2_TRY(AddReasons(reasons, reasonCount, findings, made.get()));
   // Each list ends up in the reverse order of the findings; callers walk it as it is.
   for (uint32_t i = 0; i < findings.Count(); ++i) {
     FileItem* const item = made.release();
@@ -116,11 +118,9 @@ int Manifest::Publish(Findings& findings) {
 
 int Manifest::GetReason(const FileItem* entry) const {
   const Reason* const end = reasons.get() + reasonCount;
-  const Reason* const found =
-      std::lower_bound(static_cast<const Reason*>(reasons.get()), end, entry,
-                       [](const Reason& reason, const FileItem* sought) {
-                         return std::less<>()(reason.entry, sought);
-                       });
+  const Reason* const found = std::lower_bound(
+      static_cast<const Reason*>(reasons.get()), end, entry,
+      [](const Reason& reason, const FileItem* sought) { return reason.entry < sought; });
   return found != end && found->entry == entry ? found->code : 0;
 }
 

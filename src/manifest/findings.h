@@ -8,9 +8,11 @@
 
 namespace ZvVesk2 {
 
-// The statuses found in one directory, or in all.
+// The statuses found in one directory, or in all; and why that directory was not searched, or 0.
 class StatusSet {
  public:
+  int reason = 0;
+
   void Add(uint32_t status) { statuses_ |= status; }
   // The worst finding decides: VESK2_ERR_HASH_MISMATCH over VESK2_ERR_FILE_NOT_FOUND over
   // VESK2_ERR_EXTRA_FILES over 0.

@@ -2,7 +2,6 @@
 #include <gtest/gtest.h>
 #include <sys/stat.h>
 
-#include <algorithm>
 #include <filesystem>
 #include <fstream>
 #include <sstream>
@@ -116,7 +115,8 @@ int ReasonOf(const Manifest& manifest, const std::string& name) {
     for (; item != nullptr; item = item->next) {
       const std::string path = item->name;
       if (!path.ends_with(name)) continue;
-      reason = std::max(reason, manifest.GetReason(item));
+      EXPECT_TRUE(reason == -1 || reason == manifest.GetReason(item)) << path;
+      reason = manifest.GetReason(item);
     }
   }
   return reason;

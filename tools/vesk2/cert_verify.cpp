@@ -30,7 +30,7 @@ int VerifyMembers(const CertChain& chain, const Question& question) {
   for (size_t i = 0; i < request.members.size(); ++i) {
     const int code = chain->Verify(nullptr, request.members[i].tag.get(),
                                    question.period.notBefore.get(), question.period.notAfter.get());
-    if (code < 0 || code == VESK2_ERR_MEM_ALLOC) {
+    if (code < 0 || code == VESK2_ERR_MEM_ALLOC || code == VESK2_ERR_READ_FILE) {
       ExplainUnreadable(question, code);
       Check(code, Escape(question.file));
     }

@@ -180,7 +180,8 @@ bool IsRefusal(int code) {
 
 void ThrowUnreadable(const std::string& path, const Manifest& manifest, int code) {
   if (code == VESK2_ERR_OPEN_MANIFEST_FILE) throw FileTrouble(path, WhyUnreadable(path), "io");
-  if (code < 0 || code == VESK2_ERR_MEM_ALLOC) Check(code, Escape(path));
+  const bool wasRead = code > 0 && code != VESK2_ERR_MEM_ALLOC && code != VESK2_ERR_READ_FILE;
+  if (!wasRead) Check(code, Escape(path));
   Malformed(path, manifest.GetReadPosition(), "manifest", code);
 }
 

@@ -219,6 +219,7 @@ std::string CodeWords(int code) {
       {VESK2_ERR_MEM_ALLOC, "out of memory"},
       {VESK2_ERR_FILE_OPEN, "cannot be opened"},
       {VESK2_ERR_FIND_DIR, "no such directory"},
+      {VESK2_ERR_READ_FILE, "a file of a store is held by another process"},
       {VESK2_ERR_PARSE_FILE, "not in the expected form"},
       {VESK2_ERR_PRINCIPAL, "neither a key nor a hash where one must be"},
       {VESK2_ERR_INVALID_HASH, "a digest of the wrong length"},
