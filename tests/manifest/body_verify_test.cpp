@@ -2,10 +2,12 @@
 #include <gtest/gtest.h>
 #include <sys/stat.h>
 
+#include <algorithm>
 #include <filesystem>
 #include <fstream>
 #include <sstream>
 #include <string>
+#include <vector>
 
 #include <vesk2/manifest.h>
 
@@ -152,21 +154,24 @@ TEST(BodyVerify, TellsWhatWasNotCompared) {
 
 // Paths that are too long to be opened are findings like others, and the search goes on.
 TEST(BodyVerify, GoesOnBehindLongPaths) {
-  const std::string part(250, 'd'), longest(255, 'x');
+  constexpr size_t kLength = 3841;  // with a "/" and 255 bytes more than can be opened
+  const std::string longest(255, 'x');
   TempDir dir;
-  std::string inside = FileEntry("f", "f");
+  dir.Write("extra/y", "y");
   std::string path = dir.Path() + "/s";
   fs::create_directory(path);
-  dir.Write("extra/y", "y");
-  size_t levels = 0;
-  for (; path.size() + part.size() + 1 < 3900; path += "/" + part, ++levels) {
-    fs::create_directory(path + "/" + part);
+  std::vector<std::string> parts;
+  while (path.size() < kLength) {
+    parts.emplace_back(std::min<size_t>(200, kLength - path.size() - 1), 'd');
+    path += "/" + parts.back();
+    fs::create_directory(path);
   }
   std::ofstream(path + "/f") << "f";
   fs::current_path(path);
   std::ofstream(std::string(longest)) << "x";
   fs::current_path("/");
-  for (size_t i = 0; i < levels; ++i) inside = DirEntry(part, inside);
+  std::string inside = FileEntry("f", "f");
+  for (; !parts.empty(); parts.pop_back()) inside = DirEntry(parts.back(), inside);
   const std::string body = Body(DirEntry("s", inside) + DirEntry("extra", ""));
   {
     Manifest manifest(nullptr);

@@ -56,7 +56,7 @@ TEST(HeldFile, IsReadWhenItIsGivenBack) {
   const std::string path = dir.Write("file", "abc");
   const HeldFiles held({path}, OnDemand::kGiveBack);
   ZvFileOwner file;
-  EXPECT_EQ(zv_open(file, path.c_str(), ZV_READ), 0);
+  ASSERT_EQ(zv_open(file, path.c_str(), ZV_READ), 0);
   unsigned char bytes[4];
   EXPECT_EQ(zv_read(file.get(), bytes, sizeof bytes), 3u);
 }
