@@ -88,7 +88,7 @@ int LoadSource(SExpression* store, SExpression* tag) {
   Ref<CrlSequence> sequence(TryNew<CrlSequence>(store->GetContext()));
   VESK2_REQUIRE(sequence, VESK2_ERR_MEM_ALLOC);
   const int code = sequence->Import(path.get());
-  VESK2_REQUIRE(!IsNoAbsence(code), code);
+  VESK2_REQUIRE(!IsNoAbsence(code), InOwnWords(code));
   return code == 0 ? Append(store, std::move(sequence)) : 0;
 }
 

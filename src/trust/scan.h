@@ -52,7 +52,9 @@ class Scan {
   // The code of the file read last.
   int Last() const { return last_; }
   // What a scan that came to its end answers: `atEnd`, unless it was ended before.
-  [[nodiscard]] int Result(int atEnd) const { return IsNoAbsence(last_) ? last_ : atEnd; }
+  [[nodiscard]] int Result(int atEnd) const {
+    return IsNoAbsence(last_) ? InOwnWords(last_) : atEnd;
+  }
 
  private:
   ZVsysutil::ZvCall call_;  // one wait for all files
