@@ -1,74 +1,18 @@
-// The CRL store: one file for each source of revocation lists that the trust roots name, holding
-// the newest list that verified.
+// Loading revocation lists: those of the sources that the trust roots name from the store, and
+// those of a directory.
 #include <vesk2/crl.h>
-
-#include <algorithm>
-#include <cstring>
-#include <string_view>
 
 #include <vesk2/acl_entry.h>
 #include <vesk2/context.h>
 
 #include "src/sexpr/storage.h"
+#include "src/trust/crl_update.h"
 #include "src/trust/lists.h"
 #include "src/trust/scan.h"
-#include "src/trust/store_write.h"
 
 namespace ZvVesk2 {
 
 namespace {
-
-// ---- Names ----
-
-// Whether the text of `tag` has a 0 byte in it: as a C string it would name another tag's file.
-int HoldsZeroByte(bool& holds, SExpression* tag) {
-  const unsigned int size = tag->AdvancedLength();
-  const std::unique_ptr<unsigned char[]> text(TryNewArray<unsigned char>(size_t{size} + 1));
-  VESK2_REQUIRE(text, VESK2_ERR_MEM_ALLOC);
-  unsigned int length = 0;
-  VESK2_TRY(tag->ExportAdvanced(text.get(), length, size));
-  holds = std::memchr(text.get(), 0, length) != nullptr;
-  return 0;
-}
-
-// "/" becomes "%2F": what a tag says must not choose a directory, and only the last component of a
-// name would count.
-TextPtr EscapeSlashes(std::string_view text) {
-  TextPtr escaped(TryNewArray<char>(3 * text.size() + 1));
-  if (!escaped) return nullptr;
-  char* out = escaped.get();
-  for (const char c : text) {
-    if (c == '/') {
-      out = std::copy_n("%2F", 3, out);
-    } else {
-      *out++ = c;
-    }
-  }
-  *out = '\0';
-  return escaped;
-}
-
-// The name of the file that keeps the list of the source `tag` (may be null): the text of the tag's
-// body. Success with null for a tag that names none.
-int StoreName(TextPtr& name, SExpression* tag) {
-  name = nullptr;
-  if (tag == nullptr) return 0;
-  bool holdsZeroByte = false;
-  VESK2_TRY(HoldsZeroByte(holdsZeroByte, tag));
-  if (holdsZeroByte) return 0;
-  const TextPtr text(tag->ExportTagW("tag"));
-  if (!text) {
-    // No text of a tag with a body is a lack of memory.
-    auto* const keyword = dynamic_cast<ByteString*>(tag->First());
-    const bool hasBody = keyword != nullptr && keyword->IsEqual("tag") && tag->Count() > 1;
-    return hasBody ? VESK2_ERR_MEM_ALLOC : 0;
-  }
-  if (std::strlen(text.get()) > Limits::kMaxStoreName) return 0;
-  name = EscapeSlashes(text.get());
-  return name ? 0 : VESK2_ERR_MEM_ALLOC;
-}
-
-// ---- Loading ----
 
 // The path of a stored list.
 int StoredPath(TextPtr& path, const char* name) {
@@ -176,55 +120,6 @@ int CrlSequence::Find(CrlSequence*& out, SExpression* tag) {
   // Found or not, callers expect the last candidate, and free it.
   out = candidate.Release();
   return status;
-}
-
-// ---- Storing ----
-
-namespace {
-
-// Whether the list of `fresh` takes the place of the stored one.
-bool Replaces(const Cert* fresh, const Cert* stored, const TimeStamp* now) {
-  // Texts of different tags can read the same; none may push another's list out.
-  if (!fresh->GetTag()->IsEqual(stored->GetTag())) return false;
-  const TimeStamp* const begin = fresh->GetNotBefore();
-  if (begin != nullptr && now->IsBefore(begin)) return false;
-  if (stored->GetNotBefore() != nullptr && stored->GetNotBefore()->IsAfter(now)) return true;
-  const TimeStamp* const end = fresh->GetNotAfter();
-  return end != nullptr && end->IsAfterOrEqual(stored->GetNotAfter());
-}
-
-// Whether the store should take the list: it has none at `path` that can be read, or an older one.
-int IsWanted(bool& wanted, const Cert* fresh, const char* path) {
-  wanted = false;
-  Ref<CrlSequence> stored(TryNew<CrlSequence>(fresh->GetContext()));
-  VESK2_REQUIRE(stored, VESK2_ERR_MEM_ALLOC);
-  const int code = stored->Import(path);
-  VESK2_REQUIRE(!LacksMemory(code), VESK2_ERR_MEM_ALLOC);
-  if (code != 0) {
-    wanted = true;
-    return 0;
-  }
-  Ref<TimeStamp> now;
-  VESK2_TRY(MakeNow(now, fresh->GetContext()));
-  wanted = Replaces(fresh, stored->GetCert(), now.get());
-  return 0;
-}
-
-}  // namespace
-
-int CrlSequence::UpdateStore(SExpression* aclEntries) {
-  VESK2_REQUIRE(First() != nullptr, VESK2_ERR_INVALID_PARAM);
-  TextPtr name;
-  VESK2_TRY(StoreName(name, cert->GetTag()));
-  VESK2_REQUIRE(name, VESK2_ERR_INVALID_PARAM);
-  // From here on the answer is a plain success: a damaged store degrades to having no list.
-  SetStorageType(StorageGlobal);
-  const TextPtr path(CalcPath(name.get(), StorageGlobal));
-  bool wanted = false;
-  if (!path || IsWanted(wanted, cert, path.get()) != 0 || !wanted) return 0;
-  if (crl->GetIssuerTag() == nullptr && VerifySelf(aclEntries) != 0) return 0;
-  if (SetFilePath(path.get()) == 0) static_cast<void>(WriteStored(this, path.get()));
-  return 0;
 }
 
 }  // namespace ZvVesk2

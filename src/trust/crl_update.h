@@ -1,0 +1,16 @@
+// The CRL store: one file for each source of revocation lists that the trust roots name, holding
+// the newest list that verified.
+#ifndef VESK2_SRC_TRUST_CRL_UPDATE_H
+#define VESK2_SRC_TRUST_CRL_UPDATE_H
+
+#include "src/trust/lists.h"
+
+namespace ZvVesk2 {
+
+// StoreName makes the name of the file that keeps the list of the source `tag` (may be null): the
+// text of the tag's body. Success with null for a tag that names none. VESK2_ERR_MEM_ALLOC.
+[[nodiscard]] int StoreName(TextPtr& name, SExpression* tag);
+
+}  // namespace ZvVesk2
+
+#endif  // VESK2_SRC_TRUST_CRL_UPDATE_H
