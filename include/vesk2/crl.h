@@ -11,7 +11,8 @@
 //
 // The store keeps one list for every revocation source, an ACL entry whose tag ends in
 // (revoke ...), in "cert"/*.crl below the global root. Its file name is the text of the tag's body,
-// with "/" written "%2F"; a text with a 0 byte or longer than 250 bytes names no file.
+// with "/" written "%2F"; a text with a 0 byte names no file, and neither does one that is longer
+// than 250 bytes when it is so written.
 #ifndef VESK2_CRL_H
 #define VESK2_CRL_H
 

@@ -35,7 +35,7 @@ inline constexpr uint32_t kMaxHeldWait = 60'000;
 
 // A path inside a manifest body, counted from the body's root; deep trees cost their square.
 inline constexpr size_t kMaxBodyPath = 4096;
-// The text of a revocation tag that names a stored file: a file name holds 255 bytes.
+// The name of a stored list, its "/" escaped, without extension: a file name holds 255 bytes.
 inline constexpr size_t kMaxStoreName = 250;
 
 // Work that one reduction (or one tag comparison) may do. Certificates that an attacker signs for

@@ -57,9 +57,11 @@ int StoreName(TextPtr& name, SExpression* tag) {
     const bool hasBody = keyword != nullptr && keyword->IsEqual("tag") && tag->Count() > 1;
     return hasBody ? VESK2_ERR_MEM_ALLOC : 0;
   }
-  if (std::strlen(text.get()) > Limits::kMaxStoreName) return 0;
-  name = EscapeSlashes(text.get());
-  return name ? 0 : VESK2_ERR_MEM_ALLOC;
+  TextPtr escaped = EscapeSlashes(text.get());
+  VESK2_REQUIRE(escaped, VESK2_ERR_MEM_ALLOC);
+  // What is measured is the name that the file would have: a longer one could never be written.
+  if (std::strlen(escaped.get()) <= Limits::kMaxStoreName) name = std::move(escaped);
+  return 0;
 }
 
 namespace {

@@ -262,13 +262,18 @@ TEST_F(CrlStore, AsksTheStoresAtThisMoment) {
 }
 
 TEST_F(CrlStore, TagsNameFiles) {
-  const std::string n(241, 'n');
+  const std::string n(241, 'n'), m(208, 'm');
+  std::string slashes;
+  for (int i = 0; i < 11; ++i) slashes += "%2F";
   const std::tuple<std::string, std::string, int> cases[] = {
       {Tag("sym (revoke x)"), "<sym (revoke x).crl>", 0},
       {Tag("a/b (revoke x)"), "<a%2Fb (revoke x).crl>", 0},
       {Tag("../../x (revoke)"), "<..%2F..%2Fx (revoke).crl>", 0},
       {Tag(n + " (revoke)"), "<" + n + " (revoke).crl>", 0},
       {Tag(n + "n (revoke)"), "", kInvalid},
+      // The limit is on the name that the file gets, in which each "/" takes three bytes.
+      {Tag(m + std::string(11, '/') + " (revoke)"), "<" + m + slashes + " (revoke).crl>", 0},
+      {Tag(m + "m" + std::string(11, '/') + " (revoke)"), "", kInvalid},
       {Tag(std::string("sym\0x (revoke x)", 16)), "", kInvalid},
       {"(3:foo1:a(6:revoke))", "", kInvalid},
       {Tag(".."), "", 0},  // not in the store

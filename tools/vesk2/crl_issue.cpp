@@ -152,7 +152,7 @@ ExitCode Run(const Options& options) {
     throw Trouble("nowhere to put the list: --output or --import", "usage");
   }
   const Ref<SExpression> tag = ParseRevocationTag(options.tag);
-  if (TagText(tag.get()).size() > ZvVesk2::Limits::kMaxStoreName) {
+  if (!NamesFile(tag.get())) {
     throw Trouble("--tag: too long; the store names the list's file by it", "usage");
   }
   const WriteFlags& flags = options.flags;

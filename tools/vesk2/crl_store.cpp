@@ -1,6 +1,7 @@
 // crl_store.cpp: offering revocation lists to the store.
 #include "tools/vesk2/crl_store.h"
 
+#include <algorithm>
 #include <cctype>
 #include <filesystem>
 
@@ -41,6 +42,12 @@ std::string SourceName(const std::string& keyPath, SExpression* tag) {
 
 }  // namespace
 
+bool NamesFile(SExpression* tag) {
+  const std::string text = TagText(tag);
+  const auto slashes = static_cast<size_t>(std::count(text.begin(), text.end(), '/'));
+  return text.size() + 2 * slashes <= ZvVesk2::Limits::kMaxStoreName;  // "%2F" for each
+}
+
 Ref<CrlSequence> StoredCrl(CrlSequence& list) {
   Ref<CrlSequence> stored;
   const int code = CrlSequence::Find(stored.Out(), list.GetCert()->GetTag());
@@ -52,6 +59,10 @@ Ref<CrlSequence> StoredCrl(CrlSequence& list) {
 std::string WhyRefused(CrlSequence& list, SExpression* acls) {
   if (!IsRevocationTag(list.GetCert()->GetTag())) {
     return "its tag " + TagText(list.GetCert()->GetTag()) + " does not end in (revoke ...)";
+  }
+  if (!NamesFile(list.GetCert()->GetTag())) {
+    return "its tag is too long to name a file of the store (" + CodeName(VESK2_ERR_INVALID_PARAM) +
+           ")";
   }
   const int code = list.VerifySelf(acls);
   if (code == VESK2_ERR_MEM_ALLOC) throw Trouble(Reason(code), ReasonWord(code));

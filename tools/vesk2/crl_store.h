@@ -8,6 +8,9 @@
 
 namespace vesk2_command {
 
+// Whether the text of a source's tag is short enough to name its list's file in the store.
+bool NamesFile(SExpression* tag);
+
 // WhyRefused says why the store must not take a list; empty when it is to decide by age.
 std::string WhyRefused(CrlSequence& list, SExpression* acls);
 // StoreCrl offers a list to the store: why it is not there now, or empty. `path` names it in
