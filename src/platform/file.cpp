@@ -97,12 +97,19 @@ int OpenForReading(ZvFileOwner& out, const char* path) {
   return 0;
 }
 
-int OpenForWriting(ZvFileOwner& out, const char* path, int flags) {
+// Makes a file one that all can read, and tells whether it is. Another's file may be one already.
+bool Share(int fd, mode_t mode) {
+  constexpr mode_t kReadable = 0444;
+  return fchmod(fd, kZvSharedFile) == 0 || (mode & kReadable) == kReadable;
+}
+
+int OpenForWriting(ZvFileOwner& out, const char* path, int mode) {
   ZvFileOwner file(new (std::nothrow) ZvFile);
   if (file == nullptr) return VESK2_ERR_MEM_ALLOC;
   Descriptor fd;
-  const int forWriting = O_WRONLY | O_CREAT | O_NOFOLLOW | flags;
-  if (const int code = OpenRegular(fd, path, forWriting, &file->opened)) return code;
+  const int flags = O_WRONLY | O_CREAT | O_TRUNC | (mode == ZV_WRITE ? 0 : O_NOFOLLOW);
+  if (const int code = OpenRegular(fd, path, flags, &file->opened)) return code;
+  if (mode == ZV_WRITE_SHARED && !Share(fd.get(), file->opened.st_mode)) return VESK2_ERR_FILE_OPEN;
   file->stream = fdopen(fd.get(), "w");
   if (file->stream == nullptr) return OpenError();
   static_cast<void>(fd.release());  // the stream's now
@@ -140,14 +147,7 @@ int zv_error_code(int error, int otherwise) {
 
 int zv_open(ZvFileOwner& out, const char* path, int mode) {
   out.reset();
-  if (mode == ZV_READ) return OpenForReading(out, path);
-  if (mode == ZV_WRITE) return OpenForWriting(out, path, O_TRUNC);
-  return VESK2_ERR_FILE_OPEN;
-}
-
-ZvFile* zv_create_new(const char* path) {
-  ZvFileOwner file;
-  return OpenForWriting(file, path, O_EXCL) == 0 ? file.release() : nullptr;
+  return mode == ZV_READ ? OpenForReading(out, path) : OpenForWriting(out, path, mode);
 }
 
 int zv_close(ZvFile* file) {
@@ -158,12 +158,6 @@ int zv_close(ZvFile* file) {
   if (file->stream == nullptr) return 0;
   const bool lost = ferror(file->stream) != 0;
   return fclose(file->stream) != 0 || lost ? VESK2_ERR_WRITE_FILE : 0;
-}
-
-int zv_sync(ZvFile* file) {
-  if (file == nullptr || file->stream == nullptr) return VESK2_ERR_WRITE_FILE;
-  const bool kept = fflush(file->stream) == 0 && fsync(fileno(file->stream)) == 0;
-  return kept ? 0 : VESK2_ERR_WRITE_FILE;
 }
 
 size_t zv_read_slow(ZvFile* file, unsigned char* out, size_t length) {
@@ -240,7 +234,11 @@ int zv_stat(const char* path, struct stat* out) {
 
 int zv_mkdir(const char* path, mode_t mode) {
   if (path == nullptr) return VESK2_ERR_CREATE_DIR;
-  if (mkdir(path, mode) == 0) return 0;
+  if (mkdir(path, mode) == 0) {
+    if (chmod(path, mode) == 0) return 0;
+    static_cast<void>(rmdir(path));  // the next attempt must not find it closed to others
+    return VESK2_ERR_CREATE_DIR;
+  }
   struct stat there {};
   const bool isDirectory = stat(path, &there) == 0 && S_ISDIR(there.st_mode);
   return isDirectory ? 0 : VESK2_ERR_CREATE_DIR;

@@ -31,14 +31,22 @@ struct ZvFile {
   struct stat opened {};   // reading only: the file as it was when it was opened
 };
 
-enum ZvOpenMode : int { ZV_WRITE = 1, ZV_READ = 2 };
+enum ZvOpenMode : int {
+  ZV_WRITE = 1,  // follows links, as any program's output does
+  ZV_READ = 2,
+  ZV_WRITE_STORE = 3,   // refuses a link: what stands in a store must not lead out of it
+  ZV_WRITE_SHARED = 4,  // the same, readable by all (kZvSharedFile) whatever the umask
+};
+
+// The modes of what everybody must be able to read: with a revocation list that only its writer can
+// read, the revoked key passes for all others.
+inline constexpr mode_t kZvSharedFile = 0644;
+inline constexpr mode_t kZvSharedDirectory = 0755;
 
 // zv_error_code is the code of a system call that failed with `error`: VESK2_ERR_MEM_ALLOC where a
 // resource ran out, else `otherwise`. No other place reads errno.
 int zv_error_code(int error, int otherwise);
 
-// zv_create_new opens for writing a file that must not exist yet and is no link. Null on failure.
-ZvFile* zv_create_new(const char* path);
 // zv_close closes, flushing first. 0, or VESK2_ERR_WRITE_FILE when written bytes could not be kept.
 int zv_close(ZvFile* file);
 struct ZvFileCloser {
@@ -50,8 +58,6 @@ using ZvFileOwner = std::unique_ptr<ZvFile, ZvFileCloser>;
 // VESK2_ERR_READ_FILE (see above); VESK2_ERR_FILE_OPEN for a null path, for anything but a regular
 // file, and for all else that fails. `out` is null after a failure.
 [[nodiscard]] int zv_open(ZvFileOwner& out, const char* path, int mode);
-// zv_sync flushes a written file down to the disk. 0 or VESK2_ERR_WRITE_FILE.
-int zv_sync(ZvFile* file);
 // The stream behind a file opened for writing, for PrintCanonical.
 inline FILE* zv_stream(ZvFile* file) { return file->stream; }
 
@@ -126,9 +132,9 @@ size_t zv_write(FILE* stream, const void* data, size_t length);
 
 // zv_stat fills *out, following links. 0, VESK2_ERR_STAT_FILE, VESK2_ERR_MEM_ALLOC.
 [[nodiscard]] int zv_stat(const char* path, struct stat* out);
-// zv_mkdir makes one directory (mode `mode` less the umask). 0 when it is there already, else
+// zv_mkdir makes one directory, of mode `mode` whatever the umask. 0 when it is there already, else
 // VESK2_ERR_CREATE_DIR.
-int zv_mkdir(const char* path, mode_t mode = 0777);
+int zv_mkdir(const char* path, mode_t mode);
 
 // ZvDir reads the names of a directory that match a pattern ("*" or "*.ext"), sorted bytewise,
 // never "." or "..". The order decides which store file is found first, so it must not depend on

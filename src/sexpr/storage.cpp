@@ -30,9 +30,11 @@ const char* Root(StorageType type) {
   return type == StorageGlobal ? VeskConf::GetGlobalDirectory() : VeskConf::GetHomeDirectory();
 }
 
-// What lies in the home store is its user's alone.
+// What lies in the home store is its user's alone; in the global one it is there for everybody.
 int MakeDirectory(const char* path, StorageType type) {
-  return type == StorageGlobal ? ZVsysutil::zv_mkdir(path) : ZVsysutil::zv_mkdir(path, 0700);
+  constexpr mode_t kPrivate = 0700;
+  return ZVsysutil::zv_mkdir(path,
+                             type == StorageGlobal ? ZVsysutil::kZvSharedDirectory : kPrivate);
 }
 
 // Whether the last component of a name names a file; the others would lead out of the store.
@@ -134,8 +136,11 @@ int SExpression::CreateFileDirectory() {
 int SExpression::Export(const char* name) {
   VESK2_TRY(CreateFileDirectory());
   if (name != nullptr) VESK2_TRY(SetFileName(name));
+  const bool isOwnPath = storageType == StoragePath || IsEmpty(DirectoryName());
+  const int stored =
+      storageType == StorageGlobal ? ZVsysutil::ZV_WRITE_SHARED : ZVsysutil::ZV_WRITE_STORE;
   ZVsysutil::ZvFileOwner file;
-  const int opened = ZVsysutil::zv_open(file, fileName, ZVsysutil::ZV_WRITE);
+  const int opened = ZVsysutil::zv_open(file, fileName, isOwnPath ? ZVsysutil::ZV_WRITE : stored);
   VESK2_REQUIRE(opened != VESK2_ERR_MEM_ALLOC, VESK2_ERR_MEM_ALLOC);
   VESK2_REQUIRE(opened == 0, VESK2_ERR_FILE_OPEN);
   const int printed = PrintCanonical(ZVsysutil::zv_stream(file.get()));

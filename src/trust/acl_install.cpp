@@ -1,6 +1,7 @@
 // Installing trust roots: copying into the store what it lacks.
 #include <vesk2/acl_entry.h>
 
+#include "src/platform/replace.h"
 #include "src/platform/text.h"
 #include "src/trust/lists.h"
 #include "src/trust/store_write.h"
@@ -39,7 +40,7 @@ int Install(AclEntry* entry) {
   entry->SetStorageType(StorageGlobal);
   VESK2_TRY(entry->SetFileName(name.get()));
   if (entry->Exists()) return 0;
-  return WriteStored(entry, entry->GetFileName());
+  return WriteStored(entry, entry->GetFileName(), false);
 }
 
 int InstallAll(const char* dir, Vesk2ContextStruct* ctx) {
@@ -51,6 +52,7 @@ int InstallAll(const char* dir, Vesk2ContextStruct* ctx) {
   VESK2_TRY(AclEntry::Import(loaded.Out(), ctx, dir));
   VESK2_TRY(Split(loaded.get(), stored.get(), added.get()));
 
+  ZVsysutil::zv_remove_leftovers(TextPtr(AclEntry::CalcDir(StorageGlobal)).get());
   for (auto it = added->Begin(); it; it.Next()) {
     auto* entry = dynamic_cast<AclEntry*>(it.Value());
     if (entry == nullptr || HasTag(stored.get(), entry->GetTag())) continue;

@@ -9,6 +9,7 @@
 
 #include <vesk2/acl_entry.h>
 
+#include "src/platform/replace.h"
 #include "src/trust/store_write.h"
 
 namespace ZvVesk2 {
@@ -107,7 +108,9 @@ int CrlSequence::UpdateStore(SExpression* aclEntries) {
   bool wanted = false;
   if (!path || IsWanted(wanted, cert, path.get()) != 0 || !wanted) return 0;
   if (crl->GetIssuerTag() == nullptr && VerifySelf(aclEntries) != 0) return 0;
-  if (SetFilePath(path.get()) == 0) static_cast<void>(WriteStored(this, path.get()));
+  if (SetFilePath(path.get()) != 0) return 0;
+  ZVsysutil::zv_remove_leftovers(TextPtr(CalcDir(StorageGlobal)).get());
+  static_cast<void>(WriteStored(this, path.get(), true));
   return 0;
 }
 

@@ -97,5 +97,23 @@ TEST_F(Storage, ExportWritesIntoTheStore) {
   EXPECT_EQ(SExpression::Import(read.Out(), "g/acl/x", nullptr), VESK2_ERR_FILE_OPEN);
 }
 
+// One's own path is written as any program writes its output; in a store a link is refused.
+TEST_F(Storage, ExportFollowsLinksToOnesOwnPath) {
+  for (const char* store : {"h/acl", "g/acl"}) fs::create_directory(store);
+  for (const char* link : {"x.acl", "h/acl/x.acl", "g/acl/x.acl"}) {
+    fs::create_symlink(dir_.File("target"), link);
+  }
+  for (const StorageType type : {StorageHome, StorageGlobal, StoragePath}) {
+    object_->SetStorageType(type);
+    const bool own = type == StoragePath;
+    EXPECT_EQ(object_->Export("x"), own ? 0 : VESK2_ERR_FILE_OPEN);
+    EXPECT_EQ(fs::exists("target"), own);
+  }
+  // A class without a store has paths of its own only.
+  const Ref<SExpression> plain(new SExpression(nullptr));
+  EXPECT_EQ(plain->Export("x.acl"), 0);
+  EXPECT_TRUE(fs::is_symlink("x.acl"));
+}
+
 }  // namespace
 }  // namespace ZvVesk2
