@@ -17,6 +17,7 @@
 namespace ZvVesk2 {
 
 class AclEntry;
+class RevocationLists;
 
 class VESK2_API Cert : public SExpression {
  public:
@@ -78,6 +79,7 @@ class VESK2_API Cert : public SExpression {
   void SetRevocationElement(SExpression* borrowed) { revocationElement = borrowed; }
 
  private:
+  friend class RevocationLists;  // which sets the status
   // The elements that Import reads and Set builds, in order.
   [[nodiscard]] int AppendVersion();
   [[nodiscard]] int AppendPropagate();

@@ -147,6 +147,13 @@ class VESK2_API CrlSequence : public SExpression {
                                                   SExpression* tag, SExpression* object,
                                                   TimeStamp* notBefore, TimeStamp* notAfter);
 
+  // MarkRevoked asks about each certificate of `certs` what Cert::IsRevoked asks, and leaves the
+  // answer in its status; whatever fails for one leaves it Undetermined. Each list is proved once,
+  // however many certificates there are. VESK2_ERR_PARAM_NULL, VESK2_ERR_MEM_ALLOC.
+  [[nodiscard]] static int MarkRevoked(SExpression* certs, SExpression* aclEntries,
+                                       SExpression* store, TimeStamp* notBefore,
+                                       TimeStamp* notAfter);
+
   // The parts, borrowed; null until imported.
   Crl* GetCrl() const { return crl; }
   Cert* GetCert() const { return cert; }

@@ -332,7 +332,9 @@ class VESK2_API SExpression : public DExpression {
   // that is none and when the root is not set or too long, VESK2_ERR_MEM_ALLOC,
   // VESK2_ERR_CREATE_DIR.
   [[nodiscard]] int CreateFileDirectory();
-  // Export writes the object, with hints, to its file: to SetFileName(name) when a name is given.
+  // Export writes the object, with hints, to its file: to SetFileName(name) when a name is given. A
+  // path of its own may be a link, a file of a store may not; in the global store it is readable by
+  // all whatever the umask.
   // VESK2_ERR_FILE_OPEN, VESK2_ERR_WRITE_FILE (the file is left as far as it was written) and those
   // of the two functions above.
   [[nodiscard]] int Export(const char* name);

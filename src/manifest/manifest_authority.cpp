@@ -65,16 +65,10 @@ int ManifestAuthority::MarkRevoked(SExpression* carried, bool updateStore) {
   for (auto it = carried->Begin(); it; it.Next()) {
     VESK2_TRY(Append(lists.get(), Ref<DExpression>::Share(it.Value())));
   }
-  for (auto it = certificates_->Begin(); it; it.Next()) {
-    auto* const cert = dynamic_cast<Cert*>(it.Value());
-    if (cert == nullptr) continue;
-    // The status that this leaves decides; a certificate about which nothing is known is dropped
-    // like a revoked one.
-    bool revoked = false;
-    const int code =
-        cert->IsRevoked(revoked, acls_.get(), lists.get(), notBefore_.get(), notAfter_.get());
-    VESK2_REQUIRE(!LacksMemory(code), VESK2_ERR_MEM_ALLOC);
-  }
+  // The status that this leaves decides; a certificate about which nothing is known is dropped like
+  // a revoked one.
+  VESK2_TRY(CrlSequence::MarkRevoked(certificates_, acls_.get(), lists.get(), notBefore_.get(),
+                                     notAfter_.get()));
   if (!updateStore) return 0;
   // Lists that do not verify, or are older than the stored ones, are left out by the store.
   for (auto it = carried->Begin(); it; it.Next()) {

@@ -1,10 +1,13 @@
 // Installing trust roots: copying into the store what it lacks.
 #include <vesk2/acl_entry.h>
 
+#include <variant>
+
 #include "src/platform/replace.h"
 #include "src/platform/text.h"
 #include "src/trust/lists.h"
 #include "src/trust/store_write.h"
+#include "src/trust/tag_index.h"
 
 namespace ZvVesk2 {
 namespace {
@@ -25,16 +28,25 @@ int Split(SExpression* loaded, SExpression* stored, SExpression* added) {
   return 0;
 }
 
-bool HasTag(SExpression* entries, SExpression* tag) {
+using StoredTags = TagIndex<std::monostate>;
+
+int IndexTags(StoredTags& tags, SExpression* entries) {
+  VESK2_TRY(tags.Reserve(entries->Count()));
   for (auto it = entries->Begin(); it; it.Next()) {
     auto* entry = dynamic_cast<AclEntry*>(it.Value());
-    if (entry != nullptr && entry->GetTag()->IsEqual(tag)) return true;
+    if (entry != nullptr) VESK2_TRY(tags.Add(entry->GetTag(), {}));
   }
-  return false;
+  tags.Sort();
+  return 0;
 }
 
-// Writes the entry into the store under its file's name, unless another trust root has that name.
-int Install(AclEntry* entry) {
+// Writes the entry into the store under its file's name, unless another trust root has that name,
+// or its tag.
+int Install(AclEntry* entry, StoredTags& tags) {
+  bool hashed = false;
+  TagDigest digest;
+  VESK2_TRY(DigestTag(hashed, digest, entry->GetTag()));
+  if (hashed && !tags.Find(digest).empty()) return 0;
   const TextPtr name(ZVsysutil::zv_fstrdup(entry->GetFileName()));
   VESK2_REQUIRE(name, VESK2_ERR_MEM_ALLOC);
   entry->SetStorageType(StorageGlobal);
@@ -52,12 +64,14 @@ int InstallAll(const char* dir, Vesk2ContextStruct* ctx) {
   VESK2_TRY(AclEntry::Import(loaded.Out(), ctx, dir));
   VESK2_TRY(Split(loaded.get(), stored.get(), added.get()));
 
+  StoredTags tags;
+  VESK2_TRY(IndexTags(tags, stored.get()));
+
   ZVsysutil::zv_remove_leftovers(TextPtr(AclEntry::CalcDir(StorageGlobal)).get());
   for (auto it = added->Begin(); it; it.Next()) {
     auto* entry = dynamic_cast<AclEntry*>(it.Value());
-    if (entry == nullptr || HasTag(stored.get(), entry->GetTag())) continue;
     // One entry that cannot be written does not keep the others out.
-    static_cast<void>(Install(entry));
+    if (entry != nullptr) static_cast<void>(Install(entry, tags));
   }
   return 0;
 }

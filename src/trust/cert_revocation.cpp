@@ -7,6 +7,7 @@
 
 #include "src/platform/wait.h"
 #include "src/trust/lists.h"
+#include "src/trust/revocation_lists.h"
 
 namespace ZvVesk2 {
 
@@ -19,34 +20,37 @@ Cert::Cert(AclEntry* entry)
       notAfter(entry->GetNotAfter()),
       comment(entry->GetComment()) {}
 
-int Cert::IsRevoked(bool& revoked, SExpression* acls, SExpression* crls, TimeStamp* from,
-                    TimeStamp* to) {
-  revoked = false;
+int RevocationLists::Mark(Cert* cert, const TimeStamp* notBefore) {
   // Chain verification looks at the status alone: it speaks for the certificate only when both
   // questions were answered.
-  revocationStatus = Undetermined;
+  cert->revocationStatus = Cert::Undetermined;
 
-  const int key = CrlSequence::CheckStatusCritical(acls, crls, nullptr, subject);
+  const int key = AskCritical(nullptr, cert->GetSubject());
   if (key == VESK2_ERR_KEY_REVOKED) {
-    revocationStatus = KeyRevoked;
-    revoked = true;
+    cert->revocationStatus = Cert::KeyRevoked;
     return 0;
   }
   VESK2_TRY(key);
 
-  if (revocationElement != nullptr) {
+  if (cert->GetRevocationElement() != nullptr) {
     Ref<SExpression> source;
-    VESK2_TRY(MakeTag(source, revocationElement));
-    const int listed =
-        CrlSequence::CheckStatusNonCritical(acls, crls, source.get(), this, from, to);
+    VESK2_TRY(MakeTag(source, cert->GetRevocationElement()));
+    const int listed = AskNonCritical(source.get(), cert, notBefore);
     if (listed == VESK2_ERR_CERT_REVOKED) {
-      revocationStatus = RevokedByCrl;
-      revoked = true;
+      cert->revocationStatus = Cert::RevokedByCrl;
       return 0;
     }
     VESK2_TRY(listed);
   }
-  revocationStatus = NotRevoked;
+  cert->revocationStatus = Cert::NotRevoked;
+  return 0;
+}
+
+int Cert::IsRevoked(bool& revoked, SExpression* acls, SExpression* crls, TimeStamp* from,
+                    TimeStamp*) {
+  revoked = false;
+  VESK2_TRY(RevocationLists(acls, crls).Mark(this, from));
+  revoked = revocationStatus != NotRevoked;
   return 0;
 }
 

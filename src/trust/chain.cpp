@@ -41,16 +41,9 @@ int LoadRoots(Ref<SExpression>& acls, Vesk2ContextStruct* ctx) {
 int MarkRevoked(SExpression* certs, SExpression* acls, TimeStamp* notBefore, TimeStamp* notAfter) {
   Ref<SExpression> crls;
   VESK2_TRY(CrlSequence::ImportStore(crls.Out(), acls, certs->GetContext()));
-  for (auto it = certs->Begin(); it; it.Next()) {
-    auto* const cert = dynamic_cast<Cert*>(it.Value());
-    if (cert == nullptr) continue;
-    // The status decides, which is "undetermined" after a failure. Some callers keep such a
-    // certificate, which may not happen because a list could not be asked for want of memory.
-    bool revoked = false;
-    const int code = cert->IsRevoked(revoked, acls, crls.get(), notBefore, notAfter);
-    VESK2_REQUIRE(!LacksMemory(code), VESK2_ERR_MEM_ALLOC);
-  }
-  return 0;
+  // The status decides, which is "undetermined" after a failure. Some callers keep such a
+  // certificate, which may not happen because a list could not be asked for want of memory.
+  return CrlSequence::MarkRevoked(certs, acls, crls.get(), notBefore, notAfter);
 }
 
 int AppendCopy(SExpression* chain, Cert* cert) {

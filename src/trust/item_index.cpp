@@ -1,0 +1,112 @@
+// See item_index.h.
+#include "src/trust/item_index.h"
+
+#include <algorithm>
+
+#include "src/frame/check.h"
+
+namespace ZvVesk2 {
+namespace {
+
+using Bytes = ItemIndex::Bytes;
+using Item = ItemIndex::Item;
+
+constexpr ZvclmHashID kAlgorithms[] = {ZVCLM_HASH_SHA1, ZVCLM_HASH_SHA256, ZVCLM_HASH_RMD160};
+
+bool IsKnown(ZvclmHashID id) {
+  return std::find(std::begin(kAlgorithms), std::end(kAlgorithms), id) != std::end(kAlgorithms);
+}
+
+unsigned Bit(ZvclmHashID id) { return 1U << static_cast<unsigned>(id); }
+
+Bytes View(const ByteString* value) {
+  return value != nullptr ? Bytes(value->GetData(), value->GetLength()) : Bytes();
+}
+
+// By what is named; of several items about one object the one that revokes earliest is first.
+bool IsLess(const Item& a, const Item& b) {
+  if (a.algorithm != b.algorithm) return a.algorithm < b.algorithm;
+  if (a.digest != b.digest) return a.digest < b.digest;
+  if (a.from == nullptr || b.from == nullptr) return a.from == nullptr && b.from != nullptr;
+  return a.from->IsBefore(b.from);
+}
+
+bool Names(const Item& item, ZvclmHashID algorithm, Bytes digest) {
+  return item.algorithm == algorithm && item.digest == digest;
+}
+
+const Item* Earlier(const Item* a, const Item* b) {
+  if (a == nullptr || b == nullptr) return a != nullptr ? a : b;
+  if (a->from == nullptr || b->from == nullptr) return a->from == nullptr ? a : b;
+  return b->from->IsBefore(a->from) ? b : a;
+}
+
+}  // namespace
+
+bool IsStamp(const TimeStamp* stamp) {
+  constexpr std::string_view kForm = "####-##-##_##:##:##";
+  if (stamp->GetLength() != kForm.size()) return false;
+  for (size_t i = 0; i < kForm.size(); ++i) {
+    const unsigned char c = stamp->GetData()[i];
+    if (kForm[i] == '#' ? c < '0' || c > '9' : c != kForm[i]) return false;
+  }
+  return true;
+}
+
+int ItemIndex::Reserve(size_t count) {
+  items_.reset(TryNewArray<Item>(count));
+  VESK2_REQUIRE(items_ != nullptr, VESK2_ERR_MEM_ALLOC);
+  return 0;
+}
+
+void ItemIndex::Add(SExpression* list) {
+  for (auto it = list->Begin(); it; it.Next()) {
+    auto* const item = dynamic_cast<SExpression*>(it.Value());
+    if (item == nullptr) continue;
+    auto at = item->Begin();
+    if (at) at.Next();
+    auto* const named = at ? dynamic_cast<Hash*>(at.Value()) : nullptr;
+    if (named == nullptr || !IsKnown(named->GetAlgorithm())) continue;
+    const Bytes digest = View(named->GetDigest());
+    if (digest.empty()) continue;
+    auto* const date = dynamic_cast<TimeStamp*>(item->Last());
+    const bool isDated = date != nullptr && IsStamp(date);
+    items_[count_++] = {named->GetAlgorithm(), digest, isDated ? date : nullptr};
+    algorithms_ |= Bit(named->GetAlgorithm());
+  }
+}
+
+void ItemIndex::Sort() { std::sort(items_.get(), items_.get() + count_, IsLess); }
+
+const Item* ItemIndex::Find(ZvclmHashID algorithm, Bytes digest) const {
+  const Item* const begin = items_.get();
+  const Item* const end = begin + count_;
+  const auto before = [](const Item& item, const Item& wanted) {
+    if (item.algorithm != wanted.algorithm) return item.algorithm < wanted.algorithm;
+    return item.digest < wanted.digest;
+  };
+  const Item wanted{algorithm, digest, nullptr};
+  const Item* const first = std::lower_bound(begin, end, wanted, before);
+  return first != end && Names(*first, algorithm, digest) ? first : nullptr;
+}
+
+int ItemIndex::Find(const Item*& found, DExpression* object) const {
+  found = nullptr;
+  for (const ZvclmHashID algorithm : kAlgorithms) {
+    if ((algorithms_ & Bit(algorithm)) == 0) continue;
+    for (const bool ignoreHints : {true, false}) {
+      unsigned char* bytes = nullptr;
+      unsigned int length = 0;
+      VESK2_TRY(object->ComputeHash(bytes, length, algorithm, ignoreHints));
+      const std::unique_ptr<unsigned char[]> owner(bytes);
+      found = Earlier(found, Find(algorithm, Bytes(bytes, length)));
+    }
+  }
+  auto* const hash = dynamic_cast<Hash*>(object);
+  if (hash != nullptr) {
+    found = Earlier(found, Find(hash->GetAlgorithm(), View(hash->GetDigest())));
+  }
+  return 0;
+}
+
+}  // namespace ZvVesk2

@@ -1,0 +1,63 @@
+// RevocationLists: what the revocation lists of one call say, kept for all its questions. Each list
+// is proved at most once, and only items of proved lists are looked at: whoever writes a manifest
+// chooses how many certificates it has, and how many lists, true ones or not.
+#ifndef VESK2_SRC_TRUST_REVOCATION_LISTS_H
+#define VESK2_SRC_TRUST_REVOCATION_LISTS_H
+
+#include <memory>
+#include <span>
+
+#include <vesk2/acl_entry.h>
+#include <vesk2/crl.h>
+
+#include "src/trust/item_index.h"
+#include "src/trust/tag_index.h"
+
+namespace ZvVesk2 {
+
+class RevocationLists {
+ public:
+  // `acls` vouch for the lists in `store`; either may be null, and both outlive this object.
+  RevocationLists(SExpression* acls, SExpression* store) : acls_(acls), store_(store) {}
+
+  // See CrlSequence::CheckStatusCritical and CheckStatusNonCritical.
+  [[nodiscard]] int AskCritical(SExpression* tag, SExpression* object);
+  [[nodiscard]] int AskNonCritical(SExpression* tag, SExpression* object,
+                                   const TimeStamp* notBefore);
+  // See Cert::IsRevoked. The status tells whether it was revoked.
+  [[nodiscard]] int Mark(Cert* cert, const TimeStamp* notBefore);
+
+ private:
+  enum class Proof : uint8_t { kUnknown, kHolds, kFails };
+  struct List {
+    CrlSequence* sequence;
+    Proof proof;
+  };
+  using Source = TagIndex<List>::Entry;
+  // What the lists of one source say together, or all lists. Their order makes no difference.
+  struct Answers {
+    bool ready = false;
+    ItemIndex items;
+    const TimeStamp* latest = nullptr;  // the latest end of a list
+  };
+
+  int Load();
+  int LoadRoots();
+  int Find(Answers*& answers, bool critical, SExpression* tag);
+  int Collect(Answers& answers, bool critical, std::span<Source> lists);
+  int Prove(Source& list);
+
+  SExpression* acls_;
+  SExpression* store_;
+  bool loaded_ = false;
+  bool rootsLoaded_ = false;
+  TagIndex<List> lists_;  // by source; a list without one can never be proved
+  TagIndex<AclEntry*> roots_;
+  // For each of the two questions: of all lists, and at the place of the first list of a source.
+  Answers all_[2];
+  std::unique_ptr<Answers[]> bySource_[2];
+};
+
+}  // namespace ZvVesk2
+
+#endif  // VESK2_SRC_TRUST_REVOCATION_LISTS_H

@@ -1,0 +1,229 @@
+// What the lists of one call say, against an oracle that asks them one by one; and how much work a
+// stranger's certificates and lists make.
+#include <random>
+#include <vector>
+
+#include "src/platform/crypto.h"
+#include "tests/support/test_load.h"
+#include "tests/trust/trust_test.h"
+
+// The linker leads the library's calls here (--wrap).
+static size_t proofs = 0, digests = 0;
+extern "C" {
+decltype(zvclm_HashAlloc) __real_zvclm_HashAlloc, __wrap_zvclm_HashAlloc;
+decltype(zvclm_PublicKeyVerifySignature) __real_zvclm_PublicKeyVerifySignature,
+    __wrap_zvclm_PublicKeyVerifySignature;
+int __wrap_zvclm_HashAlloc(ZVCLMHashContextData** context, ZvclmHashID id, uint32_t handle) {
+  ++digests;
+  return __real_zvclm_HashAlloc(context, id, handle);
+}
+int __wrap_zvclm_PublicKeyVerifySignature(const ZVCLMPublicKeyData* key, int scheme,
+                                          const void* parameters, const unsigned char* digest,
+                                          uint32_t digestLength, const unsigned char* signature,
+                                          uint32_t signatureLength, int* valid, uint32_t handle) {
+  ++proofs;
+  return __real_zvclm_PublicKeyVerifySignature(key, scheme, parameters, digest, digestLength,
+                                               signature, signatureLength, valid, handle);
+}
+}
+
+namespace vesk2test {
+namespace {
+
+const std::string kSources[] = {"a (revoke)", "b (revoke)"};
+
+struct ItemModel {
+  int object;  // which certificate, or key, is named
+  std::string date;
+};
+struct ListModel {
+  int source = 0;
+  bool proved = false;
+  std::string end;
+  std::vector<ItemModel> certs, keys;
+};
+struct CertModel {
+  int source = -1;  // none
+  int key = 0;
+};
+
+std::string TextOf(const CertModel& cert, int number) {
+  CertText text{.issuer = KeyText(2), .subject = HashOf(std::to_string(cert.key))};
+  text.comment = std::to_string(number);
+  if (cert.source >= 0) {
+    text.revocation = Tag(kSources[cert.source]).replace(0, 6, "(10:revocation");
+  }
+  return Cert(text);
+}
+
+// The answer by the rules, list after list.
+int32_t Expected(const std::vector<ListModel>& lists, const CertModel& cert, int number,
+                 const std::string& from) {
+  for (const ListModel& list : lists) {
+    for (const ItemModel& item : list.keys) {
+      if (list.proved && item.object == cert.key) return CertObject::KeyRevoked;
+    }
+  }
+  if (cert.source < 0) return CertObject::NotRevoked;
+  std::string latest;
+  for (const ListModel& list : lists) {
+    if (!list.proved || list.source != cert.source || list.certs.empty()) continue;
+    for (const ItemModel& item : list.certs) {
+      const bool dated = item.date.size() == 19 && !from.empty();
+      if (item.object == number && (!dated || item.date <= from)) return CertObject::RevokedByCrl;
+    }
+    latest = std::max(latest, list.end);
+  }
+  const bool known = !latest.empty() && (from.empty() || latest >= from);
+  return known ? CertObject::NotRevoked : CertObject::Undetermined;
+}
+
+// Lists of every kind: proved or not, without items, end or tag, with objects named several times.
+class Lists {
+ public:
+  explicit Lists(const std::vector<CertModel>& certs) : certs_(certs) {
+    while (models.size() < 48) Make();
+  }
+  std::vector<ListModel> models;
+  std::vector<std::string> texts;
+
+ private:
+  size_t Below(size_t bound) { return random_() % bound; }
+
+  void Make() {
+    constexpr const char* kDates[] = {kPast, kMiddle, kFuture, "3001"};
+    constexpr const char* kAlgorithms[] = {"sha256", "sha1", "rmd160"};
+    constexpr const char* kEnds[] = {kMiddle, kFuture, ""};
+    ListModel list;
+    list.source = int(Below(2));
+    list.end = kEnds[Below(3)];
+    std::string items[2];
+    for (const bool keys : {false, true}) {
+      for (size_t count = Below(3); count > 0; --count) {
+        const size_t object = Below(keys ? 4 : certs_.size());
+        const ItemModel item{int(object), kDates[Below(4)]};
+        const std::string text =
+            keys ? HashOf(std::to_string(object)) : TextOf(certs_[object], int(object));
+        // A key is named by its hash; the name of a hash is also the hash of the name.
+        const bool asItStands = keys && Below(2) == 0;
+        const std::string hash = asItStands ? text : HashOf(text, kAlgorithms[Below(3)]);
+        items[keys] += Item(hash, item.date);
+        (keys ? list.keys : list.certs).push_back(item);
+      }
+    }
+    const size_t kind = Below(6);  // forged in three ways, or true
+    std::string text = CrlSequenceText(kind == 0, kind == 1 ? "" : Tag(kSources[list.source]),
+                                       CrlText(items[0], items[1]), kPast, list.end);
+    if (kind == 2) text[text.size() - 5] ^= 1;
+    list.proved = kind > 2;
+    models.push_back(list);
+    texts.push_back(text);
+  }
+
+  const std::vector<CertModel>& certs_;
+  std::mt19937 random_{7};
+};
+
+TEST(RevocationLists, AnswerAsOneByOne) {
+  std::vector<CertModel> certs;
+  for (const int source : {-1, 0, 1, 0, 1}) certs.push_back({source, int(certs.size()) % 4});
+  const Lists lists(certs);
+  const Ref<SExpression> acls = Acls(
+      {AclEntryText(KeyText(0), Tag("other")), AclEntryText(KeyText(1), Tag(kSources[0])),
+       AclEntryText(KeyText(0), Tag(kSources[0])), AclEntryText(KeyText(0), Tag(kSources[1]))});
+  Ref<SExpression> objects;
+  ASSERT_EQ(SExpression::Create(objects.Out(), "sequence", nullptr), 0);
+  for (size_t i = 0; i < certs.size(); ++i) {
+    ASSERT_EQ(objects->Insert(Read<CertObject>(TextOf(certs[i], int(i))).Release()), 0);
+  }
+  std::mt19937 random(8);
+  int counts[4] = {};
+  for (int round = 0; round < 200; ++round) {
+    const Ref<SExpression> store(new SExpression(nullptr));
+    std::vector<ListModel> chosen;
+    for (size_t count = random() % 6; count > 0; --count) {
+      const size_t index = random() % lists.models.size();
+      chosen.push_back(lists.models[index]);
+      ASSERT_EQ(store->Insert(Read<CrlSequence>(lists.texts[index]).Release()), 0);
+    }
+    constexpr const char* kFrom[] = {"", kPast, kMiddle, kFuture};
+    const std::string from = kFrom[random() % 4];
+    const Ref<TimeStamp> stamp = Stamp(from);
+    ASSERT_EQ(
+        CrlSequence::MarkRevoked(objects.get(), acls.get(), store.get(), stamp.get(), nullptr), 0);
+    int number = 0;
+    for (auto it = objects->Begin(); it; it.Next()) {
+      auto* const cert = dynamic_cast<CertObject*>(it.Value());
+      if (cert == nullptr) continue;
+      const int32_t status = cert->GetRevocationStatus();
+      EXPECT_EQ(status, Expected(chosen, certs[number], number, from)) << round << "/" << number;
+      bool revoked = false;  // alone it is told the same
+      const int code = cert->IsRevoked(revoked, acls.get(), store.get(), stamp.get(), nullptr);
+      EXPECT_EQ(cert->GetRevocationStatus(), status);
+      EXPECT_EQ(code == 0, status != CertObject::Undetermined);
+      ++counts[status];
+      ++number;
+    }
+  }
+  for (const int count : counts) EXPECT_GT(count, 20);  // each answer was given
+  EXPECT_EQ(CrlSequence::MarkRevoked(nullptr, acls.get(), nullptr, nullptr, nullptr),
+            VESK2_ERR_PARAM_NULL);
+}
+
+// The proofs and digests that marking takes, over a store with roots for other sources.
+std::pair<size_t, size_t> Work(const RevocationLoad& load) {
+  const Ref<SExpression> acls = Acls({AclEntryText(KeyText(0), Tag("x")), LoadRoot()});
+  const Ref<SExpression> certs(new SExpression(nullptr)), store(new SExpression(nullptr));
+  for (size_t i = 0; i < load.certificates; ++i) {
+    EXPECT_EQ(certs->Insert(Read<CertObject>(LoadCert(i)).Release()), 0);
+  }
+  for (size_t i = 0; i < load.lists; ++i) {
+    EXPECT_EQ(store->Insert(Read<CrlSequence>(LoadList(load, i)).Release()), 0);
+  }
+  proofs = digests = 0;
+  EXPECT_EQ(CrlSequence::MarkRevoked(certs.get(), acls.get(), store.get(), nullptr, nullptr), 0);
+  return {proofs, digests};
+}
+
+TEST(RevocationLists, EachIsProvedOnce) {
+  for (const bool keys : {false, true}) {
+    for (const bool genuine : {false, true}) {
+      const auto work = [&](size_t certificates, size_t lists) {
+        return Work({certificates, 3, lists, keys, genuine});
+      };
+      const auto [oneProof, oneDigest] = work(1, 1);
+      EXPECT_EQ(oneProof, 1U);
+      // Each certificate adds the same, however many lists there are, and the other way round.
+      EXPECT_EQ(work(1, 9).first, 9U);
+      EXPECT_EQ(work(9, 9).first, 9U);
+      const size_t perCert = (work(9, 1).second - oneDigest) / 8;
+      const size_t perList = (work(1, 9).second - oneDigest) / 8;
+      EXPECT_LE(perCert, 3U);  // the source, and the object in two forms
+      EXPECT_EQ(work(9, 9).second, oneDigest + 8 * (perCert + perList));
+    }
+  }
+}
+
+TEST(AclStoreWork, InstallingHashesEachTagOnce) {
+  TempDir global, fresh;
+  VeskConf::SetGlobalDirectory(global.Path().c_str());
+  const auto work = [&](int stored, int added) {
+    for (const auto& [dir, prefix, count] :
+         {std::tuple(&global, "acl/s", stored), std::tuple(&fresh, "f", added)}) {
+      for (int i = 0; i < count; ++i) {
+        const std::string name = prefix + std::to_string(i);
+        dir->Write(name + ".acl", AclEntryText(HashOf("x"), Tag("t" + name)));
+      }
+    }
+    digests = 0;
+    EXPECT_EQ(AclEntry::InstallAcls(fresh.Path().c_str(), nullptr), 0);
+    const size_t installed = digests;
+    std::filesystem::remove_all(global.File("acl"));
+    return installed;
+  };
+  EXPECT_EQ(work(10, 10), 20U);
+  EXPECT_EQ(work(30, 10), 40U);
+}
+
+}  // namespace
+}  // namespace vesk2test
