@@ -10,6 +10,7 @@
 #include "src/frame/check.h"
 #include "src/objects/build.h"
 #include "src/sexpr/same.h"
+#include "src/trust/revocation_lists.h"
 
 namespace ZvVesk2 {
 namespace {
@@ -67,15 +68,10 @@ int ManifestAuthority::MarkRevoked(SExpression* carried, bool updateStore) {
   }
   // The status that this leaves decides; a certificate about which nothing is known is dropped like
   // a revoked one.
-  VESK2_TRY(CrlSequence::MarkRevoked(certificates_, acls_.get(), lists.get(), notBefore_.get(),
-                                     notAfter_.get()));
-  if (!updateStore) return 0;
-  // Lists that do not verify, or are older than the stored ones, are left out by the store.
-  for (auto it = carried->Begin(); it; it.Next()) {
-    if (auto* const list = dynamic_cast<CrlSequence*>(it.Value())) {
-      static_cast<void>(list->UpdateStore(acls_.get()));
-    }
-  }
+  RevocationLists revocations(acls_.get(), lists.get());
+  VESK2_TRY(revocations.MarkAll(certificates_, notBefore_.get()));
+  // What cannot be stored changes no answer.
+  if (updateStore) static_cast<void>(revocations.Store(carried));
   return 0;
 }
 

@@ -1,8 +1,6 @@
 // Installing trust roots: copying into the store what it lacks.
 #include <vesk2/acl_entry.h>
 
-#include <variant>
-
 #include "src/platform/replace.h"
 #include "src/platform/text.h"
 #include "src/trust/lists.h"
@@ -28,7 +26,9 @@ int Split(SExpression* loaded, SExpression* stored, SExpression* added) {
   return 0;
 }
 
-using StoredTags = TagIndex<std::monostate>;
+// Only whether a tag is there is asked.
+struct Nothing {};
+using StoredTags = TagIndex<Nothing>;
 
 int IndexTags(StoredTags& tags, SExpression* entries) {
   VESK2_TRY(tags.Reserve(entries->Count()));

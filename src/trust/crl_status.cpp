@@ -137,6 +137,17 @@ int RevocationLists::AskNonCritical(SExpression* tag, SExpression* object,
   return notBefore != nullptr && answers->latest->IsBefore(notBefore) ? VESK2_ERR_NOT_AFTER : 0;
 }
 
+int RevocationLists::MarkAll(SExpression* certs, const TimeStamp* notBefore) {
+  VESK2_REQUIRE(certs != nullptr, VESK2_ERR_PARAM_NULL);
+  for (auto it = certs->Begin(); it; it.Next()) {
+    auto* const cert = dynamic_cast<Cert*>(it.Value());
+    if (cert == nullptr) continue;
+    const int code = Mark(cert, notBefore);
+    VESK2_REQUIRE(!LacksMemory(code), VESK2_ERR_MEM_ALLOC);
+  }
+  return 0;
+}
+
 int CrlSequence::CheckStatusCritical(SExpression* aclEntries, SExpression* store, SExpression* tag,
                                      SExpression* object) {
   return RevocationLists(aclEntries, store).AskCritical(tag, object);
@@ -150,15 +161,7 @@ int CrlSequence::CheckStatusNonCritical(SExpression* aclEntries, SExpression* st
 
 int CrlSequence::MarkRevoked(SExpression* certs, SExpression* aclEntries, SExpression* store,
                              TimeStamp* notBefore, TimeStamp*) {
-  VESK2_REQUIRE(certs != nullptr, VESK2_ERR_PARAM_NULL);
-  RevocationLists lists(aclEntries, store);
-  for (auto it = certs->Begin(); it; it.Next()) {
-    auto* const cert = dynamic_cast<Cert*>(it.Value());
-    if (cert == nullptr) continue;
-    const int code = lists.Mark(cert, notBefore);
-    VESK2_REQUIRE(!LacksMemory(code), VESK2_ERR_MEM_ALLOC);
-  }
-  return 0;
+  return RevocationLists(aclEntries, store).MarkAll(certs, notBefore);
 }
 
 }  // namespace ZvVesk2

@@ -10,6 +10,7 @@
 #include <vesk2/acl_entry.h>
 
 #include "src/platform/replace.h"
+#include "src/trust/revocation_lists.h"
 #include "src/trust/store_write.h"
 
 namespace ZvVesk2 {
@@ -111,6 +112,32 @@ int CrlSequence::UpdateStore(SExpression* aclEntries) {
   if (SetFilePath(path.get()) != 0) return 0;
   ZVsysutil::zv_remove_leftovers(TextPtr(CalcDir(StorageGlobal)).get());
   static_cast<void>(WriteStored(this, path.get(), true));
+  return 0;
+}
+
+// Each offer reads the stored list, which may be large. A list that is carried many times is
+// offered the first and the last time: those between cannot change what is stored in the end.
+int RevocationLists::Store(SExpression* carried) {
+  VESK2_TRY(Load());
+  for (Source& list : lists_.All()) VESK2_TRY(Prove(list));
+  TagIndex<CrlSequence*> proved;
+  VESK2_TRY(proved.Reserve(carried->Count()));
+  for (auto it = carried->Begin(); it; it.Next()) {
+    auto* const list = dynamic_cast<CrlSequence*>(it.Value());
+    if (list == nullptr || list->First() == nullptr) continue;
+    if (list->GetCrl()->GetIssuerTag() != nullptr) VESK2_TRY(proved.Add(list->GetCert(), list));
+  }
+  proved.Sort();
+  for (auto it = carried->Begin(); it; it.Next()) {
+    auto* const list = dynamic_cast<CrlSequence*>(it.Value());
+    if (list == nullptr || list->First() == nullptr) continue;
+    bool hashed = false;
+    TagDigest digest;
+    VESK2_TRY(DigestTag(hashed, digest, list->GetCert()));
+    const auto same = hashed ? proved.Find(digest) : decltype(proved.Find(digest))();
+    if (same.empty() || (list != same.front().value && list != same.back().value)) continue;
+    static_cast<void>(list->UpdateStore(acls_));
+  }
   return 0;
 }
 

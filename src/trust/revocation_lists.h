@@ -26,6 +26,11 @@ class RevocationLists {
                                    const TimeStamp* notBefore);
   // See Cert::IsRevoked. The status tells whether it was revoked.
   [[nodiscard]] int Mark(Cert* cert, const TimeStamp* notBefore);
+  // See CrlSequence::MarkRevoked.
+  [[nodiscard]] int MarkAll(SExpression* certs, const TimeStamp* notBefore);
+  // Store offers those of the `carried` lists that are proved to the store, in their order. All are
+  // among the lists of this object.
+  [[nodiscard]] int Store(SExpression* carried);
 
  private:
   enum class Proof : uint8_t { kUnknown, kHolds, kFails };

@@ -4,6 +4,7 @@
 #include <vector>
 
 #include "src/platform/crypto.h"
+#include "src/trust/revocation_lists.h"
 #include "tests/support/test_load.h"
 #include "tests/trust/trust_test.h"
 
@@ -201,6 +202,41 @@ TEST(RevocationLists, EachIsProvedOnce) {
       EXPECT_LE(perCert, 3U);  // the source, and the object in two forms
       EXPECT_EQ(work(9, 9).second, oneDigest + 8 * (perCert + perList));
     }
+  }
+}
+
+// Carried lists leave in the store what offering each of them in turn leaves.
+TEST(RevocationLists, StoredAsOneByOne) {
+  const std::string source = Tag(kSources[0]);
+  const auto list = [&](const char* name, const std::string& begin, const std::string& end,
+                        unsigned key = 0) {
+    return CrlSequenceText(key, source, CrlText(Item(HashOf(name)), ""), begin, end);
+  };
+  const std::string texts[] = {
+      list("a", kPast, kFuture),       list("b", kPast, kFuture),
+      list("earlier", kPast, kMiddle), list("x", kFuture, kFarFuture),
+      list("y", kFuture, kFarFuture),  list("forged", kPast, kFarFuture, 1)};
+  const Ref<SExpression> acls = Acls({AclEntryText(KeyText(0), source)});
+  std::mt19937 random(9);
+  for (int round = 0; round < 60; ++round) {
+    const Ref<SExpression> carried(new SExpression(nullptr));
+    std::string stored[2];
+    for (const bool together : {false, true}) {
+      const TempDir store;
+      VeskConf::SetGlobalDirectory(store.Path().c_str());
+      if (!together) {
+        for (size_t count = random() % 6; count > 0; --count) {
+          const std::string& text = texts[random() % std::size(texts)];
+          EXPECT_EQ(carried->Insert(Read<CrlSequence>(text).Release()), 0);
+          EXPECT_EQ(Read<CrlSequence>(text)->UpdateStore(acls.get()), 0);
+        }
+      } else {
+        EXPECT_EQ(RevocationLists(acls.get(), carried.get()).Store(carried.get()), 0);
+      }
+      const std::string file = "cert/" + kSources[0] + ".crl";
+      if (std::filesystem::exists(store.File(file))) stored[together] = store.Read(file);
+    }
+    EXPECT_EQ(stored[0], stored[1]) << round;
   }
 }
 

@@ -1,6 +1,6 @@
 // What several writers, and a writer who keeps files to himself, leave in the stores for others.
 #include <fcntl.h>
-#include <sched.h>
+#include <pthread.h>  // for unshare
 #include <sys/stat.h>
 #include <sys/wait.h>
 #include <unistd.h>
