@@ -92,7 +92,8 @@ class VESK2_API AclEntry : public SExpression {
 
   // InstallAcls copies into the store every entry of `dir` whose tag no store entry has, under its
   // file's name; a name that is taken is skipped. Every "*.acl" file of `dir` may become a trust
-  // root. Always 0.
+  // root. When something could not be read for lack of memory or descriptors, nothing is written.
+  // Always 0.
   static int InstallAcls(const char* dir, Vesk2ContextStruct* ctx);
 
   // The parts, borrowed; null, false or 0 when absent.

@@ -117,7 +117,8 @@ class VESK2_API CrlSequence : public SExpression {
   [[nodiscard]] static int ImportStore(SExpression*& store, SExpression* aclEntries,
                                        Vesk2ContextStruct* ctx);
   // UpdateStore writes this sequence to the store when it verifies and is newer than what is there.
-  // The file is replaced whole or not at all. 0 whether it was stored or not;
+  // The file is replaced whole or not at all, and a list that another process holds, or that could
+  // not be read for lack of memory or descriptors, stays. 0 whether it was stored or not;
   // VESK2_ERR_INVALID_PARAM when the certificate's tag names no file.
   [[nodiscard]] int UpdateStore(SExpression* aclEntries);
   // ImportDir loads every "*.crl" file of a directory that can be read. VESK2_ERR_INVALID_PARAM,
