@@ -85,8 +85,7 @@ int IsWanted(bool& wanted, const Cert* fresh, const char* path) {
   Ref<CrlSequence> stored(TryNew<CrlSequence>(fresh->GetContext()));
   VESK2_REQUIRE(stored, VESK2_ERR_MEM_ALLOC);
   const int code = stored->Import(path);
-  // A list that another process holds, or that nothing was left to read with, is no absent one.
-  VESK2_REQUIRE(!LacksMemory(code) && code != VESK2_ERR_READ_FILE, code);
+  VESK2_REQUIRE(!IsNoAbsence(code), code);
   if (code != 0) {
     wanted = true;
     return 0;

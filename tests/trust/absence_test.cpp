@@ -118,6 +118,20 @@ TEST_F(Absence, HeldFiles) {
   }
 }
 
+// A list that cannot be looked at now is not replaced, though the new one would be.
+TEST_F(Absence, KeepsAListThatIsHeld) {
+  const std::string before = global.Read("cert/x (revoke y).crl");
+  const auto fresh =
+      Read<CrlSequence>(CrlSequenceText(0, source_, CrlText("", ""), kPast, kFarFuture));
+  {
+    const HeldFiles held({list_});
+    EXPECT_EQ(fresh->UpdateStore(acls_.get()), 0);
+  }
+  EXPECT_TRUE(global.Read("cert/x (revoke y).crl") == before);
+  EXPECT_EQ(fresh->UpdateStore(acls_.get()), 0);
+  EXPECT_FALSE(global.Read("cert/x (revoke y).crl") == before);
+}
+
 // Looking at stores and names makes nothing, and says what is wrong with a name.
 TEST_F(Absence, NamesAndDirectories) {
   std::filesystem::remove_all(global.File("cert"));
