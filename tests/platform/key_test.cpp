@@ -266,7 +266,7 @@ TEST(KeyTest, TakesPssBlocksOfAnySaltOnly) {
   const auto takes = [&](const std::string& block) {
     return key.Takes(block, ZVCLM_SCHEME_RSA_PSS, digest);
   };
-  for (const size_t salt : {0, 20, 38}) {
+  for (const size_t salt : {0u, 20u, 38u}) {
     const std::string block = PssBlock(kSize, digest, std::string(salt, 's'));
     ExpectNoOther(key, ZVCLM_SCHEME_RSA_PSS, block, digest);
     EXPECT_FALSE(key.Takes(block, ZVCLM_SCHEME_RSA_PKCS1, digest));
