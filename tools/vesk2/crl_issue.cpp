@@ -1,11 +1,14 @@
 // crl_issue.cpp: vesk2 crl issue.
 #include "tools/vesk2/command.h"
+#include "tools/vesk2/crl_drop.h"
 #include "tools/vesk2/crl_store.h"
+#include "tools/vesk2/crl_stored.h"
 #include "tools/vesk2/files.h"
 #include "tools/vesk2/inspect.h"
 #include "tools/vesk2/key_source.h"
 #include "tools/vesk2/report.h"
 
+#include <vesk2/acl_entry.h>
 #include <vesk2/limits.h>
 
 namespace vesk2_command {
@@ -20,6 +23,7 @@ struct Options {
   std::vector<std::string> certs;
   std::vector<std::string> keys;
   std::string itemsOf;
+  std::vector<std::string> drops;
   std::string date = "now";
   PeriodOptions period;
   std::string hash = "sha256";
@@ -57,16 +61,7 @@ std::string CertDigest(const std::string& argument, const std::string& hash) {
   return Digest(*certs[number - 1].cert, hash, false);
 }
 
-// The items of a list, as they stand there.
-std::string ItemsOf(const SExpression& list) {
-  std::string items;
-  for (auto it = list.Begin(); it; it.Next()) {
-    if (it.Value()->IsSExpression()) items += Canonical(*it.Value());
-  }
-  return items;
-}
-
-Ref<Crl> MakeList(const Options& options) {
+Ref<Crl> MakeList(const Options& options, CrlSequence* old, const Drops& drops) {
   const Ref<TimeStamp> date = ParseTime(options.date, false);
   std::string certs;
   std::string keys;
@@ -76,10 +71,9 @@ Ref<Crl> MakeList(const Options& options) {
   for (const std::string& path : options.keys) {
     keys += Item(options.hash, Digest(*ReadPublicKey(path), options.hash, true), *date);
   }
-  if (!options.itemsOf.empty()) {
-    const Ref<CrlSequence> old = ReadCrl(options.itemsOf);
-    certs += ItemsOf(*old->GetCrl()->GetList1());
-    keys += ItemsOf(*old->GetCrl()->GetList2());
+  if (old != nullptr) {
+    certs += drops.ItemsOf(*old->GetCrl()->GetList1());
+    keys += drops.ItemsOf(*old->GetCrl()->GetList2());
   }
   // A list without items counts as absent, and every certificate that depends on it as
   // undetermined. This item is the digest of nothing.
@@ -112,20 +106,32 @@ std::string SignList(Crl& list, SExpression* tag, const SigningKey& key, const O
          Canonical(*issued.signature) + ")";
 }
 
-// How many items the stored list has that its successor has not. Zeros name nothing.
-size_t CountDropped(CrlSequence& stored, const std::string& successor) {
-  size_t dropped = 0;
-  for (const SExpression* items : {stored.GetCrl()->GetList1(), stored.GetCrl()->GetList2()}) {
-    auto it = items->Begin();
-    for (it.Next(); it; it.Next()) {
-      auto at = dynamic_cast<SExpression*>(it.Value())->Begin();
-      at.Next();
-      const std::string named = Canonical(*at.Value());
-      const bool dummy = named.find(std::string(20, '\0')) != std::string::npos;
-      dropped += !dummy && successor.find(named) == std::string::npos ? 1 : 0;
-    }
+// The stored list that the new one takes the place of, when it counts. One that does not revokes
+// nothing; one that this user may not read is no reason to believe so.
+Ref<CrlSequence> ListBefore(SExpression* tag, const Drops& drops) {
+  Ref<SExpression> acls;
+  const int code = ZvVesk2::AclEntry::Import(acls.Out(), nullptr, nullptr);
+  if (code == VESK2_ERR_MEM_ALLOC) throw std::bad_alloc();
+  StoredList stored = FindStored(tag, code == 0 ? acls.get() : nullptr);
+  if (stored.problem.empty()) return std::move(stored.list);
+  if (stored.unread && !drops.all()) {
+    throw Trouble(stored.problem + "; it may revoke what this list lets go (--drop all)", "io");
   }
-  return dropped;
+  Note("note: the stored list does not count: " + stored.problem);
+  return {};
+}
+
+Ref<Crl> MakeSuccessor(const Options& options, SExpression* tag) {
+  const Drops drops(options.drops);
+  Ref<CrlSequence> old;
+  if (!options.itemsOf.empty()) old = ReadCrl(options.itemsOf);
+  const Ref<CrlSequence> stored = ListBefore(tag, drops);
+  Ref<Crl> list = MakeList(options, old.get(), drops);
+  std::vector<const Crl*> before;
+  if (old) before.push_back(old->GetCrl());
+  if (stored) before.push_back(stored->GetCrl());
+  drops.Settle(before, *list);
+  return list;
 }
 
 // Puts the list into this machine's store, or says that it would.
@@ -133,13 +139,6 @@ void Import(const std::string& bytes, const Options& options, const std::string&
   const Buffer buffer = WrapBytes(bytes);
   const Ref<CrlSequence> list(new CrlSequence(nullptr));
   Check(list->Import(buffer.get()), "storing the list");
-  if (const Ref<CrlSequence> stored = StoredCrl(*list)) {
-    const size_t dropped = CountDropped(*stored, bytes);
-    if (dropped > 0) {
-      Note("note: the stored list of this source revokes " + std::to_string(dropped) +
-           " more; this one takes its place, and they are revoked no longer (--items-of)");
-    }
-  }
   if (options.flags.dryRun) return Note("would store " + CrlText(*list));
   const std::string reason = StoreCrl(*list, LoadAcls().get(), "the list");
   if (!reason.empty()) throw Trouble("the list was not stored: " + reason, "not-stored");
@@ -158,7 +157,7 @@ ExitCode Run(const Options& options) {
   const WriteFlags& flags = options.flags;
   if (!options.output.empty()) RefuseExisting(options.output, flags.force);
   const auto key = OpenSigner(options.signer);
-  const Ref<Crl> list = MakeList(options);
+  const Ref<Crl> list = MakeSuccessor(options, tag.get());
   const std::string bytes = SignList(*list, tag.get(), *key, options);
   const auto readBack = [](const std::string& temporary) {
     Check(CheckIssuerWord(*ReadCrl(temporary)), "checking the new list");
@@ -188,12 +187,18 @@ Action DefineCrlIssue(CLI::App& app) {
   app.add_option("--tag", options->tag, "The source of the list: \"calc (revoke all)\"")
       ->required();
   app.add_option("--revoke-cert", options->certs,
-                 "A certificate that is revoked: FILE, or FILE:N for the N-th of a chain")
+                 "A certificate that is revoked: FILE, or FILE:N for the N-th of a chain. Whoever "
+                 "has its key can sign with an earlier date: for a leaked key, --revoke-key")
       ->allow_extra_args(false);
-  app.add_option("--revoke-key", options->keys, "A public key that is revoked, at any time")
+  app.add_option("--revoke-key", options->keys,
+                 "A public key that is revoked, whatever the date: one that leaked")
       ->allow_extra_args(false);
   app.add_option("--items-of", options->itemsOf,
                  "Revoke what this list revokes, too: the one that is replaced");
+  app.add_option("--drop", options->drops,
+                 "Let this go, which the list before revokes (that of --items-of, and the stored "
+                 "one): a digest as crl show writes it, or \"all\"")
+      ->allow_extra_args(false);
   app.add_option("--date", options->date, "From when on the certificates are revoked")
       ->capture_default_str();
   AddPeriodOptions(app, options->period);

@@ -6,6 +6,7 @@
 #include <filesystem>
 
 #include "tools/vesk2/acl_file.h"
+#include "tools/vesk2/crl_stored.h"
 #include "tools/vesk2/grant.h"
 #include "tools/vesk2/inspect.h"
 #include "tools/vesk2/stores.h"
@@ -48,14 +49,6 @@ bool NamesFile(SExpression* tag) {
   return text.size() + 2 * slashes <= ZvVesk2::Limits::kMaxStoreName;  // "%2F" for each
 }
 
-Ref<CrlSequence> StoredCrl(CrlSequence& list) {
-  Ref<CrlSequence> stored;
-  const int code = CrlSequence::Find(stored.Out(), list.GetCert()->GetTag());
-  if (code == VESK2_ERR_MEM_ALLOC) throw std::bad_alloc();
-  if (code != 0) stored.Reset();
-  return stored;
-}
-
 std::string WhyRefused(CrlSequence& list, SExpression* acls) {
   if (!IsRevocationTag(list.GetCert()->GetTag())) {
     return "its tag " + TagText(list.GetCert()->GetTag()) + " does not end in (revoke ...)";
@@ -73,7 +66,7 @@ std::string StoreCrl(CrlSequence& list, SExpression* acls, const std::string& pa
   const std::string reason = WhyRefused(list, acls);
   if (!reason.empty()) return reason;
   Check(list.UpdateStore(acls), Escape(path));
-  const Ref<CrlSequence> kept = StoredCrl(list);
+  const Ref<CrlSequence> kept = FindStored(list.GetCert()->GetTag(), nullptr).list;
   if (!kept) {
     const Text directory(CrlSequence::CalcDir(ZvVesk2::StorageGlobal));
     throw Trouble(Escape(path) + ": cannot be written to " +
@@ -84,11 +77,8 @@ std::string StoreCrl(CrlSequence& list, SExpression* acls, const std::string& pa
 }
 
 void TrustSource(PublicKey& issuer, SExpression* tag, const std::string& keyPath, bool dryRun) {
-  std::error_code error;
-  const bool any = std::filesystem::exists(AclDirectory(), error);
   // The last entry of the tag decides whose lists count.
-  for (const std::string& path :
-       any ? FilesOf(AclDirectory(), ".acl") : std::vector<std::string>()) {
+  for (const std::string& path : StoreFilesOf(AclDirectory(), ".acl")) {
     Ref<AclEntry> entry;
     try {
       entry = ReadEntry(path);

@@ -16,8 +16,6 @@ std::string WhyRefused(CrlSequence& list, SExpression* acls);
 // StoreCrl offers a list to the store: why it is not there now, or empty. `path` names it in
 // trouble.
 std::string StoreCrl(CrlSequence& list, SExpression* acls, const std::string& path);
-// The stored list of the same source; null when there is none that can be read.
-Ref<CrlSequence> StoredCrl(CrlSequence& list);
 
 // TrustSource makes this machine believe the issuer's lists of the source `tag`: it writes the ACL
 // entry that is missing. Trouble when another key is believed for that source, since one decides.

@@ -2,9 +2,11 @@
 #include <sys/stat.h>
 
 #include <filesystem>
+#include <functional>
 
 #include "tools/vesk2/acl_file.h"
 #include "tools/vesk2/command.h"
+#include "tools/vesk2/crl_stored.h"
 #include "tools/vesk2/describe.h"
 #include "tools/vesk2/stores.h"
 
@@ -12,7 +14,7 @@ namespace vesk2_command {
 namespace {
 
 // Reads a file of its kind and says what it holds; Trouble when it cannot be used.
-using Reader = std::string (*)(const std::string& path);
+using Reader = std::function<std::string(const std::string& path)>;
 
 std::string Entry(const std::string& path) {
   const Ref<ZvVesk2::AclEntry> entry = ReadEntry(path);
@@ -25,7 +27,15 @@ std::string Chain(const std::string& path) {
   return TagText(ChainLinks(chain, path)[0].cert->GetTag());
 }
 
-std::string List(const std::string& path) { return CrlText(*ReadCrl(path)); }
+// What a list says; Trouble for one that verifications ask for and pass over.
+std::string List(const std::string& path, const Sources& sources) {
+  const Ref<CrlSequence> list = ReadCrl(path);
+  const Ref<SExpression> acls = sources.AclsFor(list->GetCert()->GetTag());
+  if (acls->Count() < 2) return CrlText(*list) + "; no entry names this source";
+  const std::string why = WhyListUnusable(*list, path, acls.get());
+  if (!why.empty()) throw FileTrouble(path, "does not count: " + why, "unusable");
+  return CrlText(*list);
+}
 
 void AddRoot(Sheet& sheet, const std::string& name, const StoreRoot& root) {
   sheet.AddRow(name, root.path.empty() ? "none" : Escape(root.path) + " (" + root.from + ")");
@@ -34,10 +44,8 @@ void AddRoot(Sheet& sheet, const std::string& name, const StoreRoot& root) {
 
 // The files of one kind. Returns how many of them cannot be used.
 size_t AddKind(Sheet& sheet, const std::string& directory, const char* kind, const char* extension,
-               Reader read) {
-  std::error_code error;
-  std::vector<std::string> files;
-  if (std::filesystem::exists(directory, error)) files = FilesOf(directory, extension);
+               const Reader& read) {
+  const std::vector<std::string> files = StoreFilesOf(directory, extension);
   sheet.AddRow(kind, std::to_string(files.size()));
   Json said = Json::array();
   size_t odd = 0;
@@ -72,7 +80,12 @@ ExitCode Run() {
   Sheet sheet("stores");
   AddRoot(sheet, "global", global);
   size_t odd = AddKind(sheet, AclDirectory(), "entries", ".acl", Entry);
-  odd += AddKind(sheet, global.path + "/cert", "lists", ".crl", List);
+  Ref<SExpression> acls;
+  const int code = ZvVesk2::AclEntry::Import(acls.Out(), nullptr, nullptr);
+  if (code == VESK2_ERR_MEM_ALLOC) throw std::bad_alloc();
+  const Sources sources(acls.get());  // none, if one of them was told as unreadable
+  const auto list = [&sources](const std::string& path) { return List(path, sources); };
+  odd += AddKind(sheet, ListDirectory(), "lists", ".crl", list);
   AddRoot(sheet, "home", home);
   if (!home.path.empty()) odd += AddKind(sheet, home.path + "/cert", "chains", ".cert", Chain);
   Present(sheet);

@@ -78,4 +78,11 @@ std::vector<std::string> FilesOf(const std::string& directory, const std::string
   return files;
 }
 
+std::vector<std::string> StoreFilesOf(const std::string& directory, const std::string& extension) {
+  std::error_code error;
+  const bool exists = std::filesystem::exists(directory, error);
+  if (error) throw FileTrouble(directory, error.message(), "io");
+  return exists ? FilesOf(directory, extension) : std::vector<std::string>();
+}
+
 }  // namespace vesk2_command

@@ -34,6 +34,8 @@ std::string AclDirectory();
 // The files of a directory whose names end in `extension`, in byte order. Trouble when the
 // directory cannot be read.
 std::vector<std::string> FilesOf(const std::string& directory, const std::string& extension);
+// The same of a store's directory, which need not be there.
+std::vector<std::string> StoreFilesOf(const std::string& directory, const std::string& extension);
 
 }  // namespace vesk2_command
 

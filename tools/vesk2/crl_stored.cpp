@@ -1,0 +1,100 @@
+// crl_stored.cpp: stored revocation lists.
+#include "tools/vesk2/crl_stored.h"
+
+#include <sys/stat.h>
+
+#include <cerrno>
+#include <cstring>
+#include <filesystem>
+
+#include "tools/vesk2/files.h"
+#include "tools/vesk2/report.h"
+
+#include <vesk2/context.h>
+#include <vesk2/limits.h>
+
+namespace vesk2_command {
+
+using ZvVesk2::AclEntry;
+
+namespace {
+
+// The library's name for the list of a source; empty for a tag that names no file.
+std::string FileName(SExpression* tag) {
+  if (tag == nullptr) return "";
+  const Text text(tag->ExportTagW("tag"));
+  std::string name;
+  for (const char* at = text.get(); at != nullptr && *at != '\0'; ++at) {
+    name += *at == '/' ? std::string("%2F") : std::string(1, *at);
+  }
+  return name.size() > ZvVesk2::Limits::kMaxStoreName ? "" : name;
+}
+
+}  // namespace
+
+std::string ListDirectory() {
+  return std::string(ZvVesk2::VeskConf::GetGlobalDirectory()) + "/cert";
+}
+
+Sources::Sources(SExpression* acls) {
+  if (acls == nullptr) return;
+  for (auto it = acls->Begin(); it; it.Next()) {
+    auto* entry = dynamic_cast<AclEntry*>(it.Value());
+    if (entry == nullptr || !IsRevocationTag(entry->GetTag())) continue;
+    last_[Fingerprint(*entry->GetTag())] = Ref<AclEntry>::Share(entry);
+  }
+}
+
+Ref<SExpression> Sources::AclsFor(SExpression* tag) const {
+  Ref<SExpression> acls;
+  Check(SExpression::Create(acls.Out(), "acl", nullptr), "building a list");
+  const auto entry = tag != nullptr ? last_.find(Fingerprint(*tag)) : last_.end();
+  if (entry == last_.end()) return acls;
+  auto shared = Ref<AclEntry>::Share(entry->second.get());
+  Check(acls->Insert(shared.get()), "building a list");
+  (void)shared.Release();
+  return acls;
+}
+
+std::string WhyListUnusable(CrlSequence& list, const std::string& path, SExpression* acls) {
+  SExpression* const tag = list.GetCert()->GetTag();
+  if (std::filesystem::path(path).filename() != FileName(tag) + ".crl") {
+    return "the list of another source, " + TagText(tag);
+  }
+  const int code = list.VerifySelf(acls);
+  if (code == VESK2_ERR_MEM_ALLOC) throw std::bad_alloc();
+  return code == 0 ? "" : WhyNotVouched(list, code) + " (" + CodeName(code) + ")";
+}
+
+StoredList FindStored(SExpression* tag, SExpression* acls) {
+  StoredList stored;
+  const std::string name = FileName(tag);
+  if (name.empty()) return stored;
+  const std::string path = ListDirectory() + "/" + name + ".crl";
+  struct stat status = {};
+  if (stat(path.c_str(), &status) != 0) {
+    stored.unread = errno != ENOENT && errno != ENOTDIR;
+    if (stored.unread) stored.problem = Escape(path) + ": " + std::strerror(errno);
+    return stored;
+  }
+  try {
+    stored.list = ReadCrl(path);
+  } catch (const Trouble& trouble) {
+    stored.problem = trouble.what();
+    stored.unread = trouble.reason == "io";
+    return stored;
+  }
+  std::string why;
+  // Texts of different tags can read the same, and then name one file.
+  SExpression* const own = stored.list->GetCert()->GetTag();
+  if (own == nullptr || !own->IsEqual(tag)) {
+    why = "the list of another source, " + TagText(own);
+    stored.list.Reset();
+  } else if (acls != nullptr) {
+    why = WhyListUnusable(*stored.list, path, acls);
+  }
+  if (!why.empty()) stored.problem = Escape(path) + ": " + why;
+  return stored;
+}
+
+}  // namespace vesk2_command
