@@ -9,6 +9,7 @@
 #include "tools/vesk2/key_source.h"
 #include "tools/vesk2/keys.h"
 #include "tools/vesk2/report.h"
+#include "tools/vesk2/self_check.h"
 
 namespace vesk2_command {
 namespace {
@@ -27,6 +28,7 @@ struct Options {
   PeriodOptions period;
   std::string comment;
   std::string name;
+  bool strict = false;
   WriteFlags flags;
 };
 
@@ -84,6 +86,8 @@ ExitCode Run(const Options& options) {
   const Ref<AclEntry> entry =
       MakeEntry({MakeSubject(ReadKeys(options), options.threshold), options.propagate,
                  ParseTag(options.tag), ParsePeriod(options.period), options.comment});
+  const bool issuer = !options.issuerOf.empty();
+  CheckGrant(*entry, issuer ? options.issuerOf : options.subjectOf, issuer, options.strict);
   GrantEntry(*entry, {name, options.flags.force, options.flags.dryRun});
   Result()["entry"] = DescribeEntry(*entry).members();
   if (!options.propagate) {
@@ -117,6 +121,7 @@ Action DefineAclGrant(CLI::App& app) {
   AddPeriodOptions(app, options->period);
   app.add_option("--comment", options->comment, "A text for people");
   app.add_option("--name", options->name, "Name of the entry [the file's name, or the files']");
+  AddStrictFlag(app, options->strict);
   AddWriteFlags(app, options->flags);
   return [options] { return Run(*options); };
 }

@@ -5,7 +5,9 @@
 #include "tools/vesk2/command.h"
 #include "tools/vesk2/crl_file.h"
 #include "tools/vesk2/describe.h"
+#include "tools/vesk2/key_source.h"
 #include "tools/vesk2/report.h"
+#include "tools/vesk2/self_check.h"
 
 namespace vesk2_command {
 namespace {
@@ -25,6 +27,7 @@ struct Options {
   std::vector<std::string> chains;
   std::string revocation;
   std::string output;
+  bool strict = false;
   WriteFlags flags;
 };
 
@@ -102,6 +105,23 @@ std::vector<CertChain> ReadChains(const std::vector<std::string>& paths, const S
   return chains;
 }
 
+// Warns of what the certificate cannot be used for: its chains must reach what it says, while it
+// lasts.
+void CheckUse(const Options& options, const Grant& grant, const Signers& signers) {
+  SelfCheck check;
+  check.End("the certificate", grant.period.notAfter.get());
+  const Ref<TimeStamp> now = ParseTime("now", false);
+  const TimeStamp* const begin = grant.period.notBefore.get();
+  for (const std::string& path : options.chains) {
+    SelfCheck::Chain chain{path, ReadCerts(path)};
+    for (const auto& signer : signers) chain.signers.push_back(signer->Public());
+    chain.tag = grant.tag;
+    chain.at = begin != nullptr && begin->IsAfter(now.get()) ? begin : now.get();
+    check.CheckChain(chain);
+  }
+  check.Tell(options.strict);
+}
+
 ExitCode Run(const Options& options) {
   const Wish wish = ReadWish(options);
   const Ref<ByteString> comment = MakeText(options.comment);
@@ -115,6 +135,7 @@ ExitCode Run(const Options& options) {
   }
   const Signers signers = OpenSigners(options.signer);
   const std::vector<CertChain> chains = ReadChains(options.chains, signers);
+  CheckUse(options, grant, signers);
 
   const CertChain sequence = NewSequence();
   for (const auto& signer : signers) {
@@ -159,6 +180,7 @@ Action DefineCertIssue(CLI::App& app) {
       "Valid only while a current list of this source does not revoke it: \"calc (revoke "
       "all)\"");
   app.add_option("-o,--output", options->output, "The certificate file")->required();
+  AddStrictFlag(app, options->strict);
   AddWriteFlags(app, options->flags);
   return [options] { return Run(*options); };
 }

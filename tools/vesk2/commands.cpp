@@ -95,7 +95,8 @@ constexpr Command kCommands[] = {
     {"crl", "verify", "Is a list current, and vouched for?", "vesk2 crl verify vendor.crl",
      DefineCrlVerify},
     {"manifest", "sign", "Sign what a directory holds",
-     "vesk2 manifest sign app --key signer.pem --cert signer.cert -o app.manifest",
+     "vesk2 manifest sign app --key signer.pem --cert signer.cert --tag '(install (app calc))' "
+     "-o app.manifest",
      DefineManifestSign},
     {"manifest", "verify", "Is a directory as signed, by someone authorized?",
      "vesk2 manifest verify app app.manifest --tag '(install (app calc))'", DefineManifestVerify},

@@ -9,9 +9,11 @@
 #include "tools/vesk2/files.h"
 #include "tools/vesk2/grant.h"
 #include "tools/vesk2/issue.h"
+#include "tools/vesk2/key_source.h"
 #include "tools/vesk2/manifest_file.h"
 #include "tools/vesk2/progress.h"
 #include "tools/vesk2/report.h"
+#include "tools/vesk2/self_check.h"
 #include "tools/vesk2/tree.h"
 
 #include <vesk2/hash.h>
@@ -36,6 +38,7 @@ struct Options {
   std::string output;
   bool force = false;
   bool dryRun = false;
+  bool strict = false;
 };
 
 // The signed elements that stand before the signature block, and the one inside it.
@@ -86,6 +89,25 @@ std::string SignersCerts(const Options& options, const SigningKey& key) {
     if (wanted) text += Canonical(*item.Value());
   }
   return text;
+}
+
+// Warns of what nobody will believe: certificates that do not lead to the signer, or not to what is
+// signed, now and at the time of signing.
+void CheckAuthority(const Options& options, const SigningKey& key, SExpression* tag) {
+  SelfCheck check;
+  const Ref<TimeStamp> at = ParseTime(options.at, false);
+  if (at->IsAfter(ParseTime("now", false).get())) {
+    check.Add("the time of signing, " + StampText(*at) + ", is yet to come");
+  }
+  if (!options.cert.empty()) {
+    SelfCheck::Chain chain{options.cert, ReadCerts(options.cert)};
+    chain.signers.push_back(key.Public());
+    chain.tag = tag;
+    chain.at = at.get();
+    chain.passing = 1;  // the first may pass on to the content what it was granted
+    check.CheckChain(chain);
+  }
+  check.Tell(options.strict);
 }
 
 std::set<std::string> Ignored(const Options& options) {
@@ -204,6 +226,7 @@ ExitCode Run(const Options& options) {
   const std::unique_ptr<SigningKey> signing = OpenSigner(options.signer);
   const SigningKey& key = *signing;
   const Parts parts = Prepare(options, key);
+  CheckAuthority(options, key, parts.tag.get());
   const Listing listing = ListOrExplain(options);
   if (options.dryRun) ShowListing(listing);
 
@@ -218,6 +241,7 @@ ExitCode Run(const Options& options) {
   } else {
     Say(Totals(listing) + ", to be signed by " + signer);
   }
+  if (!parts.tag) Note("note: signed without --tag: good for all that its signer was granted");
   Result()["files"] = listing.files;
   Result()["bytes"] = listing.bytes;
   Result()["signer"] = signer;
@@ -244,6 +268,7 @@ Action DefineManifestSign(CLI::App& app) {
   app.add_option("--grant", options->grant,
                  "Trust the signing key for this tag on this machine, as acl grant --propagate");
   app.add_option("-o,--output", options->output, "The manifest file")->required();
+  AddStrictFlag(app, options->strict);
   app.add_flag("-f,--force", options->force, "Replace an existing file");
   app.add_flag("-n,--dry-run", options->dryRun, "Show what would be signed; write nothing");
   return [options] { return Run(*options); };
