@@ -39,10 +39,14 @@ inline constexpr size_t kMaxBodyPath = 4096;
 inline constexpr size_t kMaxStoreName = 250;
 
 // Work that one reduction (or one tag comparison) may do. Certificates that an attacker signs for
-// keys of his own multiply tuples and set members exponentially; a spent budget is a refusal.
+// keys of his own multiply tuples and set members exponentially, and long strings are compared with
+// many others; a spent budget is a refusal.
 inline constexpr uint32_t kMaxTuples = 100'000;
 inline constexpr uint32_t kMaxCombinations = 1'000'000;
-inline constexpr uint32_t kMaxComparisons = 50'000'000;
+// In units of a short comparison, by which all work is paid: under a second. An entry or a
+// certificate of a large installation costs some 500.
+inline constexpr uint32_t kMaxComparisons = 30'000'000;
+// In units of 64 bytes: what a reduction holds at once.
 inline constexpr uint32_t kMaxRecords = 4'000'000;
 // Members of one accumulated (* set ...).
 inline constexpr uint32_t kMaxSetMembers = 4096;

@@ -13,7 +13,7 @@ inline constexpr size_t kSpkiDigestSize = 32;
 
 struct spki_digest {
   ZVCLMHashContextData* context = nullptr;
-  uint32_t handle = 0;
+  spki_engine* engine = nullptr;
 
   spki_digest() = default;
   spki_digest(const spki_digest&) = delete;
@@ -21,7 +21,8 @@ struct spki_digest {
   ~spki_digest();
 };
 
-// Starts a hash with the engine's provider; `digest` is fresh.
+// Starts a hash with the engine's provider, which it and its pieces are charged to; `digest` is
+// fresh.
 spki_status spki_digest_start(spki_engine* engine, spki_digest* digest, ZvclmHashID id);
 // Feeds one piece; a null one and an empty one are skipped.
 spki_status spki_digest_update(spki_digest* digest, const void* data, size_t length);

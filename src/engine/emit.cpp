@@ -55,7 +55,7 @@ spki_status spki_emit_entries(spki_engine* engine, spki_elem** result) {
   VESK2_TRY(spki_parse_template(engine, &list, "(3:acl)"));
   spki_elem_owner acl = Own(engine, list);
   spki_elem* last = list;
-  for (const spki_bucket_entry* entry = engine->acl_tuples; entry != nullptr; entry = entry->next) {
+  for (const spki_entry* entry = engine->acl_tuples; entry != nullptr; entry = entry->next) {
     const spki_tuple* tuple = entry->tuple;
     // Without a tag the template's own would stand, which is the widest of all.
     if (!tuple->reaches || tuple->tag == nullptr) continue;

@@ -46,17 +46,9 @@ spki_status Advance(spki_reduction* run) {
   return made == nullptr ? 0 : Push(run, made);
 }
 
-// The next tuple at the cursor; null at the end, and when the budget is spent.
-const spki_tuple* NextAtCursor(spki_reduction* run, spki_work* work) {
-  const spki_bucket_entry* entry = work->cursor;
-  if (entry == nullptr || spki_charge_step(run->engine) != 0) return nullptr;
-  work->cursor = entry->next;
-  return entry->tuple;
-}
-
 // This one first, with what its subject issued.
 spki_status Downward(spki_reduction* run, spki_work* work, spki_tuple** made) {
-  while (const spki_tuple* second = NextAtCursor(run, work)) {
+  while (const spki_tuple* second = spki_next_tuple(run, work)) {
     if (!second->reaches) continue;
     VESK2_TRY(spki_tuple_combine(run->engine, work->tuple, second, made));
     if (*made != nullptr) return 0;
@@ -67,7 +59,7 @@ spki_status Downward(spki_reduction* run, spki_work* work, spki_tuple** made) {
 
 // What the issuer received first, with this one.
 spki_status Upward(spki_reduction* run, spki_work* work, spki_tuple** made) {
-  while (const spki_tuple* first = NextAtCursor(run, work)) {
+  while (const spki_tuple* first = spki_next_tuple(run, work)) {
     if (!first->propagate) continue;
     VESK2_TRY(spki_tuple_combine(run->engine, first, work->tuple, made));
     if (*made != nullptr) return 0;
@@ -89,8 +81,7 @@ spki_status Receive(spki_reduction* run, spki_work* work, spki_tuple** /*made*/)
 
 spki_status Issue(spki_reduction* run, spki_work* work) {
   spki_tuple* tuple = work->tuple;
-  spki_bucket_entry** list =
-      tuple->issuer == nullptr ? &run->engine->acl_tuples : &tuple->issuer->issued;
+  spki_entry** list = tuple->issuer == nullptr ? &run->engine->acl_tuples : &tuple->issuer->issued;
   bool filed = false;
   VESK2_TRY(spki_tuple_file(run->engine, list, tuple, &filed));
   work->step = filed ? Receive : nullptr;
@@ -107,6 +98,13 @@ spki_status Begin(spki_reduction* run, spki_work* work, spki_tuple** made) {
 }
 
 }  // namespace
+
+const spki_tuple* spki_next_tuple(spki_reduction* run, spki_work* work) {
+  const spki_entry* entry = work->cursor;
+  if (entry == nullptr || spki_charge_step(run->engine) != 0) return nullptr;
+  work->cursor = entry->next;
+  return entry->tuple;
+}
 
 spki_status spki_tuple_insert(spki_reduction* run, spki_tuple* tuple) {
   if (run->third != nullptr && run->requester == nullptr) {

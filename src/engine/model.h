@@ -55,7 +55,7 @@ struct spki_elem {
   spki_elem* next;            // counted
   const unsigned char* text;  // on a head: the "(" in the input; null for lists made from templates
   uint32_t text_length;       // on a head: bytes up to just behind the ")"
-  unsigned char* digest;      // on the head of a key: its SHA-256, once asked for; its own memory
+  unsigned char* digest;      // of the chain from here on, once asked for; its own memory
   union {
     int32_t keyword;  // SPKI_ELEM_KEYWORD
     spki_atom* atom;  // SPKI_ELEM_HEAD, SPKI_ELEM_STRING; counted
@@ -63,16 +63,23 @@ struct spki_elem {
   } value;
 };
 
-struct spki_tuple;  // src/engine/reduce.h
+struct spki_tuple;  // src/engine/tuple.h
 struct spki_principal;
-struct spki_bucket_entry;
+struct spki_entry;  // src/engine/tables.h
+struct spki_node;
 
-// Work done so far by this engine; see the limits. When `spent` is set the operation that set it
-// failed, and the reduction ends with `spent`.
+// What is known by a digest; see src/engine/tables.h. Empty when it is zero-filled.
+struct spki_table {
+  spki_node* first;
+  spki_node* newest;
+};
+
+// Work done so far by this engine; see src/engine/budget.h. When `spent` is set the operation that
+// set it failed, and the reduction ends with `spent`.
 struct spki_budget {
   uint32_t tuples;
   uint32_t combinations;
-  uint32_t comparisons;
+  uint32_t comparisons;  // units
   uint32_t live_records;
   spki_status spent;  // 0, SPKI_ERR_NO_MEM or SPKI_ERR_THRESHOLD
 };
@@ -83,15 +90,15 @@ struct spki_slab {
   uint32_t left;
 };
 
-inline constexpr size_t kSpkiBuckets = 256;
-
 // The state of one call. Zero-filled before use, held in the caller's frame.
 struct spki_engine {
-  spki_bucket_entry* principals[kSpkiBuckets];  // by the first byte of a digest
-  bool keys_by_sha1;                            // whether keys stand there by their SHA-1 too
-  spki_bucket_entry* name_definitions[kSpkiBuckets];
-  spki_bucket_entry* name_users[kSpkiBuckets];
-  spki_bucket_entry* acl_tuples;  // issued by the ACL itself, newest first
+  spki_table principals;        // by their digests
+  spki_principal* newest;       // of them all
+  bool keys_by_sha1;            // whether keys stand in the table by their SHA-1 too
+  spki_table name_definitions;  // by the values of names
+  spki_table name_users;
+  spki_table filed;        // values of the tuples that are in a list, and of definitions
+  spki_entry* acl_tuples;  // issued by the ACL itself, newest first
   spki_atom* free_atoms;
   spki_elem* free_elems;
   spki_slab atom_slab;
@@ -177,6 +184,8 @@ int32_t spki_keyword_id(const unsigned char* data, size_t length);
 const spki_keyword_entry* spki_keyword_row(int32_t id);
 
 // ---- Comparison of byte strings ----
+//
+// What takes an engine is charged to it (src/engine/budget.h).
 
 // 0 equal, 1 the first is less, 2 the first is greater, 3 a null argument.
 enum spki_order : int {
@@ -192,7 +201,9 @@ int spki_cmp_bytes(const unsigned char* a, size_t a_length, const unsigned char*
 int spki_cmp_padded(const unsigned char* a, size_t a_length, const unsigned char* b,
                     size_t b_length, unsigned char pad);
 // Same hint and equal by spki_cmp_bytes. Null equals null only.
-bool spki_atom_equal(const spki_atom* a, const spki_atom* b);
+bool spki_atom_equal(spki_engine* engine, const spki_atom* a, const spki_atom* b);
+// Whether the first comes behind the second by spki_cmp_bytes.
+bool spki_atom_later(spki_engine* engine, const spki_atom* a, const spki_atom* b);
 
 // ---- Canonical text ----
 

@@ -1,7 +1,5 @@
 // Names: (issuer (name K N)) defines what N means below K, (subject (name K N N2...)) uses it.
 // Definitions and uses wait for each other under the digest of K and N, whichever comes first.
-#include <cstring>
-
 #include "src/engine/budget.h"
 #include "src/engine/chain.h"
 #include "src/engine/reduction.h"
@@ -11,16 +9,6 @@
 
 namespace ZvVesk2::Engine {
 namespace {
-
-using Digest = unsigned char[kSpkiDigestSize];
-
-// The next tuple under the cursor's name.
-const spki_tuple* NextOfName(spki_reduction* run, spki_work* work) {
-  spki_bucket_entry* entry = work->cursor;
-  if (entry == nullptr) return nullptr;
-  work->cursor = spki_entry_find(run->engine, entry->next, entry->digest);
-  return entry->tuple;
-}
 
 // The use with its first name replaced by what the definition says; none when they are never valid
 // together.
@@ -39,11 +27,11 @@ spki_status Resolve(spki_engine* engine, const spki_tuple* use, const spki_tuple
   }
   spki_atom_assign(engine, &copy->subject_name, name);
   if (spki_validity_meet(engine, copy.get(), definition)) *made = copy.release();
-  return 0;
+  return engine->budget.spent;
 }
 
 spki_status ResolveUses(spki_reduction* run, spki_work* work, spki_tuple** made) {
-  while (const spki_tuple* use = NextOfName(run, work)) {
+  while (const spki_tuple* use = spki_next_tuple(run, work)) {
     VESK2_TRY(Resolve(run->engine, use, work->tuple, made));
     if (*made != nullptr) return 0;
   }
@@ -52,7 +40,7 @@ spki_status ResolveUses(spki_reduction* run, spki_work* work, spki_tuple** made)
 }
 
 spki_status ResolveDefinitions(spki_reduction* run, spki_work* work, spki_tuple** made) {
-  while (const spki_tuple* definition = NextOfName(run, work)) {
+  while (const spki_tuple* definition = spki_next_tuple(run, work)) {
     VESK2_TRY(Resolve(run->engine, work->tuple, definition, made));
     if (*made != nullptr) return 0;
   }
@@ -60,17 +48,13 @@ spki_status ResolveDefinitions(spki_reduction* run, spki_work* work, spki_tuple*
   return 0;
 }
 
-// Whether the subject has this name already. The first definition counts, whatever the others'
-// dates are.
-spki_status IsDefined(spki_engine* engine, const Digest& digest, const spki_principal* subject,
-                      bool* defined) {
-  spki_bucket_entry* entry = engine->name_definitions[digest[0]];
-  *defined = false;
-  while ((entry = spki_entry_find(engine, entry, digest)) != nullptr && !*defined) {
-    *defined = entry->tuple->subject == subject;
-    entry = entry->next;
-  }
-  return engine->budget.spent;
+// What is listed under a name in a table; null for nothing.
+spki_status ListedUnder(spki_engine* engine, const spki_table& table, const Digest& name,
+                        spki_entry** list) {
+  spki_node* node = nullptr;
+  VESK2_TRY(spki_table_find(engine, table, name, &node));
+  *list = node == nullptr ? nullptr : node->tuples;
+  return 0;
 }
 
 }  // namespace
@@ -81,33 +65,35 @@ spki_status spki_name_define(spki_reduction* run, spki_work* work) {
   work->step = nullptr;
   // A name for any k of n subjects is none that a single one of them has.
   if (tuple->member > 0) return 0;
-  Digest digest;
-  VESK2_TRY(spki_name_value(engine, tuple->issuer, tuple->issuer_name, digest));
-  bool defined = false;
-  VESK2_TRY(IsDefined(engine, digest, tuple->subject, &defined));
-  if (defined) return 0;
-  spki_bucket_entry** bucket = &engine->name_definitions[digest[0]];
-  VESK2_TRY(spki_tuple_push(engine, bucket, tuple));
-  std::memcpy((*bucket)->digest, digest, sizeof digest);
-  work->cursor = spki_entry_find(engine, engine->name_users[digest[0]], digest);
+  Digest name;
+  VESK2_TRY(spki_name_value(engine, tuple->issuer, tuple->issuer_name, name));
+  Digest definition;
+  VESK2_TRY(spki_definition_value(engine, name, tuple->subject, definition));
+  spki_node* node = nullptr;
+  bool made = false;
+  VESK2_TRY(spki_table_enter(engine, &engine->filed, definition, &node, &made));
+  // The first definition of a name for a subject counts, whatever the others' dates are.
+  if (!made) return 0;
+  VESK2_TRY(spki_table_enter(engine, &engine->name_definitions, name, &node, &made));
+  VESK2_TRY(spki_tuple_push(engine, &node->tuples, tuple));
   work->step = ResolveUses;
-  return 0;
+  return ListedUnder(engine, engine->name_users, name, &work->cursor);
 }
 
 spki_status spki_name_use(spki_reduction* run, spki_work* work) {
   spki_engine* engine = run->engine;
   spki_tuple* tuple = work->tuple;
   work->step = nullptr;
-  Digest digest;
-  VESK2_TRY(spki_name_value(engine, tuple->subject, tuple->subject_name, digest));
-  spki_bucket_entry** bucket = &engine->name_users[digest[0]];
+  Digest name;
+  VESK2_TRY(spki_name_value(engine, tuple->subject, tuple->subject_name, name));
+  spki_node* node = nullptr;
+  bool made = false;
+  VESK2_TRY(spki_table_enter(engine, &engine->name_users, name, &node, &made));
   bool filed = false;
-  VESK2_TRY(spki_tuple_file(engine, bucket, tuple, &filed));
+  VESK2_TRY(spki_tuple_file(engine, &node->tuples, tuple, &filed));
   if (!filed) return 0;
-  std::memcpy((*bucket)->digest, digest, sizeof digest);
-  work->cursor = spki_entry_find(engine, engine->name_definitions[digest[0]], digest);
   work->step = ResolveDefinitions;
-  return 0;
+  return ListedUnder(engine, engine->name_definitions, name, &work->cursor);
 }
 
 }  // namespace ZvVesk2::Engine

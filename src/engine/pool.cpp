@@ -7,9 +7,9 @@
 namespace ZvVesk2::Engine {
 namespace {
 
-// What a block costs of the budget of live records: one, and one more for each of these bytes, so
-// that the budget bounds bytes as well.
-constexpr size_t kRecordBytes = 256;
+// What a block costs of the budget of live records: as many as there is room for in its bytes, so
+// that the budget bounds bytes.
+constexpr size_t kRecordBytes = 64;
 // Records of one block of a slab.
 constexpr uint32_t kSlabRecords = 64;
 
@@ -26,7 +26,7 @@ void* Allocate(size_t size, void* pool) {
   void* memory = allocator->allocate(sizeof(Header) + size, allocator->user);
   if (memory == nullptr) return nullptr;
   std::memset(memory, 0, sizeof(Header) + size);
-  auto* header = new (memory) Header{{self->ring.next, &self->ring}, 1 + size / kRecordBytes};
+  auto* header = new (memory) Header{{self->ring.next, &self->ring}, spki_block_cost(size)};
   self->ring.next->previous = &header->link;
   self->ring.next = &header->link;
   return header + 1;
@@ -80,6 +80,8 @@ void* Charged(spki_engine* engine, void* memory, size_t cost) {
 
 const spki_memory_ops kSpkiMemoryOps = {Allocate, Free, Create, Destroy};
 
+size_t spki_block_cost(size_t size) { return 1 + (sizeof(Header) + size) / kRecordBytes; }
+
 spki_status spki_engine_start(spki_engine* engine, const spki_allocator* allocator) {
   if (engine == nullptr || allocator == nullptr) return SPKI_ERR_NULL_PARAM;
   *engine = {};
@@ -104,7 +106,7 @@ void spki_engine_stop(spki_engine* engine, const spki_allocator* allocator) {
 
 void* spki_allocate(spki_engine* engine, size_t size) {
   if (engine->budget.spent != 0) return nullptr;
-  const size_t cost = 1 + size / kRecordBytes;
+  const size_t cost = spki_block_cost(size);
   void* memory = nullptr;
   if (cost <= Limits::kMaxRecords - engine->budget.live_records) {
     memory = kSpkiMemoryOps.allocate(size, engine->pool);

@@ -31,6 +31,9 @@ struct spki_memory_ops {
 };
 extern const spki_memory_ops kSpkiMemoryOps;
 
+// What a block of this size costs of the budget of live records.
+size_t spki_block_cost(size_t size);
+
 }  // namespace ZvVesk2::Engine
 
 #endif  // VESK2_SRC_ENGINE_POOL_H

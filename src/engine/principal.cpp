@@ -5,86 +5,73 @@
 //   (hash sha256 <32 bytes>)
 #include "src/engine/principal.h"
 
+#include <algorithm>
 #include <cstring>
 
 #include "src/engine/chain.h"
+#include "src/engine/value.h"
 #include "src/engine/write.h"
 #include "src/frame/check.h"
 
 namespace ZvVesk2::Engine {
 namespace {
 
-using Digest = unsigned char[kSpkiDigestSize];
+constexpr size_t kSha1Size = 20;
 
-spki_status FindPrincipal(spki_engine* engine, const Digest& digest, spki_principal** slot) {
-  const spki_bucket_entry* entry = spki_entry_find(engine, engine->principals[digest[0]], digest);
-  *slot = entry == nullptr ? nullptr : entry->principal;
-  return engine->budget.spent;
-}
-
-spki_status EnterPrincipal(spki_engine* engine, const Digest& digest, spki_principal* principal) {
-  spki_bucket_entry* entry = spki_entry_push(engine, &engine->principals[digest[0]]);
-  VESK2_REQUIRE(entry != nullptr, SPKI_ERR_NO_MEM);
-  std::memcpy(entry->digest, digest, sizeof entry->digest);
-  entry->principal = principal;
-  ++principal->refcount;
-  return 0;
-}
-
-// A new principal, in the table under its digest.
-spki_status AddPrincipal(spki_engine* engine, const Digest& digest, spki_elem* key,
-                         spki_principal** slot) {
+// A new principal, known by `node`.
+spki_status NewPrincipal(spki_engine* engine, spki_node* node, spki_elem* key) {
   auto* principal = static_cast<spki_principal*>(spki_allocate(engine, sizeof(spki_principal)));
   VESK2_REQUIRE(principal != nullptr, SPKI_ERR_NO_MEM);
-  if (const spki_status status = EnterPrincipal(engine, digest, principal)) {
-    spki_free(engine, principal);
-    return status;
-  }
-  std::memcpy(principal->digest, digest, sizeof principal->digest);
+  *principal = {};
+  principal->older = engine->newest;
+  engine->newest = principal;
+  std::memcpy(principal->digest, node->digest, sizeof principal->digest);
   spki_elem_assign(engine, &principal->key, key);
-  *slot = principal;
+  node->principal = principal;
   return 0;
 }
 
-spki_status DigestKey(spki_engine* engine, const spki_elem* key, ZvclmHashID id, Digest& digest) {
-  spki_digest_sink sink;
-  VESK2_TRY(spki_digest_start(engine, &sink.digest, id));
-  VESK2_TRY(spki_write_pieces(key, &sink));
-  return spki_digest_finish(&sink.digest, digest);
-}
-
-// The key's SHA-256, which its head keeps: keys are registered first and looked for later.
-spki_status IdentifyKey(spki_engine* engine, spki_elem* key, Digest& digest) {
-  if (key->digest == nullptr) {
-    VESK2_TRY(DigestKey(engine, key, ZVCLM_HASH_SHA256, digest));
-    key->digest = static_cast<unsigned char*>(spki_allocate(engine, sizeof digest));
-    VESK2_REQUIRE(key->digest != nullptr, SPKI_ERR_NO_MEM);
-    std::memcpy(key->digest, digest, sizeof digest);
-  }
-  std::memcpy(digest, key->digest, sizeof digest);
+// The principal of a digest, made for `list` when there is none.
+spki_status FindPrincipal(spki_engine* engine, const Digest& digest, spki_elem* list,
+                          spki_principal** slot) {
+  spki_node* node = nullptr;
+  bool made = false;
+  VESK2_TRY(spki_table_enter(engine, &engine->principals, digest, &node, &made));
+  if (made) VESK2_TRY(NewPrincipal(engine, node, list));
+  *slot = node->principal;
   return 0;
 }
 
+// Where another principal stands already, it stays: it was registered later, and the last one
+// counts.
 spki_status EnterBySha1(spki_engine* engine, spki_principal* principal) {
+  spki_digest_sink sink;
   Digest digest;
-  VESK2_TRY(DigestKey(engine, principal->key, ZVCLM_HASH_SHA1, digest));
-  return EnterPrincipal(engine, digest, principal);
+  VESK2_TRY(spki_digest_start(engine, &sink.digest, ZVCLM_HASH_SHA1));
+  VESK2_TRY(spki_write_pieces(principal->key, &sink));
+  VESK2_TRY(spki_digest_finish(&sink.digest, digest));
+  spki_node* node = nullptr;
+  bool made = false;
+  VESK2_TRY(spki_table_enter(engine, &engine->principals, digest, &node, &made));
+  if (made) node->principal = principal;
+  return 0;
 }
 
-// Enters every key by its SHA-1 too, once a credential names one so; few ever do.
+// Enters every key by its SHA-1 too, once a credential may name one so; few ever do. All keys are
+// registered by then.
 spki_status EnterKeysBySha1(spki_engine* engine) {
   if (engine->keys_by_sha1) return 0;
   engine->keys_by_sha1 = true;
-  for (const spki_bucket_entry* entry : engine->principals) {
-    for (; entry != nullptr; entry = entry->next) {
-      spki_principal* principal = entry->principal;
-      const bool bySha256 =
-          std::memcmp(entry->digest, principal->digest, sizeof entry->digest) == 0;
-      if (!bySha256 || HeadKeyword(principal->key) != SPKI_KW_PUBLIC_KEY) continue;
-      VESK2_TRY(EnterBySha1(engine, principal));
-    }
+  for (spki_principal* key = engine->newest; key != nullptr; key = key->older) {
+    if (HeadKeyword(key->key) == SPKI_KW_PUBLIC_KEY) VESK2_TRY(EnterBySha1(engine, key));
   }
   return 0;
+}
+
+// A SHA-1 is kept with zeros behind it, and so is a SHA-256 that ends in them: by either a key may
+// be named.
+bool MayBeSha1(const Digest& digest) {
+  return std::all_of(digest + kSha1Size, std::end(digest), [](unsigned char c) { return c == 0; });
 }
 
 // The digest that (hash <algorithm> <value>) holds, zero-padded.
@@ -96,7 +83,7 @@ spki_status ReadHash(const spki_elem* hash, Digest& digest) {
   VESK2_REQUIRE(value != nullptr, SPKI_ERR_BAD_HASH_FORMAT);
   const bool sha1 = algorithm->keyword == SPKI_KW_SHA1;
   VESK2_REQUIRE(sha1 || algorithm->keyword == SPKI_KW_SHA256, SPKI_ERR_UNKNOWN_HASH_ALG);
-  VESK2_REQUIRE(value->length == (sha1 ? 20 : 32), SPKI_ERR_HASH_LTH_DIFFER);
+  VESK2_REQUIRE(value->length == (sha1 ? kSha1Size : sizeof digest), SPKI_ERR_HASH_LTH_DIFFER);
   std::memset(digest, 0, sizeof digest);
   std::memcpy(digest, value->data, value->length);
   return 0;
@@ -117,20 +104,16 @@ spki_status spki_register_keys(spki_engine* engine, spki_elem* list) {
 
 spki_status spki_principal_of_key(spki_engine* engine, spki_elem* key, spki_principal** slot) {
   Digest digest;
-  VESK2_TRY(IdentifyKey(engine, key, digest));
-  VESK2_TRY(FindPrincipal(engine, digest, slot));
-  if (*slot != nullptr) return 0;
-  VESK2_TRY(AddPrincipal(engine, digest, key, slot));
-  return engine->keys_by_sha1 ? EnterBySha1(engine, *slot) : 0;
+  VESK2_TRY(spki_chain_value(engine, key, digest));
+  return FindPrincipal(engine, digest, key, slot);
 }
 
+// Entered, so that all credentials that name this hash mean one principal.
 spki_status spki_principal_of_hash(spki_engine* engine, spki_elem* hash, spki_principal** slot) {
   Digest digest;
   VESK2_TRY(ReadHash(hash, digest));
-  if (StringOf(hash->next)->keyword == SPKI_KW_SHA1) VESK2_TRY(EnterKeysBySha1(engine));
-  VESK2_TRY(FindPrincipal(engine, digest, slot));
-  // Entered, so that all credentials that name this hash mean one principal.
-  return *slot != nullptr ? 0 : AddPrincipal(engine, digest, hash, slot);
+  if (MayBeSha1(digest)) VESK2_TRY(EnterKeysBySha1(engine));
+  return FindPrincipal(engine, digest, hash, slot);
 }
 
 spki_status spki_resolve_principal(spki_engine* engine, spki_elem* list, spki_principal** slot) {
@@ -142,6 +125,19 @@ spki_status spki_resolve_principal(spki_engine* engine, spki_elem* list, spki_pr
     default:
       return SPKI_ERR_KEY_OR_HASH_EXPECTED;
   }
+}
+
+void spki_principals_clear(spki_engine* engine) {
+  for (spki_principal* principal = engine->newest; principal != nullptr;) {
+    spki_principal* older = principal->older;
+    spki_entries_clear(engine, &principal->issued);
+    spki_entries_clear(engine, &principal->received);
+    spki_elem_release(engine, principal->key);
+    spki_free(engine, principal);
+    principal = older;
+  }
+  engine->newest = nullptr;
+  spki_table_clear(engine, &engine->principals);
 }
 
 }  // namespace ZvVesk2::Engine

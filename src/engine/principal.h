@@ -4,39 +4,22 @@
 #ifndef VESK2_SRC_ENGINE_PRINCIPAL_H
 #define VESK2_SRC_ENGINE_PRINCIPAL_H
 
-#include "src/engine/digest.h"
-#include "src/engine/model.h"
+#include "src/engine/tables.h"
 
 namespace ZvVesk2::Engine {
 
-// One link of the tables' chains, which grow at the front. An entry holds a principal or a tuple.
-struct spki_bucket_entry {
-  spki_bucket_entry* next;
-  unsigned char digest[kSpkiDigestSize];  // of the principal or the name; its first byte is the
-                                          // bucket. Unused in the lists of tuples.
-  spki_principal* principal;              // counted
-  spki_tuple* tuple;                      // counted
-};
-
-// Tuples point at principals without counting: the principal table outlives every tuple.
+// Tuples and tables point at principals without counting: the engine keeps all of them, and they
+// outlive every tuple.
 struct spki_principal {
-  uint32_t refcount;  // one for each entry of the principal table
-  unsigned char digest[kSpkiDigestSize];
-  spki_elem* key;               // the (public-key ...) list, or the (hash ...) of an unknown one
-  spki_bucket_entry* issued;    // tuples
-  spki_bucket_entry* received;  // tuples
+  spki_principal* older;  // the one made before this one
+  Digest digest;
+  spki_elem* key;        // the (public-key ...) list, or the (hash ...) of an unknown one
+  spki_entry* issued;    // tuples
+  spki_entry* received;  // tuples
 };
 
-// The first entry of a chain under `digest`. Null at the end of the chain, and when the budget is
-// spent.
-spki_bucket_entry* spki_entry_find(spki_engine* engine, spki_bucket_entry* chain,
-                                   const unsigned char (&digest)[kSpkiDigestSize]);
-// A new entry at the front of a chain; null without memory.
-spki_bucket_entry* spki_entry_push(spki_engine* engine, spki_bucket_entry** chain);
-// Releases a chain and what its entries hold.
-void spki_entries_clear(spki_engine* engine, spki_bucket_entry** chain);
-
-// Registers every (public-key ...) list at any depth, the list itself included.
+// Registers every (public-key ...) list at any depth, the list itself included. All lists come
+// before the first principal of a hash.
 spki_status spki_register_keys(spki_engine* engine, spki_elem* list);
 
 // Each finds the principal of a list, or enters a new one in the table. `*slot` is borrowed.
@@ -44,6 +27,9 @@ spki_status spki_principal_of_key(spki_engine* engine, spki_elem* key, spki_prin
 spki_status spki_principal_of_hash(spki_engine* engine, spki_elem* hash, spki_principal** slot);
 // By the list's head; SPKI_ERR_KEY_OR_HASH_EXPECTED for any other.
 spki_status spki_resolve_principal(spki_engine* engine, spki_elem* list, spki_principal** slot);
+
+// Releases all principals, what they issued and received, and the table.
+void spki_principals_clear(spki_engine* engine);
 
 }  // namespace ZvVesk2::Engine
 

@@ -1,4 +1,5 @@
 // Ranges: whether a string lies in one, and how they relate to prefixes and to each other.
+#include "src/engine/budget.h"
 #include "src/engine/chain.h"
 #include "src/engine/tag_forms.h"
 
@@ -6,18 +7,20 @@ namespace ZvVesk2::Engine {
 namespace {
 
 spki_relation RelationOf(spki_engine* engine, spki_range_bounds* bounds) {
-  const spki_relation relation = spki_range_relation(bounds);
+  const spki_relation relation = spki_range_relation(engine, bounds);
   spki_range_clear(engine, bounds);
   return relation;
 }
 
 }  // namespace
 
-bool spki_bound_holds(const spki_atom* value, const spki_elem* bound, int32_t ordering) {
+bool spki_bound_holds(spki_engine* engine, const spki_atom* value, const spki_elem* bound,
+                      int32_t ordering) {
+  if (spki_charge_step(engine) != 0) return false;
   const spki_bound limit = spki_read_bound(bound);
   if (limit.value == nullptr || !limit.exact) return false;
-  if (!spki_valid_value(limit.value, ordering)) return false;
-  const int order = spki_cmp_ordered(value, limit.value, ordering);
+  if (!spki_valid_value(engine, limit.value, ordering)) return false;
+  const int order = spki_cmp_ordered(engine, value, limit.value, ordering);
   switch (limit.op) {
     case SPKI_KW_G:
       return order == SPKI_ORDER_GREATER;
@@ -32,7 +35,7 @@ bool spki_bound_holds(const spki_atom* value, const spki_elem* bound, int32_t or
   }
 }
 
-bool spki_in_range_charged(spki_engine* engine, const spki_elem* string, const spki_elem* range) {
+bool spki_in_range(spki_engine* engine, const spki_elem* string, const spki_elem* range) {
   const spki_atom* value = StringOf(string);
   if (value == nullptr) return false;
   const spki_tag_class range_class = spki_classify(range);
@@ -41,16 +44,11 @@ bool spki_in_range_charged(spki_engine* engine, const spki_elem* string, const s
   const spki_elem* order = spki_form_arguments(range);
   if (StringOf(order) == nullptr) return false;
   const int32_t ordering = order->value.atom->keyword;
-  if (!spki_valid_value(value, ordering)) return false;
+  if (!spki_valid_value(engine, value, ordering)) return false;
   for (const spki_elem* bound = order->next; bound != nullptr; bound = bound->next) {
-    if (engine != nullptr && !spki_spend(engine, value)) return false;
-    if (!spki_bound_holds(value, bound, ordering)) return false;
+    if (!spki_bound_holds(engine, value, bound, ordering)) return false;
   }
   return true;
-}
-
-bool spki_in_range(const spki_elem* string, const spki_elem* range) {
-  return spki_in_range_charged(nullptr, string, range);
 }
 
 spki_relation spki_prefix_to_range(spki_engine* engine, const spki_elem* prefix,

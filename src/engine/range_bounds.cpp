@@ -2,6 +2,7 @@
 // input that it came from.
 #include <algorithm>
 
+#include "src/engine/budget.h"
 #include "src/engine/chain.h"
 #include "src/engine/tag_forms.h"
 
@@ -36,7 +37,7 @@ struct End {
 bool Tighten(spki_engine* engine, const End& end, spki_atom* value, int32_t op, int32_t ordering,
              int32_t source) {
   const int order =
-      *end.value == nullptr ? end.tighter : spki_cmp_ordered(value, *end.value, ordering);
+      *end.value == nullptr ? end.tighter : spki_cmp_ordered(engine, value, *end.value, ordering);
   if (order == SPKI_ORDER_NONE) return false;
   if (order == end.tighter) {
     spki_atom_assign(engine, end.value, value);
@@ -51,7 +52,8 @@ bool Tighten(spki_engine* engine, const End& end, spki_atom* value, int32_t op, 
 
 bool AddBound(spki_engine* engine, spki_range_bounds* bounds, spki_atom* value, int32_t op,
               int32_t source) {
-  if (!spki_spend(engine, value) || !spki_valid_value(value, bounds->ordering)) return false;
+  if (spki_charge_step(engine) != 0) return false;
+  if (!spki_valid_value(engine, value, bounds->ordering)) return false;
   switch (op) {
     case SPKI_KW_G:
     case SPKI_KW_GE:
@@ -78,6 +80,8 @@ const unsigned char* CopyBytes(spki_engine* engine, const unsigned char* data, s
 
 // The first `length` bytes of a string with 1 added to the last of them; the hint stays.
 spki_atom_owner Successor(spki_engine* engine, const spki_atom* string, uint32_t length) {
+  if (spki_charge_strings(engine, string) != 0)
+    return Own(engine, static_cast<spki_atom*>(nullptr));
   spki_atom_owner atom = Own(engine, spki_atom_new(engine));
   if (atom == nullptr) return atom;
   atom->owns = true;
@@ -135,6 +139,9 @@ void spki_range_add_prefix(spki_engine* engine, spki_range_bounds* bounds, const
   spki_range_add_bound(engine, bounds, string, SPKI_KW_GE, SPKI_KW_ALPHA, source);
   if (bounds->high_source == kInvalid) return;
   uint32_t length = string->length;
+  if (spki_charge_units(engine, length / kSingleBytesPerUnit) != 0) {
+    return Invalidate(engine, bounds);
+  }
   while (length > 0 && string->data[length - 1] == 255) --length;
   if (length == 0) return;
   const spki_atom_owner successor = Successor(engine, string, length);
@@ -142,10 +149,10 @@ void spki_range_add_prefix(spki_engine* engine, spki_range_bounds* bounds, const
   spki_range_add_bound(engine, bounds, successor.get(), SPKI_KW_L, SPKI_KW_ALPHA, source);
 }
 
-spki_relation spki_range_relation(const spki_range_bounds* bounds) {
+spki_relation spki_range_relation(spki_engine* engine, const spki_range_bounds* bounds) {
   if (bounds->high_source == kInvalid) return SPKI_REL_DISJOINT;
   if (bounds->low != nullptr && bounds->high != nullptr) {
-    const int order = spki_cmp_ordered(bounds->low, bounds->high, bounds->ordering);
+    const int order = spki_cmp_ordered(engine, bounds->low, bounds->high, bounds->ordering);
     if (order == SPKI_ORDER_EQUAL) {
       const bool point = bounds->low_op == SPKI_KW_GE && bounds->high_op == SPKI_KW_LE;
       return point ? SPKI_REL_OVERLAP : SPKI_REL_DISJOINT;

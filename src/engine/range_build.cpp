@@ -49,7 +49,7 @@ spki_elem* BuildRange(spki_engine* engine, const spki_range_bounds* bounds) {
 }  // namespace
 
 spki_elem* spki_range_build(spki_engine* engine, spki_range_bounds* bounds) {
-  const bool empty = spki_range_relation(bounds) == SPKI_REL_DISJOINT;
+  const bool empty = spki_range_relation(engine, bounds) == SPKI_REL_DISJOINT;
   spki_elem* range = empty ? nullptr : BuildRange(engine, bounds);
   spki_range_clear(engine, bounds);
   return range;

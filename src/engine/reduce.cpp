@@ -2,8 +2,6 @@
 // ACL has come to grant is written out.
 #include "src/engine/reduce.h"
 
-#include <algorithm>
-
 #include "src/engine/chain.h"
 #include "src/engine/fields.h"
 #include "src/engine/reduction.h"
@@ -71,9 +69,11 @@ spki_status spki_walk_credentials(spki_reduction* run, const spki_elem* chain, c
 }
 
 void ForgetTables(spki_engine* engine) {
-  std::fill(std::begin(engine->principals), std::end(engine->principals), nullptr);
-  std::fill(std::begin(engine->name_definitions), std::end(engine->name_definitions), nullptr);
-  std::fill(std::begin(engine->name_users), std::end(engine->name_users), nullptr);
+  for (spki_table* table :
+       {&engine->principals, &engine->name_definitions, &engine->name_users, &engine->filed}) {
+    *table = {};
+  }
+  engine->newest = nullptr;
   engine->keys_by_sha1 = false;
   engine->acl_tuples = nullptr;
 }
@@ -89,9 +89,10 @@ spki_reduction::~spki_reduction() {
   spki_work_clear(this);
   spki_thresholds_clear(this);
   spki_entries_clear(engine, &engine->acl_tuples);
-  for (spki_bucket_entry*& bucket : engine->name_definitions) spki_entries_clear(engine, &bucket);
-  for (spki_bucket_entry*& bucket : engine->name_users) spki_entries_clear(engine, &bucket);
-  for (spki_bucket_entry*& bucket : engine->principals) spki_entries_clear(engine, &bucket);
+  for (spki_table* table : {&engine->name_definitions, &engine->name_users, &engine->filed}) {
+    spki_table_clear(engine, table);
+  }
+  spki_principals_clear(engine);
   for (spki_elem* list : {acl, sequence, third, requested_tag, fifth}) {
     spki_elem_release(engine, list);
   }

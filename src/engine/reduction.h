@@ -22,7 +22,7 @@ struct spki_work {
   spki_work* below;
   spki_tuple* tuple;  // counted
   spki_step step;
-  spki_bucket_entry* cursor;  // the next tuple to combine or resolve with
+  spki_entry* cursor;         // the next tuple to combine or resolve with
   spki_threshold* threshold;  // of a k-of-n subject: what its members belong to,
   const spki_elem* member;    // the next of them
   int32_t position;           // and the position of the last
@@ -46,6 +46,10 @@ struct spki_reduction {
   spki_reduction& operator=(const spki_reduction&) = delete;
   ~spki_reduction();
 };
+
+// The next tuple at an insertion's cursor, which moves on; null at the end, and when the budget is
+// spent.
+const spki_tuple* spki_next_tuple(spki_reduction* run, spki_work* work);
 
 // Inserts the tuple of a credential and all that follow from it.
 spki_status spki_tuple_insert(spki_reduction* run, spki_tuple* tuple);

@@ -1,48 +1,132 @@
-// The chains of the engine's tables. They grow at the front, so that whoever walks one may go on
-// while others add to it.
+// Lists of tuples and tables by digest.
+#include "src/engine/tables.h"
+
+#include <bit>
 #include <cstring>
 
 #include "src/engine/budget.h"
 #include "src/engine/tuple.h"
+#include "src/frame/check.h"
 
 namespace ZvVesk2::Engine {
 namespace {
 
-void ReleasePrincipal(spki_engine* engine, spki_principal* principal) {
-  if (principal == nullptr || --principal->refcount > 0) return;
-  spki_entries_clear(engine, &principal->issued);
-  spki_entries_clear(engine, &principal->received);
-  spki_elem_release(engine, principal->key);
-  spki_free(engine, principal);
+// Bit 0 stands in front of every digest: the first node of a table has one branch only.
+unsigned Bit(const Digest& digest, unsigned number) {
+  if (number == 0) return 0;
+  return digest[(number - 1) / 8] >> (7 - (number - 1) % 8) & 1;
+}
+
+// The number of the first bit in which two different digests differ.
+unsigned FirstDifference(const Digest& a, const Digest& b) {
+  size_t i = 0;
+  while (a[i] == b[i]) ++i;
+  const auto difference = static_cast<unsigned char>(a[i] ^ b[i]);
+  return static_cast<unsigned>(8 * i) + static_cast<unsigned>(std::countl_zero(difference)) + 1;
+}
+
+// Goes down to where `digest` is, or would be below `bit`: *end is the node that the way leads to,
+// and the result the one that it leads from. Null when the budget is spent.
+spki_node* Descend(spki_engine* engine, spki_node* from, const Digest& digest, unsigned bit,
+                   spki_node** end) {
+  spki_node* node = from;
+  *end = node->below[Bit(digest, node->bit)];
+  while ((*end)->bit > node->bit && (*end)->bit < bit) {
+    if (spki_charge_step(engine) != 0) return nullptr;
+    node = *end;
+    *end = node->below[Bit(digest, node->bit)];
+  }
+  return node;
+}
+
+constexpr unsigned kToTheEnd = 8 * kSpkiDigestSize + 1;
+
+spki_node* NewNode(spki_engine* engine, spki_table* table, const Digest& digest) {
+  auto* node = static_cast<spki_node*>(spki_allocate(engine, sizeof(spki_node)));
+  if (node == nullptr) return nullptr;
+  *node = {};
+  std::memcpy(node->digest, digest, sizeof node->digest);
+  node->older = table->newest;
+  table->newest = node;
+  return node;
+}
+
+// Hangs a new node into the way of its digest, above `nearest`, which shares most of its bits.
+spki_status Hang(spki_engine* engine, spki_table* table, spki_node* node,
+                 const spki_node* nearest) {
+  node->bit = FirstDifference(node->digest, nearest->digest);
+  spki_node* end = nullptr;
+  spki_node* above = Descend(engine, table->first, node->digest, node->bit, &end);
+  VESK2_REQUIRE(above != nullptr, engine->budget.spent);
+  const unsigned side = Bit(node->digest, node->bit);
+  node->below[side] = node;
+  node->below[1 - side] = end;
+  above->below[Bit(node->digest, above->bit)] = node;
+  return 0;
 }
 
 }  // namespace
 
-spki_bucket_entry* spki_entry_find(spki_engine* engine, spki_bucket_entry* chain,
-                                   const unsigned char (&digest)[kSpkiDigestSize]) {
-  for (; chain != nullptr; chain = chain->next) {
-    if (spki_charge_step(engine) != 0) return nullptr;
-    if (std::memcmp(chain->digest, digest, sizeof chain->digest) == 0) return chain;
-  }
-  return nullptr;
-}
-
-spki_bucket_entry* spki_entry_push(spki_engine* engine, spki_bucket_entry** chain) {
-  auto* entry = static_cast<spki_bucket_entry*>(spki_allocate(engine, sizeof(spki_bucket_entry)));
+spki_entry* spki_entry_push(spki_engine* engine, spki_entry** list) {
+  auto* entry = static_cast<spki_entry*>(spki_allocate(engine, sizeof(spki_entry)));
   if (entry == nullptr) return nullptr;
-  *entry = {};
-  entry->next = *chain;
-  *chain = entry;
+  *entry = {*list, nullptr};
+  *list = entry;
   return entry;
 }
 
-void spki_entries_clear(spki_engine* engine, spki_bucket_entry** chain) {
-  while (spki_bucket_entry* entry = *chain) {
-    *chain = entry->next;
-    ReleasePrincipal(engine, entry->principal);
+void spki_entries_clear(spki_engine* engine, spki_entry** list) {
+  while (spki_entry* entry = *list) {
+    *list = entry->next;
     spki_tuple_release(engine, entry->tuple);
     spki_free(engine, entry);
   }
+}
+
+spki_status spki_table_find(spki_engine* engine, const spki_table& table, const Digest& digest,
+                            spki_node** slot) {
+  *slot = nullptr;
+  if (table.first == nullptr) return 0;
+  spki_node* end = nullptr;
+  VESK2_REQUIRE(Descend(engine, table.first, digest, kToTheEnd, &end) != nullptr,
+                engine->budget.spent);
+  if (std::memcmp(end->digest, digest, sizeof end->digest) == 0) *slot = end;
+  return 0;
+}
+
+spki_status spki_table_enter(spki_engine* engine, spki_table* table, const Digest& digest,
+                             spki_node** slot, bool* made) {
+  *slot = nullptr;
+  *made = false;
+  spki_node* nearest = nullptr;
+  if (table->first != nullptr) {
+    VESK2_REQUIRE(Descend(engine, table->first, digest, kToTheEnd, &nearest) != nullptr,
+                  engine->budget.spent);
+    if (std::memcmp(nearest->digest, digest, sizeof nearest->digest) == 0) {
+      *slot = nearest;
+      return 0;
+    }
+  }
+  spki_node* node = NewNode(engine, table, digest);
+  VESK2_REQUIRE(node != nullptr, SPKI_ERR_NO_MEM);
+  if (nearest == nullptr) {
+    node->below[0] = node;
+    table->first = node;
+  } else {
+    VESK2_TRY(Hang(engine, table, node, nearest));
+  }
+  *slot = node;
+  *made = true;
+  return 0;
+}
+
+void spki_table_clear(spki_engine* engine, spki_table* table) {
+  while (spki_node* node = table->newest) {
+    table->newest = node->older;
+    spki_entries_clear(engine, &node->tuples);
+    spki_free(engine, node);
+  }
+  table->first = nullptr;
 }
 
 }  // namespace ZvVesk2::Engine

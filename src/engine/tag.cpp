@@ -1,6 +1,7 @@
 // The relation of two tags, element by element and list by list.
 #include "src/engine/tag.h"
 
+#include "src/engine/budget.h"
 #include "src/engine/tag_forms.h"
 
 namespace ZvVesk2::Engine {
@@ -24,95 +25,91 @@ bool Within(spki_relation relation) {
   return relation == SPKI_REL_EQUAL || relation == SPKI_REL_NARROWER;
 }
 
-spki_relation StringTo(spki_engine* engine, const spki_elem* a, const spki_elem* b) {
-  switch (spki_classify(b)) {
+spki_relation StringTo(spki_engine* engine, const spki_elem* a, const spki_elem* b,
+                       spki_tag_class b_class) {
+  switch (b_class) {
     case SPKI_TAG_PREFIX:
-      return When(spki_has_prefix(a, b), SPKI_REL_NARROWER);
+      return When(spki_has_prefix(engine, a, b), SPKI_REL_NARROWER);
     case SPKI_TAG_RANGE:
-      return When(spki_in_range_charged(engine, a, b), SPKI_REL_NARROWER);
+      return When(spki_in_range(engine, a, b), SPKI_REL_NARROWER);
     case SPKI_TAG_STRING:
-      return When(spki_atom_equal(a->value.atom, b->value.atom), SPKI_REL_EQUAL);
+      return When(spki_atom_equal(engine, a->value.atom, b->value.atom), SPKI_REL_EQUAL);
     default:
       return SPKI_REL_DISJOINT;
   }
 }
 
 // Equal prefixes count as narrower.
-spki_relation PrefixToPrefix(const spki_elem* a, const spki_elem* b) {
-  if (spki_has_prefix(spki_prefix_string(a), b)) return SPKI_REL_NARROWER;
-  return When(spki_has_prefix(spki_prefix_string(b), a), SPKI_REL_WIDER);
+spki_relation PrefixToPrefix(spki_engine* engine, const spki_elem* a, const spki_elem* b) {
+  if (spki_has_prefix(engine, spki_prefix_string(a), b)) return SPKI_REL_NARROWER;
+  return When(spki_has_prefix(engine, spki_prefix_string(b), a), SPKI_REL_WIDER);
 }
 
-spki_relation PrefixTo(spki_engine* engine, const spki_elem* a, const spki_elem* b) {
-  switch (spki_classify(b)) {
+spki_relation PrefixTo(spki_engine* engine, const spki_elem* a, const spki_elem* b,
+                       spki_tag_class b_class) {
+  switch (b_class) {
     case SPKI_TAG_PREFIX:
-      return PrefixToPrefix(a, b);
+      return PrefixToPrefix(engine, a, b);
     case SPKI_TAG_RANGE:
       return spki_prefix_to_range(engine, a, b);
     case SPKI_TAG_STRING:
-      return When(spki_has_prefix(b, a), SPKI_REL_WIDER);
+      return When(spki_has_prefix(engine, b, a), SPKI_REL_WIDER);
     default:
       return SPKI_REL_DISJOINT;
   }
 }
 
-spki_relation RangeTo(spki_engine* engine, const spki_elem* a, const spki_elem* b) {
-  switch (spki_classify(b)) {
+spki_relation RangeTo(spki_engine* engine, const spki_elem* a, const spki_elem* b,
+                      spki_tag_class b_class) {
+  switch (b_class) {
     case SPKI_TAG_PREFIX:
       return Exchanged(spki_prefix_to_range(engine, b, a));
     case SPKI_TAG_RANGE:
       return spki_range_to_range(engine, a, b);
     case SPKI_TAG_STRING:
-      return When(spki_in_range_charged(engine, b, a), SPKI_REL_WIDER);
+      return When(spki_in_range(engine, b, a), SPKI_REL_WIDER);
     default:
       return SPKI_REL_DISJOINT;
   }
 }
 
-spki_relation SetTo(spki_engine* engine, const spki_elem* a, const spki_elem* b) {
-  if (IsPlain(spki_classify(b))) return When(spki_in_set(engine, b, a), SPKI_REL_WIDER);
+spki_relation SetTo(spki_engine* engine, const spki_elem* a, const spki_elem* b,
+                    spki_tag_class b_class) {
+  if (IsPlain(b_class)) return When(spki_in_set(engine, b, a), SPKI_REL_WIDER);
   return spki_set_overlaps(engine, a, b);
 }
 
 // `a` against a set.
-spki_relation ToSet(spki_engine* engine, const spki_elem* a, const spki_elem* b) {
-  if (IsPlain(spki_classify(a))) return When(spki_in_set(engine, a, b), SPKI_REL_NARROWER);
+spki_relation ToSet(spki_engine* engine, const spki_elem* a, spki_tag_class a_class,
+                    const spki_elem* b) {
+  if (IsPlain(a_class)) return When(spki_in_set(engine, a, b), SPKI_REL_NARROWER);
   return Exchanged(spki_set_overlaps(engine, b, a));
 }
 
 // By the class of `a`; `b` is neither "(*)" nor a set.
-spki_relation ByClass(spki_engine* engine, const spki_elem* a, const spki_elem* b) {
-  const spki_tag_class b_class = spki_classify(b);
-  switch (spki_classify(a)) {
+spki_relation ByClass(spki_engine* engine, const spki_elem* a, spki_tag_class a_class,
+                      const spki_elem* b, spki_tag_class b_class) {
+  switch (a_class) {
     case SPKI_TAG_KEYWORD_HEAD:
       return When(b_class == SPKI_TAG_KEYWORD_HEAD && a->value.keyword == b->value.keyword,
                   SPKI_REL_EQUAL);
     case SPKI_TAG_HEAD:
-      return When(b_class == SPKI_TAG_HEAD && spki_atom_equal(a->value.atom, b->value.atom),
+      return When(b_class == SPKI_TAG_HEAD && spki_atom_equal(engine, a->value.atom, b->value.atom),
                   SPKI_REL_EQUAL);
     case SPKI_TAG_STRING:
-      return StringTo(engine, a, b);
+      return StringTo(engine, a, b, b_class);
     case SPKI_TAG_LIST:
       if (b_class != SPKI_TAG_LIST) return SPKI_REL_DISJOINT;
       return spki_cmp_chain(engine, a->value.list, b->value.list);
     case SPKI_TAG_SET:
-      return SetTo(engine, a, b);
+      return SetTo(engine, a, b, b_class);
     case SPKI_TAG_PREFIX:
-      return PrefixTo(engine, a, b);
+      return PrefixTo(engine, a, b, b_class);
     case SPKI_TAG_RANGE:
-      return RangeTo(engine, a, b);
+      return RangeTo(engine, a, b, b_class);
     default:
       return SPKI_REL_DISJOINT;
   }
-}
-
-// The string whose bytes a comparison of this element may walk.
-const spki_atom* LongestString(const spki_elem* elem) {
-  if (elem == nullptr) return nullptr;
-  const spki_elem* prefix = spki_prefix_string(elem);
-  if (prefix != nullptr) return prefix->value.atom;
-  const bool string = elem->kind == SPKI_ELEM_HEAD || elem->kind == SPKI_ELEM_STRING;
-  return string ? elem->value.atom : nullptr;
 }
 
 // What two lists are to each other when they were `so_far` up to an element that is `next`.
@@ -145,7 +142,7 @@ spki_relation spki_set_overlaps(spki_engine* engine, const spki_elem* set, const
 }
 
 spki_relation spki_cmp_elem(spki_engine* engine, const spki_elem* a, const spki_elem* b) {
-  if (!spki_spend(engine, LongestString(a))) return SPKI_REL_DISJOINT;
+  if (spki_charge_step(engine) != 0) return SPKI_REL_DISJOINT;
   if (a == b) return SPKI_REL_EQUAL;
   if (a == nullptr || b == nullptr) return SPKI_REL_DISJOINT;
   const spki_tag_class a_class = spki_classify(a);
@@ -154,7 +151,8 @@ spki_relation spki_cmp_elem(spki_engine* engine, const spki_elem* a, const spki_
     return a_class == SPKI_TAG_ALL ? SPKI_REL_EQUAL : SPKI_REL_NARROWER;
   }
   if (a_class == SPKI_TAG_ALL) return SPKI_REL_WIDER;
-  return b_class == SPKI_TAG_SET ? ToSet(engine, a, b) : ByClass(engine, a, b);
+  if (b_class == SPKI_TAG_SET) return ToSet(engine, a, a_class, b);
+  return ByClass(engine, a, a_class, b, b_class);
 }
 
 // The shorter list is the wider tag: what a list has beyond the other narrows it.

@@ -56,9 +56,10 @@ spki_elem* spki_intersect_set(spki_engine* engine, spki_elem* set, spki_elem* ot
 
 bool spki_in_set(spki_engine* engine, const spki_elem* elem, const spki_elem* set);
 spki_relation spki_set_overlaps(spki_engine* engine, const spki_elem* set, const spki_elem* other);
-bool spki_has_prefix(const spki_elem* string, const spki_elem* prefix);
-bool spki_in_range(const spki_elem* string, const spki_elem* range);
-bool spki_bound_holds(const spki_atom* value, const spki_elem* bound, int32_t ordering);
+bool spki_has_prefix(spki_engine* engine, const spki_elem* string, const spki_elem* prefix);
+bool spki_in_range(spki_engine* engine, const spki_elem* string, const spki_elem* range);
+bool spki_bound_holds(spki_engine* engine, const spki_atom* value, const spki_elem* bound,
+                      int32_t ordering);
 
 void spki_range_add_bound(spki_engine* engine, spki_range_bounds* bounds, spki_atom* value,
                           int32_t op, int32_t ordering, int32_t source);
@@ -66,10 +67,10 @@ void spki_range_add_tag(spki_engine* engine, spki_range_bounds* bounds, const sp
                         int32_t source);
 void spki_range_add_prefix(spki_engine* engine, spki_range_bounds* bounds, const spki_elem* prefix,
                            int32_t source);
-spki_relation spki_range_relation(const spki_range_bounds* bounds);
+spki_relation spki_range_relation(spki_engine* engine, const spki_range_bounds* bounds);
 spki_elem* spki_range_build(spki_engine* engine, spki_range_bounds* bounds);
 
-int spki_cmp_ordered(const spki_atom* a, const spki_atom* b, int32_t ordering);
+int spki_cmp_ordered(spki_engine* engine, const spki_atom* a, const spki_atom* b, int32_t ordering);
 bool spki_valid_date(const spki_atom* value);
 bool spki_valid_time(const spki_atom* value);
 bool spki_valid_numeric(const spki_atom* value);

@@ -9,9 +9,6 @@
 namespace ZvVesk2::Engine {
 namespace {
 
-// Bytes of a string that may be compared for the price of one comparison.
-constexpr uint32_t kBytesPerComparison = 64;
-
 spki_elem_owner NewElem(spki_engine* engine, spki_elem_kind kind) {
   spki_elem_owner elem = Own(engine, spki_elem_new(engine));
   if (elem != nullptr) elem->kind = kind;
@@ -19,11 +16,6 @@ spki_elem_owner NewElem(spki_engine* engine, spki_elem_kind kind) {
 }
 
 }  // namespace
-
-bool spki_spend(spki_engine* engine, const spki_atom* string) {
-  const uint32_t cost = 1 + (string != nullptr ? string->length / kBytesPerComparison : 0);
-  return spki_charge(engine, &spki_budget::comparisons, cost, Limits::kMaxComparisons) == 0;
-}
 
 const spki_elem* spki_form_head(const spki_elem* elem) {
   if (elem == nullptr) return nullptr;
@@ -62,10 +54,10 @@ const spki_elem* spki_prefix_string(const spki_elem* elem) {
   return StringOf(string) != nullptr && string->next == nullptr ? string : nullptr;
 }
 
-bool spki_has_prefix(const spki_elem* string, const spki_elem* prefix) {
+bool spki_has_prefix(spki_engine* engine, const spki_elem* string, const spki_elem* prefix) {
   const spki_atom* s = StringOf(string);
   const spki_atom* p = StringOf(spki_prefix_string(prefix));
-  if (s == nullptr || p == nullptr) return false;
+  if (s == nullptr || p == nullptr || spki_charge_strings(engine, s, p) != 0) return false;
   return std::equal(s->hint, s->hint + s->hint_length, p->hint, p->hint + p->hint_length) &&
          s->length >= p->length && std::equal(p->data, p->data + p->length, s->data);
 }

@@ -1,5 +1,4 @@
-// What the parts of the tag algebra share: looking into the star forms, making elements, and
-// charging work to the engine's budget.
+// What the parts of the tag algebra share: looking into the star forms, and making elements.
 //
 //   (*)   (* set member...)   (* prefix string)   (* range ordering (operator value)...)
 #ifndef VESK2_SRC_ENGINE_TAG_FORMS_H
@@ -9,10 +8,6 @@
 #include "src/engine/tag.h"
 
 namespace ZvVesk2::Engine {
-
-// Charges one comparison, more for a long string. False when the budget is spent: whoever asks then
-// answers that nothing is allowed.
-bool spki_spend(spki_engine* engine, const spki_atom* string);
 
 // The head of the list that an element stands for: a nested list's head, or the element itself when
 // it is a keyword head. Null for any other.
@@ -31,11 +26,8 @@ struct spki_bound {
 spki_bound spki_read_bound(const spki_elem* elem);
 
 // Whether a value may stand in a range of this ordering; false for an unknown ordering.
-bool spki_valid_value(const spki_atom* value, int32_t ordering);
+bool spki_valid_value(spki_engine* engine, const spki_atom* value, int32_t ordering);
 bool spki_known_ordering(int32_t ordering);
-
-// spki_in_range with each bound charged to the engine, which may be null.
-bool spki_in_range_charged(spki_engine* engine, const spki_elem* string, const spki_elem* range);
 
 // Releases what the bounds hold and leaves them fresh.
 void spki_range_clear(spki_engine* engine, spki_range_bounds* bounds);

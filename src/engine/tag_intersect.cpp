@@ -62,8 +62,8 @@ spki_elem* IntersectRanges(spki_engine* engine, const spki_elem* a, const spki_e
 }
 
 spki_elem* IntersectPrefixes(spki_engine* engine, const spki_elem* a, const spki_elem* b) {
-  if (spki_has_prefix(spki_prefix_string(a), b)) return spki_copy(engine, a).release();
-  if (spki_has_prefix(spki_prefix_string(b), a)) return spki_copy(engine, b).release();
+  if (spki_has_prefix(engine, spki_prefix_string(a), b)) return spki_copy(engine, a).release();
+  if (spki_has_prefix(engine, spki_prefix_string(b), a)) return spki_copy(engine, b).release();
   return nullptr;
 }
 

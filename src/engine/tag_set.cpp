@@ -1,7 +1,8 @@
 // Intersection of a set with anything: what each member has in common with it.
-#include "src/engine/tag_forms.h"
-
 #include <utility>
+
+#include "src/engine/budget.h"
+#include "src/engine/tag_forms.h"
 
 namespace ZvVesk2::Engine {
 namespace {
@@ -56,7 +57,7 @@ class Members {
  private:
   bool AddMembersOf(const spki_elem* set) {
     for (const spki_elem* m = spki_form_arguments(set); m != nullptr; m = m->next) {
-      if (!Add(spki_copy(engine_, m))) return false;
+      if (spki_charge_step(engine_) != 0 || !Add(spki_copy(engine_, m))) return false;
     }
     return true;
   }

@@ -8,6 +8,7 @@
 
 #include <algorithm>
 
+#include "src/engine/budget.h"
 #include "src/engine/chain.h"
 #include "src/engine/fields.h"
 #include "src/frame/check.h"
@@ -47,8 +48,8 @@ spki_status NewThreshold(spki_reduction* run, const spki_tuple* carrier, uint32_
   *threshold = {run->thresholds,    k,      n, carrier->member, carrier->issuer,
                 carrier->threshold, nullptr};
   run->thresholds = threshold;
-  const size_t size = (size_t{n} + 1) * sizeof(spki_bucket_entry*);
-  threshold->chains = static_cast<spki_bucket_entry**>(spki_allocate(engine, size));
+  const size_t size = (size_t{n} + 1) * sizeof(spki_entry*);
+  threshold->chains = static_cast<spki_entry**>(spki_allocate(engine, size));
   VESK2_REQUIRE(threshold->chains != nullptr, SPKI_ERR_NO_MEM);
   std::fill_n(threshold->chains, size_t{n} + 1, nullptr);
   *slot = threshold;
@@ -88,6 +89,7 @@ spki_status spki_threshold_expand(spki_reduction* run, spki_work* work) {
   VESK2_REQUIRE(wanted > 0 && wanted <= count, SPKI_ERR_KOFN_SYNTAX);
   // Before memory is taken for what the number only claims.
   VESK2_REQUIRE(CountLists(n->next) == count, SPKI_ERR_KOFN_SYNTAX);
+  VESK2_TRY(spki_charge_units(run->engine, count));
   VESK2_TRY(NewThreshold(run, work->tuple, wanted, count, &work->threshold));
   work->member = n->next;
   work->step = NextMember;

@@ -13,10 +13,10 @@ struct spki_threshold {
   // Wider than any position: a number cut to fewer bits would ask for fewer members.
   uint32_t k;
   uint32_t n;
-  int32_t member;              // position of the carrying tuple, or what it had instead
-  spki_principal* issuer;      // of the carrying tuple
-  spki_threshold* enclosing;   // that the carrying tuple belongs to
-  spki_bucket_entry** chains;  // the member tuples that got to a principal, by position, 1 to n
+  int32_t member;             // position of the carrying tuple, or what it had instead
+  spki_principal* issuer;     // of the carrying tuple
+  spki_threshold* enclosing;  // that the carrying tuple belongs to
+  spki_entry** chains;        // the member tuples that got to a principal, by position, 1 to n
 };
 
 // Searches k positions with a tuple to the subject of `arriving`, its own among them, that agree on

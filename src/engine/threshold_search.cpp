@@ -13,9 +13,9 @@ namespace {
 
 // The choice of one more position.
 struct Choice {
-  uint32_t next;                   // the candidate behind the one chosen
-  const spki_bucket_entry* entry;  // the member tuple chosen; null before the first
-  spki_tuple* sum;                 // what this and the choices before it have in common
+  uint32_t next;            // the candidate behind the one chosen
+  const spki_entry* entry;  // the member tuple chosen; null before the first
+  spki_tuple* sum;          // what this and the choices before it have in common
 };
 
 class Search {
@@ -31,7 +31,7 @@ class Search {
   spki_status Run(spki_tuple** made);
 
  private:
-  const spki_bucket_entry* Fitting(const spki_bucket_entry* entry);
+  const spki_entry* Fitting(const spki_entry* entry);
   void Start(uint32_t depth);
   bool Move(uint32_t depth);
   spki_status Join(uint32_t depth, bool* agree);
@@ -41,7 +41,7 @@ class Search {
   const spki_threshold* threshold_;
   const spki_tuple* arriving_;
   uint32_t k_;
-  const spki_bucket_entry** candidates_ = nullptr;
+  const spki_entry** candidates_ = nullptr;
   uint32_t count_ = 0;
   uint32_t own_ = 0;  // the arriving tuple among the candidates
   Choice* choices_ = nullptr;
@@ -56,7 +56,7 @@ Search::~Search() {
 // The first tuple from `entry` on that may be chosen: to the subject, and of the arriving tuple's
 // position that one alone (choices without it were searched before). Null also when the budget is
 // spent.
-const spki_bucket_entry* Search::Fitting(const spki_bucket_entry* entry) {
+const spki_entry* Search::Fitting(const spki_entry* entry) {
   for (; entry != nullptr; entry = entry->next) {
     if (spki_charge_step(engine_, SPKI_ERR_THRESHOLD) != 0) return nullptr;
     const spki_tuple* tuple = entry->tuple;
@@ -67,11 +67,13 @@ const spki_bucket_entry* Search::Fitting(const spki_bucket_entry* entry) {
 }
 
 spki_status Search::Prepare() {
-  const size_t size = threshold_->n * sizeof(spki_bucket_entry*);
-  candidates_ = static_cast<const spki_bucket_entry**>(spki_allocate(engine_, size));
+  // Each position is looked at, whether or not anything is there.
+  VESK2_TRY(spki_charge_units(engine_, threshold_->n, SPKI_ERR_THRESHOLD));
+  const size_t size = threshold_->n * sizeof(spki_entry*);
+  candidates_ = static_cast<const spki_entry**>(spki_allocate(engine_, size));
   VESK2_REQUIRE(candidates_ != nullptr, SPKI_ERR_NO_MEM);
   for (uint32_t position = 1; position <= threshold_->n; ++position) {
-    const spki_bucket_entry* entry = Fitting(threshold_->chains[position]);
+    const spki_entry* entry = Fitting(threshold_->chains[position]);
     if (entry == nullptr) continue;
     if (entry->tuple == arriving_) own_ = count_;
     candidates_[count_++] = entry;

@@ -1,7 +1,5 @@
-// Tuples: made, counted, listed, compared and combined.
+// Tuples: made, counted, filed and combined.
 #include "src/engine/tuple.h"
-
-#include <cstring>
 
 #include "src/engine/budget.h"
 #include "src/engine/tag.h"
@@ -10,21 +8,6 @@
 #include "src/frame/check.h"
 
 namespace ZvVesk2::Engine {
-namespace {
-
-// Most tuples differ in what is no text; values are made for the others only.
-spki_status Compare(spki_engine* engine, spki_tuple* a, spki_tuple* b, bool* equal) {
-  *equal = a->reaches == b->reaches && a->propagate == b->propagate && a->member == b->member &&
-           a->issuer == b->issuer && a->subject == b->subject && a->threshold == b->threshold;
-  if (!*equal) return 0;
-  VESK2_TRY(spki_tuple_value(engine, a));
-  VESK2_TRY(spki_tuple_value(engine, b));
-  *equal = std::memcmp(a->value, b->value, sizeof a->value) == 0;
-  return 0;
-}
-
-}  // namespace
-
 spki_tuple* spki_tuple_new(spki_engine* engine) {
   spki_tuple* tuple = engine->free_tuples;
   if (tuple != nullptr) {
@@ -71,24 +54,23 @@ void spki_tuple_release(spki_engine* engine, spki_tuple* tuple) {
   engine->free_tuples = tuple;
 }
 
-spki_status spki_tuple_push(spki_engine* engine, spki_bucket_entry** list, spki_tuple* tuple) {
-  spki_bucket_entry* entry = spki_entry_push(engine, list);
+spki_status spki_tuple_push(spki_engine* engine, spki_entry** list, spki_tuple* tuple) {
+  spki_entry* entry = spki_entry_push(engine, list);
   VESK2_REQUIRE(entry != nullptr, SPKI_ERR_NO_MEM);
   entry->tuple = tuple;
   ++tuple->refcount;
   return 0;
 }
 
-spki_status spki_tuple_file(spki_engine* engine, spki_bucket_entry** list, spki_tuple* tuple,
+spki_status spki_tuple_file(spki_engine* engine, spki_entry** list, spki_tuple* tuple,
                             bool* filed) {
   *filed = false;
-  VESK2_TRY(spki_tuple_charge(engine, tuple));
-  for (const spki_bucket_entry* entry = *list; entry != nullptr; entry = entry->next) {
-    VESK2_TRY(spki_charge_step(engine));
-    bool equal = false;
-    VESK2_TRY(Compare(engine, entry->tuple, tuple, &equal));
-    if (equal) return 0;
-  }
+  Digest value;
+  VESK2_TRY(spki_tuple_value(engine, tuple, value));
+  spki_node* node = nullptr;
+  bool made = false;
+  VESK2_TRY(spki_table_enter(engine, &engine->filed, value, &node, &made));
+  if (!made) return 0;
   VESK2_TRY(spki_tuple_push(engine, list, tuple));
   *filed = true;
   return 0;

@@ -31,8 +31,6 @@ struct spki_tuple {
   spki_elem* tag;             // the whole (tag ...) list
   spki_atom* not_before;
   spki_atom* not_after;
-  bool valued;                           // whether `value` was made
-  unsigned char value[kSpkiDigestSize];  // see spki_tuple_file
 };
 
 // One reference, all else zero; null without memory.
@@ -48,15 +46,12 @@ using spki_tuple_owner = std::unique_ptr<spki_tuple, spki_tuple_releaser>;
 inline spki_tuple_owner Own(spki_engine* engine, spki_tuple* tuple) { return {tuple, {engine}}; }
 
 // Puts a tuple in front of a list.
-spki_status spki_tuple_push(spki_engine* engine, spki_bucket_entry** list, spki_tuple* tuple);
-// The same unless an equal tuple is in the list already; `*filed` tells. Tuples are equal by value:
-// by the canonical bytes of their lists and strings, and by the identity of their principals and
-// threshold. By pointer or by the relation of their tags, delegation in a circle would never end.
-spki_status spki_tuple_file(spki_engine* engine, spki_bucket_entry** list, spki_tuple* tuple,
-                            bool* filed);
+spki_status spki_tuple_push(spki_engine* engine, spki_entry** list, spki_tuple* tuple);
+// The same unless an equal tuple was filed before; `*filed` tells. Equal tuples belong in one list.
+spki_status spki_tuple_file(spki_engine* engine, spki_entry** list, spki_tuple* tuple, bool* filed);
 
 // Narrows a tuple to what `first` allows as well. Whether anything is left; the tag is null when
-// not. Check the budget.
+// not. Nothing is when the budget is spent.
 bool spki_tuple_narrow(spki_engine* engine, spki_tuple* tuple, const spki_tuple* first);
 // What `first`, whose subject issued `second`, grants to the subject of `second`, in *made; null
 // when that is nothing.

@@ -3,39 +3,37 @@
 //   constraint = (not-before d) / (not-after d) / (valid *(d / constraint))
 #include "src/engine/validity.h"
 
+#include "src/engine/budget.h"
 #include "src/engine/chain.h"
 #include "src/frame/check.h"
 
 namespace ZvVesk2::Engine {
 namespace {
 
-bool Later(const spki_atom* a, const spki_atom* b) {
-  return spki_cmp_bytes(a->data, a->length, b->data, b->length) == SPKI_ORDER_GREATER;
-}
-
 void Raise(spki_engine* engine, spki_tuple* tuple, spki_atom* date) {
   if (date == nullptr) return;
-  if (tuple->not_before == nullptr || Later(date, tuple->not_before)) {
+  if (tuple->not_before == nullptr || spki_atom_later(engine, date, tuple->not_before)) {
     spki_atom_assign(engine, &tuple->not_before, date);
   }
 }
 
 void Lower(spki_engine* engine, spki_tuple* tuple, spki_atom* date) {
   if (date == nullptr) return;
-  if (tuple->not_after == nullptr || Later(tuple->not_after, date)) {
+  if (tuple->not_after == nullptr || spki_atom_later(engine, tuple->not_after, date)) {
     spki_atom_assign(engine, &tuple->not_after, date);
   }
 }
 
-bool IsEmpty(const spki_tuple* tuple) {
+bool IsEmpty(spki_engine* engine, const spki_tuple* tuple) {
   return tuple->not_before != nullptr && tuple->not_after != nullptr &&
-         Later(tuple->not_before, tuple->not_after);
+         spki_atom_later(engine, tuple->not_before, tuple->not_after);
 }
 
 spki_status Apply(spki_engine* engine, spki_tuple* tuple, const spki_elem* constraint);
 
 spki_status ApplyParts(spki_engine* engine, spki_tuple* tuple, const spki_elem* part) {
   for (; part != nullptr; part = part->next) {
+    VESK2_TRY(spki_charge_step(engine));
     if (const spki_elem* nested = ListOf(part)) VESK2_TRY(Apply(engine, tuple, nested));
     Raise(engine, tuple, StringOf(part));
     Lower(engine, tuple, StringOf(part));
@@ -62,13 +60,16 @@ spki_status Apply(spki_engine* engine, spki_tuple* tuple, const spki_elem* const
 bool spki_validity_meet(spki_engine* engine, spki_tuple* tuple, const spki_tuple* other) {
   Raise(engine, tuple, other->not_before);
   Lower(engine, tuple, other->not_after);
-  return !IsEmpty(tuple);
+  const bool empty = IsEmpty(engine, tuple);
+  return !empty && engine->budget.spent == 0;
 }
 
 spki_status spki_validity_narrow(spki_engine* engine, spki_tuple* tuple,
                                  const spki_elem* constraint) {
   VESK2_TRY(Apply(engine, tuple, constraint));
-  return IsEmpty(tuple) ? SPKI_ERR_DATE_INTERSECTION : 0;
+  const bool empty = IsEmpty(engine, tuple);
+  VESK2_TRY(engine->budget.spent);
+  return empty ? SPKI_ERR_DATE_INTERSECTION : 0;
 }
 
 spki_status spki_validity_date(const spki_elem* list, spki_atom** date) {

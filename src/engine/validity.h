@@ -7,7 +7,8 @@
 
 namespace ZvVesk2::Engine {
 
-// Narrows a tuple to the period of another. Whether anything is left.
+// Narrows a tuple to the period of another. Whether anything is left; nothing is when the budget is
+// spent.
 bool spki_validity_meet(spki_engine* engine, spki_tuple* tuple, const spki_tuple* other);
 
 // Narrows a tuple by a constraint: (not-before d), (not-after d), or a (valid ...) of those and of

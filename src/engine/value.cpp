@@ -2,77 +2,93 @@
 // so what is walked through is charged piece by piece: written out, such a tag has no end.
 #include "src/engine/value.h"
 
-#include "src/engine/budget.h"
+#include <cstring>
+
 #include "src/engine/write.h"
 #include "src/frame/check.h"
 
 namespace ZvVesk2::Engine {
 namespace {
 
-// Bytes that cost one comparison.
-constexpr size_t kBytesPerStep = 64;
-
-class ChargeSink final : public spki_sink {
- public:
-  explicit ChargeSink(spki_engine* engine) : engine_(engine) {}
-
-  spki_status Put(const void* /*data*/, size_t length) override {
-    const auto cost = static_cast<uint32_t>(1 + length / kBytesPerStep);
-    return spki_charge(engine_, &spki_budget::comparisons, cost, Limits::kMaxComparisons);
-  }
-
- private:
-  spki_engine* engine_;
-};
-
-// Neither form begins with the mark of an absent one, and both say where they end.
-spki_status PutAtom(const spki_atom* atom, spki_sink* sink) {
-  return atom == nullptr ? sink->Put("-", 1) : spki_write_atom(atom, sink);
-}
-spki_status PutChain(const spki_elem* chain, spki_sink* sink) {
-  return chain == nullptr ? sink->Put("-", 1) : spki_write_pieces(chain, sink);
-}
-
-spki_status PutName(const spki_principal* principal, const spki_atom* name, spki_sink* sink) {
-  VESK2_TRY(sink->Put(principal->digest, sizeof principal->digest));
-  return PutAtom(name, sink);
-}
-
-spki_status PutTuple(const spki_tuple* tuple, spki_sink* sink) {
-  VESK2_TRY(PutAtom(tuple->issuer_name, sink));
-  VESK2_TRY(PutAtom(tuple->subject_name, sink));
-  VESK2_TRY(PutChain(tuple->name_rest, sink));
-  VESK2_TRY(PutChain(tuple->subject_list, sink));
-  VESK2_TRY(PutChain(tuple->tag, sink));
-  VESK2_TRY(PutAtom(tuple->not_before, sink));
-  return PutAtom(tuple->not_after, sink);
-}
-
-}  // namespace
-
-spki_status spki_name_value(spki_engine* engine, const spki_principal* principal,
-                            const spki_atom* name, unsigned char (&out)[kSpkiDigestSize]) {
-  ChargeSink cost(engine);
-  VESK2_TRY(PutName(principal, name, &cost));
+spki_status DigestChain(spki_engine* engine, const spki_elem* chain, Digest& out) {
   spki_digest_sink sink;
   VESK2_TRY(spki_digest_start(engine, &sink.digest, ZVCLM_HASH_SHA256));
-  VESK2_TRY(PutName(principal, name, &sink));
+  VESK2_TRY(spki_write_pieces(chain, &sink));
   return spki_digest_finish(&sink.digest, out);
 }
 
-spki_status spki_tuple_charge(spki_engine* engine, const spki_tuple* tuple) {
-  ChargeSink cost(engine);
-  return PutTuple(tuple, &cost);
+// Says what stands where: neither a string nor a value begins with the mark of an absent one.
+spki_status PutAtom(const spki_atom* atom, spki_sink* sink) {
+  return atom == nullptr ? sink->Put("-", 1) : spki_write_atom(atom, sink);
+}
+spki_status PutChain(spki_engine* engine, spki_elem* chain, spki_sink* sink) {
+  if (chain == nullptr) return sink->Put("-", 1);
+  Digest value;
+  VESK2_TRY(spki_chain_value(engine, chain, value));
+  VESK2_TRY(sink->Put("+", 1));
+  return sink->Put(value, sizeof value);
 }
 
-spki_status spki_tuple_value(spki_engine* engine, spki_tuple* tuple) {
-  if (tuple->valued) return 0;
+// What of a tuple is no text. Principals and thresholds are told apart by where they are.
+struct Identity {
+  const void* issuer;
+  const void* subject;
+  const void* threshold;
+  int32_t member;
+  uint32_t flags;
+};
+
+}  // namespace
+
+spki_status spki_chain_value(spki_engine* engine, spki_elem* chain, Digest& out) {
+  if (chain->digest == nullptr) {
+    VESK2_TRY(DigestChain(engine, chain, out));
+    chain->digest = static_cast<unsigned char*>(spki_allocate(engine, sizeof out));
+    VESK2_REQUIRE(chain->digest != nullptr, SPKI_ERR_NO_MEM);
+    std::memcpy(chain->digest, out, sizeof out);
+  }
+  std::memcpy(out, chain->digest, sizeof out);
+  return 0;
+}
+
+spki_status spki_name_value(spki_engine* engine, const spki_principal* principal,
+                            const spki_atom* name, Digest& out) {
   spki_digest_sink sink;
   VESK2_TRY(spki_digest_start(engine, &sink.digest, ZVCLM_HASH_SHA256));
-  VESK2_TRY(PutTuple(tuple, &sink));
-  VESK2_TRY(spki_digest_finish(&sink.digest, tuple->value));
-  tuple->valued = true;
-  return 0;
+  VESK2_TRY(sink.Put(principal->digest, sizeof principal->digest));
+  VESK2_TRY(PutAtom(name, &sink));
+  return spki_digest_finish(&sink.digest, out);
+}
+
+// Stands in one table with the values of tuples, and begins with another word.
+spki_status spki_definition_value(spki_engine* engine, const Digest& name,
+                                  const spki_principal* subject, Digest& out) {
+  spki_digest_sink sink;
+  VESK2_TRY(spki_digest_start(engine, &sink.digest, ZVCLM_HASH_SHA256));
+  VESK2_TRY(sink.Put("name", 4));
+  VESK2_TRY(sink.Put(name, sizeof name));
+  VESK2_TRY(sink.Put(subject->digest, sizeof subject->digest));
+  return spki_digest_finish(&sink.digest, out);
+}
+
+spki_status spki_tuple_value(spki_engine* engine, const spki_tuple* tuple, Digest& out) {
+  const Identity identity = {tuple->issuer, tuple->subject, tuple->threshold, tuple->member,
+                             (tuple->reaches ? 2u : 0u) | (tuple->propagate ? 1u : 0u)};
+  static_assert(sizeof identity == 3 * sizeof(void*) + 8, "no byte without a meaning");
+  spki_digest_sink sink;
+  VESK2_TRY(spki_digest_start(engine, &sink.digest, ZVCLM_HASH_SHA256));
+  VESK2_TRY(sink.Put("tuple", 5));
+  VESK2_TRY(sink.Put(&identity, sizeof identity));
+  for (const spki_atom* atom : {tuple->issuer_name, tuple->subject_name}) {
+    VESK2_TRY(PutAtom(atom, &sink));
+  }
+  for (spki_elem* chain : {tuple->name_rest, tuple->subject_list, tuple->tag}) {
+    VESK2_TRY(PutChain(engine, chain, &sink));
+  }
+  for (const spki_atom* atom : {tuple->not_before, tuple->not_after}) {
+    VESK2_TRY(PutAtom(atom, &sink));
+  }
+  return spki_digest_finish(&sink.digest, out);
 }
 
 }  // namespace ZvVesk2::Engine

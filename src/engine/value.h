@@ -1,4 +1,5 @@
-// Digests that stand for values: what a name is filed under, and what makes two tuples equal.
+// Digests that stand for values: what a key and a name are known by, and what makes two tuples
+// equal.
 #ifndef VESK2_SRC_ENGINE_VALUE_H
 #define VESK2_SRC_ENGINE_VALUE_H
 
@@ -6,14 +7,20 @@
 
 namespace ZvVesk2::Engine {
 
+// The SHA-256 of a chain's canonical form, which its first element keeps: the chain never changes
+// from then on.
+[[nodiscard]] spki_status spki_chain_value(spki_engine* engine, spki_elem* chain, Digest& out);
 // The SHA-256 of the principal's digest and the canonical name.
-spki_status spki_name_value(spki_engine* engine, const spki_principal* principal,
-                            const spki_atom* name, unsigned char (&out)[kSpkiDigestSize]);
-// Charges the walk through a tuple's lists and strings: what its value costs, once or never made.
-spki_status spki_tuple_charge(spki_engine* engine, const spki_tuple* tuple);
-// Makes `tuple->value`, the SHA-256 of a charged tuple's lists and strings, each absent one marked,
-// unless it is there.
-spki_status spki_tuple_value(spki_engine* engine, spki_tuple* tuple);
+[[nodiscard]] spki_status spki_name_value(spki_engine* engine, const spki_principal* principal,
+                                          const spki_atom* name, Digest& out);
+// That of a name (its value) as defined for a subject.
+[[nodiscard]] spki_status spki_definition_value(spki_engine* engine, const Digest& name,
+                                                const spki_principal* subject, Digest& out);
+// Tuples are equal when their values are: the principals and the threshold are the same, and the
+// canonical bytes of the lists and strings. By pointer or by the relation of their tags, delegation
+// in a circle would never end.
+[[nodiscard]] spki_status spki_tuple_value(spki_engine* engine, const spki_tuple* tuple,
+                                           Digest& out);
 
 }  // namespace ZvVesk2::Engine
 

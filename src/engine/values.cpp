@@ -6,6 +6,7 @@
 #include <algorithm>
 #include <string_view>
 
+#include "src/engine/budget.h"
 #include "src/engine/tag_forms.h"
 #include "src/platform/text.h"
 
@@ -89,7 +90,10 @@ bool spki_valid_numeric(const spki_atom* value) {
   if (value->hint_length > 0) return false;
   const std::string_view digits = ReadNumber(value).digits;
   if (digits.size() > 1 && digits.front() == '0') return false;
-  return std::all_of(digits.begin(), digits.end(), IsDigit);
+  // To the end, so that many bytes can be tested at once.
+  bool all = true;
+  for (const char c : digits) all = all & IsDigit(c);
+  return all;
 }
 
 bool spki_valid_time(const spki_atom* value) {
@@ -122,7 +126,8 @@ bool spki_known_ordering(int32_t ordering) {
   }
 }
 
-bool spki_valid_value(const spki_atom* value, int32_t ordering) {
+bool spki_valid_value(spki_engine* engine, const spki_atom* value, int32_t ordering) {
+  if (spki_charge_strings(engine, value) != 0) return false;
   switch (ordering) {
     case SPKI_KW_DATE:
       return spki_valid_date(value);
@@ -135,8 +140,10 @@ bool spki_valid_value(const spki_atom* value, int32_t ordering) {
   }
 }
 
-int spki_cmp_ordered(const spki_atom* a, const spki_atom* b, int32_t ordering) {
+int spki_cmp_ordered(spki_engine* engine, const spki_atom* a, const spki_atom* b,
+                     int32_t ordering) {
   if (a == nullptr || b == nullptr) return SPKI_ORDER_NONE;
+  if (spki_charge_strings(engine, a, b) != 0) return SPKI_ORDER_NONE;
   if (!std::equal(a->hint, a->hint + a->hint_length, b->hint, b->hint + b->hint_length)) {
     return SPKI_ORDER_NONE;
   }

@@ -11,6 +11,7 @@
 #include <string>
 #include <vector>
 
+#include "src/engine/pool.h"
 #include "src/engine/tag.h"
 #include "src/engine/tuple.h"
 #include "src/engine/write.h"
@@ -83,10 +84,12 @@ struct TestEngine {
   TestEngine(const TestEngine&) = delete;
   ~TestEngine() {
     for (spki_elem* list : lists_) spki_elem_release(&engine_, list);
-    uint32_t free_records = 0;
+    size_t free_records = 0;
     for (auto* a = engine_.free_atoms; a != nullptr; a = a->link) ++free_records;
     for (auto* e = engine_.free_elems; e != nullptr; e = e->link) ++free_records;
-    for (auto* t = engine_.free_tuples; t != nullptr; t = t->link) ++free_records;
+    for (auto* t = engine_.free_tuples; t != nullptr; t = t->link) {
+      free_records += spki_block_cost(sizeof(spki_tuple));
+    }
     EXPECT_EQ(free_records, engine_.budget.live_records) << "a reference was not released";
     spki_engine_stop(&engine_, &allocator_.record);
     EXPECT_EQ(0, allocator_.live);

@@ -115,7 +115,7 @@ TEST(Order, BytesAndPaddedBytes) {
 }
 
 TEST_F(Model, AtomsAreEqualByTheOrder) {
-  EXPECT_TRUE(spki_atom_equal(Atom("x"), Atom(Raw("x\0y"s))));
+  EXPECT_TRUE(spki_atom_equal(&engine_, Atom("x"), Atom(Raw("x\0y"s))));
 }
 
 TEST(CryptoStatus, UnlistedResultsAreSuccess) {

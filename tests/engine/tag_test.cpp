@@ -197,12 +197,13 @@ TEST_F(Tags, OrderOfValues) {
     for (const std::string& pair : Split(c.pairs, ',')) {
       const spki_atom* a = Elem(pair)->value.atom;
       const spki_atom* b = Elem(pair)->next->value.atom;
-      EXPECT_EQ(c.order, spki_cmp_ordered(a, b, c.ordering)) << pair;
-      EXPECT_EQ(mirrored[c.order], spki_cmp_ordered(b, a, c.ordering)) << pair;
+      EXPECT_EQ(c.order, spki_cmp_ordered(&engine_, a, b, c.ordering)) << pair;
+      EXPECT_EQ(mirrored[c.order], spki_cmp_ordered(&engine_, b, a, c.ordering)) << pair;
     }
   }
   const spki_atom* padded = Atom(Raw({"\0\0a", 3}));
-  EXPECT_EQ(0, spki_cmp_ordered(padded, Atom("a"), SPKI_KW_BINARY)) << "leading zero bytes";
+  EXPECT_EQ(0, spki_cmp_ordered(&engine_, padded, Atom("a"), SPKI_KW_BINARY))
+      << "leading zero bytes";
 }
 
 // A lone sign is a number, no day of March is a date.
@@ -237,7 +238,8 @@ TEST_F(Tags, MembersOfRanges) {
   for (const auto& c : cases) {
     for (const bool in : {true, false}) {
       for (const std::string& word : Split(in ? c.in : c.out, ' ')) {
-        EXPECT_EQ(in, spki_in_range(Elem(word), Elem(c.range))) << word << " in " << c.range;
+        EXPECT_EQ(in, spki_in_range(&engine_, Elem(word), Elem(c.range)))
+            << word << " in " << c.range;
       }
     }
   }
@@ -246,7 +248,7 @@ TEST_F(Tags, MembersOfRanges) {
       "(* range alpha (ge a b));(* range alpha (ge));(* range alpha (ge (a)));(* range alpha (name "
       "a))";
   for (const std::string& range : Split(empty, ';')) {
-    EXPECT_FALSE(spki_in_range(Elem("x"), Elem(range))) << range;
+    EXPECT_FALSE(spki_in_range(&engine_, Elem("x"), Elem(range))) << range;
   }
 }
 
