@@ -48,6 +48,9 @@ inline constexpr uint32_t kMaxCombinations = 1'000'000;
 inline constexpr uint32_t kMaxComparisons = 30'000'000;
 // In units of 64 bytes: what a reduction holds at once.
 inline constexpr uint32_t kMaxRecords = 4'000'000;
+// Bytes of all that one reduction says to be granted: grants share their parts, so that 700 KB of
+// certificates can grant 800 MB, which would then be read into objects.
+inline constexpr uint64_t kMaxResult = uint64_t{8} << 20;
 // Members of one accumulated (* set ...).
 inline constexpr uint32_t kMaxSetMembers = 4096;
 // Names still to resolve below one subject: (name K N N N ...) definitions can feed themselves.

@@ -3,7 +3,9 @@
 // Results are library codes or, negative, the engine's SPKI_ERR_* codes (texts: V2SpkiError). One
 // credential that the engine cannot read (an empty byte string, a hash other than sha1 and sha256,
 // a k-of-n with k = 0 or k > n) makes the whole reduction fail: one odd file in the ACL store stops
-// all verification. Work is bounded; a spent budget is SPKI_ERR_NO_MEM or SPKI_ERR_THRESHOLD.
+// all verification. Work and memory are bounded, and so is what is granted in all
+// (Limits::kMaxResult bytes; for ReductA the first entry alone): what is more is SPKI_ERR_NO_MEM,
+// and a k-of-n that takes too long to search SPKI_ERR_THRESHOLD.
 #ifndef VESK2_VERIFY_H
 #define VESK2_VERIFY_H
 

@@ -20,7 +20,7 @@ void spki_call_stop(spki_engine* engine);
 // spki_list_dispose. Codes of SExpression::Export and of the engine.
 int spki_import_sexpr(spki_engine* engine, SExpression* expression, spki_elem** slot);
 
-// The bytes of a chain's canonical form; more than Limits::kMaxExport for one that is too long,
+// The bytes of a chain's canonical form; more than Limits::kMaxResult for one that is too long,
 // which is not measured to its end.
 uint64_t spki_canonical_length(const spki_elem* chain);
 // Writes the canonical form, of that length, and moves the cursor behind it.

@@ -35,7 +35,7 @@ struct Granted {
 
 int WriteResult(const Engine::spki_elem* result, Granted& granted) {
   const uint64_t length = Engine::spki_canonical_length(result);
-  VESK2_REQUIRE(length <= Limits::kMaxExport, VESK2_ERR_MEM_ALLOC);
+  VESK2_REQUIRE(length <= Limits::kMaxResult, SPKI_ERR_NO_MEM);
   granted.bytes.reset(TryNewArray<unsigned char>(length));
   VESK2_REQUIRE(granted.bytes != nullptr, VESK2_ERR_MEM_ALLOC);
   unsigned char* cursor = granted.bytes.get();
@@ -44,8 +44,11 @@ int WriteResult(const Engine::spki_elem* result, Granted& granted) {
   return 0;
 }
 
+enum class Entries { All, First };
+
 // The result still points into the imported bytes, so it is written while they are there.
-int Reduce(const Vesk2ContextStruct* ctx, const Arguments& arguments, Granted& granted) {
+int Reduce(const Vesk2ContextStruct* ctx, const Arguments& arguments, Entries entries,
+           Granted& granted) {
   Engine::EngineCall call;
   Engine::spki_elem* acl = nullptr;
   Engine::spki_elem* sequence = nullptr;
@@ -61,6 +64,9 @@ int Reduce(const Vesk2ContextStruct* ctx, const Arguments& arguments, Granted& g
   Engine::spki_elem* result = nullptr;
   VESK2_TRY(Engine::spki_reduce(call.Engine(), acl, sequence, third, requestedTag, fifth, &result));
   const Engine::spki_elem_owner owner = Engine::Own(call.Engine(), result);
+  if (entries == Entries::First && result->next != nullptr) {
+    Engine::spki_elem_assign(call.Engine(), &result->next->next, nullptr);
+  }
   return WriteResult(result, granted);
 }
 
@@ -82,7 +88,7 @@ int ReductA(Vesk2ContextStruct* ctx, SExpression* acl, SExpression* sequence, SE
   // Without a request there would be nothing to hold the grant against.
   VESK2_REQUIRE(requestedTag != nullptr, VESK2_ERR_INVALID_PARAM);
   Granted granted;
-  VESK2_TRY(Reduce(ctx, {acl, sequence, third, requestedTag, fifth}, granted));
+  VESK2_TRY(Reduce(ctx, {acl, sequence, third, requestedTag, fifth}, Entries::First, granted));
   VESK2_REQUIRE(!IsEmpty(granted), VESK2_ERR_NOT_AUTHORIZED);
   // The first entry decides, whatever the others grant.
   Ref<SExpression> tag;
@@ -96,7 +102,7 @@ int ReductB(Vesk2ContextStruct* ctx, SExpression* acl, SExpression* sequence, SE
   VESK2_REQUIRE(tag == nullptr && notBefore == nullptr && notAfter == nullptr,
                 VESK2_ERR_PARAM_NOT_NULL);
   Granted granted;
-  VESK2_TRY(Reduce(ctx, {acl, sequence, third, nullptr, nullptr}, granted));
+  VESK2_TRY(Reduce(ctx, {acl, sequence, third, nullptr, nullptr}, Entries::All, granted));
   Ref<SExpression> found;
   Ref<SExpression> from;
   Ref<SExpression> to;

@@ -8,14 +8,14 @@
 namespace ZvVesk2::Engine {
 namespace {
 
-// Ends the walk once the length is past what is exported: a derived tag may share its parts, and
-// written out have more bytes than there are.
+// Ends the walk once the length is past what a result may have: a derived tag may share its parts,
+// and written out have more bytes than there are.
 struct LengthSink final : spki_sink {
   uint64_t length = 0;
 
   spki_status Put(const void* /*data*/, size_t size) override {
     length += size;
-    return length > Limits::kMaxExport ? SPKI_ERR_NO_MEM : 0;
+    return length > Limits::kMaxResult ? SPKI_ERR_NO_MEM : 0;
   }
 };
 

@@ -6,6 +6,7 @@
 
 #include "tests/support/test_object.h"
 #include "tests/support/test_text.h"
+#include "tests/support/worst_inputs.h"
 
 namespace {
 
@@ -95,6 +96,22 @@ TEST(ReductA, Answers) {
     const auto given = [&](int i) { return i == missing ? nullptr : key.get(); };
     EXPECT_EQ(VESK2_ERR_INVALID_PARAM,
               Verify::ReductA(nullptr, given(0), given(1), given(2), given(3), nullptr));
+  }
+}
+
+// Some hundred MB of grants in 600 KB of certificates: ReductA asks for the first one only.
+TEST(Reductions, GrantsHaveALimit) {
+  for (const vesk2test::WorstInput& input : vesk2test::WorstInputs()) {
+    if (std::string(input.name) != "shared tag") continue;
+    const vesk2test::WorstLists text = input.make(600'000);
+    const Ref<SExpression> acl = Parse(text.acl), sequence = Parse(text.sequence);
+    const Ref<SExpression> key = Parse(text.third), asked = Parse(text.tag);
+    Ref<SExpression> tag, from, to;
+    EXPECT_EQ(SPKI_ERR_NO_MEM, Verify::ReductB(nullptr, acl.get(), sequence.get(), key.get(),
+                                               tag.Out(), from.Out(), to.Out()));
+    EXPECT_FALSE(tag || from || to);
+    EXPECT_EQ(VESK2_ERR_PACKAGE_NOT_GRANTED,
+              Verify::ReductA(nullptr, acl.get(), sequence.get(), key.get(), asked.get(), nullptr));
   }
 }
 
