@@ -7,9 +7,11 @@
 #include <limits>
 #include <map>
 #include <string>
+#include <string_view>
 #include <vector>
 
 #include "bench/bench.h"
+#include "bench/worst.h"
 
 namespace bench {
 namespace {
@@ -89,4 +91,7 @@ int Run(int count, char** arguments) {
 }  // namespace
 }  // namespace bench
 
-int main(int count, char** arguments) { return bench::Run(count, arguments); }
+int main(int count, char** arguments) {
+  if (count == 2 && std::string_view(arguments[1]) == "--worst") return bench::RunWorst();
+  return bench::Run(count, arguments);
+}
