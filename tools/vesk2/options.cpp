@@ -8,6 +8,7 @@ namespace vesk2_command {
 namespace {
 
 constexpr const char* kCommonGroup = "Common options";
+constexpr const char* kEmpty = "the value is empty; leave out what is not meant";
 
 // What the value of an option is; an option means the same wherever it is taken.
 constexpr struct {
@@ -56,6 +57,17 @@ std::vector<std::string> ChoicesOf(const CLI::Option& option) {
   return choices;
 }
 
+// A script whose variable is unset hands over an empty word. Taken for "not given", it would turn
+// an end, a place or a limit into none.
+void RefuseEmptyValues(CLI::App& app) {
+  for (CLI::Option* option : app.get_options()) {
+    if (option->get_expected_min() == 0) continue;  // a flag
+    // As a transform it comes before the checks of the option's own.
+    option->transform(CLI::Validator(
+        [](const std::string& value) { return std::string(value.empty() ? kEmpty : ""); }, ""));
+  }
+}
+
 }  // namespace
 
 Action DefineOptions(CLI::App& app, const Command& command, Common& common) {
@@ -65,6 +77,7 @@ Action DefineOptions(CLI::App& app, const Command& command, Common& common) {
   AddCommonOptions(app, common);
   const std::vector<CLI::Option*> options = app.get_options();
   for (size_t i = own; i < options.size(); ++i) options[i]->group(kCommonGroup);
+  RefuseEmptyValues(app);
   return action;
 }
 

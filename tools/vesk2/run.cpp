@@ -76,6 +76,21 @@ void Define(CLI::App& app, Common& common, Choice& choice) {
       "everything else on standard error.\n");
 }
 
+// The words behind the command's name, last first, as the parser takes them. It would read the word
+// behind "--option=" as the value: that value is empty.
+std::vector<std::string> ParserWords(int argc, const char* const* argv) {
+  std::vector<std::string> words;
+  bool options = true;
+  for (int i = 1; i < argc; ++i) {
+    const std::string word = argv[i];
+    options = options && word != "--";
+    const bool empty = options && word.starts_with("--") && word.find('=') + 1 == word.size();
+    words.push_back(empty ? word.substr(0, word.size() - 1) : word);
+    if (empty) words.emplace_back();
+  }
+  return {words.rbegin(), words.rend()};
+}
+
 // Whether a command line that could not be parsed asked for JSON.
 bool WantsJson(int argc, const char* const* argv) {
   for (int i = 1; i < argc; ++i) {
@@ -125,7 +140,7 @@ ExitCode Run(int argc, const char* const* argv) {
   Choice choice;
   try {
     Define(app, common, choice);
-    app.parse(argc, argv);
+    app.parse(ParserWords(argc, argv));
   } catch (const CLI::ParseError& error) {
     const bool help = error.get_exit_code() == 0;
     StartReport("", {.json = !help && WantsJson(argc, argv)});
