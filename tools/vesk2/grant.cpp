@@ -6,6 +6,7 @@
 #include "tools/vesk2/files.h"
 #include "tools/vesk2/report.h"
 #include "tools/vesk2/stores.h"
+#include "tools/vesk2/tag_bounds.h"
 
 #include <vesk2/limits.h>
 
@@ -41,6 +42,7 @@ void ReadBack(const std::string& temporary) {
 }  // namespace
 
 Ref<AclEntry> MakeEntry(EntryText text) {
+  RequirePlainBounds(text.tag.get());
   Ref<ByteString> comment = MakeText(text.comment);
   Ref<AclEntry> entry;
   Check(AclEntry::Create(entry.Out(), text.subject.get(), text.propagate, text.tag.get(),

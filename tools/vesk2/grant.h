@@ -12,7 +12,8 @@
 
 namespace vesk2_command {
 
-// MakeEntry builds the entry that trusts `subject` for a tag.
+// MakeEntry builds the entry that trusts `subject` for a tag. Trouble for a tag with a bound that
+// is none.
 struct EntryText {
   Ref<ZvVesk2::Subject> subject;
   bool propagate = false;

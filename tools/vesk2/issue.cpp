@@ -3,6 +3,7 @@
 
 #include "tools/vesk2/external_key.h"
 #include "tools/vesk2/report.h"
+#include "tools/vesk2/tag_bounds.h"
 
 namespace vesk2_command {
 
@@ -45,6 +46,7 @@ Grant Renewed(const Cert& old, const Renewal& renewal) {
 }
 
 SignedCert IssueCert(const SigningKey& key, const Grant& grant, const std::string& algorithm) {
+  RequirePlainBounds(grant.tag);
   const Ref<PublicKey> issuer = key.Public();
   SignedCert result{Ref<Cert>(new Cert(nullptr)), {}};
   Check(result.cert->Set(issuer.get(), grant.subject, grant.propagate, grant.tag,

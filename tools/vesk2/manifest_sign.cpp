@@ -14,6 +14,7 @@
 #include "tools/vesk2/progress.h"
 #include "tools/vesk2/report.h"
 #include "tools/vesk2/self_check.h"
+#include "tools/vesk2/tag_bounds.h"
 #include "tools/vesk2/tree.h"
 
 #include <vesk2/hash.h>
@@ -197,7 +198,7 @@ struct Parts {
 };
 
 Parts Prepare(const Options& options, const SigningKey& key) {
-  if (!options.grant.empty()) ParseTag(options.grant);
+  if (!options.grant.empty()) RequirePlainBounds(ParseTag(options.grant).get());
   return {MakeHead(options), options.tag.empty() ? Ref<SExpression>() : ParseTag(options.tag),
           SignersCerts(options, key), CarriedLists(options)};
 }
