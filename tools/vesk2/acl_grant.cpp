@@ -3,6 +3,7 @@
 #include <set>
 
 #include "tools/vesk2/command.h"
+#include "tools/vesk2/crl_file.h"
 #include "tools/vesk2/describe.h"
 #include "tools/vesk2/files.h"
 #include "tools/vesk2/grant.h"
@@ -90,7 +91,8 @@ ExitCode Run(const Options& options) {
   CheckGrant(*entry, issuer ? options.issuerOf : options.subjectOf, issuer, options.strict);
   GrantEntry(*entry, {name, options.flags.force, options.flags.dryRun});
   Result()["entry"] = DescribeEntry(*entry).members();
-  if (!options.propagate) {
+  // The lists of a revocation source are believed without it.
+  if (!options.propagate && !IsRevocationTag(entry->GetTag())) {
     Note(
         "note: without --propagate this key may use the grant but not pass it on: certificates "
         "that it issues, and manifests that it signs, are refused");

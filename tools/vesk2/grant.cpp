@@ -5,6 +5,7 @@
 
 #include "tools/vesk2/files.h"
 #include "tools/vesk2/report.h"
+#include "tools/vesk2/shell_words.h"
 #include "tools/vesk2/stores.h"
 #include "tools/vesk2/tag_bounds.h"
 
@@ -24,6 +25,11 @@ std::string EntryPath(const std::string& name) {
     throw Trouble("--name " + Escape(name) + ": cannot name an entry", "usage");
   }
   return AclDirectory() + "/" + name + (name.ends_with(".acl") ? "" : ".acl");
+}
+
+// A name that was given as a file's.
+std::string NameWithout(const std::string& name) {
+  return name.ends_with(".acl") ? name.substr(0, name.size() - 4) : name;
 }
 
 bool IsAlready(const std::string& path, const std::string& bytes) {
@@ -74,13 +80,22 @@ void GrantEntry(AclEntry& entry, const EntryPlace& place) {
   const std::string path = EntryPath(place.name);
   const std::string bytes = Canonical(entry);
   if (IsAlready(path, bytes)) return Note(Escape(path) + " says so already");
+  RefuseTaken(entry, place);
   const WriteOptions options{0666, place.force, ReadBack, place.dryRun, true};
   if (WriteFile(path, bytes, options)) Note("wrote " + Escape(path));
 }
 
 void RefuseTaken(AclEntry& entry, const EntryPlace& place) {
   const std::string path = EntryPath(place.name);
-  if (!IsAlready(path, Canonical(entry))) RefuseExisting(path, place.force);
+  std::error_code error;
+  const bool taken = std::filesystem::exists(std::filesystem::symlink_status(path, error));
+  if (!taken || IsAlready(path, Canonical(entry))) return;
+  if (place.force) return RefuseExisting(path, true);
+  // The entry that is there is trusted, and somebody meant it: the way out must not destroy it.
+  throw FileTrouble(path,
+                    "another entry has this name; beside it, --name " +
+                        ShellWord(FreeEntryName(entry, NameWithout(place.name))),
+                    "exists");
 }
 
 }  // namespace vesk2_command
