@@ -47,6 +47,7 @@ Action DefineAclRemove(CLI::App& app);
 Action DefineCertRequest(CLI::App& app);
 Action DefineCertIssue(CLI::App& app);
 Action DefineCertRenew(CLI::App& app);
+Action DefineCertCosign(CLI::App& app);
 Action DefineCertShow(CLI::App& app);
 Action DefineCertVerify(CLI::App& app);
 Action DefineCertFind(CLI::App& app);

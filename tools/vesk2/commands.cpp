@@ -78,6 +78,8 @@ constexpr Command kCommands[] = {
     {"cert", "renew", "Issue a certificate of a chain or manifest again",
      "vesk2 cert renew signer.cert:2 --key vendor.pem --not-after 2028 -o signer.cert --force",
      DefineCertRenew},
+    {"cert", "cosign", "Certify the same as a certificate of a chain or manifest does",
+     "vesk2 cert cosign signer.cert:2 --key bob.pem -o signer.cert --force", DefineCertCosign},
     {"cert", "show", "Show the certificates of a chain", "vesk2 cert show signer.cert",
      DefineCertShow},
     {"cert", "verify", "Is the first subject of a chain authorized?",
