@@ -72,6 +72,19 @@ std::string Pair(const SignedCert& each) {
   return Canonical(*each.cert) + Canonical(*each.signature);
 }
 
+// The certificates behind a manifest's first, which is for its content.
+std::string ChainOf(const std::string& manifest, PublicKey& signer) {
+  const std::vector<SignedCert> certs = ReadCerts(manifest);
+  RequireCert(certs, 2, manifest);
+  if (!certs[1].cert->GetSubject()->IsEqual(&signer)) {
+    throw Trouble(Escape(manifest) + ": signed by " + Fingerprint(*certs[1].cert->GetSubject()) +
+                  ", not by the signing key " + Fingerprint(signer));
+  }
+  std::string text;
+  for (size_t i = 1; i < certs.size(); ++i) text += Pair(certs[i]);
+  return text;
+}
+
 // The certificates that speak for the signer: those of the --cert file, or else one that the signer
 // issues to itself, which is worth what the ACL store grants its key.
 std::string SignersCerts(const Options& options, const SigningKey& key) {
@@ -79,6 +92,7 @@ std::string SignersCerts(const Options& options, const SigningKey& key) {
   if (options.cert.empty()) {
     return Pair(IssueCert(key, {signer.get(), true}, options.signer.algorithm));
   }
+  if (OpenBuffer(options.cert)->LooksAt("(8:manifest")) return ChainOf(options.cert, *signer);
   const CertChain chain = ReadCertChain(options.cert);
   RequireCertFor(chain, options.cert, *signer);
   std::string text;
@@ -256,8 +270,10 @@ Action DefineManifestSign(CLI::App& app) {
   auto options = std::make_shared<Options>();
   app.add_option("directory", options->directory, "The tree to sign")->required();
   AddSignerOptions(app, options->signer);
-  app.add_option("--cert", options->cert,
-                 "Certificate file of the signing key [none: the key speaks for itself]");
+  app.add_option(
+      "--cert", options->cert,
+      "Certificate file of the signing key, or a manifest that it signed [none: the key speaks "
+      "for itself]");
   app.add_option("--tag", options->tag, "Sign for this tag only [all that the signer is granted]");
   app.add_option("--at", options->at, "Time of signing, UTC")->capture_default_str();
   app.add_option("--ignore", options->ignored, "Leave this entry out (a path below the directory)")
