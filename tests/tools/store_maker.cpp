@@ -50,6 +50,11 @@ StoreMaker::StoreMaker(const TempDir& directory, unsigned seed)
       digits += kHex[static_cast<unsigned char>(byte) & 15];
     }
     fingerprints_.push_back(digits);
+    CertText probe;
+    probe.issuer = Key(i).Public();
+    probe.subject = Key(kKeys).Public();
+    directory.Write("probe" + std::to_string(i) + ".cert",
+                    "(8:sequence" + Signed(probe, Key(i)) + "(7:comment))");
   }
   directory.Write("tree/one", "one\n");
   directory.Write("tree/sub/two", "two\n");
@@ -60,6 +65,12 @@ std::string StoreMaker::KeyFile(std::string_view digits) const {
     if (fingerprints_[i].starts_with(digits)) return "key" + std::to_string(i) + ".pem";
   }
   throw std::runtime_error("no key " + std::string(digits));
+}
+
+std::vector<std::string> StoreMaker::Requests() {
+  std::vector<std::string> requests;
+  for (const auto& row : kTags) requests.emplace_back(row.asked);
+  return requests;
 }
 
 std::string StoreMaker::Grant(const std::string& asked) {
@@ -83,7 +94,10 @@ std::string StoreMaker::EntrySubject(const std::vector<unsigned>& holders) {
   if (Chance(10)) {
     const unsigned n = 2 + Pick(2);
     std::string members;
-    for (unsigned i = 0; i < n; ++i) members += Key((holders.back() + i) % kKeys).Public();
+    for (unsigned i = 0; i < n; ++i) {
+      made_.members.insert((holders.back() + i) % kKeys);
+      members += Key((holders.back() + i) % kKeys).Public();
+    }
     return "(6:k-of-n1:\x02"
            "1:" +
            std::string(1, static_cast<char>(n)) + members + ")";
@@ -108,6 +122,7 @@ void StoreMaker::WriteEntries(const std::string& asked, const std::vector<unsign
 // The pairs of the chain, from the end to the root.
 std::string StoreMaker::WriteChain(const std::string& asked, const std::vector<unsigned>& holders) {
   certs_.clear();
+  subjects_.clear();
   revocable_ = false;
   std::string pairs;
   std::string triples;
@@ -115,7 +130,8 @@ std::string StoreMaker::WriteChain(const std::string& asked, const std::vector<u
     CertText cert;
     const unsigned issuer = Chance(4) ? Pick(kKeys) : holders[i + 1];
     cert.issuer = Key(issuer).Public();
-    cert.subject = Key(Chance(4) && i > 0 ? Pick(kKeys) : holders[i]).Public();
+    subjects_.push_back(Chance(4) && i > 0 ? Pick(kKeys) : holders[i]);
+    cert.subject = Key(subjects_.back()).Public();
     cert.propagate = Chance(i == 0 ? 30 : 80);
     cert.tag = Chance(10) ? "" : Tag(Grant(asked));
     Period(cert.notBefore, cert.notAfter);
@@ -159,16 +175,27 @@ std::string StoreMaker::List(const TestKey& signer, const std::string& notAfter,
 void StoreMaker::WriteLists() {
   if (!revocable_) return;
   const unsigned revoker = 5;
-  if (Chance(85)) {
+  const bool vouched = Chance(85);
+  if (vouched) {
     directory_.Write("global/acl/m-revoker.acl", AclEntryText(Key(revoker).Public(), Tag(kSource)));
   }
   if (Chance(30)) return;  // no list
+  const unsigned signer = Chance(10) ? Pick(kKeys) : revoker;
+  const bool counts = vouched && signer == revoker;
   std::vector<std::string> revoked;
-  if (Chance(20)) revoked.push_back(certs_[Pick(static_cast<unsigned>(certs_.size()))]);
-  const TestKey& signer = Key(Chance(10) ? Pick(kKeys) : revoker);
+  if (Chance(20)) {
+    const unsigned index = Pick(static_cast<unsigned>(certs_.size()));
+    revoked.push_back(certs_[index]);
+    // The list is asked about certificates that name it.
+    if (counts && certs_[index].find("15:revocation-list") != std::string::npos) {
+      made_.revoked.insert(subjects_[index]);
+    }
+  }
+  const unsigned key = Chance(10) ? Pick(kKeys) : kKeys;
+  if (counts && key < kKeys) made_.revoked.insert(key);
   directory_.Write("global/cert/" + std::string(kSource) + ".crl",
-                   List(signer, Chance(30) ? "2023-12-31_23:59:59" : "2031-12-31_23:59:59", revoked,
-                        Chance(10) ? Key(Pick(kKeys)).Public() : ""));
+                   List(Key(signer), Chance(30) ? "2023-12-31_23:59:59" : "2031-12-31_23:59:59",
+                        revoked, key < kKeys ? Key(key).Public() : ""));
 }
 
 void StoreMaker::WriteManifest(const std::vector<unsigned>& holders, const std::string& chain,
@@ -186,22 +213,22 @@ void StoreMaker::WriteManifest(const std::vector<unsigned>& holders, const std::
 
 StoreCase StoreMaker::Make() {
   std::filesystem::remove_all(directory_.File("global"));
-  StoreCase made;
-  made.manifest = Chance(25);
-  made.tag = kTags[Pick(std::size(kTags))].asked;
+  made_ = {};
+  made_.manifest = Chance(25);
+  made_.tag = kTags[Pick(std::size(kTags))].asked;
   constexpr const char* kMoments[] = {"2024-06-01_00:00:00", "2025-03-01_00:00:00",
                                       "2026-08-01_00:00:00"};
-  if (!made.manifest || Chance(50)) made.at = kMoments[Pick(3)];
+  if (!made_.manifest || Chance(50)) made_.at = kMoments[Pick(3)];
   // The end of the chain first, the root last.
   const unsigned first = Pick(2);
   std::vector<unsigned> holders;
   const unsigned count = 2 + Pick(3);
   for (unsigned i = 0; i < count; ++i) holders.push_back((first + i) % kKeys);
-  WriteEntries(made.tag, holders);
-  const std::string chain = WriteChain(made.tag, holders);
+  WriteEntries(made_.tag, holders);
+  const std::string chain = WriteChain(made_.tag, holders);
   WriteLists();
-  if (made.manifest) WriteManifest(holders, chain, made.tag);
-  return made;
+  if (made_.manifest) WriteManifest(holders, chain, made_.tag);
+  return made_;
 }
 
 }  // namespace vesk2test

@@ -3,6 +3,7 @@
 #define VESK2_TESTS_TOOLS_STORE_MAKER_H
 
 #include <random>
+#include <set>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -18,10 +19,14 @@ struct StoreCase {
   bool manifest = false;
   std::string tag;
   std::string at;  // a stamp; empty for a manifest's own time
+  // Keys that a list of the store's revoker names, or the certificate of which it does, and keys
+  // that an entry trusts together with others only.
+  std::set<unsigned> revoked = {};
+  std::set<unsigned> members = {};
 };
 
 // StoreMaker writes, below one directory: global/acl, global/cert, chain.cert or tree.manifest, and
-// once the tree "tree" and the private keys.
+// once the tree "tree", the private keys, and for each key a probe: a certificate for another one.
 class StoreMaker {
  public:
   StoreMaker(const TempDir& directory, unsigned seed);
@@ -29,6 +34,8 @@ class StoreMaker {
   StoreCase Make();
   // The private key file whose public key's fingerprint begins with these digits.
   std::string KeyFile(std::string_view digits) const;
+  // All that is ever asked.
+  static std::vector<std::string> Requests();
 
  private:
   static constexpr unsigned kKeys = 6;
@@ -51,7 +58,9 @@ class StoreMaker {
   std::mt19937 random_;
   std::vector<std::string> fingerprints_;
   std::vector<std::string> certs_;  // of the current case
+  std::vector<unsigned> subjects_;  // of those
   bool revocable_ = false;
+  StoreCase made_;
 };
 
 }  // namespace vesk2test

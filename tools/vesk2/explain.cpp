@@ -11,6 +11,7 @@
 #include "tools/vesk2/remedy.h"
 #include "tools/vesk2/report.h"
 #include "tools/vesk2/stores.h"
+#include "tools/vesk2/tell_remedies.h"
 
 namespace vesk2_command {
 namespace {
@@ -188,44 +189,6 @@ void TellFacts(const Evidence& evidence) {
   }
 }
 
-// ---- Remedies ----
-
-// A word as a shell takes it.
-std::string Quoted(const std::string& word) {
-  const auto plain = [](char c) {
-    return std::isalnum(static_cast<unsigned char>(c)) != 0 ||
-           std::string_view("-_./:=,+@%").find(c) != std::string_view::npos;
-  };
-  if (!word.empty() && std::all_of(word.begin(), word.end(), plain)) return word;
-  std::string text = "'";
-  for (const char c : word) text += c == '\'' ? std::string("'\\''") : std::string(1, c);
-  return text + "'";
-}
-
-void TellRemedies(const std::vector<Remedy>& remedies) {
-  Json& list = Result()["remedies"] = Json::array();
-  const char* lead = "would pass: ";
-  for (const Remedy& remedy : remedies) {
-    Note((remedy.commands.empty() ? "to mend: " : lead) + remedy.text);
-    lead = "or: ";
-    Json commands = Json::array();
-    for (const auto& words : remedy.commands) {
-      Json command = Json::array();
-      std::string line = " ";
-      for (const std::string& word : words) {
-        command.push_back(Escape(word));
-        line.append(" ").append(Escape(Quoted(word)));
-      }
-      Note(line);
-      commands.push_back(command);
-    }
-    list.push_back({{"kind", remedy.kind},
-                    {"text", remedy.text},
-                    {"commands", commands},
-                    {"keys", remedy.keys}});
-  }
-}
-
 void TellLosses(const std::vector<Loss>& losses) {
   Json& lost = Result()["lost"] = Json::array();
   for (const Loss& loss : losses) {
@@ -289,13 +252,7 @@ void ExplainRefusal(const Question& question, int code) {
 }
 
 void ExplainTree(const Question& question) {
-  Explain([&] {
-    std::vector<Remedy> remedies = SignAgain(question, GatherEvidence(question));
-    for (Remedy& remedy : remedies) {
-      remedy.text = "what is named above as it was, or, if it is meant so, " + remedy.text;
-    }
-    TellRemedies(remedies);
-  });
+  Explain([&] { TellRemedies(MendTree(question, GatherEvidence(question))); });
 }
 
 void ExplainGrant(const Question& question) {

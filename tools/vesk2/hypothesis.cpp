@@ -62,14 +62,28 @@ class World {
     return status == Cert::NotRevoked ? 0 : VESK2_ERR_CERT_REVOKED;
   }
 
+  static Ref<Cert> Reissued(const Cert& old, PublicKey& issuer) {
+    Ref<Cert> cert(new Cert(nullptr));
+    Check(cert->Set(&issuer, old.GetSubject(), old.GetPropagate(), old.GetTag(), old.GetNotBefore(),
+                    old.GetNotAfter(), old.GetComment(), old.GetRevocationElement()),
+          "building a certificate");
+    return cert;
+  }
+
   void AddCerts() {
     for (size_t i = 0; i < evidence_.certs.size(); ++i) {
       if (hypothesis_.withoutCerts.count(i) != 0) continue;
       const CertEvidence& each = evidence_.certs[i];
       const auto other = hypothesis_.certs.find(i);
       const bool replaced = other != hypothesis_.certs.end();
-      certs_.push_back({replaced ? other->second : each.cert.get(), replaced ? 0 : each.code,
-                        each.source.get()});
+      Cert* cert = replaced ? other->second : each.cert.get();
+      // Each stands before the one that was there, as `cert cosign` writes it.
+      const auto [first, last] = hypothesis_.coSigners.equal_range(i);
+      for (auto it = last; it != first;) {
+        coSigned_.push_back(Reissued(*cert, *(--it)->second));
+        certs_.push_back({coSigned_.back().get(), 0, each.source.get()});
+      }
+      certs_.push_back({cert, replaced ? 0 : each.code, each.source.get()});
     }
   }
 
@@ -208,6 +222,7 @@ class World {
   const Hypothesis& hypothesis_;
   ZvVesk2::Subject* subject_ = nullptr;  // for whom authority is asked
   std::vector<Link> certs_;
+  std::vector<Ref<Cert>> coSigned_;
   Ref<SExpression> all_;
   Ref<SExpression> granting_;  // all of them, or the one that is asked about
   std::vector<int32_t> statuses_;

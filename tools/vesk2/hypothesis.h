@@ -15,7 +15,9 @@
 namespace vesk2_command {
 
 struct Hypothesis {
-  std::map<size_t, ZvVesk2::Cert*> certs;             // these instead, with good signatures
+  std::map<size_t, ZvVesk2::Cert*> certs;  // these instead, with good signatures
+  std::multimap<size_t, ZvVesk2::PublicKey*>
+      coSigners;                                      // who certify the same as these, beside them
   std::map<std::string, ZvVesk2::AclEntry*> entries;  // these in the store, by file name
   std::vector<SExpression*> freshLists;  // sources with a current list that revokes no more
   std::set<size_t> withoutCerts;

@@ -7,6 +7,8 @@
 #include "tools/vesk2/edits.h"
 #include "tools/vesk2/inspect.h"
 #include "tools/vesk2/report.h"
+#include "tools/vesk2/sign_again.h"
+#include "tools/vesk2/stores.h"
 
 namespace vesk2_command {
 namespace {
@@ -19,6 +21,7 @@ using Choice = std::vector<const Edit*>;
 constexpr size_t kMaxCerts = 16;
 constexpr size_t kMaxEntries = 16;
 constexpr unsigned kMaxTrials = 600;
+constexpr unsigned kMaxRootTrials = 200;  // of them, kept for roots of trust
 constexpr size_t kMaxAlternatives = 3;
 constexpr size_t kMaxTogether = 3;
 
@@ -36,19 +39,36 @@ bool OneTarget(const Choice& choice) {
   return false;
 }
 
+bool HasNewRoot(const Choice& choice) {
+  return std::any_of(choice.begin(), choice.end(), [](const Edit* edit) { return edit->newRoot; });
+}
+
+void AddOnce(std::vector<std::string>& words, const std::vector<std::string>& more) {
+  for (const std::string& word : more) {
+    if (std::find(words.begin(), words.end(), word) == words.end()) words.push_back(word);
+  }
+}
+
 Remedy Together(const Choice& choice) {
   Remedy remedy{choice.size() == 1 ? choice[0]->remedy.kind : "several", ""};
+  if (HasNewRoot(choice)) remedy.kind = "new-root";
   for (const Edit* edit : choice) {
     const Remedy& part = edit->remedy;
     remedy.text += (remedy.text.empty() ? "" : "; and ") + part.text;
     remedy.commands.insert(remedy.commands.end(), part.commands.begin(), part.commands.end());
-    for (const std::string& key : part.keys) {
-      if (std::find(remedy.keys.begin(), remedy.keys.end(), key) == remedy.keys.end()) {
-        remedy.keys.push_back(key);
-      }
-    }
+    AddOnce(remedy.keys, part.keys);
+    AddOnce(remedy.foreign, part.foreign);
   }
   return remedy;
+}
+
+// The commands are about the stores that the question was about.
+void CarryStores(Remedy& remedy) {
+  const StoreOptions& stores = GetStoreOptions();
+  for (auto& command : remedy.commands) {
+    if (!stores.global.empty()) command.insert(command.end(), {"--global", stores.global});
+    if (!stores.home.empty()) command.insert(command.end(), {"--home", stores.home});
+  }
 }
 
 class Finder {
@@ -59,26 +79,32 @@ class Finder {
   }
 
   std::vector<Remedy> Find() {
-    for (const Reach reach : {Reach::kAsItIs, Reach::kAsked, Reach::kWholePeriod}) {
-      required_.clear();
-      if (!Require(reach)) return {};
-      MakeOptional();
-      std::vector<Remedy> found = TryAll();
-      if (!found.empty() || required_.empty()) return found;
+    // A root of trust is named when nothing else helps.
+    for (const bool roots : {false, true}) {
+      roots_ = roots;
+      for (const Reach reach : {Reach::kAsItIs, Reach::kAsked, Reach::kWholePeriod}) {
+        required_.clear();
+        if (!Require(reach)) return {};
+        MakeOptional();
+        std::vector<Remedy> found = TryAll();
+        if (!found.empty()) return found;
+        if (required_.empty()) break;
+      }
     }
     return {};
   }
 
  private:
   // The changes without which no other helps: a manifest leaves out certificates that are revoked
-  // or about which nothing is known, a chain is refused for one. False when there is none.
+  // or about which nothing is known, a chain is refused for one. False when there is none, or what
+  // was taken back would have to be given again.
   bool Require(Reach reach) {
     for (size_t i = 0; i < evidence_.certs.size(); ++i) {
       const bool needed = !question_.manifest || i == 0;
       const size_t count = required_.size();
-      const bool listed = needed && states_[i] == Cert::RevokedByCrl;
-      if (needed && states_[i] == Cert::KeyRevoked) return false;
-      if (evidence_.certs[i].code != 0 || listed) {
+      const bool revoked = states_[i] == Cert::RevokedByCrl || states_[i] == Cert::KeyRevoked;
+      if (needed && revoked) return false;
+      if (evidence_.certs[i].code != 0) {
         const size_t before = count;
         maker_.Renew(required_, i, reach);
         if (required_.size() == before) maker_.Renew(required_, i, Reach::kAsItIs);
@@ -96,24 +122,15 @@ class Finder {
                                     [&](const Edit& edit) { return edit.target == source; });
     if (served) return true;
     const size_t count = edits.size();
-    maker_.TrustList(edits, index);
-    if (edits.size() > count && Determines(edits.back(), index)) return true;
-    edits.erase(edits.begin() + static_cast<std::ptrdiff_t>(count), edits.end());
     maker_.FreshList(edits, index);
     return edits.size() > count;
-  }
-
-  bool Determines(const Edit& edit, size_t index) const {
-    Hypothesis hypothesis;
-    Apply(edit, hypothesis);
-    return RevocationStates(evidence_, hypothesis)[index] == Cert::NotRevoked;
   }
 
   void MakeOptional() {
     optional_.clear();
     const size_t certs = std::min(evidence_.certs.size(), kMaxCerts);
     for (size_t i = 0; i < certs; ++i) {
-      maker_.GrantIssuer(optional_, i);
+      if (roots_) maker_.NewRoot(optional_, i);
       if (IsRequired(i)) continue;
       const size_t count = optional_.size();
       maker_.Renew(optional_, i, Reach::kAsked);
@@ -123,10 +140,9 @@ class Finder {
         optional_.pop_back();
       }
       if (!question_.manifest || i == 0) continue;
-      if (states_[i] == Cert::RevokedByCrl) maker_.Renew(optional_, i, Reach::kAsItIs);
       if (states_[i] == Cert::Undetermined) (void)Determine(optional_, i);
     }
-    maker_.GrantSubject(optional_);
+    maker_.CoSign(optional_);
     size_t entries = 0;
     for (const EntryEvidence& each : evidence_.entries) {
       if (entries == kMaxEntries) break;
@@ -144,7 +160,7 @@ class Finder {
   }
 
   bool Turns(const Choice& choice) {
-    if (trials_++ >= kMaxTrials) return false;
+    if (trials_++ >= kMaxTrials - (roots_ ? 0 : kMaxRootTrials)) return false;
     Hypothesis hypothesis;
     for (const Edit* edit : choice) Apply(*edit, hypothesis);
     return Judge(question_, evidence_, hypothesis) == 0;
@@ -154,13 +170,13 @@ class Finder {
   std::vector<Remedy> TryAll() {
     Choice required;
     for (const Edit& edit : required_) required.push_back(&edit);
-    if (!required.empty() && Turns(required)) return {Together(required)};
+    if (!roots_ && !required.empty() && Turns(required)) return {Together(required)};
     for (size_t count = 1; count <= kMaxTogether; ++count) {
       std::vector<Remedy> found;
       for (const Choice& choice : Choices(count)) {
         Choice whole = required;
         whole.insert(whole.end(), choice.begin(), choice.end());
-        if (OneTarget(whole) || !Turns(whole)) continue;
+        if (HasNewRoot(whole) != roots_ || OneTarget(whole) || !Turns(whole)) continue;
         found.push_back(Together(whole));
         if (found.size() == (count == 1 ? kMaxAlternatives : 1)) return found;
       }
@@ -189,7 +205,7 @@ class Finder {
     return choices;
   }
 
-  // Every certificate renewed, and the root trusted.
+  // Every certificate renewed, and the root trusted if that may be.
   std::vector<Remedy> Rebuild(const Choice& required) {
     std::vector<Edit> renewals;
     for (size_t i = 0; i < std::min(evidence_.certs.size(), kMaxCerts); ++i) {
@@ -198,7 +214,7 @@ class Finder {
       maker_.Renew(renewals, i, Reach::kWholePeriod);
       if (renewals.size() == count) maker_.Renew(renewals, i, Reach::kAsked);
     }
-    if (!evidence_.certs.empty()) maker_.GrantIssuer(renewals, evidence_.certs.size() - 1);
+    if (roots_) maker_.NewRoot(renewals, evidence_.certs.size() - 1);
     Choice whole = required;
     for (const Edit& edit : renewals) whole.push_back(&edit);
     std::vector<Remedy> found;
@@ -212,76 +228,62 @@ class Finder {
   std::vector<int32_t> states_;
   std::vector<Edit> required_;
   std::vector<Edit> optional_;
+  bool roots_ = false;  // new ones are among the candidates
   unsigned trials_ = 0;
 };
 
-// A certificate as `manifest sign` writes it, for a hypothesis.
-Ref<Cert> Unlimited(PublicKey& issuer, ZvVesk2::Subject& subject, bool propagate) {
-  Ref<Cert> cert(new Cert(nullptr));
-  Check(cert->Set(&issuer, &subject, propagate, nullptr, nullptr, nullptr, nullptr, nullptr),
-        "building a certificate");
-  return cert;
-}
-
-// For a revoked key there is no command line: its holder has to begin anew.
-std::vector<Remedy> NewKeys(const Evidence& evidence) {
+// Where the way back is not a command: a revoked key's holder has to begin anew, and whose lists
+// count is decided by who keeps the store.
+std::vector<Remedy> ByHand(const Evidence& evidence) {
   const std::vector<int32_t> states = RevocationStates(evidence);
   std::vector<Remedy> remedies;
   for (size_t i = 0; i < states.size(); ++i) {
-    if (states[i] != Cert::KeyRevoked) continue;
-    const std::string text = SubjectText(*evidence.certs[i].cert->GetSubject()) +
-                             " is revoked: its holder needs a new key, and certificates for it";
+    const CertEvidence& each = evidence.certs[i];
+    const std::string subject = SubjectText(*each.cert->GetSubject());
+    Remedy remedy;
+    if (states[i] == Cert::KeyRevoked) {
+      remedy = {"new-key",
+                subject + " is revoked: its holder needs a new key, and certificates for it"};
+    } else if (states[i] == Cert::RevokedByCrl) {
+      remedy = {"new-key", CertName(evidence, i) + " is revoked: " + subject +
+                               " needs a new key, and a certificate for it"};
+    } else if (states[i] == Cert::Undetermined && Voucher(evidence, each.source.get()) == nullptr) {
+      remedy = {"revocation-list",
+                "find out who revokes for " + TagText(each.source.get()) +
+                    ", grant that key this tag, and import its list: no ACL entry says whose lists "
+                    "count"};
+    } else {
+      continue;
+    }
     const bool named = std::any_of(remedies.begin(), remedies.end(),
-                                   [&](const Remedy& each) { return each.text == text; });
-    if (!named) remedies.push_back({"new-key", text});
+                                   [&](const Remedy& other) { return other.text == remedy.text; });
+    if (!named) remedies.push_back(remedy);
   }
   return remedies;
 }
 
 }  // namespace
 
-std::vector<Remedy> SignAgain(const Question& question, const Evidence& evidence) {
-  if (evidence.certs.empty() || question.signing.empty()) return {};
-  ZvVesk2::Subject* content = evidence.certs[0].cert->GetSubject();
-  auto* signer = dynamic_cast<PublicKey*>(evidence.certs[0].cert->GetIssuer());
-  if (signer == nullptr || !content->IsHash()) return {};
-  const Ref<Cert> first = Unlimited(*signer, *content, false);
-  const Ref<Cert> own = Unlimited(*signer, *signer, true);
-  const Ref<TimeStamp> now = ParseTime("now", false);
-  Hypothesis again;
-  again.signedAgain = {first.get(), own.get()};
-  again.at = now.get();
-
-  Remedy remedy{"sign-again", "have " + Fingerprint(*signer) + " sign the manifest again"};
-  std::vector<Edit> grants;
-  if (Judge(question, evidence, again) != 0) {
-    // The certificates of another key's manifest are not at hand: its own trust has to be.
-    EditMaker(question, evidence).GrantIssuer(grants, 0);
-    if (grants.empty()) return {};
-    Apply(grants[0], again);
-    if (Judge(question, evidence, again) != 0) return {};
-    remedy.commands = grants[0].remedy.commands;
-    remedy.text += ", and trust it for " + TagText(question.request->tag.get());
-  }
-  std::vector<std::string> command = {"vesk2", "manifest", "sign"};
-  command.insert(command.end(), question.signing.begin(), question.signing.end());
-  for (const std::string& word : {std::string("--key"), KeyWord(*signer), std::string("-o"),
-                                  question.file, std::string("--force")}) {
-    command.push_back(word);
-  }
-  remedy.commands.push_back(command);
-  remedy.keys = {Fingerprint(*signer)};
-  return {remedy};
+std::vector<Remedy> MendTree(const Question& question, const Evidence& evidence) {
+  std::vector<Remedy> remedies = {{"restore", "put back what is named above as it was signed"}};
+  for (Remedy& again : SignAgain(question, evidence)) remedies.push_back(std::move(again));
+  for (Remedy& remedy : remedies) CarryStores(remedy);
+  return remedies;
 }
 
 std::vector<Remedy> FindRemedies(const Question& question, const Evidence& evidence, int code) {
-  if (evidence.certs.empty()) return {};
-  if (!evidence.contentSigned) return SignAgain(question, evidence);
-  // What cannot be reproduced from what lies there now cannot be mended either.
-  if (Judge(question, evidence) != code) return {};
-  std::vector<Remedy> remedies = Finder(question, evidence).Find();
-  if (remedies.empty()) remedies = SignAgain(question, evidence);
-  if (remedies.empty()) remedies = NewKeys(evidence);
+  std::vector<Remedy> remedies;
+  if (evidence.certs.empty()) return remedies;
+  if (!evidence.contentSigned) {
+    remedies = {{"restore", "get " + Escape(question.file) + " as it was signed"}};
+    for (Remedy& again : SignAgain(question, evidence)) remedies.push_back(std::move(again));
+  } else if (Judge(question, evidence) == code) {
+    // What cannot be reproduced from what lies there now cannot be mended either.
+    remedies = Finder(question, evidence).Find();
+    if (remedies.empty()) remedies = SignAgain(question, evidence);
+    if (remedies.empty()) remedies = ByHand(evidence);
+  }
+  for (Remedy& remedy : remedies) CarryStores(remedy);
   return remedies;
 }
 

@@ -88,7 +88,8 @@ void WriteJson(ExitCode code) {
   if (report.byte) answer["byte"] = *report.byte;
   answer["notes"] = report.notes;
   answer["result"] = report.result.is_null() ? Json::object() : report.result;
-  std::printf("%s\n", answer.dump().c_str());
+  // In ASCII: the words of a command line are as they are, and may turn a terminal's text.
+  std::printf("%s\n", answer.dump(-1, ' ', true).c_str());
 }
 
 }  // namespace
