@@ -63,7 +63,14 @@ class VESK2_API Manifest {
   // ---- Settings; see vesk2.h ----
   void SetFailOnExtraEntries(bool value) { failOnExtraEntries = value; }
   // Takes over `owned`, an array from new[], or null.
-  void SetExtraAclDirectory(char* owned) { extraAclDirectory.reset(owned); }
+  void SetExtraAclDirectory(char* owned) {
+    extraAclDirectory.reset(owned);
+    lostSetting = false;
+  }
+  // The same with a copy of the text. Without memory for it VESK2_ERR_MEM_ALLOC, which every
+  // verification answers then, until the setting is made again: without the directory, and the
+  // revocation sources that it names, it would answer another question.
+  [[nodiscard]] int CopyExtraAclDirectory(const char* text);
   // Replaces the ignored entries by copies, in reverse order. VESK2_ERR_MEM_ALLOC leaves none.
   [[nodiscard]] int SetIgnoredEntries(const FileItem* list);
   [[nodiscard]] int SetFileCallbacks(const Vesk2FileCallbacks* callbacks);
@@ -86,9 +93,8 @@ class VESK2_API Manifest {
   FileItem* GetMissing() const { return missing.get(); }
   FileItem* GetExtra() const { return extra.get(); }
   // GetReason tells why an entry of the lists above is there although it was not compared:
-  //   VESK2_ERR_FILE_OPEN  it could not be opened; a changed file that could not be opened is
-  //   there,
-  //                        and another process held it for Limits::kMaxHeldWait
+  //   VESK2_ERR_FILE_OPEN  it could not be opened: a changed file, which is there, because another
+  //                        process held it for Limits::kMaxHeldWait
   //   VESK2_ERR_READ_FILE  it could not be read to its end, or changed meanwhile
   //   VESK2_ERR_FIND_DIR   the directory is missing, or its entries could not be read
   // 0 when it was compared, and for any other entry.
@@ -129,6 +135,7 @@ class VESK2_API Manifest {
   Ref<TimeStamp> signingTime;
   size_t readPosition = 0;
   bool storeUpdate = true;
+  bool lostSetting = false;  // there was no memory to keep it
   Vesk2FileCallbacks fileCallbacks{};
 };
 

@@ -58,6 +58,12 @@ int Manifest::Initialize(const char* directoryPath, const char* path, const char
   return SExpression::ParseTagAdvanced(tag.Out(), tagText, "tag", context);
 }
 
+int Manifest::CopyExtraAclDirectory(const char* text) {
+  SetExtraAclDirectory(zv_fstrdup(text));
+  lostSetting = text != nullptr && extraAclDirectory == nullptr;
+  return lostSetting ? VESK2_ERR_MEM_ALLOC : 0;
+}
+
 int Manifest::SetIgnoredEntries(const FileItem* list) {
   FileItemList copies;
   const FileItem* item = list;
@@ -104,6 +110,8 @@ void Manifest::ClearResults() {
 }
 
 int Manifest::ReadManifest(bool verifyChain, long notBefore, long notAfter, ZvBuffer** body) {
+  if (body != nullptr) *body = nullptr;
+  VESK2_REQUIRE(!verifyChain || !lostSetting, VESK2_ERR_MEM_ALLOC);
   return ManifestReader(*this, verifyChain, notBefore, notAfter).Read(body);
 }
 

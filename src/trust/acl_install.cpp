@@ -3,6 +3,7 @@
 
 #include "src/platform/replace.h"
 #include "src/platform/text.h"
+#include "src/sexpr/storage.h"
 #include "src/trust/lists.h"
 #include "src/trust/store_write.h"
 #include "src/trust/tag_index.h"
@@ -10,10 +11,15 @@
 namespace ZvVesk2 {
 namespace {
 
-// Whether the entry was read from the store: its path is where the store would put it.
-bool IsStored(const AclEntry* entry) {
-  const TextPtr path(AclEntry::CalcPath(entry->GetFileName(), StorageGlobal));
-  return path && ZVsysutil::zv_filenamecmp(path.get(), entry->GetFileName()) == 0;
+// Whether the entry was read from the store: its path is where the store would put it. One that
+// counted as new for want of memory would be installed a second time.
+int IsStored(bool& stored, const AclEntry* entry) {
+  TextPtr path;
+  const int code = FilePath(path, AclEntry::DirectoryName(true), AclEntry::ExtensionName(true),
+                            entry->GetFileName(), StorageGlobal);
+  VESK2_REQUIRE(!LacksMemory(code), VESK2_ERR_MEM_ALLOC);
+  stored = code == 0 && ZVsysutil::zv_filenamecmp(path.get(), entry->GetFileName()) == 0;
+  return 0;
 }
 
 // Parts the loaded entries into those of the store and the others.
@@ -21,7 +27,9 @@ int Split(SExpression* loaded, SExpression* stored, SExpression* added) {
   for (auto it = loaded->Begin(); it; it.Next()) {
     auto* entry = dynamic_cast<AclEntry*>(it.Value());
     if (entry == nullptr) continue;
-    VESK2_TRY(AppendShared(IsStored(entry) ? stored : added, entry));
+    bool isStored = false;
+    VESK2_TRY(IsStored(isStored, entry));
+    VESK2_TRY(AppendShared(isStored ? stored : added, entry));
   }
   return 0;
 }

@@ -5,7 +5,6 @@
 #include <vesk2/acl_entry.h>
 #include <vesk2/context.h>
 
-#include "src/sexpr/storage.h"
 #include "src/trust/crl_update.h"
 #include "src/trust/lists.h"
 #include "src/trust/scan.h"
@@ -13,12 +12,6 @@
 namespace ZvVesk2 {
 
 namespace {
-
-// The path of a stored list.
-int StoredPath(TextPtr& path, const char* name) {
-  const char* const extension = CrlSequence::ExtensionName(true);
-  return FilePath(path, CrlSequence::DirectoryName(true), extension, name, StorageGlobal);
-}
 
 // Appends the stored list of one source, if it can be read. A list that is there but could not be
 // read for want of memory, or because another process holds it, is never taken for a missing one:

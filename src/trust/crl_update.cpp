@@ -10,6 +10,7 @@
 #include <vesk2/acl_entry.h>
 
 #include "src/platform/replace.h"
+#include "src/sexpr/storage.h"
 #include "src/trust/revocation_lists.h"
 #include "src/trust/store_write.h"
 
@@ -66,6 +67,11 @@ int StoreName(TextPtr& name, SExpression* tag) {
   return 0;
 }
 
+int StoredPath(TextPtr& path, const char* name) {
+  const char* const extension = CrlSequence::ExtensionName(true);
+  return FilePath(path, CrlSequence::DirectoryName(true), extension, name, StorageGlobal);
+}
+
 namespace {
 
 // Whether the list of `fresh` takes the place of the stored one.
@@ -105,11 +111,12 @@ int CrlSequence::UpdateStore(SExpression* aclEntries) {
   VESK2_REQUIRE(name, VESK2_ERR_INVALID_PARAM);
   // From here on the answer is a plain success: a damaged store degrades to having no list.
   SetStorageType(StorageGlobal);
-  const TextPtr path(CalcPath(name.get(), StorageGlobal));
+  TextPtr path;
+  if (StoredPath(path, name.get()) != 0) return 0;
   bool wanted = false;
-  if (!path || IsWanted(wanted, cert, path.get()) != 0 || !wanted) return 0;
+  if (IsWanted(wanted, cert, path.get()) != 0 || !wanted) return 0;
   if (crl->GetIssuerTag() == nullptr && VerifySelf(aclEntries) != 0) return 0;
-  if (SetFilePath(path.get()) != 0) return 0;
+  if (CreateFileDirectory() != 0 || SetFilePath(path.get()) != 0) return 0;
   ZVsysutil::zv_remove_leftovers(TextPtr(CalcDir(StorageGlobal)).get());
   static_cast<void>(WriteStored(this, path.get(), true));
   return 0;

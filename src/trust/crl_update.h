@@ -10,6 +10,8 @@ namespace ZvVesk2 {
 // StoreName makes the name of the file that keeps the list of the source `tag` (may be null): the
 // text of the tag's body. Success with null for a tag that names none. VESK2_ERR_MEM_ALLOC.
 [[nodiscard]] int StoreName(TextPtr& name, SExpression* tag);
+// StoredPath makes the path of the file of that name. The codes of FilePath.
+[[nodiscard]] int StoredPath(TextPtr& path, const char* name);
 
 }  // namespace ZvVesk2
 

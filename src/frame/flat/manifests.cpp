@@ -42,11 +42,11 @@ void DeleteManifestContext(Manifest* manifest) { delete manifest; }
 void FailOnExtraEntries(Manifest* manifest) { manifest->SetFailOnExtraEntries(true); }
 
 void SetExtraAclDirectory(Manifest* manifest, const char* directory) {
-  manifest->SetExtraAclDirectory(ZVsysutil::zv_fstrdup(directory));
+  static_cast<void>(manifest->CopyExtraAclDirectory(directory));  // the verification tells
 }
 
 void SetExtraAclDirectoryA(Manifest* manifest, const char* directory) {
-  manifest->SetExtraAclDirectory(ZVsysutil::zv_atof_copy(directory));
+  SetExtraAclDirectory(manifest, directory);
 }
 
 void SetIgnoredEntries(Manifest* manifest, const FileItem* list) {
