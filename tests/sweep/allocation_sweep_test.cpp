@@ -20,6 +20,7 @@
 #include "tests/support/test_object.h"
 #include "tests/support/test_text.h"
 #include "tests/sweep/failing_memory.h"
+#include "tests/sweep/scenes.h"
 
 using namespace ZvVesk2;
 using namespace vesk2test;
@@ -565,6 +566,24 @@ std::vector<Case> FlatCases() {
   };
 }
 
+// The machines of scenes.h: extra directory, home store, carried lists, and stores that are not to
+// be written. `scenes` outlives the rows.
+std::vector<Case> SceneCases(const Scenes& scenes) {
+  std::vector<Case> cases;
+  for (const auto& each : scenes) {
+    const auto ask = [scene = each.get(), before = each->Stored()] {
+      const int code = scene->ask();
+      const bool wrote = scene->Stored() != before;
+      if (wrote) scene->Restore(before);
+      Outcome outcome = Outcome::Of(code, scene->code);
+      outcome.outputsFit &= !wrote || scene->stores;
+      return outcome;
+    };
+    cases.push_back(Plain(each->Name(), ask, true));
+  }
+  return cases;
+}
+
 // Whether a code can tell of a lack of memory: in the words of the library, the crypto layer and
 // the engine, or as a store or a file that was not got at. Of the verdicts it is only that a grant
 // does not cover the request: IsSubset has no other word for tags that it could not compare.
@@ -619,6 +638,10 @@ void Sweep(const std::vector<Case>& cases) {
   }
 }
 
+TEST(AllocationSweep, Scenes) {
+  const Scenes scenes = MakeScenes();
+  Sweep(SceneCases(scenes));
+}
 TEST(AllocationSweep, Expressions) { Sweep(ExpressionCases()); }
 TEST(AllocationSweep, Objects) { Sweep(ObjectCases()); }
 TEST(AllocationSweep, TrustAndReduction) { Sweep(TrustCases()); }
