@@ -152,9 +152,7 @@ ExitCode Run(int argc, const char* const* argv) {
   return FinishReport(choice.action());
 }
 
-}  // namespace
-
-int RunCommand(int argc, const char* const* argv) {
+int RunOrTell(int argc, const char* const* argv) {
   try {
     return Run(argc, argv);
   } catch (const Trouble& trouble) {
@@ -163,6 +161,20 @@ int RunCommand(int argc, const char* const* argv) {
     return FinishReport(Trouble("out of memory", "mem-alloc"));
   } catch (const std::exception& error) {
     return FinishReport(Trouble(error.what()));
+  }
+}
+
+}  // namespace
+
+int RunCommand(int argc, const char* const* argv) {
+  try {
+    return RunOrTell(argc, argv);
+  } catch (...) {
+    // Not even the words for it could be made: these are here already.
+    constexpr std::string_view kWords = "vesk2: out of memory\n";
+    const ssize_t written = write(STDERR_FILENO, kWords.data(), kWords.size());
+    static_cast<void>(written);
+    return kTrouble;
   }
 }
 
