@@ -8,6 +8,7 @@
 #include <vesk2/cert_sequence.h>
 #include <vesk2/context.h>
 #include <vesk2/crl.h>
+#include <vesk2/evidence.h>
 #include <vesk2/expression.h>
 #include <vesk2/file_item.h>
 #include <vesk2/hash.h>

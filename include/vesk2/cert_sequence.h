@@ -14,6 +14,8 @@
 
 namespace ZvVesk2 {
 
+class Evidence;
+
 class VESK2_API CertSequence : public SExpression {
  public:
   explicit CertSequence(Vesk2ContextStruct* context);
@@ -92,6 +94,10 @@ class VESK2_API CertSequence : public SExpression {
   //   Verify::ReductA's.
   [[nodiscard]] int Verify(Subject* subject, SExpression* tag, TimeStamp* notBefore,
                            TimeStamp* notAfter);
+  // The same, keeping what was read and found in `evidence`: also what comes after a failure, which
+  // does not change the answer. VESK2_ERR_MEM_ALLOC when memory runs out on the way.
+  [[nodiscard]] int Verify(Subject* subject, SExpression* tag, TimeStamp* notBefore,
+                           TimeStamp* notAfter, Evidence& evidence);
   // The same for a sequence file. VESK2_ERR_PARAM_NULL for a null name.
   [[nodiscard]] static int Verify(Subject* subject, SExpression* tag, TimeStamp* notBefore,
                                   TimeStamp* notAfter, const char* name, bool usePath,
@@ -107,6 +113,10 @@ class VESK2_API CertSequence : public SExpression {
   // (VESK2_ERR_INVALID_PARAM). A certificate whose revocation state cannot be determined is kept.
   // Without any certificate left: VESK2_ERR_INVALID_SEQUENCE.
   [[nodiscard]] int Verify2(SExpression*& first, SExpression*& second, SExpression*& third);
+  // The same, keeping in `evidence` the certificates whose signature holds, and what the stores say
+  // of them.
+  [[nodiscard]] int Verify2(SExpression*& first, SExpression*& second, SExpression*& third,
+                            Evidence& evidence);
   // The stages of Verify2. VerifySignatures2 shares the certificates whose signature holds, and
   // their extra items, into the two lists; after one that fails it goes on with that triple's extra
   // item as the next certificate. VerifyRevocations2 replaces the lists by what is not revoked of

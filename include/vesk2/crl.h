@@ -106,6 +106,8 @@ class VESK2_API CrlSequence : public SExpression {
   // subject must be the list's hash (VESK2_ERR_HASH_ID, VESK2_ERR_SIGNATURE) and the signature must
   // hold.
   [[nodiscard]] int VerifySelf(SExpression* aclEntries);
+  // ForgetProof takes back what VerifySelf left: the list counts only when it is proved again.
+  void ForgetProof();
 
   // ---- The store ----
 

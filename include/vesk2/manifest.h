@@ -21,6 +21,8 @@
 
 namespace ZvVesk2 {
 
+class BodyDirectory;
+class Evidence;
 class Findings;
 
 struct FileItemDeleter {
@@ -75,6 +77,10 @@ class VESK2_API Manifest {
   [[nodiscard]] int SetIgnoredEntries(const FileItem* list);
   [[nodiscard]] int SetFileCallbacks(const Vesk2FileCallbacks* callbacks);
   void SetStoreUpdate(bool value) { storeUpdate = value; }
+  // SetEvidence has ReadManifest and VerifyManifest keep what they read and found in `borrowed`,
+  // which must outlive them; null takes it back. They then read on after a refusal, for the
+  // evidence only: codes, positions and what is stored stay as they are without it.
+  void SetEvidence(Evidence* borrowed) { evidence = borrowed; }
 
   // ---- What the object holds, borrowed ----
   Vesk2ContextStruct* GetContext() const { return context; }
@@ -107,6 +113,9 @@ class VESK2_API Manifest {
   // The byte of the manifest file that the last read had come to: after an error of a reader, where
   // the text stopped making sense.
   size_t GetReadPosition() const { return readPosition; }
+  // The listing that the last VerifyManifest with SetEvidence proved and compared, its root named
+  // by the directory; null when it did not come to that.
+  BodyDirectory* GetListing() const { return listing.get(); }
 
  private:
   friend class ManifestReader;
@@ -137,6 +146,8 @@ class VESK2_API Manifest {
   bool storeUpdate = true;
   bool lostSetting = false;  // there was no memory to keep it
   Vesk2FileCallbacks fileCallbacks{};
+  Evidence* evidence = nullptr;
+  std::unique_ptr<BodyDirectory> listing;
 };
 
 }  // namespace ZvVesk2

@@ -170,14 +170,18 @@ int Manifest::Verify(ZvBuffer* body, const char* directoryPath) {
   const ZVsysutil::ZvCall call;
   PointerArray<char> ignoreList;
   VESK2_TRY(BuildIgnoreList(directoryPath, ignoreList));
-  BodyDirectory root(context);
+  std::unique_ptr<BodyDirectory> parsed(TryNew<BodyDirectory>(context));
+  VESK2_REQUIRE(parsed, VESK2_ERR_MEM_ALLOC);
+  BodyDirectory& root = *parsed;
   root.SetName(zv_fstrdup(directoryPath));
   VESK2_REQUIRE(root.GetName() != nullptr, VESK2_ERR_MEM_ALLOC);
   VESK2_TRY(root.ParseBody(body, &ignoreList));
 
   Findings findings(context);
   StatusSet statuses;
-  VESK2_TRY(DiskCheck(context, findings, GetFileCallbacks()).Directory(root, 0, statuses));
+  const int checked = DiskCheck(context, findings, GetFileCallbacks()).Directory(root, 0, statuses);
+  if (evidence != nullptr) listing = std::move(parsed);
+  VESK2_TRY(checked);
   VESK2_TRY(Publish(findings));
   return statuses.Code();
 }

@@ -3,6 +3,8 @@
 
 #include <utility>
 
+#include <vesk2/manifest_body.h>
+
 #include "src/frame/check.h"
 #include "src/frame/handles.h"
 #include "src/manifest/manifest_reader.h"
@@ -107,6 +109,7 @@ void Manifest::ClearResults() {
   extra.reset();
   reasons.reset();
   reasonCount = 0;
+  listing.reset();
 }
 
 int Manifest::ReadManifest(bool verifyChain, long notBefore, long notAfter, ZvBuffer** body) {

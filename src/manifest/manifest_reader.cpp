@@ -12,15 +12,18 @@
 
 #include <utility>
 
+#include <vesk2/acl_entry.h>
 #include <vesk2/crl.h>
 #include <vesk2/hash.h>
+#include <vesk2/manifest_body.h>
 #include <vesk2/signature.h>
 
 #include "src/frame/check.h"
-#include "src/manifest/manifest_authority.h"
 #include "src/objects/build.h"
 #include "src/platform/wait.h"
 #include "src/sexpr/same.h"
+#include "src/trust/chain.h"
+#include "src/trust/revocation_lists.h"
 
 namespace ZvVesk2 {
 namespace {
@@ -32,13 +35,16 @@ constexpr unsigned kStampLength = 19;
 int ManifestReader::Read(ZvBuffer** body) {
   if (body != nullptr) *body = nullptr;
   manifest_.ClearRead();
+  evidence_.Clear(Evidence::SignedManifest);
   const ZVsysutil::ZvCall call;
   const char* const path = manifest_.manifestPath.get();
   const int opened = WrapFile(buffer_, path, VESK2_ERR_OPEN_MANIFEST_FILE);
   VESK2_REQUIRE(opened != VESK2_ERR_READ_FILE, VESK2_ERR_OPEN_MANIFEST_FILE);
   VESK2_TRY(opened);
   const int code = ReadFile(body);
-  manifest_.readPosition = buffer_->Position();
+  manifest_.readPosition = refusal_ != 0 ? refusedAt_ : buffer_->Position();
+  VESK2_REQUIRE(!LacksMemory(code), code);
+  VESK2_TRY(refusal_);
   VESK2_TRY(code);
   manifest_.version = std::move(version_);
   manifest_.type = std::move(type_);
@@ -51,6 +57,15 @@ int ManifestReader::ReadFile(ZvBuffer** body) {
   VESK2_TRY(ReadSignatureBlock());
   VESK2_TRY(verifyChain_ ? ProveAuthority() : ReadRevocationLists(nullptr));
   return ProveBody(body);
+}
+
+int ManifestReader::Refuse(int code) {
+  VESK2_REQUIRE(code != 0 && readsOn_ && !LacksMemory(code), code);
+  if (refusal_ == 0) {
+    refusal_ = code;
+    refusedAt_ = buffer_->Position();
+  }
+  return 0;
 }
 
 int ManifestReader::ReadHead() {
@@ -87,12 +102,12 @@ int ManifestReader::ReadSigningTime() {
   VESK2_TRY(ImportNew(signingTime_, buffer_.get(), Context()));
   // Stamps are compared by their 19 characters; a shorter or longer text is no moment.
   VESK2_REQUIRE(signingTime_->GetLength() == kStampLength, VESK2_ERR_TIME_STAMP);
+  evidence_.SetSigningTime(signingTime_.get());
   VESK2_TRY(SExpression::Create(timeElement_.Out(), "time-of-signing", Context()));
   return Append(timeElement_.get(), Ref<TimeStamp>::Share(signingTime_.get()));
 }
 
 int ManifestReader::ReadSignatureBlock() {
-  VESK2_TRY(SExpression::Create(certificates_.Out(), "sequence", Context()));
   VESK2_TRY(ReadSigner());
   // The signer certificate speaks for the content only; at least one more must speak for its
   // issuer.
@@ -100,22 +115,22 @@ int ManifestReader::ReadSignatureBlock() {
     Ref<Cert> cert;
     VESK2_TRY(ImportNew(cert, buffer_.get(), Context()));
     VESK2_TRY(ReadSignature(*cert));
-    VESK2_TRY(Append(certificates_.get(), std::move(cert)));
   } while (buffer_->Peek() == '(');
   return buffer_->Expect(")");
 }
 
 int ManifestReader::ReadSigner() {
   VESK2_TRY(ImportNew(signer_, buffer_.get(), Context()));
-  VESK2_REQUIRE(signer_->GetSubject()->IsHash(), VESK2_ERR_NOT_OBJECT_CERT);
-  VESK2_TRY(ReadSignature(*signer_));
-  return Append(certificates_.get(), Ref<Cert>::Share(signer_.get()));
+  VESK2_TRY(Refuse(signer_->GetSubject()->IsHash() ? 0 : VESK2_ERR_NOT_OBJECT_CERT));
+  return ReadSignature(*signer_);
 }
 
 int ManifestReader::ReadSignature(Cert& cert) {
   Ref<Signature> signature;
   VESK2_TRY(ImportNew(signature, buffer_.get(), Context()));
-  return signature->Verify(&cert);
+  const int code = signature->Verify(&cert);
+  VESK2_TRY(evidence_.AddCert(&cert, signature.get(), code));
+  return Refuse(code);
 }
 
 // Reads the revocation lists that the manifest carries, into `lists` unless it is null.
@@ -129,15 +144,57 @@ int ManifestReader::ReadRevocationLists(SExpression* lists) {
   return buffer_->Expect(")");
 }
 
+// The period that the grant must meet; with both times 0 the moment of signing.
+int ManifestReader::SetPeriod() {
+  Ref<TimeStamp> first;
+  Ref<TimeStamp> last;
+  if (notBefore_ != 0) VESK2_TRY(MakeTime(first, notBefore_));
+  if (notAfter_ != 0) VESK2_TRY(MakeTime(last, notAfter_));
+  evidence_.SetPeriod(first.get(), last.get());
+  return 0;
+}
+
+int ManifestReader::MakeTime(Ref<TimeStamp>& stamp, long seconds) {
+  stamp.Reset(TryNew<TimeStamp>(Context()));
+  VESK2_REQUIRE(stamp, VESK2_ERR_MEM_ALLOC);
+  const int code = stamp->Set(seconds);
+  return code != -1 ? code : VESK2_ERR_TIME_STAMP;  // a year that has no text
+}
+
+int ManifestReader::LoadEntries() {
+  Ref<SExpression> acls;
+  VESK2_TRY(AclEntry::Import(acls.Out(), Context(), manifest_.extraAclDirectory.get()));
+  evidence_.SetEntries(acls.get());
+  return 0;
+}
+
+int ManifestReader::LoadLists(SExpression* carried) {
+  Ref<SExpression> stored;
+  VESK2_TRY(CrlSequence::ImportStore(stored.Out(), evidence_.GetEntries(), Context()));
+  evidence_.SetLists(stored.get(), carried);
+  return evidence_.MarkRevoked();
+}
+
 int ManifestReader::ProveAuthority() {
-  ManifestAuthority authority(Context(), certificates_.get(), signer_.get());
-  VESK2_TRY(authority.SetPeriod(notBefore_, notAfter_, signingTime_.get()));
-  VESK2_TRY(authority.LoadRoots(manifest_.extraAclDirectory.get()));
+  VESK2_TRY(Refuse(SetPeriod()));
+  VESK2_TRY(Refuse(LoadEntries()));
   Ref<SExpression> carried(TryNew<SExpression>(Context()));
   VESK2_REQUIRE(carried, VESK2_ERR_MEM_ALLOC);
-  VESK2_TRY(ReadRevocationLists(carried.get()));
-  VESK2_TRY(authority.MarkRevoked(carried.get(), manifest_.storeUpdate));
-  return authority.Prove(manifest_.tag.get());
+  const int read = ReadRevocationLists(carried.get());
+  evidence_.SetLists(nullptr, carried.get());
+  VESK2_TRY(read);
+  return evidence_.GetEntries() != nullptr ? AskAuthority(carried.get()) : 0;
+}
+
+int ManifestReader::AskAuthority(SExpression* carried) {
+  VESK2_TRY(Refuse(LoadLists(carried)));
+  if (readsOn_) VESK2_TRY(AddUnvouched(evidence_, Context()));
+  if (refusal_ != 0) return 0;
+  // What cannot be stored changes no answer.
+  if (manifest_.storeUpdate) {
+    static_cast<void>(RevocationLists(evidence_.GetEntries(), carried).Store(carried));
+  }
+  return Refuse(evidence_.Prove(manifest_.tag.get()));
 }
 
 int ManifestReader::ProveBody(ZvBuffer** body) {
@@ -145,12 +202,27 @@ int ManifestReader::ProveBody(ZvBuffer** body) {
   VESK2_REQUIRE(buffer_->Remaining() > 0, VESK2_ERR_PARSE_FILE);
   const size_t length = buffer_->Remaining() - 1;
   const unsigned char* const bytes = buffer_->Data();
-  VESK2_TRY(CheckDigest(bytes, static_cast<unsigned int>(length)));
+  const int digest = CheckDigest(bytes, static_cast<unsigned int>(length));
+  VESK2_TRY(Refuse(digest));
+  if (refusal_ != 0) return InspectBody(bytes, length, digest);
   buffer_->Skip(length);
   VESK2_TRY(buffer_->Expect(")"));
   if (body == nullptr) return 0;
   *body = ZVsysutil::zv_buffer_wrap(bytes, length);
   return *body != nullptr ? 0 : VESK2_ERR_FILE_OPEN;
+}
+
+// Notes whether a body that is refused is at least whole.
+int ManifestReader::InspectBody(const unsigned char* bytes, size_t length, int contentCode) {
+  const size_t start = buffer_->Position();
+  const BufferOwner body(ZVsysutil::zv_buffer_wrap(bytes, length));
+  VESK2_REQUIRE(body, VESK2_ERR_MEM_ALLOC);
+  BodyDirectory listing(Context());
+  int code = listing.ParseBody(body.get(), nullptr);
+  VESK2_REQUIRE(!LacksMemory(code), code);
+  if (code == 0 && body->Remaining() != 0) code = VESK2_ERR_PARSE_FILE;
+  evidence_.SetContent(contentCode, code, start + body->Position());
+  return 0;
 }
 
 int ManifestReader::CheckDigest(const unsigned char* body, unsigned int length) {

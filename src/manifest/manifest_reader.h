@@ -5,6 +5,7 @@
 #define VESK2_SRC_MANIFEST_MANIFEST_READER_H
 
 #include <vesk2/cert.h>
+#include <vesk2/evidence.h>
 #include <vesk2/manifest.h>
 #include <vesk2/ref.h>
 
@@ -16,6 +17,9 @@ class ManifestReader {
  public:
   ManifestReader(Manifest& manifest, bool verifyChain, long notBefore, long notAfter)
       : manifest_(manifest),
+        own_(manifest.context),
+        evidence_(manifest.evidence != nullptr ? *manifest.evidence : own_),
+        readsOn_(manifest.evidence != nullptr),
         verifyChain_(verifyChain),
         notBefore_(notBefore),
         notAfter_(notAfter) {}
@@ -25,6 +29,8 @@ class ManifestReader {
 
  private:
   int ReadFile(ZvBuffer** body);
+  // Refuse returns `code`, which ends the reading, or keeps it as the answer and returns 0.
+  int Refuse(int code);
   int ReadHead();
   int ReadVersion();
   int ReadType();
@@ -33,13 +39,24 @@ class ManifestReader {
   int ReadSigner();
   int ReadSignature(Cert& cert);
   int ReadRevocationLists(SExpression* lists);
+  int SetPeriod();
+  int MakeTime(Ref<TimeStamp>& stamp, long seconds);
+  int LoadEntries();
+  int LoadLists(SExpression* carried);
   int ProveAuthority();
+  int AskAuthority(SExpression* carried);
   int ProveBody(ZvBuffer** body);
+  int InspectBody(const unsigned char* bytes, size_t length, int contentCode);
   int CheckDigest(const unsigned char* body, unsigned int length);
 
   Vesk2ContextStruct* Context() const { return manifest_.context; }
 
   Manifest& manifest_;
+  Evidence own_;
+  Evidence& evidence_;
+  const bool readsOn_;
+  int refusal_ = 0;  // the answer, while reading goes on
+  size_t refusedAt_ = 0;
   const bool verifyChain_;
   const long notBefore_;
   const long notAfter_;
@@ -47,9 +64,8 @@ class ManifestReader {
   Ref<SExpression> version_;
   Ref<SExpression> type_;
   Ref<TimeStamp> signingTime_;
-  Ref<SExpression> timeElement_;   // (time-of-signing <stamp>)
-  Ref<Cert> signer_;               // held for the whole reading, whatever happens to the list
-  Ref<SExpression> certificates_;  // (sequence <signer> <certificate>...)
+  Ref<SExpression> timeElement_;  // (time-of-signing <stamp>)
+  Ref<Cert> signer_;
 };
 
 }  // namespace ZvVesk2

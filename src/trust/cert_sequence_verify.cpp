@@ -1,12 +1,57 @@
 // CertSequence: whether a chain proves that a subject holds a tag. The first failure is the answer.
+//
+// Each stage works on an Evidence, which judges; the stages load into it what they need, afresh.
 #include <vesk2/cert_sequence.h>
-#include <vesk2/verify.h>
+#include <vesk2/crl.h>
+#include <vesk2/evidence.h>
 
 #include "src/platform/wait.h"
 #include "src/trust/chain.h"
 #include "src/trust/lists.h"
 
 namespace ZvVesk2 {
+namespace {
+
+// Takes the certificates of a sequence. With `verify`, their signatures are verified: up to the
+// first failure, or all of them for `wholly`.
+int TakeCerts(const CertSequence& sequence, Evidence& evidence, bool verify, bool wholly) {
+  auto at = FirstItem(&sequence);
+  VESK2_REQUIRE(at, VESK2_ERR_INVALID_SEQUENCE);
+  int failure = 0;
+  while (at) {
+    ChainLink link;
+    const int whole = ReadWholeLink(link, at);
+    VESK2_REQUIRE(whole == 0, failure != 0 ? failure : whole);
+    const int code = verify ? link.signature->Verify(link.cert) : 0;
+    VESK2_REQUIRE(!LacksMemory(code), code);
+    VESK2_TRY(evidence.AddCert(link.cert, link.signature, code));
+    if (failure == 0) failure = code;
+    if (failure != 0 && !wholly) return failure;
+  }
+  return failure;
+}
+
+int LoadEntries(Evidence& evidence, Vesk2ContextStruct* ctx) {
+  Ref<SExpression> acls;
+  VESK2_TRY(LoadRoots(acls, ctx));
+  evidence.SetEntries(acls.get());
+  return 0;
+}
+
+int LoadLists(Evidence& evidence, Vesk2ContextStruct* ctx) {
+  VESK2_TRY(LoadEntries(evidence, ctx));
+  Ref<SExpression> lists;
+  VESK2_TRY(CrlSequence::ImportStore(lists.Out(), evidence.GetEntries(), ctx));
+  evidence.SetLists(lists.get(), nullptr);
+  return 0;
+}
+
+int AskStores(Evidence& evidence, Vesk2ContextStruct* ctx) {
+  VESK2_TRY(LoadLists(evidence, ctx));
+  return evidence.MarkRevoked();
+}
+
+}  // namespace
 
 int CertSequence::Verify(Subject* subject, SExpression* tag, TimeStamp* notBefore,
                          TimeStamp* notAfter, const char* name, bool usePath,
@@ -26,80 +71,47 @@ int CertSequence::Verify(Subject* subject, SExpression* tag, TimeStamp* notBefor
   return VerifyChain(subject, tag, notBefore, notAfter);
 }
 
+int CertSequence::Verify(Subject* subject, SExpression* tag, TimeStamp* notBefore,
+                         TimeStamp* notAfter, Evidence& evidence) {
+  const ZVsysutil::ZvCall call;
+  evidence.Clear(Evidence::Chain);
+  evidence.SetSubject(subject);
+  evidence.SetPeriod(notBefore, notAfter);
+  const int signatures = TakeCerts(*this, evidence, true, true);
+  VESK2_REQUIRE(!LacksMemory(signatures), signatures);
+  const int stores = AskStores(evidence, GetContext());
+  VESK2_REQUIRE(!LacksMemory(stores), stores);
+  VESK2_TRY(AddUnvouched(evidence, GetContext()));
+  // What the stores say was asked for the evidence only when a signature does not hold.
+  VESK2_TRY(signatures);
+  VESK2_TRY(stores);
+  VESK2_TRY(evidence.CheckRevoked());
+  VESK2_TRY(LoadEntries(evidence, GetContext()));
+  return evidence.Prove(tag);
+}
+
 int CertSequence::VerifySignatures() {
-  auto at = FirstItem(this);
-  VESK2_REQUIRE(at, VESK2_ERR_INVALID_SEQUENCE);
-  while (at) {
-    ChainLink link;
-    VESK2_TRY(ReadWholeLink(link, at));
-    VESK2_TRY(link.signature->Verify(link.cert));
-  }
-  return 0;
+  Evidence evidence(GetContext());
+  return TakeCerts(*this, evidence, true, false);
 }
 
 int CertSequence::VerifyRevocations(TimeStamp* notBefore, TimeStamp* notAfter) {
   const ZVsysutil::ZvCall call;
-  auto at = FirstItem(this);
-  VESK2_REQUIRE(at, VESK2_ERR_INVALID_SEQUENCE);
-  Ref<SExpression> certs(TryNew<SExpression>(GetContext()));
-  VESK2_REQUIRE(certs, VESK2_ERR_MEM_ALLOC);
-  while (at) {
-    ChainLink link;
-    VESK2_TRY(ReadWholeLink(link, at));
-    VESK2_TRY(AppendShared(certs.get(), link.cert));
-  }
-
-  Ref<SExpression> acls;
-  VESK2_TRY(LoadRoots(acls, GetContext()));
-  VESK2_TRY(MarkRevoked(certs.get(), acls.get(), notBefore, notAfter));
-  for (auto it = certs->Begin(); it; it.Next()) {
-    auto* const cert = dynamic_cast<Cert*>(it.Value());
-    VESK2_REQUIRE(cert != nullptr, VESK2_ERR_INVALID_SEQUENCE);
-    const int32_t status = cert->GetRevocationStatus();
-    VESK2_REQUIRE(status != Cert::Undetermined, VESK2_ERR_CRL_NOT_FOUND);
-    VESK2_REQUIRE(status == Cert::NotRevoked, VESK2_ERR_CERT_REVOKED);
-  }
-  return 0;
+  Evidence evidence(GetContext());
+  VESK2_TRY(TakeCerts(*this, evidence, false, false));
+  evidence.SetPeriod(notBefore, notAfter);
+  VESK2_TRY(AskStores(evidence, GetContext()));
+  return evidence.CheckRevoked();
 }
-
-namespace {
-
-// (valid [(not-before <stamp>)] [(not-after <stamp>)]) over the caller's stamps; null without any.
-int MakeValidity(Ref<SExpression>& out, TimeStamp* notBefore, TimeStamp* notAfter,
-                 Vesk2ContextStruct* ctx) {
-  if (notBefore == nullptr && notAfter == nullptr) return 0;
-  Ref<SExpression> valid;
-  VESK2_TRY(SExpression::Create(valid.Out(), "valid", ctx));
-  if (notBefore != nullptr) {
-    VESK2_TRY(AppendPair(valid.get(), "not-before", Ref<TimeStamp>::Share(notBefore)));
-  }
-  if (notAfter != nullptr) {
-    VESK2_TRY(AppendPair(valid.get(), "not-after", Ref<TimeStamp>::Share(notAfter)));
-  }
-  out = std::move(valid);
-  return 0;
-}
-
-}  // namespace
 
 int CertSequence::VerifyChain(Subject* subject, SExpression* tag, TimeStamp* notBefore,
                               TimeStamp* notAfter) {
-  auto at = FirstItem(this);
-  VESK2_REQUIRE(at, VESK2_ERR_INVALID_SEQUENCE);
-  Ref<SExpression> chain;
-  VESK2_TRY(SExpression::Create(chain.Out(), "sequence", GetContext()));
-  while (at) {
-    ChainLink link;
-    VESK2_TRY(ReadWholeLink(link, at));
-    if (subject == nullptr) subject = link.cert->GetSubject();
-    VESK2_TRY(AppendCopy(chain.get(), link.cert));
-  }
-
-  Ref<SExpression> acls;
-  VESK2_TRY(LoadRoots(acls, GetContext()));
-  Ref<SExpression> validity;
-  VESK2_TRY(MakeValidity(validity, notBefore, notAfter, GetContext()));
-  return Verify::ReductA(GetContext(), acls.get(), chain.get(), subject, tag, validity.get());
+  Evidence evidence(GetContext());
+  VESK2_TRY(TakeCerts(*this, evidence, false, false));
+  evidence.SetSubject(subject);
+  evidence.SetPeriod(notBefore, notAfter);
+  VESK2_TRY(LoadEntries(evidence, GetContext()));
+  return evidence.Reduce(tag);
 }
 
 }  // namespace ZvVesk2

@@ -1,6 +1,8 @@
 // CertSequence: what a chain grants when the certificates that fail are left out of it.
 #include <vesk2/acl_entry.h>
 #include <vesk2/cert_sequence.h>
+#include <vesk2/crl.h>
+#include <vesk2/evidence.h>
 #include <vesk2/verify.h>
 
 #include "src/platform/wait.h"
@@ -15,12 +17,25 @@ int VerifyLink(const ChainLink& link) {
   return link.signature->Verify(link.cert);
 }
 
-// Replaces the lists by what is not revoked of them. Both are as they were after a failure.
-int DropRevoked(Ref<SExpression>& certs, Ref<SExpression>& extras, Vesk2ContextStruct* ctx) {
+int AskStores(Evidence& evidence, Vesk2ContextStruct* ctx) {
   const ZVsysutil::ZvCall call;
   Ref<SExpression> acls;
   VESK2_TRY(AclEntry::Import(acls.Out(), ctx, nullptr));
-  VESK2_TRY(MarkRevoked(certs.get(), acls.get(), nullptr, nullptr));
+  Ref<SExpression> lists;
+  VESK2_TRY(CrlSequence::ImportStore(lists.Out(), acls.get(), ctx));
+  evidence.SetEntries(acls.get());
+  evidence.SetLists(lists.get(), nullptr);
+  return evidence.MarkRevoked();
+}
+
+// Replaces the lists by what is not revoked of them. Both are as they were after a failure.
+int DropRevoked(Ref<SExpression>& certs, Ref<SExpression>& extras, Evidence& evidence,
+                Vesk2ContextStruct* ctx) {
+  for (auto it = certs->Begin(); it; it.Next()) {
+    auto* const cert = dynamic_cast<Cert*>(it.Value());
+    if (cert != nullptr) VESK2_TRY(evidence.AddCert(cert, nullptr, 0));
+  }
+  VESK2_TRY(AskStores(evidence, ctx));
 
   Ref<SExpression> keptCerts(TryNew<SExpression>(ctx));
   Ref<SExpression> keptExtras(TryNew<SExpression>(ctx));
@@ -43,6 +58,13 @@ int DropRevoked(Ref<SExpression>& certs, Ref<SExpression>& extras, Vesk2ContextS
 }  // namespace
 
 int CertSequence::Verify2(SExpression*& tag, SExpression*& notBefore, SExpression*& notAfter) {
+  Evidence evidence(GetContext());
+  return Verify2(tag, notBefore, notAfter, evidence);
+}
+
+int CertSequence::Verify2(SExpression*& tag, SExpression*& notBefore, SExpression*& notAfter,
+                          Evidence& evidence) {
+  evidence.Clear(Evidence::Chain);
   VESK2_REQUIRE(tag == nullptr && notBefore == nullptr && notAfter == nullptr,
                 VESK2_ERR_INVALID_PARAM);
   const ZVsysutil::ZvCall call;
@@ -50,7 +72,7 @@ int CertSequence::Verify2(SExpression*& tag, SExpression*& notBefore, SExpressio
   Ref<SExpression> extras(TryNew<SExpression>(GetContext()));
   VESK2_REQUIRE(certs && extras, VESK2_ERR_MEM_ALLOC);
   VESK2_TRY(VerifySignatures2(certs.get(), extras.get()));
-  VESK2_TRY(DropRevoked(certs, extras, GetContext()));
+  VESK2_TRY(DropRevoked(certs, extras, evidence, GetContext()));
   return VerifyChain2(certs.get(), tag, notBefore, notAfter);
 }
 
@@ -77,7 +99,8 @@ int CertSequence::VerifyRevocations2(SExpression*& goodCerts, SExpression*& good
   VESK2_REQUIRE(goodCerts != nullptr && goodExtras != nullptr, VESK2_ERR_PARAM_NULL);
   Ref<SExpression> certs = Ref<SExpression>::Share(goodCerts);
   Ref<SExpression> extras = Ref<SExpression>::Share(goodExtras);
-  VESK2_TRY(DropRevoked(certs, extras, GetContext()));
+  Evidence evidence(GetContext());
+  VESK2_TRY(DropRevoked(certs, extras, evidence, GetContext()));
   const Ref<SExpression> oldCerts(std::exchange(goodCerts, certs.Release()));
   const Ref<SExpression> oldExtras(std::exchange(goodExtras, extras.Release()));
   return 0;

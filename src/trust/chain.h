@@ -4,6 +4,7 @@
 #define VESK2_SRC_TRUST_CHAIN_H
 
 #include <vesk2/cert.h>
+#include <vesk2/evidence.h>
 #include <vesk2/ref.h>
 #include <vesk2/signature.h>
 
@@ -30,10 +31,9 @@ SExpression::Iterator FirstItem(const SExpression* sequence);
 // and a file that another process holds (VESK2_ERR_READ_FILE) are no absence and come through.
 [[nodiscard]] int LoadRoots(Ref<SExpression>& acls, Vesk2ContextStruct* ctx);
 
-// MarkRevoked asks the CRL store, vouched for by `acls`, about each certificate of the list, and
-// leaves the answers in the certificates. Errors of loading only.
-[[nodiscard]] int MarkRevoked(SExpression* certs, SExpression* acls, TimeStamp* notBefore,
-                              TimeStamp* notAfter);
+// AddUnvouched adds the stored lists of sources that a certificate names and no entry does. They
+// count for nothing, but tell who could be believed.
+[[nodiscard]] int AddUnvouched(Evidence& evidence, Vesk2ContextStruct* ctx);
 
 // AppendCopy appends a copy of the certificate without its revocation element, which the reduction
 // knows nothing of.

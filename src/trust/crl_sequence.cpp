@@ -155,4 +155,10 @@ int CrlSequence::VerifySelf(SExpression* aclEntries) {
   return 0;
 }
 
+void CrlSequence::ForgetProof() {
+  if (crl == nullptr || crl->issuerTag == nullptr) return;
+  crl->issuerTag->Free();
+  crl->issuerTag = nullptr;
+}
+
 }  // namespace ZvVesk2

@@ -6,6 +6,7 @@
 #include <string>
 
 #include <vesk2/context.h>
+#include <vesk2/evidence.h>
 #include <vesk2/manifest.h>
 
 #include "src/platform/text.h"
@@ -15,7 +16,11 @@
 #include "tests/support/test_object.h"
 
 using namespace vesk2test;
+using ZvVesk2::Evidence;
 using ZvVesk2::Manifest;
+using ZvVesk2::Ref;
+using ZvVesk2::SExpression;
+using ZvVesk2::TimeStamp;
 using ZvVesk2::VeskConf;
 
 namespace {
@@ -67,7 +72,30 @@ class ManifestTest : public testing::Test {
     const int code = manifest.VerifyManifest(from, to);
     EXPECT_EQ(Findings(manifest, tree.Path() + "/"), code == 0 ? kAllValid : "V: I: M: X:");
     EXPECT_EQ(manifest.GetSigningTime() == nullptr, code != 0);
+    JudgeAgain(manifest, code, from, to);
     return code;
+  }
+  // A verification that keeps its evidence answers the same; what it keeps is judged the same, also
+  // when file and stores are gone, and says what the code is about.
+  void JudgeAgain(Manifest& manifest, int code, long from, long to) {
+    const size_t position = manifest.GetReadPosition();
+    Evidence evidence(nullptr);
+    manifest.SetEvidence(&evidence);
+    manifest.SetStoreUpdate(false);
+    EXPECT_EQ(manifest.VerifyManifest(from, to), code);
+    EXPECT_EQ(manifest.GetReadPosition(), position);
+    EXPECT_EQ(manifest.GetListing() != nullptr, code == 0);
+    EXPECT_EQ(evidence.GetContentCode() == VESK2_ERR_HASH_MATCH, code == VESK2_ERR_HASH_MATCH);
+    if (code == VESK2_ERR_PARSE_FILE || evidence.GetListingPosition() == 0) return;
+    EXPECT_TRUE(code == VESK2_ERR_HASH_MATCH || evidence.GetListingCode() == 0);
+    EXPECT_EQ(evidence.CountCerts() > 1 && evidence.GetCarriedLists() != nullptr, true);
+    const int authority = code == VESK2_ERR_HASH_MATCH || code == VESK2_ERR_TIME_STAMP ? 0 : code;
+    std::filesystem::rename(store.File("acl"), store.File("away"));
+    EXPECT_EQ(evidence.Judge(manifest.GetTag()), authority);
+    Evidence copy(nullptr);
+    EXPECT_EQ(copy.Copy(evidence), 0);
+    EXPECT_EQ(copy.Judge(manifest.GetTag()), authority);
+    std::filesystem::rename(store.File("away"), store.File("acl"));
   }
   // A revocation list of the vendor: canonical objects revoked as certificates and as keys.
   std::string RevocationList(const std::string& cert, const std::string& key,
@@ -238,6 +266,16 @@ TEST_F(ManifestTest, DropsRevokedAndUndeterminedCertificates) {
   std::filesystem::remove_all(store.File("cert"));
   parts.lists = RevocationList(signerCert, "", "2024-06-01_00:00:00");
   EXPECT_EQ(Verify(ManifestFile(parts), kTag, kInside, 0), VESK2_ERR_CERT_REVOKED);
+  // Of the evidence it can be asked by itself.
+  Manifest manifest(nullptr);
+  Open(manifest, ManifestFile(parts));
+  Evidence evidence(nullptr);
+  manifest.SetEvidence(&evidence);
+  EXPECT_EQ(manifest.VerifyManifest(0, 0), 0);
+  const Ref<TimeStamp> later(new TimeStamp(nullptr));
+  ASSERT_EQ(later->Set(kOutside), 0);
+  evidence.SetRevocationTime(later.get());
+  EXPECT_EQ(evidence.Judge(manifest.GetTag()), VESK2_ERR_CERT_REVOKED);
   parts.lists.clear();
   // Elsewhere in the chain too: what is undetermined is left out, needed or not.
   std::filesystem::remove_all(store.File("cert"));
@@ -268,6 +306,58 @@ TEST_F(ManifestTest, CarriedListsCountWithoutTheStoreBeingWritten) {
   manifest.SetStoreUpdate(true);
   EXPECT_EQ(manifest.VerifyManifest(0, 0), VESK2_ERR_SIGNING_CERT_ORDER);
   EXPECT_TRUE(std::filesystem::exists(store.File("cert/app (revoke all).crl")));
+}
+
+// The evidence of a refusal reaches as far as the file does, and its changes are judged.
+TEST_F(ManifestTest, EvidenceReadsOnAndJudgesChanges) {
+  CertText forged = own;
+  forged.issuer = stranger.Public();
+  parts.lists = RevocationList("", "");
+  parts.signer.revocation = revocation;
+  parts.chain = Signed(own, stranger) + Signed(forged, stranger);
+  Manifest manifest(nullptr);
+  Open(manifest, ManifestFile(parts));
+  Evidence evidence(nullptr);
+  manifest.SetEvidence(&evidence);
+  EXPECT_EQ(manifest.VerifyManifest(0, 0), VESK2_ERR_SIGNATURE);
+  EXPECT_FALSE(std::filesystem::exists(store.File("cert"))) << "a refusal stored a list";
+  EXPECT_EQ(manifest.GetListing(), nullptr);
+  ASSERT_EQ(evidence.CountCerts(), 3u);
+  EXPECT_EQ(evidence.GetSignatureCode(0), 0);
+  EXPECT_EQ(evidence.GetSignatureCode(1), VESK2_ERR_SIGNATURE);
+  EXPECT_EQ(evidence.GetSignatureCode(2), 0);
+  EXPECT_EQ(evidence.GetRevocationStatus(0), ZvVesk2::Cert::NotRevoked);
+  EXPECT_EQ(evidence.GetCarriedLists()->Count(), 1u);
+  EXPECT_EQ(evidence.GetEntries()->Count(), 3u);
+  EXPECT_EQ(evidence.GetSigningTime()->ToTime(), kSigned);
+  EXPECT_EQ(evidence.GetListingCode(), 0);
+
+  // The certificate with a good signature, without its list, with another list, later.
+  Evidence other(nullptr);
+  const auto mend = [&] {
+    EXPECT_EQ(other.Copy(evidence), 0);
+    other.RemoveCerts();
+    for (const size_t i : {0, 1}) EXPECT_EQ(other.AddCert(evidence.GetCert(i), nullptr, 0), 0);
+    EXPECT_EQ(other.Judge(manifest.GetTag()), 0);
+  };
+  mend();
+  const Ref<SExpression> none(new SExpression(nullptr));
+  other.SetLists(none.get(), none.get());
+  EXPECT_EQ(other.Judge(manifest.GetTag()), VESK2_ERR_CRL_NOT_FOUND);
+  ASSERT_EQ(other.AssumeList(evidence.GetRevocationSource(0)), 0);
+  EXPECT_EQ(other.Judge(manifest.GetTag()), 0);
+  const Ref<TimeStamp> late(new TimeStamp(nullptr));
+  ASSERT_EQ(late->Set(kOutside), 0);
+  other.SetPeriod(late.get(), late.get());
+  EXPECT_EQ(other.Judge(manifest.GetTag()), VESK2_ERR_NOT_AUTHORIZED);
+  // The original is as it was, and a list that other entries proved is proved again.
+  mend();
+  Ref<SExpression> entries;
+  ASSERT_EQ(SExpression::Create(entries.Out(), "acl", nullptr), 0);
+  ASSERT_EQ(entries->Insert(Parse("(1:x)").Release()), 0);
+  other.SetEntries(entries.get());
+  EXPECT_EQ(other.Judge(manifest.GetTag()), VESK2_ERR_CRL_NOT_FOUND);
+  EXPECT_EQ(evidence.Judge(manifest.GetTag()), VESK2_ERR_SIGNATURE);
 }
 
 // What callbacks were told, and when they end the work: at the call of that number.

@@ -438,6 +438,18 @@ std::vector<Case> TrustCases() {
          };
        },
        true},
+      // Nor is it another no when what was found is kept.
+      {"CertSequence::Verify with evidence of a revoked chain",
+       [] {
+         Ref<CertSequence> chain;
+         EXPECT_EQ(CertSequence::Import(chain.Out(), W().File("revoked"), true, nullptr), 0);
+         return [chain = Keep(std::move(chain)), tag = Kept(Tag("install"))] {
+           Evidence evidence(nullptr);
+           return Outcome::Of(chain->Verify(nullptr, tag.get(), nullptr, nullptr, evidence),
+                              VESK2_ERR_CERT_REVOKED);
+         };
+       },
+       true},
       // The revoked certificate is left out, and none remains.
       {"CertSequence::Verify2 of a revoked chain",
        [] {
@@ -554,6 +566,17 @@ std::vector<Case> FlatCases() {
          return [manifest = make()] {
            const int code = VerifyManifest(manifest.get(), 0, 0);
            return Outcome{code, code != 0 || GetValidEntries(manifest.get()) != nullptr};
+         };
+       },
+       true},
+      {"VerifyManifest with evidence",
+       [make] {
+         return [manifest = make()] {
+           Evidence evidence(nullptr);
+           manifest->SetEvidence(&evidence);
+           const int code = manifest->VerifyManifest(0, 0);
+           manifest->SetEvidence(nullptr);
+           return Outcome{code, code != 0 || manifest->GetListing() != nullptr};
          };
        },
        true},

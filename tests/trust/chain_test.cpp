@@ -1,5 +1,6 @@
 // Chains, leaf first. The ACL store trusts key 0; key 4 issues the revocation lists.
 #include <vesk2/cert_sequence.h>
+#include <vesk2/evidence.h>
 
 #include <tuple>
 
@@ -37,7 +38,14 @@ class Chain : public TrustTest {
     return sequence;
   }
   int Verify(const Ref<CertSequence>& sequence, const char* from = "", const char* to = "") const {
-    return sequence->Verify(nullptr, tag.get(), Stamp(from).get(), Stamp(to).get());
+    const int code = sequence->Verify(nullptr, tag.get(), Stamp(from).get(), Stamp(to).get());
+    // Keeping the evidence does not change the answer, and what is kept comes to it again.
+    Evidence evidence(nullptr);
+    EXPECT_EQ(sequence->Verify(nullptr, tag.get(), Stamp(from).get(), Stamp(to).get(), evidence),
+              code);
+    EXPECT_EQ(evidence.Judge(tag.get()), code);
+    EXPECT_EQ(evidence.CountCerts(), sequence->Count() / 3);
+    return code;
   }
   // The tag that Verify2 finds; empty for none.
   static std::string Granted(const Ref<CertSequence>& sequence, int code) {

@@ -1,0 +1,142 @@
+// Evidence: what a verification read, and changes to it. Judging it: evidence_judge.cpp.
+#include <vesk2/evidence.h>
+
+#include <algorithm>
+#include <utility>
+
+#include "src/trust/evidence_link.h"
+#include "src/trust/lists.h"
+
+namespace ZvVesk2 {
+
+Evidence::Evidence(Vesk2ContextStruct* ctx) : context(ctx) {}
+Evidence::~Evidence() = default;
+
+void Evidence::Clear(Kind newKind) {
+  kind = newKind;
+  links.reset();
+  count = capacity = 0;
+  for (Ref<SExpression>* list : {&entries, &granting, &storedLists, &carriedLists, &assumed}) {
+    list->Reset();
+  }
+  subject.Reset();
+  for (Ref<TimeStamp>* stamp : {&signingTime, &first, &last, &revocationTime}) stamp->Reset();
+  SetContent(0, 0, 0);
+}
+
+int Evidence::Copy(const Evidence& other) {
+  Clear(other.kind);
+  VESK2_TRY(Reserve(other.count));
+  for (; count < other.count; ++count) {
+    const Link& each = other.links[count];
+    links[count] = {Ref<Cert>::Share(each.cert.get()), Ref<Signature>::Share(each.signature.get()),
+                    Ref<SExpression>::Share(each.source.get()), each.signatureCode, each.status};
+  }
+  entries = Ref<SExpression>::Share(other.entries.get());
+  granting = Ref<SExpression>::Share(other.granting.get());
+  storedLists = Ref<SExpression>::Share(other.storedLists.get());
+  carriedLists = Ref<SExpression>::Share(other.carriedLists.get());
+  assumed = Ref<SExpression>::Share(other.assumed.get());
+  subject = Ref<Subject>::Share(other.subject.get());
+  signingTime = Ref<TimeStamp>::Share(other.signingTime.get());
+  first = Ref<TimeStamp>::Share(other.first.get());
+  last = Ref<TimeStamp>::Share(other.last.get());
+  revocationTime = Ref<TimeStamp>::Share(other.revocationTime.get());
+  SetContent(other.contentCode, other.listingCode, other.listingPosition);
+  return 0;
+}
+
+// ---- What was read ----
+
+Cert* Evidence::GetCert(size_t index) const { return links[index].cert.get(); }
+Signature* Evidence::GetSignature(size_t index) const { return links[index].signature.get(); }
+int Evidence::GetSignatureCode(size_t index) const { return links[index].signatureCode; }
+int32_t Evidence::GetRevocationStatus(size_t index) const { return links[index].status; }
+SExpression* Evidence::GetRevocationSource(size_t index) const { return links[index].source.get(); }
+
+TimeStamp* Evidence::GetFirst() const {
+  return AskedAboutSigning() ? signingTime.get() : first.get();
+}
+TimeStamp* Evidence::GetLast() const {
+  return AskedAboutSigning() ? signingTime.get() : last.get();
+}
+
+// The time of signing stands in for an open end of a manifest's period; a chain has none.
+TimeStamp* Evidence::GetRevocationFirst() const {
+  if (revocationTime) return revocationTime.get();
+  return first ? first.get() : signingTime.get();
+}
+TimeStamp* Evidence::GetRevocationLast() const {
+  if (revocationTime) return revocationTime.get();
+  return last ? last.get() : signingTime.get();
+}
+
+// ---- Changes ----
+
+int Evidence::Reserve(size_t wanted) {
+  if (wanted <= capacity) return 0;
+  const size_t larger = std::max(wanted, capacity * 2);
+  std::unique_ptr<Link[]> moved(TryNewArray<Link>(larger));
+  VESK2_REQUIRE(moved, VESK2_ERR_MEM_ALLOC);
+  std::move(links.get(), links.get() + count, moved.get());
+  links = std::move(moved);
+  capacity = larger;
+  return 0;
+}
+
+int Evidence::AddCert(Cert* cert, Signature* signature, int signatureCode) {
+  VESK2_REQUIRE(cert != nullptr, VESK2_ERR_PARAM_NULL);
+  VESK2_TRY(Reserve(count + 1));
+  Link link;
+  if (cert->GetRevocationElement() != nullptr) {
+    VESK2_TRY(MakeTag(link.source, cert->GetRevocationElement()));
+  }
+  link.cert = Ref<Cert>::Share(cert);
+  link.signature = Ref<Signature>::Share(signature);
+  link.signatureCode = signatureCode;
+  links[count++] = std::move(link);
+  return 0;
+}
+
+void Evidence::RemoveCerts() {
+  if (!subject) subject = Ref<Subject>::Share(AskedSubject());
+  links.reset();
+  count = capacity = 0;
+}
+
+void Evidence::SetEntries(SExpression* acl) { entries = Ref<SExpression>::Share(acl); }
+void Evidence::SetGrantingEntries(SExpression* acl) { granting = Ref<SExpression>::Share(acl); }
+void Evidence::SetLists(SExpression* stored, SExpression* carried) {
+  storedLists = Ref<SExpression>::Share(stored);
+  carriedLists = Ref<SExpression>::Share(carried);
+}
+
+int Evidence::AssumeList(SExpression* source) {
+  VESK2_REQUIRE(source != nullptr, VESK2_ERR_PARAM_NULL);
+  Ref<SExpression> more(TryNew<SExpression>(context));
+  VESK2_REQUIRE(more, VESK2_ERR_MEM_ALLOC);
+  if (assumed) {  // which a copy may share
+    for (auto it = assumed->Begin(); it; it.Next()) VESK2_TRY(AppendShared(more.get(), it.Value()));
+  }
+  VESK2_TRY(AppendShared(more.get(), source));
+  assumed = std::move(more);
+  return 0;
+}
+
+void Evidence::SetSubject(Subject* newSubject) { subject = Ref<Subject>::Share(newSubject); }
+void Evidence::SetSigningTime(TimeStamp* stamp) { signingTime = Ref<TimeStamp>::Share(stamp); }
+void Evidence::SetPeriod(TimeStamp* newFirst, TimeStamp* newLast) {
+  first = Ref<TimeStamp>::Share(newFirst);
+  last = Ref<TimeStamp>::Share(newLast);
+}
+void Evidence::SetRevocationTime(TimeStamp* stamp) {
+  revocationTime = Ref<TimeStamp>::Share(stamp);
+}
+
+void Evidence::SetContent(int code, int codeOfListing, size_t position) {
+  contentCode = code;
+  listingCode = codeOfListing;
+  listingPosition = position;
+}
+
+}  // namespace ZvVesk2

@@ -1,0 +1,192 @@
+// Evidence: what the certificates, entries and lists that were read come to.
+#include <vesk2/evidence.h>
+
+#include <utility>
+
+#include <vesk2/crl.h>
+#include <vesk2/verify.h>
+
+#include "src/sexpr/same.h"
+#include "src/trust/chain.h"
+#include "src/trust/evidence_link.h"
+#include "src/trust/lists.h"
+#include "src/trust/revocation_lists.h"
+
+namespace ZvVesk2 {
+namespace {
+
+// The second certificate of a manifest, counted from 0: the signer's own.
+constexpr size_t kIssuersPlace = 1;
+
+// A clone that may pass its grant on, whatever the certificate says: the signer certificate, which
+// only names the content, is not a delegation.
+int ClonePropagating(Cert& cert, Ref<Cert>& clone) {
+  clone.Reset(TryNew<Cert>(cert.GetContext()));
+  VESK2_REQUIRE(clone, VESK2_ERR_MEM_ALLOC);
+  const bool own = cert.GetPropagate();
+  cert.SetPropagate(true);
+  const int code = clone->Clone(&cert);
+  cert.SetPropagate(own);
+  return code;
+}
+
+int CodeOfStatus(int32_t status) {
+  VESK2_REQUIRE(status != Cert::Undetermined, VESK2_ERR_CRL_NOT_FOUND);
+  return status == Cert::NotRevoked ? 0 : VESK2_ERR_CERT_REVOKED;
+}
+
+// A list remembers that it was proved, which may have been by other entries.
+int AppendUnproved(SExpression* to, SExpression* from) {
+  if (from == nullptr) return 0;
+  for (auto it = from->Begin(); it; it.Next()) {
+    if (auto* const list = dynamic_cast<CrlSequence*>(it.Value())) list->ForgetProof();
+    VESK2_TRY(AppendShared(to, it.Value()));
+  }
+  return 0;
+}
+
+}  // namespace
+
+Subject* Evidence::AskedSubject() const {
+  if (subject) return subject.get();
+  return count > 0 ? GetCert(0)->GetSubject() : nullptr;
+}
+
+// ---- Revocation ----
+
+int Evidence::MarkRevoked() {
+  VESK2_REQUIRE(entries, VESK2_ERR_PARAM_NULL);
+  Ref<SExpression> lists(TryNew<SExpression>(context));
+  VESK2_REQUIRE(lists, VESK2_ERR_MEM_ALLOC);
+  VESK2_TRY(AppendUnproved(lists.get(), storedLists.get()));
+  VESK2_TRY(AppendUnproved(lists.get(), carriedLists.get()));
+  Ref<SExpression> certs(TryNew<SExpression>(context));
+  VESK2_REQUIRE(certs, VESK2_ERR_MEM_ALLOC);
+  for (size_t i = 0; i < count; ++i) VESK2_TRY(AppendShared(certs.get(), GetCert(i)));
+  // The status decides; a certificate about which nothing is known is treated like a revoked one,
+  // but never because there was no memory to ask.
+  RevocationLists revocations(entries.get(), lists.get());
+  VESK2_TRY(revocations.MarkAll(certs.get(), GetRevocationFirst()));
+  for (size_t i = 0; i < count; ++i) {
+    Link& link = links[i];
+    link.status = link.cert->GetRevocationStatus();
+    if (link.status != Cert::Undetermined) continue;
+    bool listed = false;
+    VESK2_TRY(Assumed(listed, link.source.get()));
+    if (listed) link.status = Cert::NotRevoked;
+  }
+  return 0;
+}
+
+int Evidence::Assumed(bool& found, SExpression* source) const {
+  found = false;
+  if (!assumed || source == nullptr) return 0;
+  for (auto it = assumed->Begin(); it && !found; it.Next()) {
+    VESK2_TRY(CompareValues(found, it.Value(), source));
+  }
+  return 0;
+}
+
+int Evidence::CheckRevoked() const {
+  if (kind == Chain) {
+    for (size_t i = 0; i < count; ++i) VESK2_TRY(CodeOfStatus(links[i].status));
+    return 0;
+  }
+  // Without its signer the chain would be another one, about nothing that was signed. The others
+  // are left out, and what is then the second must be the signer's own.
+  VESK2_TRY(count > 0 ? CodeOfStatus(links[0].status) : VESK2_ERR_SIGNING_CERT_ORDER);
+  size_t second = 1;
+  while (second < count && links[second].status != Cert::NotRevoked) ++second;
+  VESK2_REQUIRE(second < count, VESK2_ERR_SIGNING_CERT_ORDER);
+  bool follows = false;
+  VESK2_TRY(CompareValues(follows, GetCert(second)->GetSubject(), GetCert(0)->GetIssuer()));
+  return follows ? 0 : VESK2_ERR_SIGNING_CERT_ORDER;
+}
+
+// ---- Reduction ----
+
+int Evidence::BuildChain(Ref<SExpression>& out) const {
+  Ref<SExpression> chain;
+  VESK2_TRY(SExpression::Create(chain.Out(), "sequence", context));
+  size_t place = 0;
+  for (size_t i = 0; i < count; ++i) {
+    if (kind == SignedManifest && links[i].status != Cert::NotRevoked) continue;
+    VESK2_TRY(AppendLink(chain.get(), i, place++));
+  }
+  out = std::move(chain);
+  return 0;
+}
+
+int Evidence::AppendLink(SExpression* chain, size_t index, size_t place) const {
+  if (kind == Chain) return AppendCopy(chain, GetCert(index));
+  if (place != kIssuersPlace) return AppendShared(chain, GetCert(index));
+  Ref<Cert> clone;
+  VESK2_TRY(ClonePropagating(*GetCert(index), clone));
+  return Append(chain, std::move(clone));
+}
+
+// (valid <stamp>) for the moment of signing, else (valid [(not-before <stamp>)] [(not-after
+// <stamp>)]); null for a chain and no period.
+int Evidence::MakePeriod(Ref<SExpression>& out) const {
+  if (kind == Chain && !first && !last) return 0;
+  Ref<SExpression> valid;
+  VESK2_TRY(SExpression::Create(valid.Out(), "valid", context));
+  if (AskedAboutSigning()) {
+    VESK2_TRY(Append(valid.get(), Ref<TimeStamp>::Share(signingTime.get())));
+  }
+  if (first) VESK2_TRY(AppendPair(valid.get(), "not-before", Ref<TimeStamp>::Share(first.get())));
+  if (last) VESK2_TRY(AppendPair(valid.get(), "not-after", Ref<TimeStamp>::Share(last.get())));
+  out = std::move(valid);
+  return 0;
+}
+
+int Evidence::Reduce(SExpression* tag) const {
+  Ref<SExpression> chain;
+  VESK2_TRY(BuildChain(chain));
+  Ref<SExpression> period;
+  VESK2_TRY(MakePeriod(period));
+  return Verify::ReductA(context, granting ? granting.get() : entries.get(), chain.get(),
+                         AskedSubject(), tag, period.get());
+}
+
+int Evidence::Prove(SExpression* tag) const {
+  VESK2_TRY(CheckRevoked());
+  return Reduce(tag);
+}
+
+int Evidence::Grants(SExpression*& tag, SExpression*& notBefore, SExpression*& notAfter) const {
+  VESK2_TRY(CheckForm());
+  VESK2_TRY(CheckRevoked());
+  Ref<SExpression> chain;
+  VESK2_TRY(BuildChain(chain));
+  return Verify::ReductB(context, granting ? granting.get() : entries.get(), chain.get(),
+                         AskedSubject(), tag, notBefore, notAfter);
+}
+
+// What is refused before any store is asked.
+int Evidence::CheckForm() const {
+  if (kind == Chain) VESK2_REQUIRE(count > 0, VESK2_ERR_INVALID_SEQUENCE);
+  if (kind == SignedManifest) {
+    VESK2_REQUIRE(count > 1, VESK2_ERR_SIGNING_CERT_ORDER);
+    VESK2_REQUIRE(GetCert(0)->GetSubject()->IsHash(), VESK2_ERR_NOT_OBJECT_CERT);
+  }
+  for (size_t i = 0; i < count; ++i) VESK2_TRY(links[i].signatureCode);
+  return entries ? 0 : VESK2_ERR_ACL_ENTRY_NOT_FOUND;
+}
+
+int Evidence::Judge(SExpression* tag) {
+  VESK2_TRY(CheckForm());
+  VESK2_TRY(MarkRevoked());
+  return Prove(tag);
+}
+
+size_t Evidence::Size() const {
+  size_t size = 0;
+  for (size_t i = 0; i < count; ++i) size += GetCert(i)->CanonicalLength();
+  for (SExpression* list : {entries.get(), storedLists.get(), carriedLists.get()}) {
+    if (list != nullptr) size += list->CanonicalLength();
+  }
+  return size;
+}
+
+}  // namespace ZvVesk2
