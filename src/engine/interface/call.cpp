@@ -1,6 +1,8 @@
 // Start and end of an engine call, and the way of objects into the engine.
 #include <new>
 
+#include <vesk2/verify.h>
+
 #include "src/engine/interface/interface.h"
 #include "src/frame/check.h"
 
@@ -48,9 +50,22 @@ int EngineCall::Import(SExpression* expression, spki_elem** list) {
   return 0;
 }
 
+namespace {
+
+// Of this thread, in all its calls.
+thread_local uint64_t workDone = 0;
+
+// Trying to combine two tuples takes about as long as this many steps.
+constexpr uint64_t kStepsPerCombination = 16;
+
+}  // namespace
+
 EngineCall::~EngineCall() {
+  workDone += engine_.budget.comparisons + kStepsPerCombination * engine_.budget.combinations;
   for (spki_elem* list : lists_) spki_list_dispose(&engine_, list);
   if (started_) spki_call_stop(&engine_);
 }
 
 }  // namespace ZvVesk2::Engine
+
+uint64_t ZvVesk2::Verify::WorkDone() { return Engine::workDone; }
