@@ -346,16 +346,36 @@ VESK2_API void SetStoreUpdate(Manifest* manifest, int update);
  * from `notBefore` to `notAfter` (the periods must meet; both times 0: at the moment of signing),
  * that the body is the one that was signed, and compares the directory with it. Unlisted entries
  * are looked for below the root only, not in `directory` itself. Fills the four result lists.
+ *
+ * About the tree, told by the lists (with four empty lists none of these is about the tree):
  *   0                             the directory is as signed, by an authorized signer
  *   VESK2_ERR_HASH_MISMATCH       an entry differs; VESK2_ERR_FILE_NOT_FOUND one is missing;
  *   VESK2_ERR_EXTRA_FILES         one is unlisted (see FailOnExtraEntries); in this priority
- *   VESK2_ERR_HASH_MATCH          the body is not the one that was signed
+ * About the signatures and the content:
+ *   VESK2_ERR_HASH_MISMATCH       (22) a signature is over another certificate: the lists are empty
+ *   VESK2_ERR_SIGNATURE           one does not hold, or is not its certificate's issuer's
+ *   VESK2_ERR_SIGNATURE_ID        by an unknown algorithm; VESK2_ERR_HASH_ID an unknown hash
+ *   VESK2_ERR_NOT_IMPLEMENTED     the signer's key is of a kind that cannot be verified
+ *   VESK2_ERR_NOT_OBJECT_CERT     the first certificate is not for a digest
+ *   VESK2_ERR_HASH_MATCH          the content is not the one that was signed
+ * About the signer's authority:
+ *   VESK2_ERR_FILE_NOT_FOUND      (5) there is no ACL entry to go by: the lists are empty
  *   VESK2_ERR_NOT_AUTHORIZED      nothing is granted; VESK2_ERR_PACKAGE_NOT_GRANTED not the tag
- *   VESK2_ERR_CERT_REVOKED, VESK2_ERR_CRL_NOT_FOUND   the signer certificate was dropped
+ *   VESK2_ERR_CERT_REVOKED        the signer certificate is revoked; VESK2_ERR_CRL_NOT_FOUND no
+ *                                 current list tells whether it is
+ *   VESK2_ERR_SIGNING_CERT_ORDER  the second certificate that is left is not the signer's own
+ *   SPKI_ERR_*                    an entry or certificate that the reduction cannot read, or a
+ *                                 spent budget
+ * About the manifest file:
+ *   VESK2_ERR_OPEN_MANIFEST_FILE; VESK2_ERR_MANIFEST_VERSION, VESK2_ERR_MANIFEST_TYPE;
+ *   VESK2_ERR_TIME_STAMP          the time of signing, or one that was asked about, is none
+ *   VESK2_ERR_PARSE_FILE, VESK2_ERR_MAX_BYTE_STRING, VESK2_ERR_PRINCIPAL, VESK2_ERR_INVALID_HASH,
+ *   VESK2_ERR_BUFFER_OVERFLOW, VESK2_ERR_BIG_INT_BUFFER_SIZE of its readers;
+ *   VESK2_ERR_RANDOM_TOKEN, VESK2_ERR_UNKNOWN_HASH_ID of its listing's
+ * Otherwise:
  *   VESK2_ERR_USER_INTERRUPT      a callback ended it (SetFileCallbacks)
- *   VESK2_ERR_MEM_ALLOC           memory or descriptors ran out: nothing was decided
- *   VESK2_ERR_READ_FILE           another process held a file of a store for a minute: the same
- *   VESK2_ERR_OPEN_MANIFEST_FILE and the codes of its readers for a malformed file. */
+ *   VESK2_ERR_READ_FILE           another process held a file of a store for a minute
+ *   VESK2_ERR_MEM_ALLOC           memory or descriptors ran out; nothing was decided then */
 VESK2_API int VerifyManifest(Manifest* manifest, time_t notBefore, time_t notAfter);
 
 /* CompareManifest compares this manifest's body (the reference) with that of another manifest.

@@ -22,7 +22,6 @@
 #include "src/objects/build.h"
 #include "src/platform/wait.h"
 #include "src/sexpr/same.h"
-#include "src/trust/chain.h"
 #include "src/trust/revocation_lists.h"
 
 namespace ZvVesk2 {
@@ -188,7 +187,6 @@ int ManifestReader::ProveAuthority() {
 
 int ManifestReader::AskAuthority(SExpression* carried) {
   VESK2_TRY(Refuse(LoadLists(carried)));
-  if (readsOn_) VESK2_TRY(AddUnvouched(evidence_, Context()));
   if (refusal_ != 0) return 0;
   // What cannot be stored changes no answer.
   if (manifest_.storeUpdate) {

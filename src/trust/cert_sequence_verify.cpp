@@ -81,7 +81,6 @@ int CertSequence::Verify(Subject* subject, SExpression* tag, TimeStamp* notBefor
   VESK2_REQUIRE(!LacksMemory(signatures), signatures);
   const int stores = AskStores(evidence, GetContext());
   VESK2_REQUIRE(!LacksMemory(stores), stores);
-  VESK2_TRY(AddUnvouched(evidence, GetContext()));
   // What the stores say was asked for the evidence only when a signature does not hold.
   VESK2_TRY(signatures);
   VESK2_TRY(stores);

@@ -4,7 +4,6 @@
 #define VESK2_SRC_TRUST_CHAIN_H
 
 #include <vesk2/cert.h>
-#include <vesk2/evidence.h>
 #include <vesk2/ref.h>
 #include <vesk2/signature.h>
 
@@ -30,10 +29,6 @@ SExpression::Iterator FirstItem(const SExpression* sequence);
 // VESK2_ERR_ACL_ENTRY_NOT_FOUND: without all of its roots a machine trusts nobody. A lack of memory
 // and a file that another process holds (VESK2_ERR_READ_FILE) are no absence and come through.
 [[nodiscard]] int LoadRoots(Ref<SExpression>& acls, Vesk2ContextStruct* ctx);
-
-// AddUnvouched adds the stored lists of sources that a certificate names and no entry does. They
-// count for nothing, but tell who could be believed.
-[[nodiscard]] int AddUnvouched(Evidence& evidence, Vesk2ContextStruct* ctx);
 
 // AppendCopy appends a copy of the certificate without its revocation element, which the reduction
 // knows nothing of.

@@ -3,6 +3,7 @@
 
 #include <algorithm>
 
+#include "tools/vesk2/effort.h"
 #include "tools/vesk2/hypothesis.h"
 #include "tools/vesk2/inspect.h"
 #include "tools/vesk2/report.h"
@@ -173,6 +174,7 @@ class Search {
 
   void Tag(const std::string& name, SExpression* tag) {
     for (const auto& member : question_.request->members) {
+      SpendEffort();
       if (tag == nullptr || member.tag->IsSubset(tag)) continue;
       Add("tag", name + " grants " + TagText(tag) + ", asked was " + TagText(member.tag.get()));
       return;
@@ -255,6 +257,7 @@ class Search {
 
   // The engine's answer about one credential alone.
   int TryReduction(const std::string& head, DExpression* credential) {
+    SpendEffort();
     Ref<SExpression> acl;
     Ref<SExpression> sequence;
     Check(SExpression::Create(acl.Out(), "acl", nullptr), "building a list");

@@ -1,8 +1,12 @@
 // cert_verify.cpp: vesk2 cert verify.
 #include "tools/vesk2/command.h"
+#include "tools/vesk2/effort.h"
 #include "tools/vesk2/explain.h"
 #include "tools/vesk2/inspect.h"
 #include "tools/vesk2/report.h"
+#include "tools/vesk2/store_check.h"
+
+#include <vesk2/evidence.h>
 
 namespace vesk2_command {
 namespace {
@@ -13,6 +17,7 @@ struct Options {
   std::string at;
   PeriodOptions period;
   bool explain = false;
+  StoreCheck stores;
 };
 
 Period AskedPeriod(const Options& options) {
@@ -24,16 +29,23 @@ Period AskedPeriod(const Options& options) {
 }
 
 // The answer about every member; the first refusal is the answer to all.
-int VerifyMembers(const CertChain& chain, const Question& question) {
+int VerifyMembers(const CertChain& chain, const Question& question, const StoreCheck& stores,
+                  ZvVesk2::Evidence& proved) {
   const Request& request = *question.request;
   int first = 0;
   for (size_t i = 0; i < request.members.size(); ++i) {
-    const int code = chain->Verify(nullptr, request.members[i].tag.get(),
-                                   question.period.notBefore.get(), question.period.notAfter.get());
-    if (code < 0 || code == VESK2_ERR_MEM_ALLOC || code == VESK2_ERR_READ_FILE) {
+    SExpression* tag = request.members[i].tag.get();
+    const int code = i != 0 ? proved.Judge(tag)
+                            : chain->Verify(nullptr, tag, question.period.notBefore.get(),
+                                            question.period.notAfter.get(), proved);
+    if (code == VESK2_ERR_MEM_ALLOC || code == VESK2_ERR_READ_FILE)
+      Check(code, Escape(question.file));
+    if (proved.GetEntries() == nullptr) ThrowNoStore(VESK2_ERR_ACL_ENTRY_NOT_FOUND);
+    if (code < 0) {
       ExplainUnreadable(question, code);
       Check(code, Escape(question.file));
     }
+    if (i == 0) (void)CheckStores(question, stores);
     TellMember(request, i, code);
     if (first == 0) first = code;
   }
@@ -41,6 +53,7 @@ int VerifyMembers(const CertChain& chain, const Question& question) {
 }
 
 ExitCode Run(const Options& options) {
+  StartAnswer();
   const Request request = ParseRequest(options.tag);
   Question question;
   question.file = options.file;
@@ -48,13 +61,14 @@ ExitCode Run(const Options& options) {
   question.period = AskedPeriod(options);
   const CertChain chain = ReadCertChain(options.file);
   const std::vector<ChainLink> links = ChainLinks(chain, options.file);
-  (void)LoadAcls();  // says why there is nothing to go by
 
   const std::string tag = TagText(request.tag.get());
   const std::string subject = SubjectText(*links[0].cert->GetSubject());
   Result()["subject"] = subject;
   Result()["tag"] = tag;
-  const int code = VerifyMembers(chain, question);
+  ZvVesk2::Evidence proved(nullptr);
+  question.proved = &proved;
+  const int code = VerifyMembers(chain, question, options.stores, proved);
   if (code != 0) {
     const ExitCode verdict = No(code, CodeWords(code));
     ExplainRefusal(question, code);
@@ -77,6 +91,7 @@ Action DefineCertVerify(CLI::App& app) {
   app.add_option("--at", options->at, "Authorized at this moment [now]")
       ->excludes("--not-before")
       ->excludes("--not-after");
+  AddStoreCheckOptions(app, options->stores);
   app.add_flag("--explain", options->explain, "Tell why also when the answer is yes");
   return [options] { return Run(*options); };
 }

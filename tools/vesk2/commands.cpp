@@ -32,8 +32,9 @@ constexpr Noun kNouns[] = {
      "A manifest lists every file of a directory with its digest, and is signed. It carries the "
      "signer's certificates, so that whoever gets it needs nothing else. Verifying asks two "
      "things: is the directory as listed, and was the signer authorized?\n"
-     "The second is asked about the time of signing, which is the signer's word; --at asks about "
-     "another moment."},
+     "The second is asked about the time of signing, which is the signer's word, with what is "
+     "revoked by now: a lost key can date back, so revoke it with --revoke-key. --at signing takes "
+     "the signer's word for revocation too; --at asks about another moment."},
     {"tag", "Compare tags",
      "A tag says what is granted, or asked. A longer list is narrower: who was granted (install) "
      "may also (install (app calc)), not the other way round."},

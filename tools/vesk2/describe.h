@@ -32,7 +32,7 @@ Sheet DescribeChain(const std::vector<ChainLink>& links);
 Sheet DescribeCrl(const ZvVesk2::Crl& list);
 Sheet DescribeCrl(CrlSequence& list);
 
-// A manifest, `code` being what CheckManifest says of it.
+// A manifest, `code` being what CheckBlock says of it.
 Sheet DescribeManifest(const SignatureBlock& block, int code);
 
 // Adds the row and the member "signature" for a checked signature's code.

@@ -1,11 +1,9 @@
-// evidence.cpp: reading again what an answer rests on.
+// evidence.cpp: what an answer rests on.
 #include "tools/vesk2/evidence.h"
 
 #include <algorithm>
 #include <filesystem>
 
-#include "tools/vesk2/key_source.h"
-#include "tools/vesk2/manifest_file.h"
 #include "tools/vesk2/report.h"
 #include "tools/vesk2/stores.h"
 
@@ -31,30 +29,19 @@ bool IsDigestOf(const Hash& hash, DExpression& key) {
          std::equal(digest, digest + length, named->GetData());
 }
 
-void ReadFileParts(const Question& question, Evidence& evidence) {
-  std::vector<SignedCert> certs;
-  if (question.manifest) {
-    SignatureBlock block = ReadSignatureBlock(question.file);
-    certs = std::move(block.certs);
-    evidence.signedAt = std::move(block.signedAt);
-    evidence.damage = block.damage;
-    evidence.contentSigned = block.contentSigned && block.damage.empty();
-    for (const auto& list : block.crls) evidence.carried.push_back(Canonical(*list));
-  } else {
-    certs = ReadCerts(question.file);
-  }
-  for (SignedCert& each : certs) {
-    const int code = each.signature->Verify(each.cert.get());
-    Ref<SExpression> source = RevocationSource(*each.cert);
-    evidence.certs.push_back(
-        {std::move(each.cert), std::move(each.signature), code, std::move(source)});
+void TakeCerts(Evidence& evidence) {
+  const ZvVesk2::Evidence& proved = *evidence.proved;
+  for (size_t i = 0; i < proved.CountCerts(); ++i) {
+    evidence.certs.push_back({Ref<Cert>::Share(proved.GetCert(i)),
+                              Ref<ZvVesk2::Signature>::Share(proved.GetSignature(i)),
+                              proved.GetSignatureCode(i),
+                              Ref<SExpression>::Share(proved.GetRevocationSource(i))});
   }
 }
 
-void ReadEntries(const Question& question, Evidence& evidence) {
-  const std::string& extra = question.aclDirectory;
-  Ref<SExpression> acls;
-  if (AclEntry::Import(acls.Out(), nullptr, extra.empty() ? nullptr : extra.c_str()) != 0) return;
+void TakeEntries(Evidence& evidence) {
+  const SExpression* acls = evidence.proved->GetEntries();
+  if (acls == nullptr) return;
   for (auto it = acls->Begin(); it; it.Next()) {
     auto* entry = dynamic_cast<AclEntry*>(it.Value());
     if (entry == nullptr) continue;
@@ -65,22 +52,35 @@ void ReadEntries(const Question& question, Evidence& evidence) {
   }
 }
 
-// The library takes times as seconds about a manifest, and 0 for none.
-TimeStamp* Asked(const Question& question, const Ref<TimeStamp>& stamp) {
-  const bool none = !stamp || (question.manifest && stamp->ToTime() == 0);
-  return none ? nullptr : stamp.get();
+std::vector<CrlSequence*> ListsOf(const SExpression* lists) {
+  std::vector<CrlSequence*> found;
+  if (lists == nullptr) return found;
+  for (auto it = lists->Begin(); it; it.Next()) {
+    auto* list = dynamic_cast<CrlSequence*>(it.Value());
+    if (list != nullptr && list->First() != nullptr) found.push_back(list);
+  }
+  return found;
 }
 
 }  // namespace
 
 Evidence GatherEvidence(const Question& question) {
   Evidence evidence;
-  ReadFileParts(question, evidence);
-  ReadEntries(question, evidence);
-  evidence.first = Asked(question, question.period.notBefore);
-  evidence.last = Asked(question, question.period.notAfter);
-  if (question.manifest && evidence.first == nullptr && evidence.last == nullptr) {
-    evidence.first = evidence.last = evidence.signedAt.get();
+  evidence.proved = question.proved;
+  if (evidence.proved == nullptr) return evidence;
+  const ZvVesk2::Evidence& proved = *evidence.proved;
+  TakeCerts(evidence);
+  TakeEntries(evidence);
+  for (CrlSequence* list : ListsOf(proved.GetCarriedLists())) {
+    evidence.carried.push_back(Canonical(*list));
+  }
+  evidence.signedAt = Ref<TimeStamp>::Share(proved.GetSigningTime());
+  evidence.first = proved.GetFirst();
+  evidence.last = proved.GetLast();
+  evidence.contentSigned = proved.GetContentCode() == 0 && proved.GetListingCode() == 0;
+  if (proved.GetListingCode() != 0) {
+    evidence.damage = "byte " + std::to_string(proved.GetListingPosition()) + ": " +
+                      Reason(proved.GetListingCode());
   }
   return evidence;
 }
@@ -130,10 +130,17 @@ Ref<SExpression> EntryList(const std::vector<AclEntry*>& entries) {
   return list;
 }
 
-Ref<SExpression> LoadLists(const Evidence& evidence, SExpression* entries) {
-  Ref<SExpression> lists;
-  Check(CrlSequence::ImportStore(lists.Out(), entries, nullptr), "reading revocation lists");
-  for (const std::string& text : evidence.carried) {
+Ref<SExpression> LoadLists(const Evidence& evidence, SExpression*) {
+  std::vector<std::string> texts;
+  if (evidence.proved != nullptr) {
+    for (CrlSequence* list : ListsOf(evidence.proved->GetStoredLists())) {
+      texts.push_back(Canonical(*list));
+    }
+  }
+  texts.insert(texts.end(), evidence.carried.begin(), evidence.carried.end());
+  // A list remembers who proved it; copies do not.
+  Ref<SExpression> lists(new SExpression(nullptr));
+  for (const std::string& text : texts) {
     const Ref<CrlSequence> list(new CrlSequence(nullptr));
     const Buffer buffer = WrapBytes(text);
     if (list->Import(buffer.get()) == 0) InsertShared(*lists, list.get());

@@ -1,5 +1,5 @@
-// evidence.h: what an answer about authority rests on, read again by the library's public
-// interface: the certificates, the ACL entries and the revocation lists.
+// evidence.h: what an answer about authority rests on, as the verification kept it: the
+// certificates, the ACL entries and the revocation lists. Nothing is read again.
 #ifndef VESK2_TOOLS_EVIDENCE_H
 #define VESK2_TOOLS_EVIDENCE_H
 
@@ -12,6 +12,7 @@
 
 #include <vesk2/acl_entry.h>
 #include <vesk2/crl.h>
+#include <vesk2/evidence.h>
 
 namespace vesk2_command {
 
@@ -24,6 +25,8 @@ struct Question {
   std::string aclDirectory;  // entries beside the store's, or empty
   // How to sign the manifest again: its directory, and options for what was left out of it.
   std::vector<std::string> signing = {};
+  // What the verification that answered kept.
+  const ZvVesk2::Evidence* proved = nullptr;
 };
 
 struct CertEvidence {
@@ -40,21 +43,21 @@ struct EntryEvidence {
 };
 
 struct Evidence {
+  const ZvVesk2::Evidence* proved = nullptr;
   std::vector<CertEvidence> certs;     // the end of the chain first
   std::vector<EntryEvidence> entries;  // as the library loads them
   std::vector<std::string> carried;    // the canonical text of a manifest's lists
   Ref<TimeStamp> signedAt;             // of a manifest
   bool contentSigned = true;           // a manifest's signer names the content that is there
   std::string damage;                  // where a manifest's listing stops making sense
-  // The period asked about; null where it is open. Revocation is asked about the same, but the time
-  // of signing stands in for an open end of a manifest's.
+  // The period asked about; null where it is open.
   TimeStamp* first = nullptr;
   TimeStamp* last = nullptr;
 
-  TimeStamp* RevocationStart() const { return first != nullptr ? first : signedAt.get(); }
-  TimeStamp* RevocationEnd() const { return last != nullptr ? last : signedAt.get(); }
+  // The moment about which revocation was asked.
+  TimeStamp* RevocationStart() const { return proved->GetRevocationFirst(); }
 };
-// GatherEvidence reads what there is; no store means no entries.
+// GatherEvidence takes apart what was proved for a question.
 Evidence GatherEvidence(const Question& question);
 
 // Whether a subject is a key, names it by its digest or counts it among its k-of-n.
@@ -63,7 +66,8 @@ bool Names(ZvVesk2::Subject* subject, DExpression* key);
 Ref<SExpression> RevocationSource(const ZvVesk2::Cert& cert);
 // The last entry of exactly that tag, which decides whose lists count; null without one.
 const EntryEvidence* Voucher(const Evidence& evidence, SExpression* source);
-// The lists that count with these entries: the stored ones, then a manifest's own.
+// Fresh copies of the lists, the stored ones first, then a manifest's own: which of them count is
+// for these entries to say (CrlSequence::VerifySelf).
 Ref<SExpression> LoadLists(const Evidence& evidence, SExpression* entries);
 // (acl ENTRY...) of the evidence.
 Ref<SExpression> EntryList(const std::vector<ZvVesk2::AclEntry*>& entries);

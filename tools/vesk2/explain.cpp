@@ -6,10 +6,12 @@
 #include <filesystem>
 
 #include "tools/vesk2/authority.h"
+#include "tools/vesk2/effort.h"
 #include "tools/vesk2/hypothesis.h"
 #include "tools/vesk2/inspect.h"
 #include "tools/vesk2/remedy.h"
 #include "tools/vesk2/report.h"
+#include "tools/vesk2/revocation.h"
 #include "tools/vesk2/stores.h"
 #include "tools/vesk2/tell_remedies.h"
 
@@ -42,26 +44,6 @@ std::string CommentOf(const ByteString* comment) {
 }
 
 // ---- Revocation ----
-
-// The list that speaks for a certificate: of its source the one that ends last.
-Ref<CrlSequence> DecidingList(const Evidence& evidence, SExpression* source) {
-  const Ref<SExpression> entries = EntryList(AllEntries(evidence));
-  const Ref<SExpression> lists = LoadLists(evidence, entries.get());
-  Ref<CrlSequence> deciding;
-  for (auto it = lists->Begin(); it; it.Next()) {
-    auto* list = dynamic_cast<CrlSequence*>(it.Value());
-    if (list == nullptr || list->First() == nullptr) continue;
-    const TimeStamp* end = list->GetCert()->GetNotAfter();
-    if (end == nullptr || !list->GetCert()->GetTag() ||
-        !list->GetCert()->GetTag()->IsEqual(source) || list->VerifySelf(entries.get()) != 0) {
-      continue;
-    }
-    if (!deciding || end->IsAfter(deciding->GetCert()->GetNotAfter())) {
-      deciding = Ref<CrlSequence>::Share(list);
-    }
-  }
-  return deciding;
-}
 
 // When a list was made, as far as it tells: its beginning, or the newest date in it.
 const TimeStamp* MadeAt(const CrlSequence& list, const TimeStamp& now) {
@@ -112,15 +94,13 @@ const char* StateWord(int32_t state) {
   }
 }
 
-Json RevocationJson(const Evidence& evidence, size_t index, int32_t state) {
+Json RevocationJson(const Evidence& evidence, const RevocationLists& lists, size_t index,
+                    int32_t state) {
   SExpression* source = evidence.certs[index].source.get();
   Json json = {{"state", StateWord(state)},
                {"source", source != nullptr ? Json(TagText(source)) : Json()},
                {"list", Json()}};
-  if (source == nullptr) return json;
-  if (const Ref<CrlSequence> list = DecidingList(evidence, source)) {
-    json["list"] = ListJson(*list);
-  }
+  if (const CrlSequence* list = lists.Deciding(source)) json["list"] = ListJson(*list);
   return json;
 }
 
@@ -136,13 +116,13 @@ Json GrantJson(Grant& grant) {
           {"comment", CommentOf(grant.GetComment())}};
 }
 
-Json CertJson(const Evidence& evidence, size_t index, int32_t state) {
+Json CertJson(const Evidence& evidence, const RevocationLists& lists, size_t index, int32_t state) {
   const CertEvidence& each = evidence.certs[index];
   Json json = {{"certificate", index + 1}, {"issuer", SubjectText(*each.cert->GetIssuer())}};
   json.update(GrantJson(*each.cert));
   json["signature"] = {
       {"holds", each.code == 0}, {"reason", ReasonWord(each.code)}, {"code", each.code}};
-  json["revocation"] = RevocationJson(evidence, index, state);
+  json["revocation"] = RevocationJson(evidence, lists, index, state);
   return json;
 }
 
@@ -172,11 +152,11 @@ std::string CertText(const Evidence& evidence, size_t index, const Json& json) {
 }
 
 // The certificates, and the entries that name one of their keys.
-void TellFacts(const Evidence& evidence) {
+void TellFacts(const Evidence& evidence, const RevocationLists& lists) {
   const std::vector<int32_t> states = RevocationStates(evidence);
   Json& chain = Result()["chain"] = Json::array();
   for (size_t i = 0; i < evidence.certs.size(); ++i) {
-    chain.push_back(CertJson(evidence, i, states[i]));
+    chain.push_back(CertJson(evidence, lists, i, states[i]));
     Note(CertText(evidence, i, chain.back()));
   }
   Json& acl = Result()["acl"] = Json::array();
@@ -199,7 +179,7 @@ void TellLosses(const std::vector<Loss>& losses) {
 
 // ---- The path of a yes ----
 
-void TellPath(const Question& question, const Evidence& evidence) {
+void TellPath(const Question& question, const Evidence& evidence, const RevocationLists& lists) {
   Json json = {{"path", Json::array()}, {"ends", Json()}, {"lists", Json::array()}};
   const std::optional<AuthorityPath> path = FindPath(question, evidence);
   if (!path) {
@@ -218,9 +198,8 @@ void TellPath(const Question& question, const Evidence& evidence) {
   Note(path->ends != nullptr ? "it ends at " + StampText(*path->ends) : "it has no end");
   for (const size_t index : path->certs) {
     SExpression* source = evidence.certs[index].source.get();
-    const Ref<CrlSequence> list =
-        source != nullptr ? DecidingList(evidence, source) : Ref<CrlSequence>();
-    if (!list) continue;
+    const CrlSequence* list = lists.Deciding(source);
+    if (list == nullptr) continue;
     Json used = {{"source", TagText(source)}};
     used.update(ListJson(*list));
     json["lists"].push_back(used);
@@ -233,6 +212,7 @@ void TellPath(const Question& question, const Evidence& evidence) {
 // An explanation that cannot be had must not stand in for the answer.
 template <typename Tell>
 void Explain(Tell&& tell) {
+  StartEffort();
   try {
     tell();
   } catch (const Trouble& trouble) {
@@ -245,7 +225,7 @@ void Explain(Tell&& tell) {
 void ExplainRefusal(const Question& question, int code) {
   Explain([&] {
     const Evidence evidence = GatherEvidence(question);
-    TellFacts(evidence);
+    TellFacts(evidence, RevocationLists(evidence));
     TellLosses(FindLosses(question, evidence, code));
     TellRemedies(FindRemedies(question, evidence, code));
   });
@@ -258,8 +238,9 @@ void ExplainTree(const Question& question) {
 void ExplainGrant(const Question& question) {
   Explain([&] {
     const Evidence evidence = GatherEvidence(question);
-    TellFacts(evidence);
-    TellPath(question, evidence);
+    const RevocationLists lists(evidence);
+    TellFacts(evidence, lists);
+    TellPath(question, evidence, lists);
   });
 }
 

@@ -1,8 +1,8 @@
 // explain.h: why an answer about authority is what it is, and what would make a refusal a yes: for
 // people as notes, for machines in Result().
 //
-// The verdict is the library's. These functions look at the same files again, by the public
-// interface, and never change it.
+// The verdict is the library's. These functions look at what the library kept of it, open no file,
+// and never change it.
 #ifndef VESK2_TOOLS_EXPLAIN_H
 #define VESK2_TOOLS_EXPLAIN_H
 

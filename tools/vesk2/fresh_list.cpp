@@ -10,11 +10,16 @@
 namespace vesk2_command {
 namespace {
 
-// The stored list of a source, if it can be read.
-Ref<CrlSequence> StoredList(SExpression* source) {
-  Ref<CrlSequence> stored;
-  if (CrlSequence::Find(stored.Out(), source) != 0) stored.Reset();
-  return stored;
+// The stored list of a source, as the verification loaded it.
+Ref<CrlSequence> StoredList(const Evidence& evidence, SExpression* source) {
+  const SExpression* lists = evidence.proved->GetStoredLists();
+  if (lists == nullptr) return {};
+  for (auto it = lists->Begin(); it; it.Next()) {
+    auto* list = dynamic_cast<CrlSequence*>(it.Value());
+    SExpression* tag = list != nullptr ? list->GetCert()->GetTag() : nullptr;
+    if (tag != nullptr && tag->IsEqual(source)) return Ref<CrlSequence>::Share(list);
+  }
+  return {};
 }
 
 // The words of a tag as a file name.
@@ -51,7 +56,7 @@ void EditMaker::FreshList(std::vector<Edit>& edits, size_t index) const {
   const EntryEvidence* voucher = Voucher(evidence_, source);
   if (voucher == nullptr || !voucher->inStore) return;  // the store would not take its lists
   auto* revoker = dynamic_cast<PublicKey*>(voucher->entry->GetSubject());
-  const Ref<CrlSequence> stored = StoredList(source);
+  const Ref<CrlSequence> stored = StoredList(evidence_, source);
   const std::string until = LastYearOf(evidence_.RevocationStart(), stored.get());
   if (revoker == nullptr || until.empty() || policy_.IsRevoked(revoker)) return;
 

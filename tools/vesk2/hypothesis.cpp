@@ -3,7 +3,7 @@
 
 #include <algorithm>
 
-#include <vesk2/verify.h>
+#include "tools/vesk2/effort.h"
 
 namespace vesk2_command {
 namespace {
@@ -11,55 +11,74 @@ namespace {
 using ZvVesk2::AclEntry;
 using ZvVesk2::Cert;
 
-// A chain or manifest with the hypothesis in place.
+// What was proved, with the hypothesis in place.
 class World {
  public:
   World(const Evidence& evidence, const Hypothesis& hypothesis)
-      : evidence_(evidence), hypothesis_(hypothesis) {
-    if (!evidence.certs.empty()) subject_ = evidence.certs[0].cert->GetSubject();
-    if (!hypothesis.signedAgain.empty()) {
-      for (Cert* cert : hypothesis.signedAgain) certs_.push_back({cert, 0, nullptr});
-    } else {
-      AddCerts();
+      : evidence_(evidence), hypothesis_(hypothesis), changed_(nullptr) {
+    if (evidence.proved == nullptr) throw Trouble("nothing was verified");
+    SpendEffort(*evidence.proved);
+    Check(changed_.Copy(*evidence.proved), "judging a change");
+    ChangeCerts();
+    ChangeEntries();
+    for (SExpression* source : hypothesis.freshLists) {
+      Check(changed_.AssumeList(source), "judging a change");
     }
-    AddEntries();
-    statuses_ = States();
+    if (hypothesis.at != nullptr) changed_.SetSigningTime(hypothesis.at);
   }
 
-  const std::vector<int32_t>& statuses() const { return statuses_; }
-
-  int Judge(bool manifest, const std::vector<SExpression*>& tags) const {
-    Ref<SExpression> chain = Empty("sequence");
-    const int code = manifest ? BuildManifestChain(*chain) : BuildChain(*chain);
-    return code != 0 ? code : Reduce(*chain, tags, MakePeriod().get());
+  int Judge(const std::vector<SExpression*>& tags) {
+    int code = changed_.Judge(tags.at(0));
+    for (size_t i = 1; i < tags.size() && code == 0; ++i) code = changed_.Prove(tags[i]);
+    if (code == VESK2_ERR_MEM_ALLOC) throw std::bad_alloc();
+    return code;
   }
 
-  Granted Grants(bool manifest) const {
+  Granted Grants() {
     Granted granted;
-    Ref<SExpression> chain = Empty("sequence");
-    if ((manifest ? BuildManifestChain(*chain) : BuildChain(*chain)) != 0) return granted;
-    (void)ZvVesk2::Verify::ReductB(nullptr, granting_.get(), chain.get(), subject_,
-                                   granted.tag.Out(), granted.notBefore.Out(),
-                                   granted.notAfter.Out());
+    MarkRevoked();
+    (void)changed_.Grants(granted.tag.Out(), granted.notBefore.Out(), granted.notAfter.Out());
     return granted;
   }
 
- private:
-  struct Link {
-    Cert* cert;
-    int code;
-    SExpression* source;
-  };
-
-  static Ref<SExpression> Empty(const char* head) {
-    Ref<SExpression> list;
-    Check(SExpression::Create(list.Out(), head, nullptr), "building a list");
-    return list;
+  std::vector<int32_t> States() {
+    MarkRevoked();
+    std::vector<int32_t> states;
+    for (size_t i = 0; i < changed_.CountCerts(); ++i) {
+      states.push_back(changed_.GetRevocationStatus(i));
+    }
+    return states;
   }
 
-  static int StatusCode(int32_t status) {
-    if (status == Cert::Undetermined) return VESK2_ERR_CRL_NOT_FOUND;
-    return status == Cert::NotRevoked ? 0 : VESK2_ERR_CERT_REVOKED;
+ private:
+  void MarkRevoked() { Check(changed_.MarkRevoked(), "asking the revocation lists"); }
+  void Add(Cert& cert, ZvVesk2::Signature* signature, int code) {
+    Check(changed_.AddCert(&cert, signature, code), "judging a change");
+  }
+
+  void ChangeCerts() {
+    if (hypothesis_.signedAgain.empty() && hypothesis_.certs.empty() &&
+        hypothesis_.coSigners.empty() && hypothesis_.withoutCerts.empty()) {
+      return;
+    }
+    changed_.RemoveCerts();
+    for (Cert* cert : hypothesis_.signedAgain) Add(*cert, nullptr, 0);
+    if (!hypothesis_.signedAgain.empty()) return;
+    for (size_t i = 0; i < evidence_.certs.size(); ++i) {
+      if (hypothesis_.withoutCerts.count(i) != 0) continue;
+      const CertEvidence& each = evidence_.certs[i];
+      const auto other = hypothesis_.certs.find(i);
+      const bool replaced = other != hypothesis_.certs.end();
+      AddCoSigned(i, replaced ? *other->second : *each.cert);
+      if (replaced) Add(*other->second, nullptr, 0);
+      if (!replaced) Add(*each.cert, each.signature.get(), each.code);
+    }
+  }
+
+  // Each stands before the one that was there, as `cert cosign` writes it.
+  void AddCoSigned(size_t index, Cert& cert) {
+    const auto [first, last] = hypothesis_.coSigners.equal_range(index);
+    for (auto it = last; it != first;) Add(*Reissued(cert, *(--it)->second), nullptr, 0);
   }
 
   static Ref<Cert> Reissued(const Cert& old, PublicKey& issuer) {
@@ -70,26 +89,13 @@ class World {
     return cert;
   }
 
-  void AddCerts() {
-    for (size_t i = 0; i < evidence_.certs.size(); ++i) {
-      if (hypothesis_.withoutCerts.count(i) != 0) continue;
-      const CertEvidence& each = evidence_.certs[i];
-      const auto other = hypothesis_.certs.find(i);
-      const bool replaced = other != hypothesis_.certs.end();
-      Cert* cert = replaced ? other->second : each.cert.get();
-      // Each stands before the one that was there, as `cert cosign` writes it.
-      const auto [first, last] = hypothesis_.coSigners.equal_range(i);
-      for (auto it = last; it != first;) {
-        coSigned_.push_back(Reissued(*cert, *(--it)->second));
-        certs_.push_back({coSigned_.back().get(), 0, each.source.get()});
-      }
-      certs_.push_back({cert, replaced ? 0 : each.code, each.source.get()});
-    }
-  }
-
   // The store's entries in byte order of their files' names, as the library reads them, and those
   // of the other directory.
-  void AddEntries() {
+  void ChangeEntries() {
+    if (hypothesis_.only != nullptr) {
+      changed_.SetGrantingEntries(EntryList({const_cast<AclEntry*>(hypothesis_.only)}).get());
+    }
+    if (hypothesis_.entries.empty() && changed_.GetEntries() != nullptr) return;
     std::map<std::string, AclEntry*> store;
     std::vector<AclEntry*> others;
     for (const EntryEvidence& each : evidence_.entries) {
@@ -100,132 +106,12 @@ class World {
     std::vector<AclEntry*> entries;
     for (const auto& [file, entry] : store) entries.push_back(entry);
     entries.insert(entries.end(), others.begin(), others.end());
-    all_ = EntryList(entries);
-    if (hypothesis_.only != nullptr) {
-      std::erase_if(entries, [&](const AclEntry* each) { return each != hypothesis_.only; });
-    }
-    granting_ = EntryList(entries);
-  }
-
-  bool IsFresh(SExpression* source) const {
-    const std::vector<SExpression*>& fresh = hypothesis_.freshLists;
-    return source != nullptr && std::any_of(fresh.begin(), fresh.end(), [&](SExpression* each) {
-             return each->IsEqual(source);
-           });
-  }
-
-  std::vector<int32_t> States() const {
-    std::vector<int32_t> states;
-    const Ref<SExpression> lists = LoadLists(evidence_, all_.get());
-    for (const Link& link : certs_) {
-      bool revoked = false;
-      (void)link.cert->IsRevoked(revoked, all_.get(), lists.get(), RevocationStart(),
-                                 RevocationEnd());
-      int32_t state = link.cert->GetRevocationStatus();
-      if (state == Cert::Undetermined && IsFresh(link.source)) state = Cert::NotRevoked;
-      states.push_back(state);
-    }
-    return states;
-  }
-
-  int SignatureCode() const {
-    for (const Link& link : certs_) {
-      if (link.code != 0) return link.code;
-    }
-    return 0;
-  }
-
-  // A copy that says nothing of revocation, or lets its subject pass the grant on.
-  static void InsertCopy(SExpression& chain, Cert& cert, bool propagate, SExpression* revocation) {
-    SExpression* own = cert.GetRevocationElement();
-    const bool passes = cert.GetPropagate();
-    const Ref<Cert> copy(new Cert(nullptr));
-    cert.SetRevocationElement(revocation);
-    cert.SetPropagate(propagate);
-    const int code = copy->Clone(&cert);
-    cert.SetRevocationElement(own);
-    cert.SetPropagate(passes);
-    Check(code, "copying a certificate");
-    InsertShared(chain, copy.get());
-  }
-
-  int BuildChain(SExpression& chain) const {
-    if (subject_ == nullptr) return VESK2_ERR_INVALID_SEQUENCE;
-    if (const int code = SignatureCode()) return code;
-    for (const int32_t status : statuses_) {
-      if (const int code = StatusCode(status)) return code;
-    }
-    for (const Link& link : certs_) {
-      InsertCopy(chain, *link.cert, link.cert->GetPropagate(), nullptr);
-    }
-    return 0;
-  }
-
-  // Certificates that are not known to be good are left out, and what is then the second must be
-  // the signer's own, which need not let it pass on what it names: content.
-  int BuildManifestChain(SExpression& chain) const {
-    if (certs_.size() < 2) return VESK2_ERR_SIGNING_CERT_ORDER;
-    if (!certs_[0].cert->GetSubject()->IsHash()) return VESK2_ERR_NOT_OBJECT_CERT;
-    if (const int code = SignatureCode()) return code;
-    if (const int code = StatusCode(statuses_[0])) return code;
-    size_t place = 0;
-    for (size_t i = 0; i < certs_.size(); ++i) {
-      Cert& cert = *certs_[i].cert;
-      if (statuses_[i] != Cert::NotRevoked) continue;
-      if (place++ == 1) {
-        if (!cert.GetSubject()->IsEqual(certs_[0].cert->GetIssuer())) {
-          return VESK2_ERR_SIGNING_CERT_ORDER;
-        }
-        InsertCopy(chain, cert, true, cert.GetRevocationElement());
-      } else {
-        InsertShared(chain, &cert);
-      }
-    }
-    return place > 1 ? 0 : VESK2_ERR_SIGNING_CERT_ORDER;
-  }
-
-  bool AskedAboutSigning() const {
-    return evidence_.first != nullptr && evidence_.first == evidence_.signedAt.get();
-  }
-  TimeStamp* Moved(TimeStamp* own) const {
-    return hypothesis_.at != nullptr && AskedAboutSigning() ? hypothesis_.at : own;
-  }
-  TimeStamp* RevocationStart() const { return Moved(evidence_.RevocationStart()); }
-  TimeStamp* RevocationEnd() const { return Moved(evidence_.RevocationEnd()); }
-
-  // (valid ...); null for no period.
-  Ref<SExpression> MakePeriod() const {
-    TimeStamp* first = Moved(evidence_.first);
-    TimeStamp* last = Moved(evidence_.last);
-    if (first == nullptr && last == nullptr) return {};
-    Ref<SExpression> valid = Empty("valid");
-    if (first != nullptr) AddLimit(*valid, "not-before", first);
-    if (last != nullptr) AddLimit(*valid, "not-after", last);
-    return valid;
-  }
-  static void AddLimit(SExpression& valid, const char* name, TimeStamp* stamp) {
-    const Ref<SExpression> limit = Empty(name);
-    InsertShared(*limit, stamp);
-    InsertShared(valid, limit.get());
-  }
-
-  int Reduce(SExpression& chain, const std::vector<SExpression*>& tags, SExpression* period) const {
-    for (SExpression* tag : tags) {
-      const int code =
-          ZvVesk2::Verify::ReductA(nullptr, granting_.get(), &chain, subject_, tag, period);
-      if (code != 0) return code;
-    }
-    return 0;
+    changed_.SetEntries(EntryList(entries).get());
   }
 
   const Evidence& evidence_;
   const Hypothesis& hypothesis_;
-  ZvVesk2::Subject* subject_ = nullptr;  // for whom authority is asked
-  std::vector<Link> certs_;
-  std::vector<Ref<Cert>> coSigned_;
-  Ref<SExpression> all_;
-  Ref<SExpression> granting_;  // all of them, or the one that is asked about
-  std::vector<int32_t> statuses_;
+  ZvVesk2::Evidence changed_;
 };
 
 }  // namespace
@@ -233,16 +119,16 @@ class World {
 int Judge(const Question& question, const Evidence& evidence, const Hypothesis& hypothesis) {
   std::vector<SExpression*> tags;
   for (const auto& member : question.request->members) tags.push_back(member.tag.get());
-  return World(evidence, hypothesis).Judge(question.manifest, tags);
+  return World(evidence, hypothesis).Judge(tags);
 }
 
-Granted WhatIsGranted(const Question& question, const Evidence& evidence) {
+Granted WhatIsGranted(const Question&, const Evidence& evidence) {
   const Hypothesis asItIs;
-  return World(evidence, asItIs).Grants(question.manifest);
+  return World(evidence, asItIs).Grants();
 }
 
 std::vector<int32_t> RevocationStates(const Evidence& evidence, const Hypothesis& hypothesis) {
-  return World(evidence, hypothesis).statuses();
+  return World(evidence, hypothesis).States();
 }
 
 }  // namespace vesk2_command

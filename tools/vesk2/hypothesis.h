@@ -1,7 +1,6 @@
 // hypothesis.h: what the answer about authority would be if something were different.
 //
-// The library's own functions decide, over certificates and entries that exist in memory only; the
-// stages are those of CertSequence::Verify and of the verification of a manifest.
+// The library judges a changed copy of what it proved, by the rules of its verifications.
 #ifndef VESK2_TOOLS_HYPOTHESIS_H
 #define VESK2_TOOLS_HYPOTHESIS_H
 

@@ -18,22 +18,6 @@ using ZvVesk2::Hash;
 using ZvVesk2::Manifest;
 using ZvVesk2::Signature;
 
-std::unique_ptr<BodyDirectory> ReadListing(const std::string& path, const std::string& directory) {
-  Manifest manifest(nullptr);
-  Check(manifest.Initialize(directory.c_str(), path.c_str(), "none"), Escape(path));
-  ZvBuffer* handed = nullptr;
-  const int code = manifest.ReadManifest(false, 0, 0, &handed);
-  const Buffer body(handed);
-  if (code != 0) Malformed(path, manifest.GetReadPosition(), "manifest", code);
-
-  auto root = std::make_unique<BodyDirectory>(nullptr);
-  root->SetName(NewText(directory));
-  const size_t start = manifest.GetReadPosition() - 1 - body->Remaining();
-  const int parsed = root->ParseBody(body.get(), nullptr);
-  if (parsed != 0) Malformed(path, start + body->Position(), "manifest", parsed);
-  return root;
-}
-
 void IgnoreEntries(Manifest& manifest, const std::set<std::string>& names) {
   FileItem* list = nullptr;
   for (const std::string& name : names) {
@@ -99,7 +83,8 @@ int ReadCerts(ZvBuffer* buffer, SignatureBlock& block) {
     if (code != 0) return code;
     block.certs.push_back(std::move(each));
   }
-  return buffer->Expect(")");
+  // The first speaks for the content, the second for its issuer.
+  return block.certs.size() > 1 ? buffer->Expect(")") : VESK2_ERR_PARSE_FILE;
 }
 
 int ReadCrls(ZvBuffer* buffer, SignatureBlock& block) {
@@ -158,6 +143,14 @@ SignatureBlock ReadSignatureBlock(const std::string& path) {
   SignatureBlock block;
   (void)ReadSignatureBlock(OpenBuffer(path).get(), block);
   return block;
+}
+
+int CheckBlock(const SignatureBlock& block) {
+  if (!block.certs[0].cert->GetSubject()->IsHash()) return VESK2_ERR_NOT_OBJECT_CERT;
+  for (const SignedCert& each : block.certs) {
+    if (const int code = each.signature->Verify(each.cert.get())) return code;
+  }
+  return block.contentSigned ? 0 : VESK2_ERR_HASH_MATCH;
 }
 
 int CheckManifest(const std::string& path) {

@@ -1,5 +1,5 @@
 // manifest_file.h: manifest files as the command sees them: reading one back without judging its
-// authority, and taking it apart to explain a refusal.
+// authority, and taking it apart to show it.
 #ifndef VESK2_TOOLS_MANIFEST_FILE_H
 #define VESK2_TOOLS_MANIFEST_FILE_H
 
@@ -15,11 +15,6 @@
 #include <vesk2/manifest_body.h>
 
 namespace vesk2_command {
-
-// ReadListing checks a manifest file's form, its signatures and its signed digest, and returns the
-// tree that it lists, its root named `directory`. Malformed text is Trouble that names the byte.
-std::unique_ptr<ZvVesk2::BodyDirectory> ReadListing(const std::string& path,
-                                                    const std::string& directory);
 
 // Has a manifest leave out the entries of these names.
 void IgnoreEntries(ZvVesk2::Manifest& manifest, const std::set<std::string>& names);
@@ -45,6 +40,8 @@ struct SignatureBlock {
 // returns the code of the reader that stopped, and leaves the buffer at the place.
 SignatureBlock ReadSignatureBlock(const std::string& path);
 int ReadSignatureBlock(ZvBuffer* buffer, SignatureBlock& block);
+// What the signatures and the signed digest of a block are worth: 0, or the code of the refusal.
+int CheckBlock(const SignatureBlock& block);
 
 // CheckManifest returns 0 when the signatures and the signed digest of a manifest file hold,
 // whoever its signer is, and else the code of the refusal. Trouble for what is no manifest.

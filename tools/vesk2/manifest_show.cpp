@@ -49,7 +49,7 @@ ExitCode Run(const Options& options) {
   int code = ReadSignatureBlock(buffer.get(), block);
   if (code == 0 && buffer->Remaining() != 0) code = VESK2_ERR_PARSE_FILE;
   if (code != 0) Malformed(options.file, buffer->Position(), "manifest", code);
-  Sheet sheet = DescribeManifest(block, CheckManifest(options.file));
+  Sheet sheet = DescribeManifest(block, CheckBlock(block));
   sheet.Add("size", buffer->Position(), std::to_string(buffer->Position()) + " bytes");
   if (options.entries) {
     sheet.StartList("entries");

@@ -1,16 +1,18 @@
 // manifest_verify.cpp: vesk2 manifest verify.
-#include <algorithm>
-#include <cerrno>
-#include <cstring>
-
 #include "tools/vesk2/command.h"
+#include "tools/vesk2/effort.h"
 #include "tools/vesk2/explain.h"
 #include "tools/vesk2/files.h"
+#include "tools/vesk2/keep_lists.h"
 #include "tools/vesk2/manifest_file.h"
 #include "tools/vesk2/progress.h"
 #include "tools/vesk2/report.h"
+#include "tools/vesk2/store_check.h"
+#include "tools/vesk2/today.h"
 #include "tools/vesk2/tree.h"
+#include "tools/vesk2/tree_findings.h"
 
+#include <vesk2/evidence.h>
 #include <vesk2/manifest.h>
 
 namespace vesk2_command {
@@ -30,11 +32,27 @@ struct Options {
   std::string aclDirectory;
   std::vector<std::string> ignored;
   bool explain = false;
+  StoreCheck stores;
 };
 
+constexpr const char* kSigning = "signing";
+
 Period AskedPeriod(const Options& options) {
+  if (options.at == kSigning) return {};
   if (options.at.empty()) return ParsePeriod(options.period);
   return {ParseTime(options.at, false), ParseTime(options.at, false)};
+}
+
+// Whether nobody said what moment the answer is about.
+bool IsAboutToday(const Options& options) {
+  return options.at.empty() && options.period.notBefore.empty() && options.period.notAfter.empty();
+}
+
+TreeQuestion AboutTree(const Options& options) {
+  TreeQuestion tree{
+      options.directory, options.manifest, {}, options.allowExtra, options.allowLinks};
+  for (const std::string& name : options.ignored) tree.ignored.insert(PlainRelative(name));
+  return tree;
 }
 
 void Configure(Manifest& manifest, const Options& options, const std::string& tag,
@@ -42,113 +60,21 @@ void Configure(Manifest& manifest, const Options& options, const std::string& ta
   Check(manifest.Initialize(options.directory.c_str(), options.manifest.c_str(), tag.c_str()),
         "preparing");
   manifest.SetFailOnExtraEntries(!options.allowExtra);
-  manifest.SetStoreUpdate(!options.noStoreUpdate);
+  manifest.SetStoreUpdate(false);  // the answer decides what is kept
   if (!options.aclDirectory.empty()) manifest.SetExtraAclDirectory(NewText(options.aclDirectory));
   IgnoreEntries(manifest, ignored);
 }
-
-// ---- Findings about the tree ----
-
-// One kind of finding: what it is called, and the entries, sorted.
-struct Finding {
-  const char* kind;
-  std::vector<std::string> entries;
-};
-
-std::vector<Finding> TreeFindings(const Manifest& manifest, const std::vector<std::string>& leaving,
-                                  bool allowExtra) {
-  const std::set<std::string> parents = FoundParents(manifest);
-  std::vector<Finding> findings = {
-      {"changed", FoundNames(manifest.GetInvalid(), parents)},
-      {"missing", FoundNames(manifest.GetMissing(), parents)},
-      {"link out of the tree", leaving},
-  };
-  if (!allowExtra) findings.push_back({"not listed", FoundNames(manifest.GetExtra(), parents)});
-  return findings;
-}
-
-// "missing" covers all that could not be opened; a look at the disk tells more.
-std::string Detail(const std::string& path) {
-  const std::string why = WhyUnreadable(path);
-  return why == std::strerror(ENOENT) || why == "cannot be read" ? "" : " (" + why + ")";
-}
-
-void PrintFindings(const std::vector<Finding>& findings) {
-  for (const Finding& finding : findings) {
-    const bool unreadable = std::string(finding.kind) == "missing";
-    for (const std::string& entry : finding.entries) {
-      Note(std::string(finding.kind) + ": " + Escape(entry) + (unreadable ? Detail(entry) : ""));
-    }
-  }
-}
-
-std::string Summary(const std::vector<Finding>& findings) {
-  std::string text;
-  for (const Finding& finding : findings) {
-    if (finding.entries.empty()) continue;
-    text +=
-        (text.empty() ? "" : ", ") + std::to_string(finding.entries.size()) + " " + finding.kind;
-  }
-  return text;
-}
-
-// ---- Verdicts ----
 
 bool JudgedTree(const Manifest& manifest, int code) {
   return code == 0 || manifest.GetInvalid() != nullptr || manifest.GetMissing() != nullptr ||
          (code == VESK2_ERR_EXTRA_FILES && manifest.GetExtra() != nullptr);
 }
 
-[[noreturn]] void ThrowTrouble(const Options& options, const Manifest& manifest, int code) {
-  if (code == VESK2_ERR_FILE_NOT_FOUND || code == VESK2_ERR_FIND_DIR) {
-    ThrowNoStore(code);
-  }
-  ThrowUnreadable(options.manifest, manifest, code);
-}
-
-ExitCode AnswerAuthority(const Options& options, const Manifest& manifest, const Question& question,
-                         int code) {
-  if (!IsRefusal(code)) {
-    if (code < 0) ExplainUnreadable(question, code);
-    ThrowTrouble(options, manifest, code);
-  }
-  const ExitCode verdict = No(code, CodeWords(code));
-  ExplainRefusal(question, code);
-  return verdict;
-}
-
-ExitCode AnswerTree(const Options& options, const Manifest& manifest, const Question& question,
-                    const std::set<std::string>& ignored, int code) {
-  const auto root = ReadListing(options.manifest, options.directory);
-  const TreeNotes notes = InspectTree(*root, ignored);
-  const std::vector<std::string> none;
-  const std::vector<Finding> findings =
-      TreeFindings(manifest, options.allowLinks ? none : notes.leaving, options.allowExtra);
-  const std::string summary = Summary(findings);
-  ExitCode verdict = kNo;
-  if (code == 0 && summary.empty()) {
-    const SignatureBlock block = ReadSignatureBlock(options.manifest);
-    verdict = Yes(std::to_string(CountFiles(manifest.GetValid())) + " files of " +
-                  Escape(options.directory) + " are as signed at " + StampText(*block.signedAt) +
-                  " by " + Fingerprint(*block.certs.front().cert->GetIssuer()));
-  } else {
-    verdict = code != 0 ? No(code, summary) : No("link-leaves-tree", summary);
-    PrintFindings(findings);
-    if (code != 0) ExplainTree(question);
-  }
-  if (options.explain && verdict == kYes) ExplainGrant(question);
-  if (!options.allowExtra) {
-    for (const std::string& name : notes.unlisted) {
-      Note("note: " + Escape(name) + " is not listed; the top directory may hold more");
-    }
-  }
-  return verdict;
-}
-
-int Verify(Manifest& manifest, const Options& options, long notBefore, long notAfter) {
+int VerifyFiles(Manifest& manifest, const Options& options, const Period& period) {
   const ProgressLine progress("verifying", options.directory);
   Check(manifest.SetFileCallbacks(progress.Callbacks()), "preparing");
-  const int code = manifest.VerifyManifest(notBefore, notAfter);
+  const int code = manifest.VerifyManifest(period.notBefore ? period.notBefore->ToTime() : 0,
+                                           period.notAfter ? period.notAfter->ToTime() : 0);
   Check(manifest.SetFileCallbacks(nullptr), "preparing");
   return code;
 }
@@ -164,50 +90,113 @@ std::vector<std::string> SigningWords(const Options& options) {
   return words;
 }
 
-// The answers about the members of a set behind the first, for which the tree was compared.
-int VerifyOthers(const Options& options, const Question& question, long notBefore, long notAfter) {
-  const Request& request = *question.request;
-  int first = 0;
-  for (size_t i = 1; i < request.members.size(); ++i) {
-    Manifest manifest(nullptr);
-    Configure(manifest, options, request.members[i].text, {});
-    const int code = manifest.ReadManifest(true, notBefore, notAfter, nullptr);
-    if (code != 0 && !IsRefusal(code)) {
-      AnswerAuthority(options, manifest, question, code);
-    }
-    TellMember(request, i, code);
-    if (first == 0) first = code;
+// One verification: what was asked, and what came of it.
+class Answer {
+ public:
+  explicit Answer(const Options& options)
+      : options_(options), request_(ParseRequest(options.tag)), manifest_(nullptr) {
+    question_.file = options.manifest;
+    question_.manifest = true;
+    question_.request = &request_;
+    question_.period = AskedPeriod(options);
+    question_.aclDirectory = options.aclDirectory;
+    question_.signing = SigningWords(options);
+    question_.proved = &proved_;
+    Configure(manifest_, options, request_.members[0].text, AboutTree(options).ignored);
+    manifest_.SetEvidence(&proved_);
   }
-  return first;
-}
 
-ExitCode Run(const Options& options) {
-  RealDirectory(options.directory);
-  const Request request = ParseRequest(options.tag);
-  Question question;
-  question.file = options.manifest;
-  question.manifest = true;
-  question.request = &request;
-  question.period = AskedPeriod(options);
-  question.aclDirectory = options.aclDirectory;
-  question.signing = SigningWords(options);
-  const Period& period = question.period;
-  const long notBefore = period.notBefore ? period.notBefore->ToTime() : 0;
-  const long notAfter = period.notAfter ? period.notAfter->ToTime() : 0;
-  std::set<std::string> ignored;
-  for (const std::string& name : options.ignored) ignored.insert(PlainRelative(name));
+  ExitCode Give() {
+    code_ = VerifyFiles(manifest_, options_, question_.period);
+    const bool judged = JudgedTree(manifest_, code_);
+    if (!judged && !IsRefusal(code_)) ThrowTrouble();
+    const std::set<std::string> broken = CheckStores(question_, options_.stores);
+    if (IsAboutToday(options_)) today_.emplace(proved_);
+    const int refused = JudgeMembers(judged ? 0 : code_);
+    const ExitCode verdict = refused != 0 ? Refuse(refused) : AnswerTree();
+    if (!options_.noStoreUpdate) KeepLists(proved_, verdict == kYes, broken);
+    return verdict;
+  }
 
-  Manifest manifest(nullptr);
-  Configure(manifest, options, request.members[0].text, ignored);
-  const int code = Verify(manifest, options, notBefore, notAfter);
-  const bool judged = JudgedTree(manifest, code);
-  if (!judged && !IsRefusal(code)) return AnswerAuthority(options, manifest, question, code);
-  TellMember(request, 0, judged ? 0 : code);
-  const int others = VerifyOthers(options, question, notBefore, notAfter);
-  const int refused = judged ? others : code;
-  if (refused != 0) return AnswerAuthority(options, manifest, question, refused);
-  return AnswerTree(options, manifest, question, ignored, code);
-}
+ private:
+  [[noreturn]] void ThrowTrouble() {
+    if (code_ < 0) ExplainUnreadable(question_, code_);
+    if (code_ == VESK2_ERR_FILE_NOT_FOUND || code_ == VESK2_ERR_FIND_DIR) ThrowNoStore(code_);
+    ThrowUnreadable(options_.manifest, manifest_, code_);
+  }
+
+  // The first refusal of a member of the asked set; `first` is the library's for the first member.
+  int JudgeMembers(int first) {
+    int refused = 0;
+    for (size_t i = 0; i < request_.members.size(); ++i) {
+      int code = i == 0 ? first : JudgeMember(request_.members[i].tag.get());
+      if (code == 0 && today_) {
+        code = today_->Judge(request_.members[i].tag.get());
+        byToday_ |= refused == 0 && code != 0;
+      }
+      TellMember(request_, i, code);
+      if (refused == 0) refused = code;
+    }
+    return refused;
+  }
+
+  int JudgeMember(SExpression* tag) {
+    ZvVesk2::Evidence same(nullptr);
+    Check(same.Copy(proved_), "judging a member");
+    const int code = same.Judge(tag);
+    if (code < 0 || code == VESK2_ERR_MEM_ALLOC) Check(code, Escape(options_.manifest));
+    return code != 0 ? code : proved_.GetContentCode();
+  }
+
+  ExitCode Refuse(int code) {
+    int explained = code;
+    if (today_) {
+      question_.proved = &today_->evidence();
+      const int now = today_->Judge(request_.members[0].tag.get());
+      if (now != 0) explained = now;
+    }
+    const ExitCode verdict = byToday_ ? today_->Refuse(question_, code) : No(code, CodeWords(code));
+    ExplainRefusal(question_, explained);
+    return verdict;
+  }
+
+  ExitCode AnswerTree() {
+    const std::string signedAt = StampText(*proved_.GetSigningTime());
+    if (today_ && IsSignedInFuture(proved_)) {
+      return No("signed-in-future", "the manifest says it was signed at " + signedAt +
+                                        ", which is yet to come (--at tells when to judge it)");
+    }
+    const std::vector<Finding> findings = FindInTree(manifest_, AboutTree(options_));
+    const std::string summary = Summary(findings);
+    if (code_ != 0 || !summary.empty()) return RefuseTree(findings, summary);
+    const bool aboutSigning = today_ || options_.at == kSigning;
+    const ExitCode verdict = Yes(std::to_string(CountFiles(manifest_.GetValid())) + " files of " +
+                                 Escape(options_.directory) + " are as signed at " + signedAt +
+                                 " by " + Fingerprint(*proved_.GetCert(0)->GetIssuer()) +
+                                 (aboutSigning ? EndedSince(proved_) : ""));
+    if (today_) question_.proved = &today_->evidence();
+    if (options_.explain) ExplainGrant(question_);
+    return verdict;
+  }
+
+  ExitCode RefuseTree(const std::vector<Finding>& findings, const std::string& summary) {
+    int code = code_;
+    if (code == 0 && Found(findings, kUnlisted)) code = VESK2_ERR_EXTRA_FILES;
+    const ExitCode verdict = code != 0 ? No(code, summary) : No("link-leaves-tree", summary);
+    PrintFindings(findings);
+    if (code != 0) ExplainTree(question_);
+    return verdict;
+  }
+
+  const Options& options_;
+  Request request_;
+  Question question_;
+  ZvVesk2::Evidence proved_{nullptr};
+  Manifest manifest_;
+  std::optional<Today> today_;
+  int code_ = 0;
+  bool byToday_ = false;  // refused by what is known now, not by what was at the time of signing
+};
 
 }  // namespace
 
@@ -219,7 +208,9 @@ Action DefineManifestVerify(CLI::App& app) {
                  "What the signer must be authorized for; of a set, every member")
       ->required();
   AddPeriodOptions(app, options->period);
-  app.add_option("--at", options->at, "Authorized at this moment [at the time of signing]")
+  app.add_option("--at", options->at,
+                 "Authorized, and not revoked, at this moment; \"signing\" for the time of signing "
+                 "[authorized at the time of signing, not revoked now]")
       ->excludes("--not-before")
       ->excludes("--not-after");
   app.add_flag("--allow-extra", options->allowExtra, "Accept entries that are not listed");
@@ -229,8 +220,13 @@ Action DefineManifestVerify(CLI::App& app) {
   app.add_option("--acl-dir", options->aclDirectory, "Trust the entries of this directory too");
   app.add_option("--ignore", options->ignored, "Leave this entry out (a path below the directory)")
       ->allow_extra_args(false);
+  AddStoreCheckOptions(app, options->stores);
   app.add_flag("--explain", options->explain, "Tell why also when the answer is yes");
-  return [options] { return Run(*options); };
+  return [options] {
+    RealDirectory(options->directory);
+    StartAnswer();
+    return Answer(*options).Give();
+  };
 }
 
 }  // namespace vesk2_command

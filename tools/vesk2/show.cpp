@@ -104,7 +104,7 @@ Sheet ShowManifest(Source& source) {
   SignatureBlock block;
   const int code = ReadSignatureBlock(source.bytes.get(), block);
   if (code != 0) Refuse(source, "manifest", code);
-  return DescribeManifest(block, CheckManifest(source.path));
+  return DescribeManifest(block, CheckBlock(block));
 }
 
 Sheet ShowTag(Source& source) {

@@ -229,7 +229,9 @@ TreeNotes InspectTree(BodyDirectory& root, const std::set<std::string>& ignored)
   inspector.Inspect(root, "");
   TreeNotes notes{std::move(inspector.leaving), {}};
   std::vector<std::string> names;
-  ReadNames(root.GetName(), names);
+  if (!ReadNames(root.GetName(), names)) {
+    throw FileTrouble(root.GetName(), std::strerror(errno), "io");
+  }
   const std::set<std::string> listed = ListedInRoot(root);
   for (const std::string& name : names) {
     if (listed.count(name) == 0 && ignored.count(name) == 0) notes.unlisted.push_back(name);
