@@ -102,7 +102,7 @@ int ZvReplacement::MakeNamed(mode_t mode) {
     if (fd < 0) return zv_error_code(errno, VESK2_ERR_FILE_OPEN);
     fd_ = fd;
     if (!HasLock()) {
-      close(std::exchange(fd_, -1));  // whoever has the lock removes the file
+      close(std::exchange(fd_, -1));
       continue;
     }
     return fchmod(fd_, mode) == 0 ? 0 : VESK2_ERR_FILE_OPEN;
@@ -110,10 +110,13 @@ int ZvReplacement::MakeNamed(mode_t mode) {
   return VESK2_ERR_FILE_OPEN;
 }
 
-// Where there are no locks, nobody gets one, and nobody removes the file.
+// Where there are no locks, nobody gets one, and nobody removes the file. Whoever has the lock
+// instead of us removes it; with the lock, a file that is not known to have its name goes here.
 bool ZvReplacement::HasLock() const {
   if (flock(fd_, LOCK_EX | LOCK_NB) != 0 && errno == EWOULDBLOCK) return false;
-  return LeadsTo(AT_FDCWD, temporary_.get(), fd_);
+  if (LeadsTo(AT_FDCWD, temporary_.get(), fd_)) return true;
+  static_cast<void>(unlink(temporary_.get()));  // nobody else's: its name was drawn
+  return false;
 }
 
 int ZvReplacement::Keep(bool replace) {

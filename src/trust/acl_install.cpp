@@ -1,6 +1,7 @@
 // Installing trust roots: copying into the store what it lacks.
 #include <vesk2/acl_entry.h>
 
+#include "src/platform/file.h"
 #include "src/platform/replace.h"
 #include "src/platform/text.h"
 #include "src/sexpr/storage.h"
@@ -59,7 +60,9 @@ int Install(AclEntry* entry, StoredTags& tags) {
   VESK2_REQUIRE(name, VESK2_ERR_MEM_ALLOC);
   entry->SetStorageType(StorageGlobal);
   VESK2_TRY(entry->SetFileName(name.get()));
-  if (entry->Exists()) return 0;
+  struct stat there {};
+  const int code = ZVsysutil::zv_stat(entry->GetFileName(), &there);
+  VESK2_REQUIRE(code == VESK2_ERR_STAT_FILE, code);
   return WriteStored(entry, entry->GetFileName(), false);
 }
 

@@ -574,7 +574,7 @@ std::vector<Case> FlatCases() {
          return [manifest = make()] {
            Evidence evidence(nullptr);
            manifest->SetEvidence(&evidence);
-           const int code = manifest->VerifyManifest(0, 0);
+           const int code = VerifyManifest(manifest.get(), 0, 0);
            manifest->SetEvidence(nullptr);
            return Outcome{code, code != 0 || manifest->GetListing() != nullptr};
          };
