@@ -8,6 +8,7 @@
 #include <string_view>
 
 #include <vesk2/acl_entry.h>
+#include <vesk2/context.h>
 
 #include "src/platform/replace.h"
 #include "src/sexpr/storage.h"
@@ -103,6 +104,17 @@ int IsWanted(bool& wanted, const Cert* fresh, const char* path) {
 }
 
 }  // namespace
+
+int CrlSequence::StorePath(char*& out, SExpression* tag) {
+  VESK2_REQUIRE(out == nullptr, VESK2_ERR_INVALID_PARAM);
+  TextPtr name;
+  VESK2_TRY(StoreName(name, tag));
+  if (!name || *VeskConf::GetGlobalDirectory() == '\0') return 0;
+  TextPtr path;
+  VESK2_TRY(StoredPath(path, name.get()));
+  out = path.release();
+  return 0;
+}
 
 int CrlSequence::UpdateStore(SExpression* aclEntries) {
   VESK2_REQUIRE(First() != nullptr, VESK2_ERR_INVALID_PARAM);

@@ -11,26 +11,18 @@
 #include "tools/vesk2/report.h"
 
 #include <vesk2/context.h>
-#include <vesk2/limits.h>
 
 namespace vesk2_command {
 
 using ZvVesk2::AclEntry;
 
-namespace {
-
-// The library's name for the list of a source; empty for a tag that names no file.
-std::string FileName(SExpression* tag) {
-  if (tag == nullptr) return "";
-  const Text text(tag->ExportTagW("tag"));
-  std::string name;
-  for (const char* at = text.get(); at != nullptr && *at != '\0'; ++at) {
-    name += *at == '/' ? std::string("%2F") : std::string(1, *at);
-  }
-  return name.size() > ZvVesk2::Limits::kMaxStoreName ? "" : name;
+std::string ListPath(SExpression* tag) {
+  char* path = nullptr;
+  const int code = tag != nullptr ? CrlSequence::StorePath(path, tag) : 0;
+  if (code == VESK2_ERR_MEM_ALLOC) throw std::bad_alloc();
+  const Text owner(path);
+  return path != nullptr ? path : "";
 }
-
-}  // namespace
 
 std::string ListDirectory() {
   return std::string(ZvVesk2::VeskConf::GetGlobalDirectory()) + "/cert";
@@ -58,7 +50,7 @@ Ref<SExpression> Sources::AclsFor(SExpression* tag) const {
 
 std::string WhyListUnusable(CrlSequence& list, const std::string& path, SExpression* acls) {
   SExpression* const tag = list.GetCert()->GetTag();
-  if (std::filesystem::path(path).filename() != FileName(tag) + ".crl") {
+  if (std::filesystem::path(path).filename() != std::filesystem::path(ListPath(tag)).filename()) {
     return "the list of another source, " + TagText(tag);
   }
   const int code = list.VerifySelf(acls);
@@ -68,9 +60,8 @@ std::string WhyListUnusable(CrlSequence& list, const std::string& path, SExpress
 
 StoredList FindStored(SExpression* tag, SExpression* acls) {
   StoredList stored;
-  const std::string name = FileName(tag);
-  if (name.empty()) return stored;
-  const std::string path = ListDirectory() + "/" + name + ".crl";
+  const std::string path = ListPath(tag);
+  if (path.empty()) return stored;
   struct stat status = {};
   if (stat(path.c_str(), &status) != 0) {
     stored.unread = errno != ENOENT && errno != ENOTDIR;

@@ -37,6 +37,8 @@ StoredList FindStored(SExpression* tag, SExpression* acls);
 // when they do not.
 std::string WhyListUnusable(CrlSequence& list, const std::string& path, SExpression* acls);
 
+// The file that keeps the list of a source (null: none); empty for a tag that names none.
+std::string ListPath(SExpression* tag);
 // The directory of the stored lists.
 std::string ListDirectory();
 

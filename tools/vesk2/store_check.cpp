@@ -11,12 +11,10 @@
 #include <map>
 
 #include "tools/vesk2/crl_file.h"
+#include "tools/vesk2/crl_stored.h"
 #include "tools/vesk2/files.h"
 #include "tools/vesk2/report.h"
 #include "tools/vesk2/stores.h"
-
-#include <vesk2/context.h>
-#include <vesk2/limits.h>
 
 namespace vesk2_command {
 namespace {
@@ -100,16 +98,6 @@ void AddStoreCheckOptions(CLI::App& app, StoreCheck& check) {
                "Answer also when a stored revocation list cannot be read or does not verify");
 }
 
-std::string ListPath(SExpression& tag) {
-  const Text text(tag.ExportTag("tag"));
-  std::string name = text ? text.get() : "";
-  if (name.empty() || name.size() > ZvVesk2::Limits::kMaxStoreName) return "";
-  for (size_t at = name.find('/'); at != std::string::npos; at = name.find('/', at)) {
-    name.replace(at, 1, "%2F");
-  }
-  return std::string(ZvVesk2::VeskConf::GetGlobalDirectory()) + "/cert/" + name + ".crl";
-}
-
 std::set<std::string> CheckStores(const Question& question, const StoreCheck& check) {
   const Evidence evidence = GatherEvidence(question);
   CheckAllEntries(question, evidence, check.ignoreEntries);
@@ -128,7 +116,7 @@ std::set<std::string> CheckStores(const Question& question, const StoreCheck& ch
     const TimeStamp* end = each.entry->GetNotAfter();
     if (!IsRevocationTag(tag) || (end != nullptr && end->IsBefore(now.get()))) continue;
     const std::string source = Canonical(*tag);
-    const std::string path = ListPath(*tag);
+    const std::string path = ListPath(tag);
     const auto list = stored.find(source);
     if (path.empty() || broken.count(source) != 0) continue;
     const std::string why = WhyBroken(list != stored.end() ? list->second : nullptr, path,

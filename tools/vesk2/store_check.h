@@ -25,9 +25,6 @@ void AddStoreCheckOptions(CLI::App& app, StoreCheck& check);
 // whose list is broken.
 std::set<std::string> CheckStores(const Question& question, const StoreCheck& check);
 
-// The file that keeps the list of a source; empty for a tag that names none.
-std::string ListPath(SExpression& tag);
-
 }  // namespace vesk2_command
 
 #endif  // VESK2_TOOLS_STORE_CHECK_H

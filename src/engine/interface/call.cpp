@@ -52,8 +52,9 @@ int EngineCall::Import(SExpression* expression, spki_elem** list) {
 
 namespace {
 
-// Of this thread, in all its calls.
-thread_local uint64_t workDone = 0;
+// Of this thread, in all its calls. In the block that every thread has from its start: storage that
+// is made on demand cannot be refused, so without memory the process would end.
+__attribute__((tls_model("initial-exec"))) thread_local uint64_t workDone = 0;
 
 // Trying to combine two tuples takes about as long as this many steps.
 constexpr uint64_t kStepsPerCombination = 16;
