@@ -91,7 +91,11 @@ Words Question(const StoreCase& made) {
   Words words = {"vesk2", "cert", "verify", "chain.cert"};
   if (made.manifest) words = {"vesk2", "manifest", "verify", "tree", "tree.manifest"};
   words.insert(words.end(), {"--tag", made.tag, "--json", "--explain", "--quiet"});
+  // As the library judges, which believes the time of signing and passes over lists that are
+  // broken.
+  words.push_back("--ignore-broken-lists");
   if (!made.at.empty()) words.insert(words.end(), {"--at", made.at});
+  if (made.at.empty() && made.manifest) words.insert(words.end(), {"--at", "signing"});
   return words;
 }
 
