@@ -120,8 +120,8 @@ class VESK2_API CrlSequence : public SExpression {
                                        Vesk2ContextStruct* ctx);
   // StorePath makes the path of the file that keeps the list of a source, for the caller to free
   // with Vesk2Free; no directory is made. Null with success for a tag that names no file, and
-  // without a store. `out` must be null: VESK2_ERR_INVALID_PARAM. VESK2_ERR_FILE_OPEN for a path
-  // that is too long, VESK2_ERR_MEM_ALLOC.
+  // without a store. `out` must be null: VESK2_ERR_INVALID_PARAM. VESK2_ERR_FILE_OPEN for one
+  // that cannot be, VESK2_ERR_MEM_ALLOC.
   [[nodiscard]] static int StorePath(char*& out, SExpression* tag);
   // UpdateStore writes this sequence to the store when it verifies and is newer than what is there.
   // The file is replaced whole or not at all, and a list that another process holds, or that could

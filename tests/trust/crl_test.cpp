@@ -281,6 +281,13 @@ TEST_F(CrlStore, TagsNameFiles) {
   for (const auto& [tag, file, code] : cases) {
     EXPECT_EQ(Offer(Sequence(tag), tag), code) << tag;
     EXPECT_EQ(Names("cert"), file);
+    char* path = nullptr;
+    const int named = CrlSequence::StorePath(path, Parse(tag).get());
+    EXPECT_EQ(named, tag == Tag("..") ? VESK2_ERR_FILE_OPEN : 0) << tag;
+    EXPECT_EQ(path != nullptr, !file.empty());
+    if (path != nullptr)
+      EXPECT_EQ(Names("cert"), "<" + std::filesystem::path(path).filename().string() + ">");
+    delete[] path;
     // What was stored is what is loaded for a root with that tag.
     Ref<SExpression> store;
     EXPECT_EQ(CrlSequence::ImportStore(store.Out(), Acls({RootOf(tag)}).get(), nullptr), 0);
