@@ -169,6 +169,20 @@ class NewFile {
   Descriptor file_;
 };
 
+// While it lives, what is made is for all to read.
+class Umask {
+ public:
+  explicit Umask(bool shared) : old_(umask(022)) {
+    if (!shared) umask(old_);
+  }
+  ~Umask() { umask(old_); }
+  Umask(const Umask&) = delete;
+  Umask& operator=(const Umask&) = delete;
+
+ private:
+  mode_t old_;
+};
+
 void CheckInMemory(std::string_view bytes, const WriteOptions& options) {
   if (!options.check) return;
   const Descriptor file(MemoryFile(bytes));
@@ -189,9 +203,10 @@ void WriteNamed(const std::string& path, std::string_view bytes, const WriteOpti
   RefuseExisting(path, options.force);
   std::error_code error;
   const std::filesystem::path directory = Directory(path);
-  if (!options.makeDirectory) RequireDirectory(path);
+  if (!options.inStore) RequireDirectory(path);
   if (options.dryRun) return CheckInMemory(bytes, options);
-  if (options.makeDirectory && !std::filesystem::create_directories(directory, error) && error) {
+  const Umask mask(options.inStore);
+  if (options.inStore && !std::filesystem::create_directories(directory, error) && error) {
     Fail(directory.string(), error.value());
   }
   NewFile file(path, options.mode);

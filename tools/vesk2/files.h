@@ -42,7 +42,9 @@ struct WriteOptions {
   // Called with a path of the finished file before it has its name; throws to refuse it.
   std::function<void(const std::string&)> check = nullptr;
   bool dryRun = false;         // check only, and note what would be written
-  bool makeDirectory = false;  // make the directory that holds it
+  // A file of the global store: its directory is made, and all can read both whatever the umask. An
+  // entry that only root can read trusts, and revokes, for nobody else.
+  bool inStore = false;
 };
 
 // WriteFile writes a file that has no name until it is finished and checked: what stands at `path`
