@@ -41,7 +41,7 @@ struct WriteOptions {
   bool force = false;  // replace what is there
   // Called with a path of the finished file before it has its name; throws to refuse it.
   std::function<void(const std::string&)> check = nullptr;
-  bool dryRun = false;         // check only, and note what would be written
+  bool dryRun = false;  // check only, and note what would be written
   // A file of the global store: its directory is made, and all can read both whatever the umask. An
   // entry that only root can read trusts, and revokes, for nobody else.
   bool inStore = false;
