@@ -284,9 +284,8 @@ TEST_F(CrlStore, TagsNameFiles) {
     char* path = nullptr;
     const int named = CrlSequence::StorePath(path, Parse(tag).get());
     EXPECT_EQ(named, tag == Tag("..") ? VESK2_ERR_FILE_OPEN : 0) << tag;
-    EXPECT_EQ(path != nullptr, !file.empty());
-    if (path != nullptr)
-      EXPECT_EQ(Names("cert"), "<" + std::filesystem::path(path).filename().string() + ">");
+    const std::string base = path != nullptr ? std::filesystem::path(path).filename() : "";
+    EXPECT_EQ(base.empty() ? "" : "<" + base + ">", file);
     delete[] path;
     // What was stored is what is loaded for a root with that tag.
     Ref<SExpression> store;
