@@ -354,11 +354,11 @@ class CommandSweep {
     if (scene_.Stored() != before_) scene_.Restore(before_);
     const bool yes = scene_.exit != 0 &&
                      ((!answer.crashed && answer.code == 0) || answer.said.starts_with("yes"));
-    const bool no = scene_.exit == 0 && (answer.code == 1 || answer.said.starts_with("no"));
-    // The explanation is built with a library that does not survive every lack of memory.
-    if ((answer.crashed && point.call != kMemory) || yes || no) {
+    // The explanation is built with a library that does not survive every lack of memory. What
+    // could not be read is refused in all scenes.
+    if ((answer.crashed && point.call != kMemory) || yes) {
       ADD_FAILURE() << Text(point) << (answer.crashed ? ": crash" : "") << (yes ? ": granted" : "")
-                    << (no ? ": refused" : "") << ": code " << answer.code << "\n"
+                    << ": code " << answer.code << "\n"
                     << TheChildren().Ask(ask_, &point, true).failed << answer.said;
       scene_.Restore(before_);
     }

@@ -9,7 +9,7 @@ trap 'rm -rf "$logs"' EXIT
 command -v strace >/dev/null && strace -o /dev/null true || { echo "cannot trace here"; exit 77; }
 
 calls=%network,open,openat,creat,link,linkat,symlink,symlinkat,rename,renameat,renameat2
-calls=$calls,unlink,unlinkat,mkdir,mkdirat,rmdir,mknod,mknodat,truncate,ftruncate,chmod,fchmod
+calls=$calls,unlink,unlinkat,mkdir,mkdirat,rmdir,mknod,mknodat,truncate,ftruncate,chmod
 calls=$calls,fchmodat,chown,fchown,lchown,fchownat,utimensat
 # -D: the traced program keeps its place, so that it gets the signals that are sent to it.
 cat >"$logs/vesk2" <<END
