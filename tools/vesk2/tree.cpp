@@ -36,7 +36,12 @@ std::string Join(const std::string& directory, const std::string& name) {
 
 bool IsLink(const std::string& path) {
   struct stat status = {};
-  return lstat(path.c_str(), &status) == 0 && S_ISLNK(status.st_mode);
+  if (lstat(path.c_str(), &status) == 0) return S_ISLNK(status.st_mode);
+  // What is not there is told elsewhere; what could not be looked at may be a link.
+  for (const int gone : {ENOENT, ENOTDIR, ENAMETOOLONG, ELOOP}) {
+    if (errno == gone) return false;
+  }
+  throw FileTrouble(path, std::strerror(errno), "io");
 }
 
 struct CloseDirectory {
