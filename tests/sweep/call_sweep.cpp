@@ -22,7 +22,7 @@
 
 #include "tests/sweep/failing_calls.h"
 #include "tests/sweep/scenes.h"
-#include "tools/vesk2/command.h"
+#include "tools/vesk2/commands/command.h"
 
 #include <vesk2.h>
 

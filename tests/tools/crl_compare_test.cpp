@@ -1,11 +1,11 @@
 // What a list lets go of another one: too little said here un-revokes in silence.
-#include "tools/vesk2/crl_compare.h"
+#include "tools/vesk2/stores/crl_compare.h"
 
 #include <gtest/gtest.h>
 
 #include <sstream>
 
-#include "tools/vesk2/objects.h"
+#include "tools/vesk2/objects/objects.h"
 
 namespace vesk2_command {
 namespace {

@@ -1,9 +1,9 @@
 // An explanation ends by itself, however long what it explains is made.
-#include "tools/vesk2/effort.h"
+#include "tools/vesk2/explain/effort.h"
 
 #include <gtest/gtest.h>
 
-#include "tools/vesk2/hypothesis.h"
+#include "tools/vesk2/explain/hypothesis.h"
 
 namespace vesk2_command {
 namespace {

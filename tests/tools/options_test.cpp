@@ -1,5 +1,5 @@
 // An option with an empty value is not one that was left out, whichever option it is.
-#include "tools/vesk2/options.h"
+#include "tools/vesk2/commands/options.h"
 
 #include <gtest/gtest.h>
 

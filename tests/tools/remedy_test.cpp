@@ -12,7 +12,7 @@
 #include <optional>
 
 #include "tests/tools/store_maker.h"
-#include "tools/vesk2/command.h"
+#include "tools/vesk2/commands/command.h"
 
 #include <vesk2.h>
 #include <vesk2/expression.h>

@@ -1,5 +1,5 @@
 // What is printed as a command line is read back by a shell word by word, and runs nothing else.
-#include "tools/vesk2/shell_words.h"
+#include "tools/vesk2/say/shell_words.h"
 
 #include <gtest/gtest.h>
 

@@ -1,6 +1,6 @@
 // The place where one tag reaches beyond another is really one: whatever two random tags look like,
 // the library refuses the two parts that are named as it refuses the whole.
-#include "tools/vesk2/tag_gap.h"
+#include "tools/vesk2/objects/tag_gap.h"
 
 #include <gtest/gtest.h>
 

@@ -4,7 +4,7 @@
 
 #include <csignal>
 
-#include "tools/vesk2/command.h"
+#include "tools/vesk2/commands/command.h"
 
 namespace {
 

@@ -1,0 +1,53 @@
+// acl_remove.cpp: vesk2 acl remove.
+#include <fcntl.h>
+#include <unistd.h>
+
+#include <cerrno>
+#include <cstring>
+
+#include "tools/vesk2/commands/command.h"
+#include "tools/vesk2/files/files.h"
+#include "tools/vesk2/files/stores.h"
+#include "tools/vesk2/say/report.h"
+
+namespace vesk2_command {
+namespace {
+
+struct Options {
+  std::vector<std::string> names;
+  bool dryRun = false;
+};
+
+std::string EntryPath(const std::string& name) {
+  if (name.empty() || name.find('/') != std::string::npos) {
+    throw Trouble("\"" + Escape(name) + "\": a name, not a path", "usage");
+  }
+  const std::string path = AclDirectory() + "/" + name + (name.ends_with(".acl") ? "" : ".acl");
+  if (faccessat(AT_FDCWD, path.c_str(), F_OK, AT_SYMLINK_NOFOLLOW) != 0)
+    throw FileTrouble(path, std::strerror(errno), "io");
+  return path;
+}
+
+ExitCode Run(const Options& options) {
+  std::vector<std::string> paths;
+  for (const std::string& name : options.names) paths.push_back(EntryPath(name));
+  for (const std::string& path : paths) {
+    if (!options.dryRun && unlink(path.c_str()) != 0) {
+      throw FileTrouble(path, std::strerror(errno), "io");
+    }
+    Note((options.dryRun ? "would remove " : "removed ") + Escape(path));
+    Result()[options.dryRun ? "would_remove" : "removed"].push_back(Escape(path));
+  }
+  return kYes;
+}
+
+}  // namespace
+
+Action DefineAclRemove(CLI::App& app) {
+  auto options = std::make_shared<Options>();
+  app.add_option("names", options->names, "Entries, by the names that acl list shows")->required();
+  app.add_flag("-n,--dry-run", options->dryRun, "Say what would be removed, and remove nothing");
+  return [options] { return Run(*options); };
+}
+
+}  // namespace vesk2_command

@@ -1,0 +1,188 @@
+// cert_issue.cpp: vesk2 cert issue.
+#include <algorithm>
+#include <set>
+
+#include "tools/vesk2/commands/command.h"
+#include "tools/vesk2/commands/describe.h"
+#include "tools/vesk2/keys/key_source.h"
+#include "tools/vesk2/objects/crl_file.h"
+#include "tools/vesk2/say/report.h"
+#include "tools/vesk2/verify/self_check.h"
+
+namespace vesk2_command {
+namespace {
+
+using ZvVesk2::Cert;
+using Signers = std::vector<std::unique_ptr<SigningKey>>;
+
+struct Options {
+  SignerOptions signer;
+  std::string subject;
+  std::string request;
+  std::string tag;
+  bool propagate = false;
+  PeriodOptions period;
+  std::string comment;
+  std::string owner;
+  std::vector<std::string> chains;
+  std::string revocation;
+  std::string output;
+  bool strict = false;
+  WriteFlags flags;
+};
+
+// Whom the certificate is for, and what for.
+struct Wish {
+  Ref<ZvVesk2::Subject> subject;
+  Ref<SExpression> tag;
+  std::string owner;
+};
+
+std::string OwnerOf(const ChainLink& link) {
+  const Text text(link.extra->ExportTag("owner"));
+  return text ? text.get() : "";
+}
+
+// A request proves that its key asks for just this. What its issuer grants may be less.
+Wish ReadRequest(const Options& options) {
+  const std::string& path = options.request;
+  const CertChain chain = ReadCertChain(path);
+  const std::vector<ChainLink> links = ChainLinks(chain, path);
+  const Cert& cert = *links[0].cert;
+  if (links.size() != 1 || !cert.GetSubject()->IsEqual(cert.GetIssuer())) {
+    throw FileTrouble(path, "not a request: one certificate of a key for itself", "malformed");
+  }
+  const int code = links[0].signature->Verify(links[0].cert);
+  if (code != 0) throw FileTrouble(path, "the request: " + Reason(code), ReasonWord(code));
+  Note("request of " + SubjectText(*cert.GetSubject()) + " for " + TagText(cert.GetTag()) +
+       (cert.GetComment() != nullptr ? ": " + Escape(BytesOf(*cert.GetComment())) : ""));
+  Wish wish{Ref<ZvVesk2::Subject>::Share(cert.GetSubject()), Ref<SExpression>::Share(cert.GetTag()),
+            OwnerOf(links[0])};
+  if (options.tag.empty()) {
+    if (!wish.tag) throw FileTrouble(path, "asks for everything: --tag says how much", "usage");
+    return wish;
+  }
+  Ref<SExpression> tag = ParseTag(options.tag);
+  if (wish.tag && !tag->IsSubset(wish.tag.get())) {
+    throw Trouble(
+        "--tag " + TagText(tag.get()) + " is more than was requested, " + TagText(wish.tag.get()),
+        "wider-than-requested");
+  }
+  wish.tag = std::move(tag);
+  return wish;
+}
+
+Wish ReadWish(const Options& options) {
+  if (!options.request.empty()) return ReadRequest(options);
+  if (options.subject.empty()) throw Trouble("nobody to certify: --subject or --request", "usage");
+  if (options.tag.empty()) throw Trouble("--tag is required", "usage");
+  return {Ref<ZvVesk2::Subject>(ReadPublicKey(options.subject).Release()), ParseTag(options.tag),
+          ""};
+}
+
+Signers OpenSigners(const SignerOptions& options) {
+  Signers signers;
+  std::set<std::string> seen;
+  for (size_t i = 0; i < options.keys.size(); ++i) {
+    signers.push_back(OpenSigner(options, i));
+    if (seen.insert(Fingerprint(*signers[i]->Public())).second) continue;
+    throw Trouble(Escape(options.keys[i]) + ": this key signs already", "usage");
+  }
+  return signers;
+}
+
+// The chains of the issuers: each must begin with a certificate for one of them.
+std::vector<CertChain> ReadChains(const std::vector<std::string>& paths, const Signers& signers) {
+  std::vector<CertChain> chains;
+  for (const std::string& path : paths) {
+    chains.push_back(ReadCertChain(path));
+    ZvVesk2::Subject& subject = *ChainLinks(chains.back(), path)[0].cert->GetSubject();
+    const bool fits = std::any_of(signers.begin(), signers.end(), [&](const auto& signer) {
+      return subject.IsEqual(signer->Public().get());
+    });
+    if (!fits) RequireCertFor(chains.back(), path, *signers[0]->Public());
+  }
+  return chains;
+}
+
+// Warns of what the certificate cannot be used for: its chains must reach what it says, while it
+// lasts.
+void CheckUse(const Options& options, const Grant& grant, const Signers& signers) {
+  SelfCheck check;
+  check.End("the certificate", grant.period.notAfter.get());
+  const Ref<TimeStamp> now = ParseTime("now", false);
+  const TimeStamp* const begin = grant.period.notBefore.get();
+  for (const std::string& path : options.chains) {
+    SelfCheck::Chain chain{path, ReadCerts(path)};
+    for (const auto& signer : signers) chain.signers.push_back(signer->Public());
+    chain.tag = grant.tag;
+    chain.at = begin != nullptr && begin->IsAfter(now.get()) ? begin : now.get();
+    check.CheckChain(chain);
+  }
+  check.Tell(options.strict);
+}
+
+ExitCode Run(const Options& options) {
+  const Wish wish = ReadWish(options);
+  const Ref<ByteString> comment = MakeText(options.comment);
+  Grant grant{wish.subject.get(), options.propagate, wish.tag.get(), ParsePeriod(options.period),
+              comment.get()};
+  Ref<SExpression> revocation;
+  if (!options.revocation.empty()) {
+    // Readers know the element by the length of its keyword, 10 to 19 characters.
+    revocation = ParseRevocationTag(options.revocation, "revocation-list");
+    grant.revocation = revocation.get();
+  }
+  const Signers signers = OpenSigners(options.signer);
+  const std::vector<CertChain> chains = ReadChains(options.chains, signers);
+  CheckUse(options, grant, signers);
+
+  const CertChain sequence = NewSequence();
+  for (const auto& signer : signers) {
+    const SignedCert issued = IssueCert(*signer, grant, options.signer.algorithm);
+    Append(*sequence, issued, options.owner.empty() ? wish.owner : options.owner);
+    Result()["certificates"].push_back(
+        DescribeCert(*issued.cert, issued.signature.get()).members());
+  }
+  for (const CertChain& chain : chains) AppendChain(*sequence, *chain);
+  WriteSequence(*sequence, options.output, options.flags);
+  if (signers.size() > 1 && !options.propagate) {
+    Note(
+        "note: without --propagate these certificates do not combine to a manifest's authority: "
+        "only the first of several may pass on to the content what it was granted");
+  }
+  return kYes;
+}
+
+}  // namespace
+
+Action DefineCertIssue(CLI::App& app) {
+  auto options = std::make_shared<Options>();
+  AddSignerOptions(app, options->signer, SignerCount::kSeveral);
+  auto* subject = app.add_option("--subject", options->subject, "The public key that is certified");
+  app.add_option("--request", options->request,
+                 "Or the key that made this request, for what it asks")
+      ->excludes(subject);
+  app.add_option("--tag", options->tag,
+                 "What for: \"(install (app calc))\"; of a request, less than it asks");
+  app.add_flag(
+      "--propagate", options->propagate,
+      "The subject may certify further keys; signing manifests needs it only where several "
+      "issuers must agree");
+  AddPeriodOptions(app, options->period);
+  app.add_option("--comment", options->comment, "A text for people, signed");
+  app.add_option("--owner", options->owner, "Whose certificate this is; travels along unsigned");
+  app.add_option("--chain", options->chains,
+                 "Certificate file of a signing key, whose chain is appended")
+      ->allow_extra_args(false);
+  app.add_option(
+      "--revocation", options->revocation,
+      "Valid only while a current list of this source does not revoke it: \"calc (revoke "
+      "all)\"");
+  app.add_option("-o,--output", options->output, "The certificate file")->required();
+  AddStrictFlag(app, options->strict);
+  AddWriteFlags(app, options->flags);
+  return [options] { return Run(*options); };
+}
+
+}  // namespace vesk2_command

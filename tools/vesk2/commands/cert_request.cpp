@@ -1,0 +1,48 @@
+// cert_request.cpp: vesk2 cert request: a key asks to be certified. The request is a certificate
+// that the key issues to itself, which shows that whoever asks has the key.
+#include "tools/vesk2/commands/command.h"
+#include "tools/vesk2/keys/issue.h"
+#include "tools/vesk2/say/report.h"
+
+namespace vesk2_command {
+namespace {
+
+struct Options {
+  SignerOptions signer;
+  std::string tag;
+  std::string comment;
+  std::string owner;
+  std::string output;
+  WriteFlags flags;
+};
+
+ExitCode Run(const Options& options) {
+  const Ref<SExpression> tag = ParseTag(options.tag);
+  const Ref<ByteString> comment = MakeText(options.comment);
+  const auto signer = OpenSigner(options.signer);
+  const Ref<PublicKey> subject = signer->Public();
+  const SignedCert issued = IssueCert(*signer, {subject.get(), false, tag.get(), {}, comment.get()},
+                                      options.signer.algorithm);
+  const CertChain request = NewSequence();
+  Append(*request, issued, options.owner);
+  WriteSequence(*request, options.output, options.flags);
+  Result()["subject"] = Fingerprint(*subject);
+  Result()["tag"] = TagText(tag.get());
+  return kYes;
+}
+
+}  // namespace
+
+Action DefineCertRequest(CLI::App& app) {
+  auto options = std::make_shared<Options>();
+  AddSignerOptions(app, options->signer);
+  app.add_option("--tag", options->tag, "What the key asks for: \"(install (app calc))\"")
+      ->required();
+  app.add_option("--comment", options->comment, "A text for the issuer, signed");
+  app.add_option("--owner", options->owner, "Whose key this is; goes into the certificate file");
+  app.add_option("-o,--output", options->output, "The request file, .req")->required();
+  AddWriteFlags(app, options->flags);
+  return [options] { return Run(*options); };
+}
+
+}  // namespace vesk2_command

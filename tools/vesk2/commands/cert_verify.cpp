@@ -1,0 +1,101 @@
+// cert_verify.cpp: vesk2 cert verify.
+#include "tools/vesk2/commands/command.h"
+#include "tools/vesk2/explain/effort.h"
+#include "tools/vesk2/explain/explain.h"
+#include "tools/vesk2/objects/cert_chain.h"
+#include "tools/vesk2/objects/texts.h"
+#include "tools/vesk2/say/report.h"
+#include "tools/vesk2/stores/acl_store.h"
+#include "tools/vesk2/verify/store_check.h"
+
+#include <vesk2/evidence.h>
+
+namespace vesk2_command {
+namespace {
+
+struct Options {
+  std::string file;
+  std::string tag;
+  std::string at;
+  PeriodOptions period;
+  bool explain = false;
+  StoreCheck stores;
+};
+
+Period AskedPeriod(const Options& options) {
+  if (!options.period.notBefore.empty() || !options.period.notAfter.empty()) {
+    return ParsePeriod(options.period);
+  }
+  const std::string at = options.at.empty() ? "now" : options.at;
+  return {ParseTime(at, false), ParseTime(at, false)};
+}
+
+// The answer about every member; the first refusal is the answer to all.
+int VerifyMembers(const CertChain& chain, const Question& question, const StoreCheck& stores,
+                  ZvVesk2::Evidence& proved) {
+  const Request& request = *question.request;
+  int first = 0;
+  for (size_t i = 0; i < request.members.size(); ++i) {
+    SExpression* tag = request.members[i].tag.get();
+    const int code = i != 0 ? proved.Judge(tag)
+                            : chain->Verify(nullptr, tag, question.period.notBefore.get(),
+                                            question.period.notAfter.get(), proved);
+    if (code == VESK2_ERR_MEM_ALLOC || code == VESK2_ERR_READ_FILE)
+      Check(code, Escape(question.file));
+    if (proved.GetEntries() == nullptr) ThrowNoStore(VESK2_ERR_ACL_ENTRY_NOT_FOUND);
+    if (code < 0) {
+      ExplainUnreadable(question, code);
+      Check(code, Escape(question.file));
+    }
+    if (i == 0) (void)CheckStores(question, stores);
+    TellMember(request, i, code);
+    if (first == 0) first = code;
+  }
+  return first;
+}
+
+ExitCode Run(const Options& options) {
+  StartAnswer();
+  const Request request = ParseRequest(options.tag);
+  Question question;
+  question.file = options.file;
+  question.request = &request;
+  question.period = AskedPeriod(options);
+  const CertChain chain = ReadCertChain(options.file);
+  const std::vector<ChainLink> links = ChainLinks(chain, options.file);
+
+  const std::string tag = TagText(request.tag.get());
+  const std::string subject = SubjectText(*links[0].cert->GetSubject());
+  Result()["subject"] = subject;
+  Result()["tag"] = tag;
+  ZvVesk2::Evidence proved(nullptr);
+  question.proved = &proved;
+  const int code = VerifyMembers(chain, question, options.stores, proved);
+  if (code != 0) {
+    const ExitCode verdict = No(code, CodeWords(code));
+    ExplainRefusal(question, code);
+    return verdict;
+  }
+  const ExitCode verdict = Yes(subject + " is granted " + tag);
+  if (options.explain) ExplainGrant(question);
+  return verdict;
+}
+
+}  // namespace
+
+Action DefineCertVerify(CLI::App& app) {
+  auto options = std::make_shared<Options>();
+  app.add_option("file", options->file, "The certificate file: a chain")->required();
+  app.add_option("--tag", options->tag,
+                 "What its first subject must be authorized for; of a set, every member")
+      ->required();
+  AddPeriodOptions(app, options->period);
+  app.add_option("--at", options->at, "Authorized at this moment [now]")
+      ->excludes("--not-before")
+      ->excludes("--not-after");
+  AddStoreCheckOptions(app, options->stores);
+  app.add_flag("--explain", options->explain, "Tell why also when the answer is yes");
+  return [options] { return Run(*options); };
+}
+
+}  // namespace vesk2_command

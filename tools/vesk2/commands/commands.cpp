@@ -1,0 +1,129 @@
+// commands.cpp: the table of subcommands.
+#include "tools/vesk2/commands/command.h"
+
+namespace vesk2_command {
+namespace {
+
+constexpr Noun kNouns[] = {
+    {"key", "Make and show keys",
+     "Keys are the principals of the system: a grant names a key, and a key signs. The private "
+     "half is a PEM file (PKCS#8), if you wish under a passphrase; the public half is what others "
+     "need, a canonical S-expression.\n"
+     "A key is known by its fingerprint, the SHA-256 of its public half. File names and comments "
+     "do not count."},
+    {"acl", "Decide what this machine trusts",
+     "Every answer starts in the access-control entries of the machine's store. An entry trusts a "
+     "key for a tag, unsigned: whoever may write the store decides.\n"
+     "An entry that propagates lets its key pass the grant on, by certificates to other keys "
+     "and by signing to the files of a manifest."},
+    {"cert", "Pass authority on to another key, and check how it came",
+     "A certificate passes what its issuer was granted, or less, on to its subject, for a time. A "
+     "certificate file holds a chain: the certificate of interest first, then those that lead up "
+     "to a key that this machine trusts.\n"
+     "Along a chain tags and periods only narrow, and every certificate but the first must let its "
+     "subject pass the grant on."},
+    {"crl", "Take authority back",
+     "A revocation list names certificates and keys that are not to be honoured any more. The "
+     "machine believes a list when an access-control entry of exactly its tag, which ends in "
+     "(revoke ...), is for its signer.\n"
+     "A revoked key is honoured nowhere. Certificates are looked up in the list that they name as "
+     "their source, and without a current one they are refused."},
+    {"manifest", "Sign a directory, and check one",
+     "A manifest lists every file of a directory with its digest, and is signed. It carries the "
+     "signer's certificates, so that whoever gets it needs nothing else. Verifying asks two "
+     "things: is the directory as listed, and was the signer authorized?\n"
+     "The second is asked about the time of signing, which is the signer's word, with what is "
+     "revoked by now: a lost key can date back, so revoke it with --revoke-key. --at signing takes "
+     "the signer's word for revocation too; --at asks about another moment."},
+    {"tag", "Compare tags",
+     "A tag says what is granted, or asked. A longer list is narrower: who was granted (install) "
+     "may also (install (app calc)), not the other way round."},
+    {"show", "Show any object", "Reads what any file of the system holds, in both its forms."},
+    {"store", "Look at the stores of this machine",
+     "The machine's store holds what is trusted (acl) and the revocation lists; the user's store "
+     "holds certificates. --global and --home name them, else VESK2_GLOBAL and VESK2_HOME, else "
+     "/etc/vesk2 and $XDG_DATA_HOME/vesk2."},
+    {"version", "Show the version of the command and the library", ""},
+    {"completion", "Write a script that completes commands in a shell",
+     "The scripts know what the command line knows: both come from one table."},
+    {"manual", "Write a manual page", "Pages are in the language of man(7), as man -l - reads it."},
+};
+
+constexpr Command kCommands[] = {
+    {"key", "new", "Make a key pair, or several: NAME.pem (private) and NAME.pub",
+     "vesk2 key new vendor\nvesk2 key new --encrypt alice bob carol", DefineKeyNew},
+    {"key", "show", "Show type, size and fingerprint of a key", "vesk2 key show vendor.pub",
+     DefineKeyShow},
+    {"key", "export", "Write a public key as other programs read it",
+     "vesk2 key export vendor.pub --format x509\nvesk2 key export vendor.pem --format ssh -o v.ssh",
+     DefineKeyExport},
+    {"acl", "grant", "Write an entry into the ACL store: a root of trust",
+     "vesk2 acl grant --subject vendor.pub --tag '(install)' --propagate\n"
+     "vesk2 acl grant --threshold 2 --subject alice.pub --subject bob.pub --subject carol.pub "
+     "--tag '(install)' --propagate",
+     DefineAclGrant},
+    {"acl", "list", "Show what this machine trusts", "vesk2 acl list", DefineAclList},
+    {"acl", "install", "Copy entry files into the ACL store", "vesk2 acl install vendor.acl",
+     DefineAclInstall},
+    {"acl", "remove", "Trust an entry no longer", "vesk2 acl remove vendor", DefineAclRemove},
+    {"cert", "request", "Ask to be certified",
+     "vesk2 cert request --key signer.pem --tag '(install (app calc))' -o signer.req",
+     DefineCertRequest},
+    {"cert", "issue", "Certify a key for a tag",
+     "vesk2 cert issue --key vendor.pem --subject signer.pub --tag '(install (app calc))' "
+     "-o signer.cert\n"
+     "vesk2 cert issue --key vendor.pem --request signer.req -o signer.cert\n"
+     "vesk2 cert issue --key alice.pem --key bob.pem --subject signer.pub --tag '(install)' "
+     "--propagate -o signer.cert",
+     DefineCertIssue},
+    {"cert", "renew", "Issue a certificate of a chain or manifest again",
+     "vesk2 cert renew signer.cert:2 --key vendor.pem --not-after 2028 -o signer.cert --force",
+     DefineCertRenew},
+    {"cert", "cosign", "Certify the same as a certificate of a chain or manifest does",
+     "vesk2 cert cosign signer.cert:2 --key bob.pem -o signer.cert --force", DefineCertCosign},
+    {"cert", "show", "Show the certificates of a chain", "vesk2 cert show signer.cert",
+     DefineCertShow},
+    {"cert", "verify", "Is the first subject of a chain authorized?",
+     "vesk2 cert verify signer.cert --tag '(install (app calc))'", DefineCertVerify},
+    {"cert", "find", "Find stored chains for a tag", "vesk2 cert find --tag '(install (app calc))'",
+     DefineCertFind},
+    {"crl", "issue", "Sign a list of what is revoked",
+     "vesk2 crl issue --key vendor.pem --tag 'install (revoke all)' --revoke-key signer.pub "
+     "--not-after 2027 -o vendor.crl\n"
+     "vesk2 crl issue --key vendor.pem --tag 'install (revoke all)' --revoke-key signer.pub "
+     "--not-after 2027 --grant --import",
+     DefineCrlIssue},
+    {"crl", "import", "Offer lists to the store", "vesk2 crl import vendor.crl", DefineCrlImport},
+    {"crl", "show", "Show what a list revokes", "vesk2 crl show vendor.crl", DefineCrlShow},
+    {"crl", "verify", "Is a list current, and vouched for?", "vesk2 crl verify vendor.crl",
+     DefineCrlVerify},
+    {"manifest", "sign", "Sign what a directory holds",
+     "vesk2 manifest sign app --key signer.pem --cert signer.cert --tag '(install (app calc))' "
+     "-o app.manifest",
+     DefineManifestSign},
+    {"manifest", "verify", "Is a directory as signed, by someone authorized?",
+     "vesk2 manifest verify app app.manifest --tag '(install (app calc))'", DefineManifestVerify},
+    {"manifest", "show", "Show who signed a manifest, and what it lists",
+     "vesk2 manifest show app.manifest --files", DefineManifestShow},
+    {"manifest", "compare", "Do two manifests list the same?",
+     "vesk2 manifest compare old.manifest new.manifest", DefineManifestCompare},
+    {"tag", "check", "Does a tag lie within another, and where not?",
+     "vesk2 tag check '(install (app calc))' '(install)'", DefineTagCheck},
+    {"show", "", "Show any object: a key, a certificate, a list, a manifest, a tag",
+     "vesk2 show signer.cert\nvesk2 show --json app.manifest\nvesk2 show --advanced -", DefineShow},
+    {"store", "show", "Show where the stores are and what they hold", "vesk2 store show",
+     DefineStoreShow},
+    {"version", "", "Show the version of the command and the library", "vesk2 version",
+     DefineVersion},
+    {"completion", "", "Write a script that completes commands in a shell",
+     "source <(vesk2 completion bash)", DefineCompletion},
+    {"manual", "", "Write a manual page: of the command, or of one group",
+     "vesk2 manual cert | man -l -", DefineManual},
+};
+
+}  // namespace
+
+std::span<const Command> Commands() { return kCommands; }
+std::span<const Noun> Nouns() { return kNouns; }
+
+}  // namespace vesk2_command

@@ -1,0 +1,222 @@
+// crl_issue.cpp: vesk2 crl issue.
+#include "tools/vesk2/commands/command.h"
+#include "tools/vesk2/files/files.h"
+#include "tools/vesk2/keys/key_source.h"
+#include "tools/vesk2/objects/texts.h"
+#include "tools/vesk2/say/report.h"
+#include "tools/vesk2/stores/acl_store.h"
+#include "tools/vesk2/stores/crl_drop.h"
+#include "tools/vesk2/stores/crl_store.h"
+#include "tools/vesk2/stores/crl_stored.h"
+
+#include <vesk2/acl_entry.h>
+#include <vesk2/limits.h>
+
+namespace vesk2_command {
+namespace {
+
+using ZvVesk2::Crl;
+using ZvVesk2::Hash;
+
+struct Options {
+  SignerOptions signer;
+  std::string tag;
+  std::vector<std::string> certs;
+  std::vector<std::string> keys;
+  std::string itemsOf;
+  std::vector<std::string> drops;
+  std::string date = "now";
+  PeriodOptions period;
+  std::string hash = "sha256";
+  std::string output;
+  bool grant = false;
+  bool import = false;
+  WriteFlags flags;
+};
+
+ZvclmHashID HashId(const std::string& name) {
+  return name == "sha1" ? ZVCLM_HASH_SHA1 : ZVCLM_HASH_SHA256;
+}
+
+// (item (hash NAME DIGEST) DATE)
+std::string Item(const std::string& hash, const std::string& digest, const TimeStamp& date) {
+  const std::string stamp(reinterpret_cast<const char*>(date.GetData()), date.GetLength());
+  return "(" + Atom("item") + "(" + Atom("hash") + Atom(hash) + Atom(digest) + ")" + Atom(stamp) +
+         ")";
+}
+
+std::string Digest(DExpression& object, const std::string& hash, bool ignoreHints) {
+  unsigned char* digest = nullptr;
+  unsigned int length = 0;
+  Check(object.ComputeHash(digest, length, HashId(hash), ignoreHints), "digest of an object");
+  const std::unique_ptr<unsigned char[]> owner(digest);
+  return {reinterpret_cast<char*>(digest), length};
+}
+
+// FILE or FILE:N: the digest of the first or N-th certificate of a file, as it stands there.
+std::string CertDigest(const std::string& argument, const std::string& hash) {
+  const Place place = ParsePlace(argument);
+  const size_t number = place.number != 0 ? place.number : 1;
+  const std::vector<SignedCert> certs = ReadCerts(place.path);
+  RequireCert(certs, number, place.path);
+  return Digest(*certs[number - 1].cert, hash, false);
+}
+
+Ref<Crl> MakeList(const Options& options, CrlSequence* old, const Drops& drops) {
+  const Ref<TimeStamp> date = ParseTime(options.date, false);
+  std::string certs;
+  std::string keys;
+  for (const std::string& argument : options.certs) {
+    certs += Item(options.hash, CertDigest(argument, options.hash), *date);
+  }
+  for (const std::string& path : options.keys) {
+    keys += Item(options.hash, Digest(*ReadPublicKey(path), options.hash, true), *date);
+  }
+  if (old != nullptr) {
+    certs += drops.ItemsOf(*old->GetCrl()->GetList1());
+    keys += drops.ItemsOf(*old->GetCrl()->GetList2());
+  }
+  // A list without items counts as absent, and every certificate that depends on it as
+  // undetermined. This item is the digest of nothing.
+  if (certs.empty()) {
+    certs = Item(options.hash, std::string(options.hash == "sha1" ? 20 : 32, '\0'), *date);
+  }
+  const Buffer buffer =
+      WrapBytes("(3:crl(7:version1:1)(5:list1" + certs + ")(5:list2" + keys + "))");
+  Ref<Crl> list(new Crl(nullptr));
+  Check(list->Import(buffer.get()), "building a revocation list");
+  return list;
+}
+
+Ref<Hash> HashOf(Crl& list, const std::string& name) {
+  Ref<Hash> hash(new Hash(nullptr));
+  Check(hash->Init(HashId(name)), "hashing");
+  Check(hash->Update(&list), "hashing");
+  Check(hash->Finalize(), "hashing");
+  return hash;
+}
+
+// The list as a file holds it.
+std::string SignList(Crl& list, SExpression* tag, const SigningKey& key, const Options& options) {
+  const Ref<Hash> subject = HashOf(list, options.hash);
+  Grant grant{subject.get()};
+  grant.tag = tag;
+  grant.period = ParsePeriod(options.period);
+  const SignedCert issued = IssueCert(key, grant, options.signer.algorithm);
+  return "(" + Atom("sequence") + Canonical(list) + Canonical(*issued.cert) +
+         Canonical(*issued.signature) + ")";
+}
+
+// The stored list that the new one takes the place of, when it counts. One that does not revokes
+// nothing; one that this user may not read is no reason to believe so.
+Ref<CrlSequence> ListBefore(SExpression* tag, const Drops& drops) {
+  Ref<SExpression> acls;
+  const int code = ZvVesk2::AclEntry::Import(acls.Out(), nullptr, nullptr);
+  if (code == VESK2_ERR_MEM_ALLOC) throw std::bad_alloc();
+  StoredList stored = FindStored(tag, code == 0 ? acls.get() : nullptr);
+  if (stored.problem.empty()) return std::move(stored.list);
+  if (stored.unread && !drops.all()) {
+    throw Trouble(stored.problem + "; it may revoke what this list lets go (--drop all)", "io");
+  }
+  Note("note: the stored list does not count: " + stored.problem);
+  return {};
+}
+
+Ref<Crl> MakeSuccessor(const Options& options, SExpression* tag) {
+  const Drops drops(options.drops);
+  Ref<CrlSequence> old;
+  if (!options.itemsOf.empty()) old = ReadCrl(options.itemsOf);
+  const Ref<CrlSequence> stored = ListBefore(tag, drops);
+  Ref<Crl> list = MakeList(options, old.get(), drops);
+  std::vector<const Crl*> before;
+  if (old) before.push_back(old->GetCrl());
+  if (stored) before.push_back(stored->GetCrl());
+  drops.Settle(before, *list);
+  return list;
+}
+
+// Puts the list into this machine's store, or says that it would.
+void Import(const std::string& bytes, const Options& options, const std::string& items) {
+  const Buffer buffer = WrapBytes(bytes);
+  const Ref<CrlSequence> list(new CrlSequence(nullptr));
+  Check(list->Import(buffer.get()), "storing the list");
+  if (options.flags.dryRun) return Note("would store " + CrlText(*list));
+  const std::string reason = StoreCrl(*list, LoadAcls().get(), "the list");
+  if (!reason.empty()) throw Trouble("the list was not stored: " + reason, "not-stored");
+  Note("stored " + CrlText(*list) + items);
+  Result()["stored"] = true;
+}
+
+ExitCode Run(const Options& options) {
+  if (options.output.empty() && !options.import) {
+    throw Trouble("nowhere to put the list: --output or --import", "usage");
+  }
+  const Ref<SExpression> tag = ParseRevocationTag(options.tag);
+  if (!NamesFile(tag.get())) {
+    throw Trouble("--tag: too long; the store names the list's file by it", "usage");
+  }
+  const WriteFlags& flags = options.flags;
+  if (!options.output.empty()) RefuseExisting(options.output, flags.force);
+  const auto key = OpenSigner(options.signer);
+  const Ref<Crl> list = MakeSuccessor(options, tag.get());
+  const std::string bytes = SignList(*list, tag.get(), *key, options);
+  const auto readBack = [](const std::string& temporary) {
+    Check(CheckIssuerWord(*ReadCrl(temporary)), "checking the new list");
+  };
+  if (options.grant) {
+    TrustSource(*key->Public(), tag.get(), options.signer.keys[0], flags.dryRun);
+  }
+  const std::string items = "; revoked certificates: " + std::to_string(options.certs.size()) +
+                            ", keys: " + std::to_string(options.keys.size());
+  if (options.import) Import(bytes, options, items);
+  if (!options.output.empty() &&
+      WriteFile(options.output, bytes, {0666, flags.force, readBack, flags.dryRun})) {
+    Note("wrote " + Escape(options.output) + items);
+  }
+  Result()["tag"] = TagText(tag.get());
+  Result()["issuer"] = Fingerprint(*key->Public());
+  Result()["revoked_certificates"] = options.certs.size();
+  Result()["revoked_keys"] = options.keys.size();
+  return kYes;
+}
+
+}  // namespace
+
+Action DefineCrlIssue(CLI::App& app) {
+  auto options = std::make_shared<Options>();
+  AddSignerOptions(app, options->signer);
+  app.add_option("--tag", options->tag, "The source of the list: \"calc (revoke all)\"")
+      ->required();
+  app.add_option("--revoke-cert", options->certs,
+                 "A certificate that is revoked: FILE, or FILE:N for the N-th of a chain. Whoever "
+                 "has its key can sign with an earlier date: for a leaked key, --revoke-key")
+      ->allow_extra_args(false);
+  app.add_option("--revoke-key", options->keys,
+                 "A public key that is revoked, whatever the date: one that leaked")
+      ->allow_extra_args(false);
+  app.add_option("--items-of", options->itemsOf,
+                 "Revoke what this list revokes, too: the one that is replaced");
+  app.add_option("--drop", options->drops,
+                 "Let this go, which the list before revokes (that of --items-of, and the stored "
+                 "one): a digest as crl show writes it, or \"all\"")
+      ->allow_extra_args(false);
+  app.add_option("--date", options->date, "From when on the certificates are revoked")
+      ->capture_default_str();
+  AddPeriodOptions(app, options->period);
+  // A list without an end answers nothing and replaces nothing.
+  app.get_option("--not-after")->required();
+  app.add_option("--hash", options->hash, "How the list and what it names are hashed")
+      ->check(CLI::IsMember({"sha256", "sha1"}))
+      ->capture_default_str();
+  app.add_option("-o,--output", options->output, "The revocation list file, .crl");
+  app.add_flag("--import", options->import, "Put the list into this machine's store");
+  app.add_flag("--grant", options->grant,
+               "Let this machine believe the key's lists of this source: writes the ACL entry");
+  AddWriteFlags(app, options->flags);
+  app.footer(
+      "A list that revokes no certificate holds one dummy item, a digest of zeros: without any "
+      "item\nit would count as absent.");
+  return [options] { return Run(*options); };
+}
+
+}  // namespace vesk2_command

@@ -1,0 +1,16 @@
+// crl_show.cpp: vesk2 crl show.
+#include "tools/vesk2/commands/command.h"
+#include "tools/vesk2/commands/describe.h"
+
+namespace vesk2_command {
+
+Action DefineCrlShow(CLI::App& app) {
+  auto file = std::make_shared<std::string>();
+  app.add_option("file", *file, "A revocation list file")->required();
+  return [file] {
+    Present(DescribeCrl(*ReadCrl(*file)));
+    return kYes;
+  };
+}
+
+}  // namespace vesk2_command

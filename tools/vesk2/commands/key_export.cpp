@@ -1,0 +1,90 @@
+// key_export.cpp: vesk2 key export.
+#include <openssl/evp.h>
+#include <unistd.h>
+
+#include "tools/vesk2/commands/command.h"
+#include "tools/vesk2/files/files.h"
+#include "tools/vesk2/keys/keys.h"
+#include "tools/vesk2/say/report.h"
+
+namespace vesk2_command {
+namespace {
+
+struct Options {
+  std::string file;
+  std::string format;
+  std::string output = kStandard;
+  PassphraseOptions passphrase;
+  WriteFlags flags;
+};
+
+using Exporter = int (PublicKey::*)(unsigned char*&, unsigned int&);
+
+std::string Export(PublicKey& key, Exporter exporter) {
+  unsigned char* data = nullptr;
+  unsigned int length = 0;
+  const int code = (key.*exporter)(data, length);
+  const std::unique_ptr<unsigned char[]> owner(data);
+  Check(code, "exporting the key");
+  return {reinterpret_cast<char*>(data), length};
+}
+
+std::string Base64(const std::string& bytes) {
+  std::string out(4 * ((bytes.size() + 2) / 3) + 1, '\0');
+  const int length = EVP_EncodeBlock(reinterpret_cast<unsigned char*>(out.data()),
+                                     reinterpret_cast<const unsigned char*>(bytes.data()),
+                                     static_cast<int>(bytes.size()));
+  out.resize(static_cast<size_t>(length));
+  return out;
+}
+
+std::string Pem(const std::string& der) {
+  constexpr size_t kLine = 64;
+  const std::string text = Base64(der);
+  std::string pem = "-----BEGIN PUBLIC KEY-----\n";
+  for (size_t at = 0; at < text.size(); at += kLine) pem += text.substr(at, kLine) + "\n";
+  return pem + "-----END PUBLIC KEY-----\n";
+}
+
+std::string Ssh(PublicKey& key) {
+  const char* type = key.GetType() == ZVCLM_KEY_RSA ? "ssh-rsa " : "ssh-dss ";
+  return type + Base64(Export(key, &PublicKey::SshExport)) + "\n";
+}
+
+ExitCode Run(const Options& options) {
+  const PublicHalf half = ReadPublicHalf(options.file, options.passphrase);
+  const std::string text = options.format == "ssh" ? Ssh(*half.key)
+                           : options.format == "x509"
+                               ? Pem(Export(*half.key, &PublicKey::X509Export))
+                               : Canonical(*half.key);
+  Result()["format"] = options.format;
+  Result()["base64"] = Base64(text);
+  const bool standard = options.output == kStandard;
+  if (standard && GetStyle().json) return kYes;  // the answer holds it
+  if (standard && options.format == "canonical" && isatty(STDOUT_FILENO) == 1) {
+    throw Trouble("the canonical form is not for a terminal: --output FILE", "usage");
+  }
+  if (WriteFile(options.output, text, {0666, options.flags.force, {}, options.flags.dryRun}) &&
+      !standard) {
+    Note("wrote " + Escape(options.output));
+  }
+  return kYes;
+}
+
+}  // namespace
+
+Action DefineKeyExport(CLI::App& app) {
+  auto options = std::make_shared<Options>();
+  app.add_option("file", options->file, "A key file: .pub, or PEM")->required();
+  app.add_option("--format", options->format,
+                 "How: a line for SSH, an X.509 SubjectPublicKeyInfo in PEM, or our own form")
+      ->check(CLI::IsMember({"ssh", "x509", "canonical"}))
+      ->required();
+  app.add_option("-o,--output", options->output, "The file to write, or - for standard output")
+      ->capture_default_str();
+  AddPassphraseOptions(app, options->passphrase);
+  AddWriteFlags(app, options->flags);
+  return [options] { return Run(*options); };
+}
+
+}  // namespace vesk2_command

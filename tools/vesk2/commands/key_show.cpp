@@ -1,0 +1,31 @@
+// key_show.cpp: vesk2 key show.
+#include "tools/vesk2/commands/command.h"
+#include "tools/vesk2/commands/describe.h"
+#include "tools/vesk2/keys/keys.h"
+#include "tools/vesk2/say/report.h"
+
+namespace vesk2_command {
+namespace {
+
+struct Options {
+  std::string file;
+  PassphraseOptions passphrase;
+};
+
+ExitCode Run(const Options& options) {
+  const PublicHalf half = ReadPublicHalf(options.file, options.passphrase);
+  Present(DescribeKey(*half.key));
+  Result()["private"] = half.ofPrivate;
+  return kYes;
+}
+
+}  // namespace
+
+Action DefineKeyShow(CLI::App& app) {
+  auto options = std::make_shared<Options>();
+  app.add_option("file", options->file, "A key file: .pub, or PEM")->required();
+  AddPassphraseOptions(app, options->passphrase);
+  return [options] { return Run(*options); };
+}
+
+}  // namespace vesk2_command

@@ -1,0 +1,68 @@
+// manifest_compare.cpp: vesk2 manifest compare.
+#include "tools/vesk2/commands/command.h"
+#include "tools/vesk2/files/files.h"
+#include "tools/vesk2/objects/manifest_file.h"
+#include "tools/vesk2/say/report.h"
+
+namespace vesk2_command {
+namespace {
+
+using ZvVesk2::Manifest;
+
+struct Options {
+  std::string from;
+  std::string to;
+};
+
+// One kind of difference, and the names.
+struct Difference {
+  std::string kind;
+  std::vector<std::string> names;
+};
+
+ExitCode Answer(const Manifest& manifest, int code) {
+  const std::set<std::string> parents = FoundParents(manifest);
+  const Difference differences[] = {{"changed", FoundNames(manifest.GetInvalid(), parents)},
+                                    {"removed", FoundNames(manifest.GetMissing(), parents)},
+                                    {"added", FoundNames(manifest.GetExtra(), parents)}};
+  std::string summary;
+  for (const auto& [kind, names] : differences) {
+    Result()[kind] = Json::array();
+    for (const std::string& name : names) Result()[kind].push_back(Escape(name));
+    if (names.empty()) continue;
+    summary += (summary.empty() ? "" : ", ") + std::to_string(names.size()) + " " + kind;
+  }
+  const size_t same = CountFiles(manifest.GetValid());
+  Result()["same_files"] = same;
+  if (code == 0) return Yes("both list the same, " + std::to_string(same) + " files");
+  const ExitCode verdict = No(code, summary);
+  for (const auto& [kind, names] : differences) {
+    for (const std::string& name : names) Say(kind + ": " + Escape(name));
+  }
+  return verdict;
+}
+
+ExitCode Run(const Options& options) {
+  for (const std::string& path : {options.from, options.to}) {
+    const int code = CheckManifest(path);
+    if (code != 0) return No(code, Escape(path) + ": " + CodeWords(code));
+  }
+  Manifest manifest(nullptr);
+  Check(manifest.Initialize("", InputPath(options.from).c_str(), "none"), Escape(options.from));
+  const int code = manifest.CompareManifest(InputPath(options.to).c_str());
+  const bool compared = manifest.GetInvalid() != nullptr || manifest.GetMissing() != nullptr ||
+                        manifest.GetExtra() != nullptr;
+  if (code != 0 && !compared) Check(code, Escape(options.from) + ", " + Escape(options.to));
+  return Answer(manifest, code);
+}
+
+}  // namespace
+
+Action DefineManifestCompare(CLI::App& app) {
+  auto options = std::make_shared<Options>();
+  app.add_option("from", options->from, "A manifest file")->required();
+  app.add_option("to", options->to, "The manifest that it is compared with")->required();
+  return [options] { return Run(*options); };
+}
+
+}  // namespace vesk2_command

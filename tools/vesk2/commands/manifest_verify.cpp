@@ -1,0 +1,233 @@
+// manifest_verify.cpp: vesk2 manifest verify.
+#include "tools/vesk2/commands/command.h"
+#include "tools/vesk2/explain/effort.h"
+#include "tools/vesk2/explain/explain.h"
+#include "tools/vesk2/files/files.h"
+#include "tools/vesk2/objects/manifest_file.h"
+#include "tools/vesk2/say/progress.h"
+#include "tools/vesk2/say/report.h"
+#include "tools/vesk2/stores/acl_store.h"
+#include "tools/vesk2/tree/tree.h"
+#include "tools/vesk2/tree/tree_findings.h"
+#include "tools/vesk2/verify/keep_lists.h"
+#include "tools/vesk2/verify/store_check.h"
+#include "tools/vesk2/verify/today.h"
+
+#include <vesk2/evidence.h>
+#include <vesk2/manifest.h>
+
+namespace vesk2_command {
+namespace {
+
+using ZvVesk2::Manifest;
+
+struct Options {
+  std::string directory;
+  std::string manifest;
+  std::string tag;
+  PeriodOptions period;
+  std::string at;
+  bool allowExtra = false;
+  bool allowLinks = false;
+  bool noStoreUpdate = false;
+  std::string aclDirectory;
+  std::vector<std::string> ignored;
+  bool explain = false;
+  StoreCheck stores;
+};
+
+constexpr const char* kSigning = "signing";
+
+Period AskedPeriod(const Options& options) {
+  if (options.at == kSigning) return {};
+  if (options.at.empty()) return ParsePeriod(options.period);
+  return {ParseTime(options.at, false), ParseTime(options.at, false)};
+}
+
+// Whether nobody said what moment the answer is about.
+bool IsAboutToday(const Options& options) {
+  return options.at.empty() && options.period.notBefore.empty() && options.period.notAfter.empty();
+}
+
+TreeQuestion AboutTree(const Options& options) {
+  TreeQuestion tree{
+      options.directory, options.manifest, {}, options.allowExtra, options.allowLinks};
+  for (const std::string& name : options.ignored) tree.ignored.insert(PlainRelative(name));
+  return tree;
+}
+
+void Configure(Manifest& manifest, const Options& options, const std::string& tag,
+               const std::set<std::string>& ignored) {
+  Check(manifest.Initialize(options.directory.c_str(), options.manifest.c_str(), tag.c_str()),
+        "preparing");
+  manifest.SetFailOnExtraEntries(!options.allowExtra);
+  manifest.SetStoreUpdate(false);  // the answer decides what is kept
+  if (!options.aclDirectory.empty()) manifest.SetExtraAclDirectory(NewText(options.aclDirectory));
+  IgnoreEntries(manifest, ignored);
+}
+
+bool JudgedTree(const Manifest& manifest, int code) {
+  return code == 0 || manifest.GetInvalid() != nullptr || manifest.GetMissing() != nullptr ||
+         (code == VESK2_ERR_EXTRA_FILES && manifest.GetExtra() != nullptr);
+}
+
+int VerifyFiles(Manifest& manifest, const Options& options, const Period& period) {
+  const ProgressLine progress("verifying", options.directory);
+  Check(manifest.SetFileCallbacks(progress.Callbacks()), "preparing");
+  const int code = manifest.VerifyManifest(period.notBefore ? period.notBefore->ToTime() : 0,
+                                           period.notAfter ? period.notAfter->ToTime() : 0);
+  Check(manifest.SetFileCallbacks(nullptr), "preparing");
+  return code;
+}
+
+// How to sign the tree again as it was asked about.
+std::vector<std::string> SigningWords(const Options& options) {
+  std::vector<std::string> words = {options.directory};
+  for (const std::string& name : options.ignored) {
+    words.push_back("--ignore");
+    words.push_back(name);
+  }
+  if (options.allowLinks) words.push_back("--allow-links");
+  return words;
+}
+
+// One verification: what was asked, and what came of it.
+class Answer {
+ public:
+  explicit Answer(const Options& options)
+      : options_(options), request_(ParseRequest(options.tag)), manifest_(nullptr) {
+    question_.file = options.manifest;
+    question_.manifest = true;
+    question_.request = &request_;
+    question_.period = AskedPeriod(options);
+    question_.aclDirectory = options.aclDirectory;
+    question_.signing = SigningWords(options);
+    question_.proved = &proved_;
+    Configure(manifest_, options, request_.members[0].text, AboutTree(options).ignored);
+    manifest_.SetEvidence(&proved_);
+  }
+
+  ExitCode Give() {
+    code_ = VerifyFiles(manifest_, options_, question_.period);
+    const bool judged = JudgedTree(manifest_, code_);
+    if (!judged && !IsRefusal(code_)) ThrowTrouble();
+    const std::set<std::string> broken = CheckStores(question_, options_.stores);
+    if (IsAboutToday(options_)) today_.emplace(proved_);
+    const int refused = JudgeMembers(judged ? 0 : code_);
+    const ExitCode verdict = refused != 0 ? Refuse(refused) : AnswerTree();
+    if (!options_.noStoreUpdate) KeepLists(proved_, verdict == kYes, broken);
+    return verdict;
+  }
+
+ private:
+  [[noreturn]] void ThrowTrouble() {
+    if (code_ < 0) ExplainUnreadable(question_, code_);
+    if (code_ == VESK2_ERR_FILE_NOT_FOUND || code_ == VESK2_ERR_FIND_DIR) ThrowNoStore(code_);
+    ThrowUnreadable(options_.manifest, manifest_, code_);
+  }
+
+  // The first refusal of a member of the asked set; `first` is the library's for the first member.
+  int JudgeMembers(int first) {
+    int refused = 0;
+    for (size_t i = 0; i < request_.members.size(); ++i) {
+      int code = i == 0 ? first : JudgeMember(request_.members[i].tag.get());
+      if (code == 0 && today_) {
+        code = today_->Judge(request_.members[i].tag.get());
+        byToday_ |= refused == 0 && code != 0;
+      }
+      TellMember(request_, i, code);
+      if (refused == 0) refused = code;
+    }
+    return refused;
+  }
+
+  int JudgeMember(SExpression* tag) {
+    ZvVesk2::Evidence same(nullptr);
+    Check(same.Copy(proved_), "judging a member");
+    const int code = same.Judge(tag);
+    if (code < 0 || code == VESK2_ERR_MEM_ALLOC) Check(code, Escape(options_.manifest));
+    return code != 0 ? code : proved_.GetContentCode();
+  }
+
+  ExitCode Refuse(int code) {
+    int explained = code;
+    if (today_) {
+      question_.proved = &today_->evidence();
+      const int now = today_->Judge(request_.members[0].tag.get());
+      if (now != 0) explained = now;
+    }
+    const ExitCode verdict = byToday_ ? today_->Refuse(question_, code) : No(code, CodeWords(code));
+    ExplainRefusal(question_, explained);
+    return verdict;
+  }
+
+  ExitCode AnswerTree() {
+    const std::string signedAt = StampText(*proved_.GetSigningTime());
+    if (today_ && IsSignedInFuture(proved_)) {
+      return No("signed-in-future", "the manifest says it was signed at " + signedAt +
+                                        ", which is yet to come (--at tells when to judge it)");
+    }
+    const std::vector<Finding> findings = FindInTree(manifest_, AboutTree(options_));
+    const std::string summary = Summary(findings);
+    if (code_ != 0 || !summary.empty()) return RefuseTree(findings, summary);
+    const bool aboutSigning = today_ || options_.at == kSigning;
+    const ExitCode verdict = Yes(std::to_string(CountFiles(manifest_.GetValid())) + " files of " +
+                                 Escape(options_.directory) + " are as signed at " + signedAt +
+                                 " by " + Fingerprint(*proved_.GetCert(0)->GetIssuer()) +
+                                 (aboutSigning ? EndedSince(proved_) : ""));
+    if (today_) question_.proved = &today_->evidence();
+    if (options_.explain) ExplainGrant(question_);
+    return verdict;
+  }
+
+  ExitCode RefuseTree(const std::vector<Finding>& findings, const std::string& summary) {
+    int code = code_;
+    if (code == 0 && Found(findings, kUnlisted)) code = VESK2_ERR_EXTRA_FILES;
+    const ExitCode verdict = code != 0 ? No(code, summary) : No("link-leaves-tree", summary);
+    PrintFindings(findings);
+    if (code != 0) ExplainTree(question_);
+    return verdict;
+  }
+
+  const Options& options_;
+  Request request_;
+  Question question_;
+  ZvVesk2::Evidence proved_{nullptr};
+  Manifest manifest_;
+  std::optional<Today> today_;
+  int code_ = 0;
+  bool byToday_ = false;  // refused by what is known now, not by what was at the time of signing
+};
+
+}  // namespace
+
+Action DefineManifestVerify(CLI::App& app) {
+  auto options = std::make_shared<Options>();
+  app.add_option("directory", options->directory, "The tree to check")->required();
+  app.add_option("manifest", options->manifest, "The manifest file")->required();
+  app.add_option("--tag", options->tag,
+                 "What the signer must be authorized for; of a set, every member")
+      ->required();
+  AddPeriodOptions(app, options->period);
+  app.add_option("--at", options->at,
+                 "Authorized, and not revoked, at this moment; \"signing\" for the time of signing "
+                 "[authorized at the time of signing, not revoked now]")
+      ->excludes("--not-before")
+      ->excludes("--not-after");
+  app.add_flag("--allow-extra", options->allowExtra, "Accept entries that are not listed");
+  app.add_flag("--allow-links", options->allowLinks, "Accept links that lead out of the tree");
+  app.add_flag("--no-store-update", options->noStoreUpdate,
+               "Write nothing: do not keep the revocation lists that the manifest carries");
+  app.add_option("--acl-dir", options->aclDirectory, "Trust the entries of this directory too");
+  app.add_option("--ignore", options->ignored, "Leave this entry out (a path below the directory)")
+      ->allow_extra_args(false);
+  AddStoreCheckOptions(app, options->stores);
+  app.add_flag("--explain", options->explain, "Tell why also when the answer is yes");
+  return [options] {
+    RealDirectory(options->directory);
+    StartAnswer();
+    return Answer(*options).Give();
+  };
+}
+
+}  // namespace vesk2_command

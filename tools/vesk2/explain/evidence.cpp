@@ -1,0 +1,151 @@
+// evidence.cpp: what an answer rests on.
+#include "tools/vesk2/explain/evidence.h"
+
+#include <algorithm>
+#include <filesystem>
+
+#include "tools/vesk2/files/stores.h"
+#include "tools/vesk2/say/report.h"
+
+#include <vesk2/hash.h>
+
+namespace vesk2_command {
+namespace {
+
+using ZvVesk2::AclEntry;
+using ZvVesk2::Cert;
+using ZvVesk2::CrlSequence;
+using ZvVesk2::Hash;
+using ZvVesk2::Subject;
+using ZvVesk2::ThresholdSubject;
+
+bool IsDigestOf(const Hash& hash, DExpression& key) {
+  unsigned char* digest = nullptr;
+  unsigned int length = 0;
+  if (key.ComputeHash(digest, length, hash.GetAlgorithm(), true) != 0) return false;
+  const std::unique_ptr<unsigned char[]> owner(digest);
+  const ByteString* named = hash.GetDigest();
+  return named != nullptr && named->GetLength() == length &&
+         std::equal(digest, digest + length, named->GetData());
+}
+
+void TakeCerts(Evidence& evidence) {
+  const ZvVesk2::Evidence& proved = *evidence.proved;
+  for (size_t i = 0; i < proved.CountCerts(); ++i) {
+    evidence.certs.push_back({Ref<Cert>::Share(proved.GetCert(i)),
+                              Ref<ZvVesk2::Signature>::Share(proved.GetSignature(i)),
+                              proved.GetSignatureCode(i),
+                              Ref<SExpression>::Share(proved.GetRevocationSource(i))});
+  }
+}
+
+void TakeEntries(Evidence& evidence) {
+  const SExpression* acls = evidence.proved->GetEntries();
+  if (acls == nullptr) return;
+  for (auto it = acls->Begin(); it; it.Next()) {
+    auto* entry = dynamic_cast<AclEntry*>(it.Value());
+    if (entry == nullptr) continue;
+    const std::filesystem::path path(entry->GetFileName() != nullptr ? entry->GetFileName() : "");
+    const bool inStore = path.parent_path() == std::filesystem::path(AclDirectory());
+    evidence.entries.push_back(
+        {Ref<AclEntry>::Share(entry), inStore ? path.filename().string() : path.string(), inStore});
+  }
+}
+
+std::vector<CrlSequence*> ListsOf(const SExpression* lists) {
+  std::vector<CrlSequence*> found;
+  if (lists == nullptr) return found;
+  for (auto it = lists->Begin(); it; it.Next()) {
+    auto* list = dynamic_cast<CrlSequence*>(it.Value());
+    if (list != nullptr && list->First() != nullptr) found.push_back(list);
+  }
+  return found;
+}
+
+}  // namespace
+
+Evidence GatherEvidence(const Question& question) {
+  Evidence evidence;
+  evidence.proved = question.proved;
+  if (evidence.proved == nullptr) return evidence;
+  const ZvVesk2::Evidence& proved = *evidence.proved;
+  TakeCerts(evidence);
+  TakeEntries(evidence);
+  for (CrlSequence* list : ListsOf(proved.GetCarriedLists())) {
+    evidence.carried.push_back(Canonical(*list));
+  }
+  evidence.signedAt = Ref<TimeStamp>::Share(proved.GetSigningTime());
+  evidence.first = proved.GetFirst();
+  evidence.last = proved.GetLast();
+  evidence.contentSigned = proved.GetContentCode() == 0 && proved.GetListingCode() == 0;
+  if (proved.GetListingCode() != 0) {
+    evidence.damage = "byte " + std::to_string(proved.GetListingPosition()) + ": " +
+                      Reason(proved.GetListingCode());
+  }
+  return evidence;
+}
+
+bool Names(Subject* subject, DExpression* key) {
+  if (subject->IsEqual(key)) return true;
+  if (const auto* hash = dynamic_cast<Hash*>(subject)) return IsDigestOf(*hash, *key);
+  auto* threshold = dynamic_cast<ThresholdSubject*>(subject);
+  auto* principal = dynamic_cast<ZvVesk2::Principal*>(key);
+  return threshold != nullptr && principal != nullptr && threshold->HasMember(principal);
+}
+
+void InsertShared(SExpression& list, DExpression* item) {
+  auto shared = Ref<DExpression>::Share(item);
+  Check(list.Insert(shared.get()), "building a list");
+  (void)shared.Release();
+}
+
+Ref<SExpression> RevocationSource(const Cert& cert) {
+  const SExpression* element = cert.GetRevocationElement();
+  Ref<SExpression> source;
+  if (element == nullptr) return source;
+  Check(SExpression::Create(source.Out(), "tag", nullptr), "building a tag");
+  auto it = element->Begin();
+  if (it) it.Next();  // the keyword
+  for (; it; it.Next()) InsertShared(*source, it.Value());
+  return source;
+}
+
+const EntryEvidence* Voucher(const Evidence& evidence, SExpression* source) {
+  const auto found = std::find_if(
+      evidence.entries.rbegin(), evidence.entries.rend(),
+      [&](const EntryEvidence& each) { return each.entry->GetTag()->IsEqual(source); });
+  return found != evidence.entries.rend() ? &*found : nullptr;
+}
+
+std::vector<AclEntry*> AllEntries(const Evidence& evidence) {
+  std::vector<AclEntry*> entries;
+  for (const EntryEvidence& each : evidence.entries) entries.push_back(each.entry.get());
+  return entries;
+}
+
+Ref<SExpression> EntryList(const std::vector<AclEntry*>& entries) {
+  Ref<SExpression> list;
+  Check(SExpression::Create(list.Out(), "acl", nullptr), "building a list");
+  for (AclEntry* entry : entries) InsertShared(*list, entry);
+  return list;
+}
+
+Ref<SExpression> LoadLists(const Evidence& evidence, SExpression*) {
+  std::vector<std::string> texts;
+  if (evidence.proved != nullptr) {
+    for (CrlSequence* list : ListsOf(evidence.proved->GetStoredLists())) {
+      texts.push_back(Canonical(*list));
+    }
+  }
+  texts.insert(texts.end(), evidence.carried.begin(), evidence.carried.end());
+  // A list remembers who proved it; copies do not.
+  Ref<SExpression> lists(new SExpression(nullptr));
+  for (const std::string& text : texts) {
+    const Ref<CrlSequence> list(new CrlSequence(nullptr));
+    const Buffer buffer = WrapBytes(text);
+    if (list->Import(buffer.get()) == 0) InsertShared(*lists, list.get());
+  }
+  return lists;
+}
+
+}  // namespace vesk2_command

@@ -1,0 +1,29 @@
+// explain.h: why an answer about authority is what it is, and what would make a refusal a yes: for
+// people as notes, for machines in Result().
+//
+// The verdict is the library's. These functions look at what the library kept of it, open no file,
+// and never change it.
+#ifndef VESK2_TOOLS_EXPLAIN_H
+#define VESK2_TOOLS_EXPLAIN_H
+
+#include <string>
+#include <vector>
+
+#include "tools/vesk2/explain/evidence.h"
+
+namespace vesk2_command {
+
+// ExplainRefusal tells of every certificate, where authority was lost, and of the smallest changes
+// that would turn the answer: "chain", "acl", "lost" and "remedies" of the result.
+void ExplainRefusal(const Question& question, int code);
+// ExplainTree names what mends a tree that is not as its authorized signer signed it.
+void ExplainTree(const Question& question);
+// ExplainGrant tells of every certificate, of the path of authority, when it ends, and how old the
+// revocation data is: "chain", "acl" and "authority" of the result.
+void ExplainGrant(const Question& question);
+// ExplainUnreadable names the credentials that the reduction cannot read.
+void ExplainUnreadable(const Question& question, int code);
+
+}  // namespace vesk2_command
+
+#endif  // VESK2_TOOLS_EXPLAIN_H

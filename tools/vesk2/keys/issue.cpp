@@ -1,0 +1,46 @@
+// issue.cpp: making certificates.
+#include "tools/vesk2/keys/issue.h"
+
+#include "tools/vesk2/keys/external_key.h"
+#include "tools/vesk2/objects/tag_bounds.h"
+#include "tools/vesk2/say/report.h"
+
+namespace vesk2_command {
+
+using ZvVesk2::Cert;
+
+void AddSignerOptions(CLI::App& app, SignerOptions& options, SignerCount count) {
+  const bool several = count == SignerCount::kSeveral;
+  auto* key = app.add_option("--key", options.keys,
+                             several ? "The private key (PEM) that signs; several sign one each"
+                                     : "The private key (PEM) that signs");
+  key->required()->allow_extra_args(false);
+  if (!several) key->expected(1);
+  app.add_option("--algorithm", options.algorithm, "How an RSA key signs, over SHA-256")
+      ->check(CLI::IsMember({"rsa-pss", "rsa-1.5"}))
+      ->capture_default_str();
+  app.add_option("--sign-with", options.program,
+                 "Run this by /bin/sh to sign, --key being the public key: it reads the digest and "
+                 "writes the signature, both raw");
+  AddPassphraseOptions(app, options.passphrase);
+}
+
+std::unique_ptr<SigningKey> OpenSigner(const SignerOptions& options, size_t index) {
+  const std::string& path = options.keys[index];
+  if (!options.program.empty()) return std::make_unique<ExternalKey>(options.program, path);
+  return std::make_unique<PrivateKey>(PrivateKey::Read(path, options.passphrase));
+}
+
+SignedCert IssueCert(const SigningKey& key, const Grant& grant, const std::string& algorithm) {
+  RequirePlainBounds(grant.tag);
+  const Ref<PublicKey> issuer = key.Public();
+  SignedCert result{Ref<Cert>(new Cert(nullptr)), {}};
+  Check(result.cert->Set(issuer.get(), grant.subject, grant.propagate, grant.tag,
+                         grant.period.notBefore.get(), grant.period.notAfter.get(), grant.comment,
+                         grant.revocation),
+        "building a certificate");
+  result.signature = key.Sign(*result.cert, algorithm);
+  return result;
+}
+
+}  // namespace vesk2_command

@@ -1,0 +1,114 @@
+// passphrase.cpp: passphrases from files, descriptors and the terminal.
+#include "tools/vesk2/keys/passphrase.h"
+
+#include <fcntl.h>
+#include <openssl/crypto.h>
+#include <openssl/evp.h>
+#include <unistd.h>
+
+#include <cerrno>
+#include <cstring>
+
+#include "tools/vesk2/files/files.h"
+#include "tools/vesk2/say/report.h"
+
+namespace vesk2_command {
+namespace {
+
+constexpr int kMaxPassphrase = 1024;
+
+// One byte at a time, so that what follows the line is left for its reader.
+std::string FirstLine(int descriptor) {
+  std::string line;
+  char byte = 0;
+  while (line.size() <= kMaxPassphrase) {
+    const ssize_t got = read(descriptor, &byte, 1);
+    if (got < 0 && errno == EINTR) continue;
+    if (got < 0) {
+      throw Trouble("--passphrase-fd " + std::to_string(descriptor) + ": " + std::strerror(errno),
+                    "passphrase");
+    }
+    if (got == 0 || byte == '\n') break;
+    line += byte;
+  }
+  return line;
+}
+
+// The passphrase that the options name.
+std::shared_ptr<const Secret> NamedPassphrase(const PassphraseOptions& options) {
+  if (options.given) return options.given;
+  const bool file = !options.file.empty();
+  const Secret text(file ? ReadFile(options.file, kMaxPassphrase) : FirstLine(options.descriptor));
+  const size_t end = text.text().find_first_of("\r\n");
+  options.given = std::make_shared<const Secret>(text.text().substr(0, end));
+  const size_t size = options.given->text().size();
+  if (size == 0 || size > kMaxPassphrase) {
+    throw Trouble(
+        (file ? Escape(options.file) : "--passphrase-fd " + std::to_string(options.descriptor)) +
+            (size == 0 ? ": holds no passphrase" : ": too long for a passphrase"),
+        "passphrase");
+  }
+  return options.given;
+}
+
+// Without a terminal libcrypto would read standard input, where nobody was asked for anything.
+bool HaveTerminal() {
+  const int terminal = open("/dev/tty", O_RDWR | O_CLOEXEC | O_NOCTTY);
+  if (terminal >= 0) close(terminal);
+  return terminal >= 0;
+}
+
+int AskTerminal(char* out, int size, const std::string& prompt, bool twice) {
+  if (!HaveTerminal()) return -1;
+  if (EVP_read_pw_string(out, size, prompt.c_str(), twice ? 1 : 0) != 0) return -1;
+  return static_cast<int>(std::strlen(out));
+}
+
+int FromOptions(char* out, int size, const PassphraseOptions& options) {
+  const std::string& text = NamedPassphrase(options)->text();
+  if (text.size() > static_cast<size_t>(size)) return -1;
+  std::memcpy(out, text.data(), text.size());
+  return static_cast<int>(text.size());
+}
+
+}  // namespace
+
+void AddPassphraseOptions(CLI::App& app, PassphraseOptions& options) {
+  auto* file = app.add_option("--passphrase-file", options.file,
+                              "Take the passphrase of private keys from this file's first line");
+  app.add_option("--passphrase-fd", options.descriptor,
+                 "Take it from the first line of this open file descriptor")
+      ->check(CLI::NonNegativeNumber)
+      ->excludes(file);
+}
+
+Secret::~Secret() { OPENSSL_cleanse(text_.data(), text_.size()); }
+
+std::shared_ptr<const Secret> NewPassphrase(const PassphraseOptions& options) {
+  if (options.Named()) return NamedPassphrase(options);
+  char typed[kMaxPassphrase] = "";
+  const int length = AskTerminal(typed, sizeof typed, "Passphrase: ", true);
+  auto passphrase = std::make_shared<const Secret>(typed);
+  OPENSSL_cleanse(typed, sizeof typed);
+  if (length <= 0) {
+    throw Trouble("no passphrase was given (--passphrase-file, --passphrase-fd)", "passphrase");
+  }
+  return passphrase;
+}
+
+int GivePassphrase(char* out, int size, int /*writing*/, void* user) {
+  auto& asking = *static_cast<Asking*>(user);
+  asking.asked = true;
+  int length = -1;
+  try {  // libcrypto calls this, and nothing may be thrown through it
+    length = asking.options.Named()
+                 ? FromOptions(out, size, asking.options)
+                 : AskTerminal(out, size, "Passphrase of " + Escape(asking.path) + ": ", false);
+  } catch (...) {
+    asking.problem = std::current_exception();
+  }
+  asking.failed = length < 0;
+  return length;
+}
+
+}  // namespace vesk2_command

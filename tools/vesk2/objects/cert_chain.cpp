@@ -1,0 +1,90 @@
+// cert_chain.cpp: certificate sequence files.
+#include "tools/vesk2/objects/cert_chain.h"
+
+#include "tools/vesk2/say/report.h"
+
+namespace vesk2_command {
+
+using ZvVesk2::Cert;
+using ZvVesk2::CertSequence;
+using ZvVesk2::Signature;
+
+namespace {
+
+void AppendItem(CertSequence& sequence, DExpression* item) {
+  auto shared = Ref<DExpression>::Share(item);
+  Check(sequence.Insert(shared.get()), "building a certificate sequence");
+  (void)shared.Release();
+}
+
+}  // namespace
+
+CertChain ReadCertChain(const std::string& path) {
+  const Buffer buffer = OpenBuffer(path);
+  CertChain chain;
+  int code = CertSequence::Import(chain.Out(), buffer.get(), nullptr);
+  if (code == 0 && buffer->Remaining() != 0) code = VESK2_ERR_PARSE_FILE;
+  if (code != 0) Malformed(path, buffer->Position(), "certificate sequence", code);
+  return chain;
+}
+
+std::vector<ChainLink> ChainLinks(const CertChain& chain, const std::string& path) {
+  std::vector<ChainLink> links;
+  auto item = chain->Begin();
+  item.Next();  // the keyword
+  // The reader of chains accepts whole triples of these kinds only.
+  while (item) {
+    ChainLink link = {};
+    link.cert = dynamic_cast<Cert*>(item.Value());
+    item.Next();
+    link.signature = dynamic_cast<Signature*>(item.Value());
+    item.Next();
+    link.extra = dynamic_cast<SExpression*>(item.Value());
+    item.Next();
+    links.push_back(link);
+  }
+  if (links.empty()) throw Trouble(Escape(path) + ": holds no certificate");
+  return links;
+}
+
+CertChain NewSequence() {
+  CertChain sequence(new CertSequence(nullptr));
+  Check(sequence->Init(), "building a certificate sequence");
+  return sequence;
+}
+
+void Append(CertSequence& sequence, const SignedCert& issued, const std::string& owner) {
+  Ref<SExpression> item;
+  const int code = owner.empty() ? SExpression::Create(item.Out(), "comment", nullptr)
+                                 : SExpression::Create(item.Out(), "owner", owner.c_str(), nullptr);
+  Check(code, "--owner");
+  AppendItem(sequence, issued.cert.get());
+  AppendItem(sequence, issued.signature.get());
+  AppendItem(sequence, item.get());
+}
+
+void AppendChain(CertSequence& sequence, const CertSequence& chain) {
+  auto item = chain.Begin();
+  for (item.Next(); item; item.Next()) AppendItem(sequence, item.Value());
+}
+
+void WriteSequence(CertSequence& sequence, const std::string& path, const WriteFlags& flags) {
+  const auto readBack = [](const std::string& temporary) { ReadCertChain(temporary); };
+  const bool wrote =
+      WriteFile(path, Canonical(sequence), {0666, flags.force, readBack, flags.dryRun});
+  if (wrote && path != kStandard) Note("wrote " + Escape(path));
+}
+
+void RequireCertFor(const CertChain& chain, const std::string& path, PublicKey& key) {
+  auto item = chain->Begin();
+  if (item) item.Next();  // the keyword
+  auto* cert = item ? dynamic_cast<Cert*>(item.Value()) : nullptr;
+  if (cert == nullptr) throw Trouble(Escape(path) + ": holds no certificate");
+  if (!cert->GetSubject()->IsEqual(&key)) {
+    throw Trouble(Escape(path) + ": its first certificate is for " +
+                  Fingerprint(*cert->GetSubject()) + ", not for the signing key " +
+                  Fingerprint(key));
+  }
+}
+
+}  // namespace vesk2_command

@@ -1,0 +1,67 @@
+// manifest_file.h: manifest files as the command sees them: reading one back without judging its
+// authority, and taking it apart to show it.
+#ifndef VESK2_TOOLS_MANIFEST_FILE_H
+#define VESK2_TOOLS_MANIFEST_FILE_H
+
+#include <memory>
+#include <set>
+#include <string>
+#include <vector>
+
+#include "tools/vesk2/objects/cert_chain.h"
+#include "tools/vesk2/objects/times.h"
+
+#include <vesk2/crl.h>
+#include <vesk2/manifest.h>
+#include <vesk2/manifest_body.h>
+
+namespace vesk2_command {
+
+// Has a manifest leave out the entries of these names.
+void IgnoreEntries(ZvVesk2::Manifest& manifest, const std::set<std::string>& names);
+
+// CheckSigned checks that a manifest can be verified, but for the authority of its signer: its
+// form, its signatures, its digest, and that the tree is as it says. Trouble says what is not so.
+void CheckSigned(const std::string& path, const std::string& directory,
+                 const std::set<std::string>& ignored);
+
+// The parts of a manifest file that authority comes from. Nothing of it has been checked.
+struct SignatureBlock {
+  Ref<ByteString> version;
+  Ref<ByteString> creator;  // what made the file, in its own words
+  Ref<ByteString> type;
+  Ref<TimeStamp> signedAt;
+  std::vector<SignedCert> certs;  // the signer certificate first
+  std::vector<Ref<ZvVesk2::CrlSequence>> crls;
+  std::unique_ptr<ZvVesk2::BodyDirectory> listing;  // its root has no name
+  bool contentSigned = false;  // the digest that the signer certificate names is the file's
+  std::string damage;  // where the listing stops making sense, and why; empty for a whole one
+};
+// ReadSignatureBlock reads as far as it can; what could not be read is missing. The buffer form
+// returns the code of the reader that stopped, and leaves the buffer at the place.
+SignatureBlock ReadSignatureBlock(const std::string& path);
+int ReadSignatureBlock(ZvBuffer* buffer, SignatureBlock& block);
+// What the signatures and the signed digest of a block are worth: 0, or the code of the refusal.
+int CheckBlock(const SignatureBlock& block);
+
+// CheckManifest returns 0 when the signatures and the signed digest of a manifest file hold,
+// whoever its signer is, and else the code of the refusal. Trouble for what is no manifest.
+int CheckManifest(const std::string& path);
+
+// Whether a code of the library is a no: the question was understood, and the answer is not yes.
+bool IsRefusal(int code);
+// Throws the Trouble for any other code of reading a manifest.
+[[noreturn]] void ThrowUnreadable(const std::string& path, const ZvVesk2::Manifest& manifest,
+                                  int code);
+
+// The names of a result list of a comparison, sorted. Directories are recorded for what is inside
+// them too: those with a recorded entry below them, `parents`, are left out.
+std::vector<std::string> FoundNames(const FileItem* list, const std::set<std::string>& parents);
+// Every directory that has a difference below it.
+std::set<std::string> FoundParents(const ZvVesk2::Manifest& manifest);
+// The number of entries of a result list that are files.
+size_t CountFiles(const FileItem* list);
+
+}  // namespace vesk2_command
+
+#endif  // VESK2_TOOLS_MANIFEST_FILE_H

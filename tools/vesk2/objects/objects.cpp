@@ -1,0 +1,128 @@
+// objects.cpp: reading, building and printing the library's objects.
+#include "tools/vesk2/objects/objects.h"
+
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+
+#include "tools/vesk2/files/files.h"
+#include "tools/vesk2/say/report.h"
+
+#include <vesk2/limits.h>
+
+namespace vesk2_command {
+namespace {
+
+bool HasEmptyWord(const SExpression& list) {
+  for (auto it = list.Begin(); it; it.Next()) {
+    if (const auto* word = dynamic_cast<ByteString*>(it.Value())) {
+      if (word->GetLength() == 0) return true;
+    } else if (const auto* nested = dynamic_cast<SExpression*>(it.Value())) {
+      if (HasEmptyWord(*nested)) return true;
+    }
+  }
+  return false;
+}
+
+}  // namespace
+
+Buffer OpenBuffer(const std::string& path) {
+  if (path == kStandard) return WrapBytes(ReadFile(path, ZvVesk2::Limits::kMaxFile));
+  Buffer buffer(ZVsysutil::zv_buffer_wrap_file(path.c_str()));
+  if (!buffer) throw FileTrouble(path, WhyUnreadable(path), "io");
+  return buffer;
+}
+
+Buffer WrapBytes(std::string_view bytes) {
+  Buffer buffer(ZVsysutil::zv_buffer_wrap(bytes.data(), bytes.size()));
+  if (!buffer) throw std::bad_alloc();
+  return buffer;
+}
+
+void Check(int code, const std::string& what) {
+  if (code == 0) return;
+  Trouble trouble(what + ": " + Reason(code), ReasonWord(code));
+  trouble.code = code;
+  throw trouble;
+}
+
+void Malformed(const std::string& path, size_t offset, const std::string& kind, int code) {
+  Trouble trouble = FileTrouble(
+      path, "byte " + std::to_string(offset) + ": malformed " + kind + ": " + Reason(code),
+      "malformed");
+  trouble.code = code;
+  trouble.byte = offset;
+  throw trouble;
+}
+
+char* NewText(const std::string& text) {
+  char* copy = new char[text.size() + 1];
+  std::memcpy(copy, text.c_str(), text.size() + 1);
+  return copy;
+}
+
+std::string Atom(std::string_view bytes) {
+  return std::to_string(bytes.size()).append(":").append(bytes);
+}
+
+std::string Canonical(DExpression& expression) {
+  char* data = nullptr;
+  size_t size = 0;
+  FILE* stream = open_memstream(&data, &size);
+  if (stream == nullptr) throw std::bad_alloc();
+  const int code = expression.PrintCanonical(stream);
+  const bool closed = std::fclose(stream) == 0;
+  const std::unique_ptr<char, decltype(&std::free)> owner(data, &std::free);
+  Check(code, "writing an object");
+  if (!closed) throw std::bad_alloc();
+  return std::string(data, size);
+}
+
+std::string Fingerprint(DExpression& expression) {
+  unsigned char* digest = nullptr;
+  unsigned int length = 0;
+  Check(expression.ComputeHash(digest, length, ZVCLM_HASH_SHA256, true), "digest of a key");
+  const std::unique_ptr<unsigned char[]> owner(digest);
+  return "sha256:" + Hex({reinterpret_cast<char*>(digest), length});
+}
+
+std::string AdvancedText(SExpression& list, const std::string& keyword) {
+  const unsigned size = list.AdvancedLength();
+  if (size > ZvVesk2::Limits::kMaxExport) throw Trouble("an object too large to be written");
+  std::string text(size_t{size} + 1, '\0');
+  unsigned length = 0;
+  Check(list.ExportAdvanced(reinterpret_cast<unsigned char*>(text.data()), length, size),
+        "writing an object");
+  text.resize(length);
+  const std::string head = "(" + keyword + " ";
+  if (!keyword.empty() && text.starts_with(head)) {
+    text = text.substr(head.size(), text.size() - head.size() - 1);
+  }
+  return Escape(text);
+}
+
+std::string TagText(SExpression* tag) {
+  return tag == nullptr ? "everything" : AdvancedText(*tag, "tag");
+}
+
+Ref<SExpression> ParseTag(const std::string& text, const char* keyword) {
+  const std::string what = "tag \"" + Escape(text) + "\"";
+  Ref<SExpression> tag;
+  Check(SExpression::ParseTagAdvanced(tag.Out(), text.c_str(), keyword, nullptr), what);
+  if (tag->Count() < 2) throw Trouble(what + ": empty; a tag names what is granted");
+  if (HasEmptyWord(*tag)) throw Trouble(what + ": every list must begin with a word");
+  // What is typed may be longer than what can be read back from a file.
+  Ref<SExpression> again;
+  const Buffer buffer = WrapBytes(Canonical(*tag));
+  Check(SExpression::Import(again.Out(), buffer.get(), nullptr), what);
+  return tag;
+}
+
+Ref<ByteString> MakeText(const std::string& text) {
+  if (text.empty()) return {};
+  Ref<ByteString> bytes(new ByteString(nullptr));
+  Check(bytes->Set(text.c_str(), ByteString::BsNone), "text \"" + Escape(text) + "\"");
+  return bytes;
+}
+
+}  // namespace vesk2_command

@@ -1,0 +1,39 @@
+// times.cpp: moments and periods from the command line.
+#include "tools/vesk2/objects/times.h"
+
+#include <ctime>
+
+#include "tools/vesk2/objects/objects.h"
+#include "tools/vesk2/say/report.h"
+
+namespace vesk2_command {
+
+Ref<TimeStamp> ParseTime(const std::string& text, bool endOfPeriod) {
+  Ref<TimeStamp> stamp(new TimeStamp(nullptr));
+  const int code = text == "now" ? stamp->Set(static_cast<long>(std::time(nullptr)))
+                                 : stamp->Set(text.c_str(), endOfPeriod);
+  if (code != 0) {
+    throw Trouble("time \"" + Escape(text) +
+                  "\": not \"now\", a year from 1970 on, or more of YYYY-MM-DD_hh:mm:ss");
+  }
+  return stamp;
+}
+
+void AddPeriodOptions(CLI::App& app, PeriodOptions& options) {
+  app.add_option("--not-before", options.notBefore, "First moment (UTC): 2026, 2026-11-22_18, now");
+  app.add_option("--not-after", options.notAfter, "Last moment; 2026 is the end of that year");
+}
+
+Period ParsePeriod(const PeriodOptions& options) {
+  Period period;
+  if (!options.notBefore.empty()) period.notBefore = ParseTime(options.notBefore, false);
+  if (!options.notAfter.empty()) period.notAfter = ParseTime(options.notAfter, true);
+  if (period.notBefore && period.notBefore->IsAfter(period.notAfter.get())) {
+    throw Trouble("--not-before lies after --not-after");
+  }
+  return period;
+}
+
+std::string StampText(const TimeStamp& stamp) { return Escape(BytesOf(stamp)); }
+
+}  // namespace vesk2_command

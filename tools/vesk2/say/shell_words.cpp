@@ -1,0 +1,81 @@
+// shell_words.cpp: quoting for shells.
+#include "tools/vesk2/say/shell_words.h"
+
+#include <algorithm>
+#include <string_view>
+
+namespace vesk2_command {
+namespace {
+
+bool IsPrintable(char c) { return c >= ' ' && c <= '~'; }
+
+bool IsPlain(char c) {
+  const bool letter = (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z') || (c >= '0' && c <= '9');
+  return letter || std::string_view("-_./:=,+@%").find(c) != std::string_view::npos;
+}
+
+// A byte in a format of printf that stands in single quotes, in a substitution in double quotes.
+// An interactive shell looks for "!" before it looks for quotes.
+std::string FormatByte(char c, bool first) {
+  if (c == '%') return "%%";
+  const bool special = std::string_view("'\"`$\\!").find(c) != std::string_view::npos;
+  if (IsPrintable(c) && !special && !(first && c == '-')) return {c};
+  const unsigned byte = static_cast<unsigned char>(c);
+  std::string text = "\\";
+  for (const unsigned shift : {6U, 3U, 0U}) text += static_cast<char>('0' + ((byte >> shift) & 7));
+  return text;
+}
+
+// A substitution loses the line breaks at its end.
+std::string Substituted(const std::string& word) {
+  const size_t end = word.find_last_not_of('\n') + 1;  // 0 for a word of line breaks
+  std::string text;
+  for (size_t i = 0; i < end; ++i) text += FormatByte(word[i], i == 0);
+  if (end > 0) text = std::string("\"$(printf '").append(text).append("')\"");
+  if (end == word.size()) return text;
+  text += "$'";
+  for (size_t i = end; i < word.size(); ++i) text += "\\n";
+  text += '\'';
+  return text;
+}
+
+// What JSON can hold comes back as it was.
+bool IsUtf8(const std::string& word) {
+  return Json::parse(Json(word).dump(-1, ' ', false, Json::error_handler_t::ignore)) == word;
+}
+
+}  // namespace
+
+std::string ShellWord(const std::string& word) {
+  const bool plain = std::all_of(word.begin(), word.end(), IsPlain);
+  if (plain && !word.empty() && word[0] != '=') return word;  // zsh looks for a program behind it
+  if (!std::all_of(word.begin(), word.end(), IsPrintable)) return Substituted(word);
+  std::string text = "'";
+  for (const char c : word) {
+    if (c == '\'') text += "'\\'";
+    text += c;
+  }
+  text += '\'';
+  return text;
+}
+
+std::string ShellLine(const std::vector<std::string>& words) {
+  std::string line;
+  for (const std::string& word : words) {
+    if (!line.empty()) line += ' ';
+    line += ShellWord(word);
+  }
+  return line;
+}
+
+Json JsonWord(const std::string& word) {
+  return IsUtf8(word) ? Json(word) : Json{{"hex", Hex(word)}};
+}
+
+Json JsonWords(const std::vector<std::string>& words) {
+  Json list = Json::array();
+  for (const std::string& word : words) list.push_back(JsonWord(word));
+  return list;
+}
+
+}  // namespace vesk2_command

@@ -1,0 +1,23 @@
+// acl_store.h: the entries of this machine's ACL store, and why there are none.
+#ifndef VESK2_TOOLS_ACL_STORE_H
+#define VESK2_TOOLS_ACL_STORE_H
+
+#include <string>
+#include <vector>
+
+#include "tools/vesk2/objects/objects.h"
+
+namespace vesk2_command {
+
+// LoadAcls returns the entries of the ACL store; Trouble, and the reasons noted, when there are
+// none.
+Ref<SExpression> LoadAcls();
+
+// Why the ACL store yields no entry.
+std::vector<std::string> ExplainStore();
+// Notes that, and throws the Trouble for a store without which nothing can be answered.
+[[noreturn]] void ThrowNoStore(int code);
+
+}  // namespace vesk2_command
+
+#endif  // VESK2_TOOLS_ACL_STORE_H

@@ -1,0 +1,101 @@
+// grant.cpp: entries of the ACL store.
+#include "tools/vesk2/stores/grant.h"
+
+#include <filesystem>
+
+#include "tools/vesk2/files/files.h"
+#include "tools/vesk2/files/stores.h"
+#include "tools/vesk2/objects/tag_bounds.h"
+#include "tools/vesk2/say/report.h"
+#include "tools/vesk2/say/shell_words.h"
+
+#include <vesk2/limits.h>
+
+namespace vesk2_command {
+namespace {
+
+using ZvVesk2::AclEntry;
+
+// The library would drop directories from a name, and make the store even for a dry run.
+std::string EntryPath(const std::string& name) {
+  if (name.find('/') != std::string::npos) {
+    throw Trouble("--name " + Escape(name) + ": a name, not a path", "usage");
+  }
+  if (name.empty() || name == "." || name == "..") {
+    throw Trouble("--name " + Escape(name) + ": cannot name an entry", "usage");
+  }
+  return AclDirectory() + "/" + name + (name.ends_with(".acl") ? "" : ".acl");
+}
+
+// A name that was given as a file's.
+std::string NameWithout(const std::string& name) {
+  return name.ends_with(".acl") ? name.substr(0, name.size() - 4) : name;
+}
+
+bool IsAlready(const std::string& path, const std::string& bytes) {
+  std::error_code error;
+  return std::filesystem::is_regular_file(path, error) &&
+         std::filesystem::file_size(path, error) == bytes.size() && !error &&
+         ReadFile(path, ZvVesk2::Limits::kMaxFile) == bytes;
+}
+
+// One entry that cannot be read back would stop the whole store from loading.
+void ReadBack(const std::string& temporary) {
+  const Ref<AclEntry> again(new AclEntry(nullptr));
+  Check(again->Import(temporary.c_str()), "checking the new entry");
+}
+
+}  // namespace
+
+Ref<AclEntry> MakeEntry(EntryText text) {
+  RequirePlainBounds(text.tag.get());
+  Ref<ByteString> comment = MakeText(text.comment);
+  Ref<AclEntry> entry;
+  Check(AclEntry::Create(entry.Out(), text.subject.get(), text.propagate, text.tag.get(),
+                         text.period.notBefore.get(), text.period.notAfter.get(), 0, comment.get()),
+        "building an ACL entry");
+  // The entry holds the references now.
+  (void)text.subject.Release();
+  (void)text.tag.Release();
+  (void)text.period.notBefore.Release();
+  (void)text.period.notAfter.Release();
+  (void)comment.Release();
+  return entry;
+}
+
+std::string FreeEntryName(AclEntry& entry, const std::string& name) {
+  const std::string bytes = Canonical(entry);
+  const auto isFree = [&](const std::string& each) {
+    const std::string path = EntryPath(each);
+    std::error_code error;
+    return !std::filesystem::exists(std::filesystem::symlink_status(path, error)) ||
+           IsAlready(path, bytes);
+  };
+  std::string result = name;
+  for (int number = 2; !isFree(result); ++number) result = name + "-" + std::to_string(number);
+  return result;
+}
+
+void GrantEntry(AclEntry& entry, const EntryPlace& place) {
+  const std::string path = EntryPath(place.name);
+  const std::string bytes = Canonical(entry);
+  if (IsAlready(path, bytes)) return Note(Escape(path) + " says so already");
+  RefuseTaken(entry, place);
+  const WriteOptions options{0666, place.force, ReadBack, place.dryRun, true};
+  if (WriteFile(path, bytes, options)) Note("wrote " + Escape(path));
+}
+
+void RefuseTaken(AclEntry& entry, const EntryPlace& place) {
+  const std::string path = EntryPath(place.name);
+  std::error_code error;
+  const bool taken = std::filesystem::exists(std::filesystem::symlink_status(path, error));
+  if (!taken || IsAlready(path, Canonical(entry))) return;
+  if (place.force) return RefuseExisting(path, true);
+  // The entry that is there is trusted, and somebody meant it: the way out must not destroy it.
+  throw FileTrouble(path,
+                    "another entry has this name; beside it, --name " +
+                        ShellWord(FreeEntryName(entry, NameWithout(place.name))),
+                    "exists");
+}
+
+}  // namespace vesk2_command

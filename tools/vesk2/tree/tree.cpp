@@ -1,0 +1,247 @@
+// tree.cpp: listing a tree, and its links.
+#include "tools/vesk2/tree/tree.h"
+
+#include <dirent.h>
+#include <openssl/rand.h>
+#include <sys/stat.h>
+
+#include <algorithm>
+#include <cerrno>
+#include <climits>
+#include <cstdlib>
+#include <cstring>
+#include <memory>
+
+#include "tools/vesk2/files/files.h"
+#include "tools/vesk2/objects/objects.h"
+#include "tools/vesk2/say/report.h"
+
+#include <vesk2/hash.h>
+
+namespace vesk2_command {
+namespace {
+
+using ZvVesk2::BodyDirectory;
+using ZvVesk2::BodyObject;
+
+std::string RealPath(const std::string& path) {
+  const std::unique_ptr<char, decltype(&std::free)> real(realpath(path.c_str(), nullptr),
+                                                         &std::free);
+  return real ? real.get() : "";
+}
+
+std::string Join(const std::string& directory, const std::string& name) {
+  return directory.empty() || directory.ends_with('/') ? directory + name : directory + "/" + name;
+}
+
+bool IsLink(const std::string& path) {
+  struct stat status = {};
+  if (lstat(path.c_str(), &status) == 0) return S_ISLNK(status.st_mode);
+  // What is not there is told elsewhere; what could not be looked at may be a link.
+  for (const int gone : {ENOENT, ENOTDIR, ENAMETOOLONG, ELOOP}) {
+    if (errno == gone) return false;
+  }
+  throw FileTrouble(path, std::strerror(errno), "io");
+}
+
+struct CloseDirectory {
+  void operator()(DIR* stream) const { closedir(stream); }
+};
+
+// The names in a directory, in byte order; false with errno set when it cannot be read.
+bool ReadNames(const std::string& directory, std::vector<std::string>& names) {
+  const std::unique_ptr<DIR, CloseDirectory> stream(opendir(directory.c_str()));
+  if (!stream) return false;
+  errno = 0;
+  while (const dirent* entry = readdir(stream.get())) {
+    const std::string name = entry->d_name;
+    if (name != "." && name != "..") names.push_back(name);
+    errno = 0;
+  }
+  std::sort(names.begin(), names.end());
+  return errno == 0;
+}
+
+std::string RandomToken() {
+  unsigned char token[4];
+  if (RAND_bytes(token, sizeof token) != 1) throw Trouble("no random bytes");
+  return {reinterpret_cast<char*>(token), sizeof token};
+}
+
+class Lister {
+ public:
+  Lister(const std::string& root, const ListingOptions& options)
+      : options_(options), realRoot_(RealDirectory(root)), realOutput_(RealPath(options.output)) {}
+
+  // Appends the entries of a directory. `relative` is its path below the root, empty for the root.
+  void List(const std::string& path, const std::string& relative, unsigned depth) {
+    struct stat status = {};
+    std::vector<std::string> names;
+    if (stat(path.c_str(), &status) != 0 || !ReadNames(path, names)) {
+      return Problem(path, std::strerror(errno));
+    }
+    const Identity identity(status.st_dev, status.st_ino);
+    if (!open_.insert(identity).second) return Problem(path, "a link to a directory around it");
+    if (depth > ZvVesk2::Limits::kMaxDepth) return Problem(path, "nested too deeply");
+    std::erase_if(names, [&](const std::string& name) { return IsIgnored(Join(relative, name)); });
+    RemarkOnNames(relative, names, listing_.remarks);
+    for (const std::string& name : names) {
+      Entry(Join(path, name), name, Join(relative, name), depth);
+    }
+    open_.erase(identity);
+  }
+
+  Listing Take() { return std::move(listing_); }
+
+ private:
+  using Identity = std::pair<dev_t, ino_t>;
+
+  bool IsIgnored(const std::string& relative) {
+    if (options_.ignored.count(relative) == 0) return false;
+    listing_.ignored.insert(relative);
+    return true;
+  }
+
+  void Problem(const std::string& path, const std::string& reason) {
+    listing_.problems.push_back(Escape(path) + ": " + reason);
+  }
+
+  void Entry(const std::string& path, const std::string& name, const std::string& relative,
+             unsigned depth) {
+    struct stat status = {};
+    if (path.size() > ZvVesk2::Limits::kMaxBodyPath) return Problem(path, "path too long");
+    if (!options_.allowLinks && LeavesTree(path, realRoot_)) {
+      return Problem(path, "a link that leads out of the tree (--allow-links follows it)");
+    }
+    if (stat(path.c_str(), &status) != 0) return Problem(path, std::strerror(errno));
+    if (IsLink(path)) {
+      listing_.remarks["a link; what it leads to is signed, not the link"].push_back(relative);
+    }
+    if (S_ISDIR(status.st_mode)) {
+      listing_.entries.push_back({relative + "/", 0, ""});
+      listing_.body += "(3:dir" + Atom(name) + Atom("");
+      List(path, relative, depth + 1);
+      listing_.body += ")";
+    } else if (!S_ISREG(status.st_mode)) {
+      Problem(path, "neither a file nor a directory");
+    } else if (realOutput_.empty() || RealPath(path) != realOutput_) {
+      File(path, name, {relative, static_cast<uint64_t>(status.st_size), ""});
+    }
+  }
+
+  void File(const std::string& path, const std::string& name, ListedEntry entry) {
+    unsigned char digest[32];
+    unsigned int length = sizeof digest;
+    const int code =
+        ZvVesk2::Hash::HashFile(path.c_str(), digest, &length, nullptr, options_.callbacks);
+    if (code == VESK2_ERR_FILE_OPEN) return Problem(path, WhyUnreadable(path));
+    if (code == VESK2_ERR_READ_FILE) return Problem(path, "unreadable, or changed while read");
+    if (code != 0) return Problem(path, Reason(code));
+    const std::string_view bytes(reinterpret_cast<char*>(digest), length);
+    listing_.body += "(4:file" + Atom(name) + Atom("") + Atom(bytes) + ")";
+    ++listing_.files;
+    listing_.bytes += entry.bytes;
+    entry.digest = Hex(bytes);
+    listing_.entries.push_back(std::move(entry));
+  }
+
+  const ListingOptions& options_;
+  std::string realRoot_;
+  std::string realOutput_;   // empty unless the output exists already
+  std::set<Identity> open_;  // the directories that are being listed
+  Listing listing_;
+};
+
+class Inspector {
+ public:
+  Inspector(const std::string& root, const std::set<std::string>& ignored)
+      : ignored_(ignored), realRoot_(RealDirectory(root)) {}
+
+  void Inspect(BodyDirectory& directory, const std::string& relative) {
+    auto& files = directory.GetFiles();
+    for (BodyObject* file = files.begin(); file != nullptr; file = files.next()) {
+      Check(Join(directory.GetName(), file->GetName()), Join(relative, file->GetName()));
+    }
+    auto& subdirectories = directory.GetSubdirectories();
+    for (BodyObject* each = subdirectories.begin(); each != nullptr; each = subdirectories.next()) {
+      const std::string path = each->GetName();
+      const std::string below = Join(relative, path.substr(path.rfind('/') + 1));
+      if (Check(path, below)) Inspect(static_cast<BodyDirectory&>(*each), below);
+    }
+  }
+
+  std::vector<std::string> leaving;
+
+ private:
+  // Whether to go on below the entry: what lies behind a link out of the tree is told by the link.
+  bool Check(const std::string& path, const std::string& relative) {
+    if (ignored_.count(relative) != 0) return false;
+    const bool leaves = LeavesTree(path, realRoot_);
+    if (leaves) leaving.push_back(path);
+    return !leaves;
+  }
+
+  const std::set<std::string>& ignored_;
+  std::string realRoot_;
+};
+
+std::set<std::string> ListedInRoot(BodyDirectory& root) {
+  std::set<std::string> listed;
+  for (auto* entries : {&root.GetFiles(), &root.GetSubdirectories()}) {
+    for (BodyObject* entry = entries->begin(); entry != nullptr; entry = entries->next()) {
+      const std::string path = entry->GetName();
+      listed.insert(path.substr(path.rfind('/') + 1));
+    }
+  }
+  return listed;
+}
+
+}  // namespace
+
+std::string RealDirectory(const std::string& directory) {
+  struct stat status = {};
+  if (stat(directory.c_str(), &status) != 0) {
+    throw FileTrouble(directory, std::strerror(errno), "io");
+  }
+  if (!S_ISDIR(status.st_mode)) throw FileTrouble(directory, "not a directory", "io");
+  const std::string real = RealPath(directory);
+  if (real.empty()) throw FileTrouble(directory, std::strerror(errno), "io");
+  return real;
+}
+
+bool LeavesTree(const std::string& path, const std::string& realRoot) {
+  if (!IsLink(path)) return false;
+  const std::string target = RealPath(path);
+  return target != realRoot && !target.starts_with(Join(realRoot, ""));
+}
+
+std::string PlainRelative(std::string name) {
+  while (name.starts_with("./")) name.erase(0, 2);
+  while (name.size() > 1 && name.ends_with('/')) name.pop_back();
+  return name;
+}
+
+Listing ListTree(const std::string& directory, const ListingOptions& options) {
+  Lister lister(directory, options);
+  lister.List(directory, "", 1);
+  Listing listing = lister.Take();
+  listing.body = "(4:body(12:random-token" + Atom(RandomToken()) + ")" + listing.body + ")";
+  return listing;
+}
+
+TreeNotes InspectTree(BodyDirectory& root, const std::set<std::string>& ignored) {
+  Inspector inspector(root.GetName(), ignored);
+  inspector.Inspect(root, "");
+  TreeNotes notes{std::move(inspector.leaving), {}};
+  std::vector<std::string> names;
+  if (!ReadNames(root.GetName(), names)) {
+    throw FileTrouble(root.GetName(), std::strerror(errno), "io");
+  }
+  const std::set<std::string> listed = ListedInRoot(root);
+  for (const std::string& name : names) {
+    if (listed.count(name) == 0 && ignored.count(name) == 0) notes.unlisted.push_back(name);
+  }
+  return notes;
+}
+
+}  // namespace vesk2_command

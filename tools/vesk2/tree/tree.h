@@ -1,0 +1,66 @@
+// tree.h: a directory tree on disk: listing it for a manifest, and looking for links that lead out
+// of it.
+#ifndef VESK2_TOOLS_TREE_H
+#define VESK2_TOOLS_TREE_H
+
+#include <sys/types.h>
+
+#include <cstdint>
+#include <set>
+#include <string>
+#include <vector>
+
+#include "tools/vesk2/tree/portable.h"
+
+#include <vesk2/manifest_body.h>
+
+namespace vesk2_command {
+
+// The real path of a directory; Trouble when it is none.
+std::string RealDirectory(const std::string& directory);
+
+// Whether `path` is a symbolic link that leads out of the tree whose real path is `realRoot`, or
+// nowhere.
+bool LeavesTree(const std::string& path, const std::string& realRoot);
+
+struct ListingOptions {
+  std::set<std::string> ignored;  // paths relative to the root, without "./" and closing "/"
+  bool allowLinks = false;        // list what links outside the tree lead to
+  std::string output;             // a file that is not listed although it may lie in the root
+  const Vesk2FileCallbacks* callbacks = nullptr;  // told about the files, or null
+};
+
+struct ListedEntry {
+  std::string path;  // below the root; that of a directory ends in "/"
+  uint64_t bytes = 0;
+  std::string digest;  // SHA-256 in hexadecimal; empty for a directory
+};
+
+struct Listing {
+  std::string body;  // the canonical body of a manifest
+  std::vector<ListedEntry> entries;
+  uint64_t files = 0;
+  uint64_t bytes = 0;
+  std::vector<std::string> problems;  // entries that cannot be signed, with the reason
+  Remarks remarks;                    // on entries that can, but perhaps not verified elsewhere
+  std::set<std::string> ignored;      // what was left out
+};
+
+// ListTree reads and hashes the whole tree, in byte order of the names, and follows links. Entries
+// that could not be verified later are problems: special files, links that lead nowhere or out of
+// the tree, directories that hold themselves, files that cannot be read, paths that are too long.
+Listing ListTree(const std::string& directory, const ListingOptions& options);
+
+// An ignore name as the library compares it.
+std::string PlainRelative(std::string name);
+
+// What the library's verdict does not speak of, for a tree that it compared with `body`.
+struct TreeNotes {
+  std::vector<std::string> leaving;  // listed entries that are links out of the tree, or behind one
+  std::vector<std::string> unlisted;  // entries directly in the root that the body does not list
+};
+TreeNotes InspectTree(ZvVesk2::BodyDirectory& root, const std::set<std::string>& ignored);
+
+}  // namespace vesk2_command
+
+#endif  // VESK2_TOOLS_TREE_H
