@@ -90,7 +90,7 @@ ExitCode Run(const Options& options) {
   const bool issuer = !options.issuerOf.empty();
   CheckGrant(*entry, issuer ? options.issuerOf : options.subjectOf, issuer, options.strict);
   GrantEntry(*entry, {name, options.flags.force, options.flags.dryRun});
-  Result()["entry"] = DescribeEntry(*entry).members();
+  Result()["entry"] = DescribeEntry(*entry, name + ".acl").members();
   // The lists of a revocation source are believed without it.
   if (!options.propagate && !IsRevocationTag(entry->GetTag())) {
     Note(

@@ -39,9 +39,9 @@ ExitCode Run(const Options& options) {
     RefuseTaken(*entries.back(), {name, options.flags.force});
   }
   for (size_t i = 0; i < entries.size(); ++i) {
-    GrantEntry(*entries[i],
-               {EntryName(options, options.files[i]), options.flags.force, options.flags.dryRun});
-    Result()["entries"].push_back(DescribeEntry(*entries[i]).members());
+    const std::string name = EntryName(options, options.files[i]);
+    GrantEntry(*entries[i], {name, options.flags.force, options.flags.dryRun});
+    Result()["entries"].push_back(DescribeEntry(*entries[i], name + ".acl").members());
   }
   return kYes;
 }

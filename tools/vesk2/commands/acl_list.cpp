@@ -19,10 +19,8 @@ ExitCode Run() {
     try {
       const Ref<ZvVesk2::AclEntry> entry = ReadEntry(path);
       CheckEntry(*entry, path);
-      Sheet said = DescribeEntry(*entry);
-      said.AddMember("name", name);
-      said.AddMember("file", Escape(path));
-      sheet.AddPart("entries", name, std::move(said));
+      sheet.AddPart("entries", name,
+                    DescribeEntry(*entry, std::filesystem::path(path).filename().string()));
     } catch (const Trouble& trouble) {  // the others are still of interest
       Note(trouble.what());
       unreadable.push_back({{"file", Escape(path)}, {"reason", trouble.reason}});

@@ -44,7 +44,7 @@ int VerifyMembers(const CertChain& chain, const Question& question, const StoreC
       Check(code, Escape(question.file));
     if (proved.GetEntries() == nullptr) ThrowNoStore(VESK2_ERR_ACL_ENTRY_NOT_FOUND);
     if (code < 0) {
-      ExplainUnreadable(question, code);
+      ExplainTrouble(question, code);
       Check(code, Escape(question.file));
     }
     if (i == 0) (void)CheckStores(question, stores);
@@ -55,6 +55,8 @@ int VerifyMembers(const CertChain& chain, const Question& question, const StoreC
 }
 
 ExitCode Run(const Options& options) {
+  Result() = {{"subject", Json()}, {"tag", Json()}};
+  StartExplanation();
   StartAnswer();
   const Request request = ParseRequest(options.tag);
   Question question;
@@ -77,7 +79,7 @@ ExitCode Run(const Options& options) {
     return verdict;
   }
   const ExitCode verdict = Yes(subject + " is granted " + tag);
-  if (options.explain) ExplainGrant(question);
+  if (options.explain || GetStyle().json) ExplainGrant(question);
   return verdict;
 }
 

@@ -96,7 +96,7 @@ ExitCode Run(const Options& options) {
   const Sources sources(LoadAcls().get());
   ExitCode worst = kYes;
   for (const std::string& path : files) {
-    Json said = {{"file", Escape(path)}, {"stored", false}};
+    Json said = {{"file", Escape(path)}, {"stored", false}, {"why", Json()}};
     ExitCode code = kTrouble;
     try {
       code = Offer(path, sources, options.force, said);

@@ -1,7 +1,7 @@
 // describe.cpp: what each kind of object says.
 #include "tools/vesk2/commands/describe.h"
 
-#include <algorithm>
+#include "tools/vesk2/objects/shapes.h"
 
 namespace vesk2_command {
 namespace {
@@ -14,42 +14,15 @@ using ZvVesk2::Signature;
 using ZvVesk2::Subject;
 using ZvVesk2::ThresholdSubject;
 
-const char* SubjectKind(const Subject& subject) {
-  if (subject.IsThresholdSubject()) return "k-of-n";
-  return subject.IsHash() ? "hash" : "key";
-}
-
-void AddSubject(Sheet& sheet, Subject& subject) {
-  const std::string text = SubjectText(subject);
-  sheet.Add("subject", text, text + (subject.IsHash() ? " (a digest)" : ""));
-  sheet.AddMember("subject_kind", SubjectKind(subject));
-  if (subject.IsThresholdSubject())
-    sheet.AddMember("threshold", DescribeSubject(subject).members());
-}
-
-void AddTag(Sheet& sheet, SExpression* tag) {
-  sheet.AddRow("tag", TagText(tag));
-  if (tag != nullptr) sheet.AddMember("tag", TagText(tag));
-}
-
-void AddPeriod(Sheet& sheet, const TimeStamp* notBefore, const TimeStamp* notAfter) {
-  sheet.AddRow("valid", PeriodText(notBefore, notAfter));
-  if (notBefore != nullptr) sheet.AddMember("not_before", StampText(*notBefore));
-  if (notAfter != nullptr) sheet.AddMember("not_after", StampText(*notAfter));
-}
-
-void AddComment(Sheet& sheet, const ByteString* comment) {
-  if (comment != nullptr) sheet.Add("comment", Escape(BytesOf(*comment)));
-}
-
 // What a certificate and an ACL entry both say.
 template <typename Granting>
-void AddGrant(Sheet& sheet, const Granting& grant) {
-  AddSubject(sheet, *grant.GetSubject());
-  AddTag(sheet, grant.GetTag());
-  sheet.Add("propagate", grant.GetPropagate(), grant.GetPropagate() ? "yes" : "no");
-  AddPeriod(sheet, grant.GetNotBefore(), grant.GetNotAfter());
-  AddComment(sheet, grant.GetComment());
+void AddGrantRows(Sheet& sheet, const Granting& grant) {
+  Subject& subject = *grant.GetSubject();
+  sheet.AddRow("subject", SubjectText(subject) + (subject.IsHash() ? " (a digest)" : ""));
+  sheet.AddRow("tag", TagText(grant.GetTag()));
+  sheet.AddRow("propagate", grant.GetPropagate() ? "yes" : "no");
+  sheet.AddRow("valid", PeriodText(grant.GetNotBefore(), grant.GetNotAfter()));
+  if (grant.GetComment() != nullptr) sheet.AddRow("comment", Escape(BytesOf(*grant.GetComment())));
 }
 
 // The third item of a triple, unless it is the (comment) that stands for nothing.
@@ -59,64 +32,39 @@ void AddOwner(Sheet& sheet, SExpression* extra) {
   if (text != "(comment)") sheet.Add("extra", text);
 }
 
-void AddRevocation(Sheet& sheet, const Cert& cert) {
-  SExpression* source = cert.GetRevocationElement();
-  if (source == nullptr) return sheet.AddRow("revocation", "by key only");
-  sheet.Add("revocation", SourceText(*source));
-}
-
 Sheet DescribeLink(const ChainLink& link) {
+  const Cert& cert = *link.cert;
   Sheet sheet("certificate");
-  sheet.Add("issuer", SubjectText(*link.cert->GetIssuer()));
-  AddGrant(sheet, *link.cert);
+  sheet.SetMembers(CertJson(cert));
+  sheet.AddRow("issuer", SubjectText(*cert.GetIssuer()));
+  AddGrantRows(sheet, cert);
   AddOwner(sheet, link.extra);
-  AddRevocation(sheet, *link.cert);
+  SExpression* source = cert.GetRevocationElement();
+  sheet.AddRow("revocation", source != nullptr ? SourceText(*source) : "by key only");
   if (link.signature != nullptr) AddSignature(sheet, link.signature->Verify(link.cert));
   return sheet;
 }
 
-bool IsDummy(const Hash& hash) {
-  const ByteString& digest = *hash.GetDigest();
-  return std::all_of(digest.GetData(), digest.GetData() + digest.GetLength(),
-                     [](unsigned char byte) { return byte == 0; });
-}
-
-// The items of a list, each (item HASH DATE). A digest of nothing makes the list count although it
-// revokes nothing; without any item there is no list.
-void AddItems(Sheet& sheet, const SExpression& list, const std::string& name,
-              const std::string& member) {
-  Json items = Json::array();
-  auto it = list.Begin();
-  it.Next();
-  if (!it) return;
-  for (; it; it.Next()) {
-    const auto* item = static_cast<SExpression*>(it.Value());
-    auto at = item->Begin();
-    at.Next();
-    auto* hash = dynamic_cast<Hash*>(at.Value());
-    const std::string from = StampText(*dynamic_cast<TimeStamp*>(item->Last()));
-    if (IsDummy(*hash)) {
-      sheet.AddRow(name, "none");
-      continue;
-    }
-    const std::string digest = SubjectText(*hash);
-    sheet.AddRow(name, digest + " from " + from);
-    items.push_back({{"digest", digest}, {"from", from}});
+// The items of a list, each (item HASH DATE); without any item there is no list.
+void AddItemRows(Sheet& sheet, const SExpression& list, const std::string& name) {
+  const Json items = ItemsJson(list);
+  for (const Json& item : items) {
+    sheet.AddRow(name,
+                 item["digest"].get<std::string>() + " from " + item["from"].get<std::string>());
   }
-  sheet.AddMember(member, std::move(items));
+  if (items.empty() && list.Count() > 1) sheet.AddRow(name, "none");
 }
 
-void AddLists(Sheet& sheet, const Crl& list) {
-  AddItems(sheet, *list.GetList1(), "certificate", "certificates");
-  AddItems(sheet, *list.GetList2(), "key", "keys");
+void AddListRows(Sheet& sheet, const Crl& list) {
+  AddItemRows(sheet, *list.GetList1(), "certificate");
+  AddItemRows(sheet, *list.GetList2(), "key");
 }
 
 }  // namespace
 
 void AddSignature(Sheet& sheet, int code) {
   sheet.AddRow("signature", code == 0 ? "holds" : Reason(code));
-  sheet.AddMember("signature",
-                  {{"holds", code == 0}, {"reason", ReasonWord(code)}, {"code", code}});
+  sheet.AddMember("signature", SignatureJson(code));
 }
 
 Sheet DescribeKey(PublicKey& key) {
@@ -147,11 +95,12 @@ Sheet DescribeSubject(Subject& subject) {
   return sheet;
 }
 
-Sheet DescribeEntry(AclEntry& entry) {
+Sheet DescribeEntry(AclEntry& entry, const std::string& file) {
   Sheet sheet("acl-entry");
-  AddGrant(sheet, entry);
+  sheet.SetMembers(EntryJson(entry, file.empty() ? Json() : Json(Escape(file))));
+  AddGrantRows(sheet, entry);
   if (entry.GetGeneration() != 0) {
-    sheet.Add("generation", entry.GetGeneration(), std::to_string(entry.GetGeneration()));
+    sheet.AddRow("generation", std::to_string(entry.GetGeneration()));
   }
   return sheet;
 }
@@ -176,24 +125,29 @@ Sheet DescribeChain(const std::vector<ChainLink>& links) {
   const bool request = links.size() == 1 && first.GetIssuer()->IsEqual(first.GetSubject());
   Sheet sheet(request ? "request" : "chain");
   for (size_t i = 0; i < links.size(); ++i) {
-    sheet.AddPart("certificates", "certificate", i, links.size(), DescribeLink(links[i]));
+    Sheet part = DescribeLink(links[i]);
+    part.AddMember("certificate", i + 1);
+    sheet.AddPart("certificates", "certificate", i, links.size(), std::move(part));
   }
   return sheet;
 }
 
 Sheet DescribeCrl(const Crl& list) {
   Sheet sheet("revocation-list");
-  AddLists(sheet, list);
+  sheet.AddMember("certificates", ItemsJson(*list.GetList1()));
+  sheet.AddMember("keys", ItemsJson(*list.GetList2()));
+  AddListRows(sheet, list);
   return sheet;
 }
 
 Sheet DescribeCrl(CrlSequence& list) {
   const Cert& cert = *list.GetCert();
   Sheet sheet("revocation-list");
-  sheet.Add("issuer", SubjectText(*cert.GetIssuer()));
-  AddTag(sheet, cert.GetTag());
-  AddPeriod(sheet, cert.GetNotBefore(), cert.GetNotAfter());
-  AddLists(sheet, *list.GetCrl());
+  sheet.SetMembers(CrlJson(list));
+  sheet.AddRow("issuer", SubjectText(*cert.GetIssuer()));
+  sheet.AddRow("tag", TagText(cert.GetTag()));
+  sheet.AddRow("valid", PeriodText(cert.GetNotBefore(), cert.GetNotAfter()));
+  AddListRows(sheet, *list.GetCrl());
   AddSignature(sheet, CheckIssuerWord(list));
   return sheet;
 }

@@ -1,8 +1,7 @@
 // describe.h: what each kind of object says, as a sheet: what `show` and the `show` of every noun
 // print, and their members for machines.
 //
-// What an object does not say is no member of it; a certificate without a tag passes on everything.
-// A signature that was checked is {"holds", "reason", "code"}.
+// The members are those of shapes.h.
 #ifndef VESK2_TOOLS_DESCRIBE_H
 #define VESK2_TOOLS_DESCRIBE_H
 
@@ -22,7 +21,8 @@ namespace vesk2_command {
 Sheet DescribeKey(PublicKey& key);
 // A digest, or the members of a k-of-n.
 Sheet DescribeSubject(ZvVesk2::Subject& subject);
-Sheet DescribeEntry(ZvVesk2::AclEntry& entry);
+// `file` is the name of the entry's file; empty for one that is in no store.
+Sheet DescribeEntry(ZvVesk2::AclEntry& entry, const std::string& file = "");
 // A certificate, its signature checked unless there is none.
 Sheet DescribeCert(ZvVesk2::Cert& cert, ZvVesk2::Signature* signature);
 // A signature whose object is not at hand.

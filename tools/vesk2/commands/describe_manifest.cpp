@@ -30,8 +30,9 @@ Sheet DescribeManifest(const SignatureBlock& block, int code) {
   sheet.Add("signed at", StampText(*block.signedAt));
   sheet.StartList("certificates");
   for (size_t i = 0; i < block.certs.size(); ++i) {
-    sheet.AddPart("certificates", "certificate", i, block.certs.size(),
-                  DescribeCert(*block.certs[i].cert, block.certs[i].signature.get()));
+    Sheet part = DescribeCert(*block.certs[i].cert, block.certs[i].signature.get());
+    part.AddMember("certificate", i + 1);
+    sheet.AddPart("certificates", "certificate", i, block.certs.size(), std::move(part));
   }
   sheet.StartList("revocation_lists");
   for (size_t i = 0; i < block.crls.size(); ++i) {

@@ -4,6 +4,7 @@
 #include "tools/vesk2/explain/explain.h"
 #include "tools/vesk2/files/files.h"
 #include "tools/vesk2/objects/manifest_file.h"
+#include "tools/vesk2/objects/shapes.h"
 #include "tools/vesk2/say/progress.h"
 #include "tools/vesk2/say/report.h"
 #include "tools/vesk2/stores/acl_store.h"
@@ -33,6 +34,7 @@ struct Options {
   std::string aclDirectory;
   std::vector<std::string> ignored;
   bool explain = false;
+  bool all = false;
   StoreCheck stores;
 };
 
@@ -50,8 +52,8 @@ bool IsAboutToday(const Options& options) {
 }
 
 TreeQuestion AboutTree(const Options& options) {
-  TreeQuestion tree{
-      options.directory, options.manifest, {}, options.allowExtra, options.allowLinks};
+  TreeQuestion tree{options.directory,  options.manifest,   {},
+                    options.allowExtra, options.allowLinks, options.all};
   for (const std::string& name : options.ignored) tree.ignored.insert(PlainRelative(name));
   return tree;
 }
@@ -91,6 +93,15 @@ std::vector<std::string> SigningWords(const Options& options) {
   return words;
 }
 
+// A program finds every member in every answer.
+void StartResult() {
+  for (const char* member : {"tag", "signer", "signed_at", "counts", "changed", "missing",
+                             "links_out", "unlisted", "ignored"}) {
+    Result()[member] = Json();
+  }
+  StartExplanation();
+}
+
 // One verification: what was asked, and what came of it.
 class Answer {
  public:
@@ -105,10 +116,15 @@ class Answer {
     question_.proved = &proved_;
     Configure(manifest_, options, request_.members[0].text, AboutTree(options).ignored);
     manifest_.SetEvidence(&proved_);
+    Result()["tag"] = TagText(request_.tag.get());
   }
 
   ExitCode Give() {
     code_ = VerifyFiles(manifest_, options_, question_.period);
+    Result()["signed_at"] = StampJson(proved_.GetSigningTime());
+    if (proved_.CountCerts() > 0) {
+      Result()["signer"] = Fingerprint(*proved_.GetCert(0)->GetIssuer());
+    }
     const bool judged = JudgedTree(manifest_, code_);
     if (!judged && !IsRefusal(code_)) ThrowTrouble();
     const std::set<std::string> broken = CheckStores(question_, options_.stores);
@@ -121,7 +137,7 @@ class Answer {
 
  private:
   [[noreturn]] void ThrowTrouble() {
-    if (code_ < 0) ExplainUnreadable(question_, code_);
+    ExplainTrouble(question_, code_);
     if (code_ == VESK2_ERR_FILE_NOT_FOUND || code_ == VESK2_ERR_FIND_DIR) ThrowNoStore(code_);
     ThrowUnreadable(options_.manifest, manifest_, code_);
   }
@@ -169,22 +185,29 @@ class Answer {
     }
     const std::vector<Finding> findings = FindInTree(manifest_, AboutTree(options_));
     const std::string summary = Summary(findings);
+    TellFindings(findings, AboutTree(options_), manifest_);
     if (code_ != 0 || !summary.empty()) return RefuseTree(findings, summary);
     const bool aboutSigning = today_ || options_.at == kSigning;
     const ExitCode verdict = Yes(std::to_string(CountFiles(manifest_.GetValid())) + " files of " +
                                  Escape(options_.directory) + " are as signed at " + signedAt +
                                  " by " + Fingerprint(*proved_.GetCert(0)->GetIssuer()) +
                                  (aboutSigning ? EndedSince(proved_) : ""));
-    if (today_) question_.proved = &today_->evidence();
-    if (options_.explain) ExplainGrant(question_);
+    if (options_.explain || GetStyle().json) TellGrant();
     return verdict;
+  }
+
+  // Explains by what is known today, where that is what was asked.
+  void TellGrant() {
+    if (today_) question_.proved = &today_->evidence();
+    ExplainGrant(question_);
+    question_.proved = &proved_;
   }
 
   ExitCode RefuseTree(const std::vector<Finding>& findings, const std::string& summary) {
     int code = code_;
     if (code == 0 && Found(findings, kUnlisted)) code = VESK2_ERR_EXTRA_FILES;
     const ExitCode verdict = code != 0 ? No(code, summary) : No("link-leaves-tree", summary);
-    PrintFindings(findings);
+    if (GetStyle().json) TellGrant();
     if (code != 0) ExplainTree(question_);
     return verdict;
   }
@@ -223,7 +246,9 @@ Action DefineManifestVerify(CLI::App& app) {
       ->allow_extra_args(false);
   AddStoreCheckOptions(app, options->stores);
   app.add_flag("--explain", options->explain, "Tell why also when the answer is yes");
+  app.add_flag("--all", options->all, "Tell every finding, on a terminal too");
   return [options] {
+    StartResult();
     RealDirectory(options->directory);
     StartAnswer();
     return Answer(*options).Give();

@@ -122,6 +122,7 @@ bool TerminalTakesColor() {
 Style ResolveStyle(const Common& common) {
   Style style = common.style;
   style.color = !style.json && !common.noColor && TerminalTakesColor();
+  style.brief = isatty(STDERR_FILENO) == 1;
   style.progress = !style.quiet && !common.noProgress && isatty(STDERR_FILENO) == 1;
   return style;
 }

@@ -12,6 +12,7 @@
 #include "tools/vesk2/explain/revocation.h"
 #include "tools/vesk2/explain/tell_remedies.h"
 #include "tools/vesk2/files/stores.h"
+#include "tools/vesk2/objects/shapes.h"
 #include "tools/vesk2/objects/texts.h"
 #include "tools/vesk2/say/report.h"
 
@@ -34,9 +35,6 @@ std::string Short(const std::string& fingerprints) {
   return text;
 }
 
-Json StampJson(const TimeStamp* stamp) {
-  return stamp != nullptr ? Json(StampText(*stamp)) : Json();
-}
 std::string CommentOf(const ByteString* comment) {
   return comment == nullptr
              ? ""
@@ -94,35 +92,23 @@ const char* StateWord(int32_t state) {
   }
 }
 
-Json RevocationJson(const Evidence& evidence, const RevocationLists& lists, size_t index,
-                    int32_t state) {
+Json AskedRevocation(const Evidence& evidence, const RevocationLists& lists, size_t index,
+                     int32_t state) {
   SExpression* source = evidence.certs[index].source.get();
-  Json json = {{"state", StateWord(state)},
-               {"source", source != nullptr ? Json(TagText(source)) : Json()},
-               {"list", Json()}};
+  Json json = RevocationJson(*evidence.certs[index].cert);
+  json["state"] = StateWord(state);
   if (const CrlSequence* list = lists.Deciding(source)) json["list"] = ListJson(*list);
   return json;
 }
 
 // ---- Facts ----
 
-template <typename Grant>  // a certificate or an ACL entry
-Json GrantJson(Grant& grant) {
-  return {{"subject", SubjectText(*grant.GetSubject())},
-          {"tag", TagText(grant.GetTag())},
-          {"propagate", grant.GetPropagate()},
-          {"not_before", StampJson(grant.GetNotBefore())},
-          {"not_after", StampJson(grant.GetNotAfter())},
-          {"comment", CommentOf(grant.GetComment())}};
-}
-
-Json CertJson(const Evidence& evidence, const RevocationLists& lists, size_t index, int32_t state) {
+Json ToldCert(const Evidence& evidence, const RevocationLists& lists, size_t index, int32_t state) {
   const CertEvidence& each = evidence.certs[index];
-  Json json = {{"certificate", index + 1}, {"issuer", SubjectText(*each.cert->GetIssuer())}};
-  json.update(GrantJson(*each.cert));
-  json["signature"] = {
-      {"holds", each.code == 0}, {"reason", ReasonWord(each.code)}, {"code", each.code}};
-  json["revocation"] = RevocationJson(evidence, lists, index, state);
+  Json json = CertJson(*each.cert);
+  json["certificate"] = index + 1;
+  json["signature"] = SignatureJson(each.code);
+  json["revocation"] = AskedRevocation(evidence, lists, index, state);
   return json;
 }
 
@@ -156,15 +142,13 @@ void TellFacts(const Evidence& evidence, const RevocationLists& lists) {
   const std::vector<int32_t> states = RevocationStates(evidence);
   Json& chain = Result()["chain"] = Json::array();
   for (size_t i = 0; i < evidence.certs.size(); ++i) {
-    chain.push_back(CertJson(evidence, lists, i, states[i]));
+    chain.push_back(ToldCert(evidence, lists, i, states[i]));
     Note(CertText(evidence, i, chain.back()));
   }
   Json& acl = Result()["acl"] = Json::array();
   for (const EntryEvidence& each : evidence.entries) {
     if (!IsRelevant(each, evidence)) continue;
-    Json json = {{"entry", Escape(each.file)}};
-    json.update(GrantJson(*each.entry));
-    acl.push_back(json);
+    acl.push_back(EntryJson(*each.entry, Escape(each.file)));
     Note(EntryName(each) + ": trusts " + GrantText(*each.entry));
   }
 }
@@ -244,8 +228,18 @@ void ExplainGrant(const Question& question) {
   });
 }
 
-void ExplainUnreadable(const Question& question, int code) {
-  Explain([&] { TellLosses(FindLosses(question, GatherEvidence(question), code)); });
+void ExplainTrouble(const Question& question, int code) {
+  Explain([&] {
+    const Evidence evidence = GatherEvidence(question);
+    if (GetStyle().json && !evidence.certs.empty()) TellFacts(evidence, RevocationLists(evidence));
+    if (code < 0) TellLosses(FindLosses(question, evidence, code));
+  });
+}
+
+void StartExplanation() {
+  for (const char* member : {"members", "chain", "acl", "lost", "remedies", "authority"}) {
+    Result()[member] = Json();
+  }
 }
 
 }  // namespace vesk2_command

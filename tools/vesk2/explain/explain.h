@@ -21,8 +21,11 @@ void ExplainTree(const Question& question);
 // ExplainGrant tells of every certificate, of the path of authority, when it ends, and how old the
 // revocation data is: "chain", "acl" and "authority" of the result.
 void ExplainGrant(const Question& question);
-// ExplainUnreadable names the credentials that the reduction cannot read.
-void ExplainUnreadable(const Question& question, int code);
+// ExplainTrouble tells machines of what was read, and names the credentials that the reduction
+// cannot read.
+void ExplainTrouble(const Question& question, int code);
+// StartExplanation puts those members into the result, null until they are known.
+void StartExplanation();
 
 }  // namespace vesk2_command
 

@@ -76,7 +76,7 @@ void WriteJson(ExitCode code) {
   constexpr const char* kVerdicts[] = {"yes", "no", "trouble"};
   constexpr const char* kReasons[] = {"ok", "no", "trouble"};
   Json answer = {
-      {"schema", "vesk2.answer/1"},
+      {"schema", "vesk2.answer/2"},
       {"command", report.command},
       {"verdict", kVerdicts[code]},
       {"exit", static_cast<int>(code)},
@@ -84,8 +84,8 @@ void WriteJson(ExitCode code) {
       {"code", report.code},
       {"message", report.message},
   };
-  if (!report.file.empty()) answer["file"] = report.file;
-  if (report.byte) answer["byte"] = *report.byte;
+  answer["file"] = OrNull(report.file);
+  answer["byte"] = report.byte ? Json(*report.byte) : Json();
   answer["notes"] = report.notes;
   answer["result"] = report.result.is_null() ? Json::object() : report.result;
   // In ASCII: the words of a command line are as they are, and may turn a terminal's text.
@@ -136,7 +136,7 @@ void Say(const std::string& line) {
 
 void Note(const std::string& line) {
   report.notes.push_back(line);
-  if (!report.style.quiet) WriteError(line);
+  if (!report.style.quiet && !report.style.json) WriteError(line);
 }
 
 void Detail(const std::string& line) {
@@ -144,6 +144,7 @@ void Detail(const std::string& line) {
 }
 
 Json& Result() { return report.result; }
+Json OrNull(const std::string& text) { return text.empty() ? Json() : Json(text); }
 
 ExitCode Yes(const std::string& text) {
   report.message = text;

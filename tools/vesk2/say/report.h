@@ -47,6 +47,7 @@ struct Style {
   bool verbose = false;
   bool color = false;     // the verdict's word is coloured
   bool progress = false;  // a progress line may be drawn on standard error
+  bool brief = false;     // long lists are cut short: a person reads them on a terminal
 };
 
 // StartReport forgets what was said before. `command` is "noun verb".
@@ -58,12 +59,15 @@ const Style& GetStyle();
 // Say writes a line for people to standard output; with --json it says nothing, and what it would
 // have said belongs into Result.
 void Say(const std::string& line);
-// Note writes a line to standard error unless --quiet; with --json it is kept in "notes" too.
+// Note writes a line to standard error unless --quiet; with --json it goes into "notes" instead.
 void Note(const std::string& line);
 // Detail is a note that only --verbose asks for.
 void Detail(const std::string& line);
 // The members that a command adds for machines.
 Json& Result();
+
+// A text, or null for none.
+Json OrNull(const std::string& text);
 
 // The verdict: "yes: TEXT" or "no: TEXT (NAME)" for people, with the reason's word for machines.
 ExitCode Yes(const std::string& text);

@@ -19,6 +19,7 @@ class Sheet {
   void Add(const std::string& name, Json value, const std::string& text);
   // A fact that one of the two readers is told in another way.
   void AddMember(const std::string& name, Json value) { members_[name] = std::move(value); }
+  void SetMembers(Json members) { members_ = std::move(members); }
   void AddRow(const std::string& name, const std::string& text);
   void AddLine(const std::string& line) { rows_.push_back(line); }
 
