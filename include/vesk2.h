@@ -27,8 +27,12 @@
 
 #if defined(__GNUC__)
 #define VESK2_API __attribute__((visibility("default")))
+/* The result is the answer that the call was made for: a program that drops it trusts whatever it
+ * asked about. Compilers warn of that; a cast to void does not silence all of them. */
+#define VESK2_VERDICT VESK2_API __attribute__((warn_unused_result))
 #else
 #define VESK2_API
+#define VESK2_VERDICT
 #endif
 
 /* ---- Error codes --------------------------------------------------------------------------- */
@@ -376,12 +380,12 @@ VESK2_API void SetStoreUpdate(Manifest* manifest, int update);
  *   VESK2_ERR_USER_INTERRUPT      a callback ended it (SetFileCallbacks)
  *   VESK2_ERR_READ_FILE           another process held a file of a store for a minute
  *   VESK2_ERR_MEM_ALLOC           memory or descriptors ran out; nothing was decided then */
-VESK2_API int VerifyManifest(Manifest* manifest, time_t notBefore, time_t notAfter);
+VESK2_VERDICT int VerifyManifest(Manifest* manifest, time_t notBefore, time_t notAfter);
 
 /* CompareManifest compares this manifest's body (the reference) with that of another manifest.
  * Signatures and digests of both are proved, authority is not. Results as in VerifyManifest. */
-VESK2_API int CompareManifest(Manifest* manifest, const char* otherManifestPath);
-VESK2_API int CompareManifestA(Manifest* manifest, const char* otherManifestPath);
+VESK2_VERDICT int CompareManifest(Manifest* manifest, const char* otherManifestPath);
+VESK2_VERDICT int CompareManifestA(Manifest* manifest, const char* otherManifestPath);
 
 /* GetTimeOfSigning returns the signing time of the last successful read, or 0. */
 VESK2_API time_t GetTimeOfSigning(Manifest* manifest);
@@ -425,13 +429,13 @@ VESK2_API int Vesk2CertFree(Vesk2CertInfoStruct* chain);
  *   VESK2_ERR_MEM_ALLOC, VESK2_ERR_READ_FILE   as in VerifyManifest
  *   VESK2_ERR_TIME_STAMP           a time that has no text; the codes of the tag's parser;
  * SPKI_ERR_* */
-VESK2_API int Vesk2CertVerify(Vesk2CertInfoStruct* chain, const char* tagText, time_t notBefore,
-                              time_t notAfter);
-/* Vesk2CertVerifyFile does the same for a sequence file. VESK2_ERR_PARAM_NULL for a null path. */
-VESK2_API int Vesk2CertVerifyFile(const char* path, const char* tagText, time_t notBefore,
+VESK2_VERDICT int Vesk2CertVerify(Vesk2CertInfoStruct* chain, const char* tagText, time_t notBefore,
                                   time_t notAfter);
-VESK2_API int Vesk2CertVerifyFileA(const char* path, const char* tagText, time_t notBefore,
-                                   time_t notAfter);
+/* Vesk2CertVerifyFile does the same for a sequence file. VESK2_ERR_PARAM_NULL for a null path. */
+VESK2_VERDICT int Vesk2CertVerifyFile(const char* path, const char* tagText, time_t notBefore,
+                                      time_t notAfter);
+VESK2_VERDICT int Vesk2CertVerifyFileA(const char* path, const char* tagText, time_t notBefore,
+                                       time_t notAfter);
 
 /* CertFind lists the "*.cert" files of a directory (null: the home store's) as bare names, in byte
  * order, or null when there are none or no such directory. Free with FreeFileItemList. */
@@ -470,12 +474,12 @@ VESK2_API int Vesk2CrlFree(Vesk2CrlInfoStruct* record);
  * VESK2_ERR_NOT_BEFORE when it ends before `from`. VESK2_ERR_PARAM_NULL, the codes of loading the
  * store, and VESK2_ERR_ACL_ENTRY_NOT_FOUND, VESK2_ERR_HASH_ID, VESK2_ERR_SIGNATURE for one that
  * does not hold. */
-VESK2_API int Vesk2CrlVerify(Vesk2CrlInfoStruct* record, const char* tagText, time_t from,
-                             time_t to);
-VESK2_API int Vesk2CrlVerifyFile(const char* path, const char* tagText, time_t from, time_t to,
-                                 Vesk2ContextStruct* context);
-VESK2_API int Vesk2CrlVerifyFileA(const char* path, const char* tagText, time_t from, time_t to,
-                                  Vesk2ContextStruct* context);
+VESK2_VERDICT int Vesk2CrlVerify(Vesk2CrlInfoStruct* record, const char* tagText, time_t from,
+                                 time_t to);
+VESK2_VERDICT int Vesk2CrlVerifyFile(const char* path, const char* tagText, time_t from, time_t to,
+                                     Vesk2ContextStruct* context);
+VESK2_VERDICT int Vesk2CrlVerifyFileA(const char* path, const char* tagText, time_t from, time_t to,
+                                      Vesk2ContextStruct* context);
 
 #ifdef __cplusplus
 } /* extern "C" */

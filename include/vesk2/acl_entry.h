@@ -94,7 +94,7 @@ class VESK2_API AclEntry : public SExpression {
   // file's name; a name that is taken is skipped. Every "*.acl" file of `dir` may become a trust
   // root. When something could not be read for lack of memory or descriptors, nothing is written.
   // Always 0.
-  static int InstallAcls(const char* dir, Vesk2ContextStruct* ctx);
+  [[nodiscard]] static int InstallAcls(const char* dir, Vesk2ContextStruct* ctx);
 
   // The parts, borrowed; null, false or 0 when absent.
   SExpression* GetVersion() const { return version; }

@@ -25,7 +25,7 @@ class VESK2_API VeskConf {
 };
 
 // V2Version returns 10100, V2VersionExtra and V2VersionExtraA the tag "r2441".
-VESK2_API int V2Version();
+[[nodiscard]] VESK2_API int V2Version();
 VESK2_API const char* V2VersionExtra();
 VESK2_API const char* V2VersionExtraA();
 

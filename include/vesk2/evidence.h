@@ -57,15 +57,15 @@ class VESK2_API Evidence {
 
   // ---- What was found ----
   // 0 when the signature holds, else Signature::Verify's code.
-  int GetSignatureCode(size_t index) const;
+  [[nodiscard]] int GetSignatureCode(size_t index) const;
   // Cert::RevocationStatus; Undetermined until the lists were asked.
   int32_t GetRevocationStatus(size_t index) const;
   // The tag of the lists that speak for the certificate; null when it names none.
   SExpression* GetRevocationSource(size_t index) const;
   // 0 when the signer certificate names the digest of the manifest's content. 0 when the listing
   // can be read, else the code, and the byte of the file at which it stops making sense.
-  int GetContentCode() const { return contentCode; }
-  int GetListingCode() const { return listingCode; }
+  [[nodiscard]] int GetContentCode() const { return contentCode; }
+  [[nodiscard]] int GetListingCode() const { return listingCode; }
   size_t GetListingPosition() const { return listingPosition; }
 
   // ---- Changes ----

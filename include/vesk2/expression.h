@@ -72,8 +72,9 @@ class VESK2_API DExpression {
   // 0 or below the outermost parentheses are left out. Byte strings print by hint: none, the bytes
   // if all are printable, else nothing; bin nothing; utf-8 the bytes; num the first byte in
   // decimal. Always 0; the text ends where lists nest too deeply.
-  virtual int PrintAdvanced(int (*write)(const char* text, unsigned int length, void* user),
-                            void* user, int depth) = 0;
+  [[nodiscard]] virtual int PrintAdvanced(int (*write)(const char* text, unsigned int length,
+                                                       void* user),
+                                          void* user, int depth) = 0;
   // PrintCanonical writes the canonical encoding with hints to a stream, which a list flushes at
   // its end. A short write or a failing flush gives VESK2_ERR_WRITE_FILE; a null stream
   // VESK2_ERR_PARAM_NULL for a byte string and VESK2_ERR_INVALID_PARAM for a list; lists nested too
@@ -126,14 +127,15 @@ class VESK2_API ByteString : public DExpression {
   ~ByteString() override;
 
  public:
-  int UpdateHash(ZVCLMHashContextData* hash, bool ignoreHints) override;
+  [[nodiscard]] int UpdateHash(ZVCLMHashContextData* hash, bool ignoreHints) override;
   unsigned int CanonicalLength() override;
   unsigned int AdvancedLength() override;
-  int Export(unsigned char* buf, unsigned int& pos, unsigned int size) override;
-  int ExportAdvanced(unsigned char* buf, unsigned int& pos, unsigned int size) override;
-  int PrintAdvanced(int (*write)(const char* text, unsigned int length, void* user), void* user,
-                    int depth) override;
-  int PrintCanonical(FILE* stream) override;
+  [[nodiscard]] int Export(unsigned char* buf, unsigned int& pos, unsigned int size) override;
+  [[nodiscard]] int ExportAdvanced(unsigned char* buf, unsigned int& pos,
+                                   unsigned int size) override;
+  [[nodiscard]] int PrintAdvanced(int (*write)(const char* text, unsigned int length, void* user),
+                                  void* user, int depth) override;
+  [[nodiscard]] int PrintCanonical(FILE* stream) override;
   bool IsSExpression() const override { return false; }
   // ToString returns a new 0-terminated copy, cut at a 0 byte; free it with Vesk2Free. Null without
   // memory.
@@ -191,14 +193,15 @@ class VESK2_API SExpression : public DExpression {
   ~SExpression() override;
 
  public:
-  int UpdateHash(ZVCLMHashContextData* hash, bool ignoreHints) override;
+  [[nodiscard]] int UpdateHash(ZVCLMHashContextData* hash, bool ignoreHints) override;
   unsigned int CanonicalLength() override;
   unsigned int AdvancedLength() override;
-  int Export(unsigned char* buf, unsigned int& pos, unsigned int size) override;
-  int ExportAdvanced(unsigned char* buf, unsigned int& pos, unsigned int size) override;
-  int PrintAdvanced(int (*write)(const char* text, unsigned int length, void* user), void* user,
-                    int depth) override;
-  int PrintCanonical(FILE* stream) override;
+  [[nodiscard]] int Export(unsigned char* buf, unsigned int& pos, unsigned int size) override;
+  [[nodiscard]] int ExportAdvanced(unsigned char* buf, unsigned int& pos,
+                                   unsigned int size) override;
+  [[nodiscard]] int PrintAdvanced(int (*write)(const char* text, unsigned int length, void* user),
+                                  void* user, int depth) override;
+  [[nodiscard]] int PrintCanonical(FILE* stream) override;
   bool IsSExpression() const override { return true; }
   // The class's directory below a store root and its file extension; empty when it has none.
   virtual const char* DirectoryName() const;

@@ -20,15 +20,16 @@ class VESK2_API Hash : public Principal {
   bool IsHash() const override;
   // Import reads "(4:hash", the algorithm's name, the digest and ")". VESK2_ERR_HASH_ID for another
   // name, VESK2_ERR_INVALID_HASH for a digest of another length.
-  int Import(ZvBuffer* buffer) override;
+  [[nodiscard]] int Import(ZvBuffer* buffer) override;
   using Principal::Import;
   // A hash can name a signer but not check a signature: always VESK2_ERR_NOT_IMPLEMENTED.
-  int Verify(ByteString* algorithm, ByteString* signatureValue, Hash* hash,
-             SExpression* signedObject) override;
-  int VerifyMobile(ByteString* algorithm, unsigned char* signature, unsigned int signatureLength,
-                   unsigned char* data, unsigned int dataLength) override;
+  [[nodiscard]] int Verify(ByteString* algorithm, ByteString* signatureValue, Hash* hash,
+                           SExpression* signedObject) override;
+  [[nodiscard]] int VerifyMobile(ByteString* algorithm, unsigned char* signature,
+                                 unsigned int signatureLength, unsigned char* data,
+                                 unsigned int dataLength) override;
   // Always 0, `revoked` untouched.
-  int IsRevoked(bool& revoked) override;
+  [[nodiscard]] int IsRevoked(bool& revoked) override;
 
   // Init starts a computation on an empty object. VESK2_ERR_HASH_ID for an unknown algorithm,
   // VESK2_ERR_INVALID_PARAM for an object in use, the crypto layer's codes.

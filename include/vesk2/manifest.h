@@ -104,7 +104,7 @@ class VESK2_API Manifest {
   //   VESK2_ERR_READ_FILE  it could not be read to its end, or changed meanwhile
   //   VESK2_ERR_FIND_DIR   the directory is missing, or its entries could not be read
   // 0 when it was compared, and for any other entry.
-  int GetReason(const FileItem* entry) const;
+  [[nodiscard]] int GetReason(const FileItem* entry) const;
   FileItem* GetIgnoredEntries() const { return ignoredEntries.get(); }
   // Null before and after a failed read.
   SExpression* GetVersion() const { return version.get(); }

@@ -26,7 +26,7 @@ class VESK2_API BodyObject {
   BodyObject& operator=(const BodyObject&) = delete;
 
   // Cmp orders two BodyObject* (given by address) by name, bytewise; one without a name comes last.
-  static int Cmp(const void* a, const void* b);
+  [[nodiscard]] static int Cmp(const void* a, const void* b);
 
   const char* GetName() const { return name.get(); }
   uint32_t GetStatus() const { return status; }

@@ -26,8 +26,8 @@ class VESK2_API ZvBuffer {
   [[nodiscard]] bool LooksAt(const char* text) const;
 
   // Peek returns the next byte (0 to 255) without consuming it, Next consumes it. -1 at the end.
-  int Peek() const;
-  int Next();
+  [[nodiscard]] int Peek() const;
+  [[nodiscard]] int Next();
 
   // Read copies up to `length` bytes to `out` and returns how many there were.
   size_t Read(void* out, size_t length);
@@ -138,33 +138,36 @@ extern "C" {
 // zvclm_RSAKeyStructInit clears a record and sets its marks; `id` is ZVCLM_DATA_RSA. The zeroize
 // form frees and clears the record's numbers. zvclm_DSSKeyStructInit likewise, `id` ZVCLM_DATA_DSA
 // and `parameterSize` 48. Return 0, ZVCLM_ERR_NULL_PARAM or ZVCLM_ERR_KEY_TYPE.
-VESK2_API int zvclm_RSAKeyStructInit(int id, ZVCLMRSAKeyData* record);
-VESK2_API int zvclm_RSAKeyStructZeroize(int id, ZVCLMRSAKeyData* record);
-VESK2_API int zvclm_DSSKeyStructInit(int id, ZVCLMDSSKeyData* record, uint32_t parameterSize);
-VESK2_API int zvclm_DSSKeyStructZeroize(int id, ZVCLMDSSKeyData* record);
+[[nodiscard]] VESK2_API int zvclm_RSAKeyStructInit(int id, ZVCLMRSAKeyData* record);
+[[nodiscard]] VESK2_API int zvclm_RSAKeyStructZeroize(int id, ZVCLMRSAKeyData* record);
+[[nodiscard]] VESK2_API int zvclm_DSSKeyStructInit(int id, ZVCLMDSSKeyData* record,
+                                                   uint32_t parameterSize);
+[[nodiscard]] VESK2_API int zvclm_DSSKeyStructZeroize(int id, ZVCLMDSSKeyData* record);
 
 // zvclm_BigIntFromBuffer makes *number from `length` bytes, unsigned and big-endian; leading zeros
 // are ignored, no bytes are the number 0. *number must be null. The record's zeroize form frees it.
 // Returns 0, ZVCLM_ERR_NULL_PARAM or ZVCLM_ERR_NO_MEM.
-VESK2_API int zvclm_BigIntFromBuffer(ZVCLMBigInt** number, const unsigned char* data,
-                                     uint32_t length);
+[[nodiscard]] VESK2_API int zvclm_BigIntFromBuffer(ZVCLMBigInt** number, const unsigned char* data,
+                                                   uint32_t length);
 // zvclm_BigIntGetBufferSize returns the bytes that zvclm_BigIntToBuffer writes: 1 for 0; -1 for
 // null.
-VESK2_API int zvclm_BigIntGetBufferSize(const ZVCLMBigInt* number);
+[[nodiscard]] VESK2_API int zvclm_BigIntGetBufferSize(const ZVCLMBigInt* number);
 // zvclm_BigIntToBuffer writes the number, big-endian without leading zeros (0 as one 0 byte), into
 // *size bytes at `out` and sets *size to the bytes written. Returns 0, ZVCLM_ERR_NULL_PARAM or
 // ZVCLM_ERR_BUFFER_TOO_SMALL.
-VESK2_API int zvclm_BigIntToBuffer(const ZVCLMBigInt* number, unsigned char* out, uint32_t* size);
+[[nodiscard]] VESK2_API int zvclm_BigIntToBuffer(const ZVCLMBigInt* number, unsigned char* out,
+                                                 uint32_t* size);
 
 // zvclm_PublicKeyDefine makes *key, of `type` ZVCLM_KEY_*, from a record of `id` ZVCLM_DATA_*. The
 // numbers are copied and not judged. `parameters` is 0, `handle` a context's cryptoHandle or 0.
 // Returns 0, ZVCLM_ERR_NULL_PARAM, ZVCLM_ERR_KEY_TYPE or ZVCLM_ERR_NO_MEM.
-VESK2_API int zvclm_PublicKeyDefine(ZVCLMPublicKeyData** key, int type, int id, const void* record,
-                                    uint32_t parameters, uint32_t handle);
+[[nodiscard]] VESK2_API int zvclm_PublicKeyDefine(ZVCLMPublicKeyData** key, int type, int id,
+                                                  const void* record, uint32_t parameters,
+                                                  uint32_t handle);
 // zvclm_PublicKeyGetData fills an initialised record with copies of the key's numbers, which the
 // record's zeroize form frees. Returns as zvclm_PublicKeyDefine does.
-VESK2_API int zvclm_PublicKeyGetData(const ZVCLMPublicKeyData* key, int id, void* record,
-                                     uint32_t handle);
+[[nodiscard]] VESK2_API int zvclm_PublicKeyGetData(const ZVCLMPublicKeyData* key, int id,
+                                                   void* record, uint32_t handle);
 // zvclm_PublicKeyFree frees a key; null is allowed. A key given to SetRSA or SetDSA is no longer
 // the caller's to free.
 VESK2_API void zvclm_PublicKeyFree(ZVCLMPublicKeyData* key, uint32_t handle);

@@ -21,7 +21,7 @@ class VESK2_API PointerArray {
 
   // push appends and takes ownership. 1, or 0 without memory (the element is then still the
   // caller's).
-  int push(T* element);
+  [[nodiscard]] int push(T* element);
   // get(0): the element at the cursor. Negative: that element, then the cursor moves on. Positive:
   // the cursor moves on, then its element. Null at and past the end.
   T* get(int mode);

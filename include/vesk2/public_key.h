@@ -26,7 +26,7 @@ class VESK2_API PublicKey : public Principal {
   // Import reads the canonical form, from a buffer or from the file `name` (".pub" appended unless
   // it is there). VESK2_ERR_INVALID_PARAM, VESK2_ERR_FILE_OPEN, VESK2_ERR_PARSE_FILE,
   // VESK2_ERR_MEM_ALLOC. After a failure the object is partly built: free it.
-  int Import(ZvBuffer* buffer) override;
+  [[nodiscard]] int Import(ZvBuffer* buffer) override;
   [[nodiscard]] int Import(const char* name);
   using Principal::Import;
   // The two halves of Import, from "rsa(" or "dsa(" to the algorithm list's last pair.
@@ -43,20 +43,21 @@ class VESK2_API PublicKey : public Principal {
   // Verify: see Principal. Algorithm names: "rsa-pss" and "rsa-1.5" for RSA, with sha1 or sha256;
   // "dsa-sha1" for DSA, always over SHA-1. A name that is a prefix of a known one matches it, PSS
   // first.
-  int Verify(ByteString* algorithm, ByteString* signatureValue, Hash* hash,
-             SExpression* signedObject) override;
+  [[nodiscard]] int Verify(ByteString* algorithm, ByteString* signatureValue, Hash* hash,
+                           SExpression* signedObject) override;
   [[nodiscard]] int VerifyRSA(ByteString* algorithm, ByteString* signatureValue, Hash* hash,
                               SExpression* signedObject);
   [[nodiscard]] int VerifyDSA(ByteString* algorithm, ByteString* signatureValue, Hash* hash,
                               SExpression* signedObject);
   // VerifyMobile works with DSA keys only; others give VESK2_ERR_NOT_IMPLEMENTED.
-  int VerifyMobile(ByteString* algorithm, unsigned char* signature, unsigned int signatureLength,
-                   unsigned char* data, unsigned int dataLength) override;
+  [[nodiscard]] int VerifyMobile(ByteString* algorithm, unsigned char* signature,
+                                 unsigned int signatureLength, unsigned char* data,
+                                 unsigned int dataLength) override;
   [[nodiscard]] int VerifyMobileDSA(ByteString* algorithm, unsigned char* signature,
                                     unsigned int signatureLength, unsigned char* data,
                                     unsigned int dataLength);
   // Always 0, `revoked` untouched.
-  int IsRevoked(bool& revoked) override;
+  [[nodiscard]] int IsRevoked(bool& revoked) override;
 
   // SshExport makes the binary SSH key blob, X509Export the DER SubjectPublicKeyInfo, as a new
   // array (free with Vesk2Free; the caller's also when the export itself fails).

@@ -65,7 +65,7 @@ class VESK2_API Name : public Subject {
 
  public:
   // Always VESK2_ERR_NOT_IMPLEMENTED: names are never read from text.
-  int Import(ZvBuffer* buffer) override;
+  [[nodiscard]] int Import(ZvBuffer* buffer) override;
   using Subject::Import;
   // Set names an empty object. Errors are ByteString::Set's and Insert's.
   [[nodiscard]] int Set(const char* text);
@@ -89,7 +89,7 @@ class VESK2_API ThresholdSubject : public Subject {
  public:
   // Import reads exactly n members, which must be public keys. k and n come out as Set writes them,
   // whatever hint their text had: a signature over counts without the hint "[num]" does not verify.
-  int Import(ZvBuffer* buffer) override;
+  [[nodiscard]] int Import(ZvBuffer* buffer) override;
   bool IsThresholdSubject() const override;
   using Subject::Import;
 

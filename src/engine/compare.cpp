@@ -15,7 +15,7 @@ bool SameHint(const spki_atom* a, const spki_atom* b) {
          (a->hint_length == 0 || std::memcmp(a->hint, b->hint, a->hint_length) == 0);
 }
 
-int OrderOf(int difference) {
+[[nodiscard]] int OrderOf(int difference) {
   if (difference == 0) return SPKI_ORDER_EQUAL;
   return difference < 0 ? SPKI_ORDER_LESS : SPKI_ORDER_GREATER;
 }

@@ -195,11 +195,11 @@ enum spki_order : int {
   SPKI_ORDER_NONE = 3
 };
 
-int spki_cmp_cstr(const unsigned char* data, size_t length, const char* text);
-int spki_cmp_bytes(const unsigned char* a, size_t a_length, const unsigned char* b,
-                   size_t b_length);
-int spki_cmp_padded(const unsigned char* a, size_t a_length, const unsigned char* b,
-                    size_t b_length, unsigned char pad);
+[[nodiscard]] int spki_cmp_cstr(const unsigned char* data, size_t length, const char* text);
+[[nodiscard]] int spki_cmp_bytes(const unsigned char* a, size_t a_length, const unsigned char* b,
+                                 size_t b_length);
+[[nodiscard]] int spki_cmp_padded(const unsigned char* a, size_t a_length, const unsigned char* b,
+                                  size_t b_length, unsigned char pad);
 // Same hint and equal by spki_cmp_bytes. Null equals null only.
 bool spki_atom_equal(spki_engine* engine, const spki_atom* a, const spki_atom* b);
 // Whether the first comes behind the second by spki_cmp_bytes.

@@ -23,10 +23,14 @@ size_t Remaining(const spki_input* input) {
 }
 
 // The next byte, not consumed; -1 at the end.
-int Peek(const spki_input* input) { return input->position == input->end ? -1 : *input->position; }
+[[nodiscard]] int Peek(const spki_input* input) {
+  return input->position == input->end ? -1 : *input->position;
+}
 
 // The next byte, consumed; -1 at the end.
-int Next(spki_input* input) { return input->position == input->end ? -1 : *input->position++; }
+[[nodiscard]] int Next(spki_input* input) {
+  return input->position == input->end ? -1 : *input->position++;
+}
 
 // At a "[".
 spki_status ParseHint(spki_atom* atom, spki_input* input) {

@@ -70,7 +70,8 @@ void spki_range_add_prefix(spki_engine* engine, spki_range_bounds* bounds, const
 spki_relation spki_range_relation(spki_engine* engine, const spki_range_bounds* bounds);
 spki_elem* spki_range_build(spki_engine* engine, spki_range_bounds* bounds);
 
-int spki_cmp_ordered(spki_engine* engine, const spki_atom* a, const spki_atom* b, int32_t ordering);
+[[nodiscard]] int spki_cmp_ordered(spki_engine* engine, const spki_atom* a, const spki_atom* b,
+                                   int32_t ordering);
 bool spki_valid_date(const spki_atom* value);
 bool spki_valid_time(const spki_atom* value);
 bool spki_valid_numeric(const spki_atom* value);

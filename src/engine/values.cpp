@@ -31,7 +31,7 @@ bool Matches(const spki_atom* value, std::string_view shape) {
                     [](char c, char s) { return s == '#' ? IsDigit(c) : c == s; });
 }
 
-int MonthLength(int year, int month) {
+[[nodiscard]] int MonthLength(int year, int month) {
   switch (month) {
     case 1:
     case 5:
@@ -67,13 +67,13 @@ Number ReadNumber(const spki_atom* value) {
   return {negative, text};
 }
 
-int ComparePadded(std::string_view a, std::string_view b, unsigned char pad) {
+[[nodiscard]] int ComparePadded(std::string_view a, std::string_view b, unsigned char pad) {
   return spki_cmp_padded(reinterpret_cast<const unsigned char*>(a.data()), a.size(),
                          reinterpret_cast<const unsigned char*>(b.data()), b.size(), pad);
 }
 
 // By the signs first, so that minus zero is less than zero.
-int CompareNumbers(const spki_atom* a, const spki_atom* b) {
+[[nodiscard]] int CompareNumbers(const spki_atom* a, const spki_atom* b) {
   const Number left = ReadNumber(a);
   const Number right = ReadNumber(b);
   if (left.negative != right.negative) return left.negative ? SPKI_ORDER_LESS : SPKI_ORDER_GREATER;
@@ -99,7 +99,8 @@ bool spki_valid_numeric(const spki_atom* value) {
 bool spki_valid_time(const spki_atom* value) {
   if (!Matches(value, kTimeTemplate)) return false;
   int field[3] = {};
-  ZVsysutil::zv_scan_numbers(value->data, value->length, field, 3);
+  // There are three: it matches.
+  static_cast<void>(ZVsysutil::zv_scan_numbers(value->data, value->length, field, 3));
   return field[0] < 24 && field[1] <= 59 && field[2] <= 59;
 }
 

@@ -11,7 +11,7 @@ namespace {
 
 // Which of the two next entries comes first: negative a, positive b, 0 both. An exhausted side
 // comes last.
-int Order(BodyObject* a, BodyObject* b) {
+[[nodiscard]] int Order(BodyObject* a, BodyObject* b) {
   if (a == nullptr) return 1;
   if (b == nullptr) return -1;
   return BodyObject::Cmp(&a, &b);
@@ -24,16 +24,16 @@ class BodyComparison {
   explicit BodyComparison(Findings& findings) : findings_(findings) {}
 
   // Compares a directory of the reference with one of the other body; returns trouble only.
-  int Directories(BodyDirectory& a, BodyDirectory& b, StatusSet& statuses) {
+  [[nodiscard]] int Directories(BodyDirectory& a, BodyDirectory& b, StatusSet& statuses) {
     VESK2_TRY(Files(a, b, statuses));
     return Subdirectories(a, b, statuses);
   }
 
  private:
-  int Files(BodyDirectory& a, BodyDirectory& b, StatusSet& statuses);
-  int Subdirectories(BodyDirectory& a, BodyDirectory& b, StatusSet& statuses);
-  int Pair(BodyDirectory& a, BodyDirectory& b, StatusSet& statuses);
-  int Subtree(BodyDirectory& directory, uint32_t status, StatusSet& statuses);
+  [[nodiscard]] int Files(BodyDirectory& a, BodyDirectory& b, StatusSet& statuses);
+  [[nodiscard]] int Subdirectories(BodyDirectory& a, BodyDirectory& b, StatusSet& statuses);
+  [[nodiscard]] int Pair(BodyDirectory& a, BodyDirectory& b, StatusSet& statuses);
+  [[nodiscard]] int Subtree(BodyDirectory& directory, uint32_t status, StatusSet& statuses);
 
   Findings& findings_;
 };

@@ -50,7 +50,7 @@ class DiskCheck {
 
   // Checks one directory, the root at depth 0, and collects the statuses found in it. Trouble is
   // returned; what was found is no trouble.
-  int Directory(BodyDirectory& directory, unsigned depth, StatusSet& statuses) {
+  [[nodiscard]] int Directory(BodyDirectory& directory, unsigned depth, StatusSet& statuses) {
     VESK2_TRY(Files(directory, statuses));
     VESK2_TRY(Subdirectories(directory, depth, statuses));
     // The root may hold more than the manifest lists (the manifest itself, for one): callers rely
@@ -60,11 +60,11 @@ class DiskCheck {
   }
 
  private:
-  int Files(BodyDirectory& directory, StatusSet& statuses);
-  int Subdirectories(BodyDirectory& directory, unsigned depth, StatusSet& statuses);
-  int Unlisted(BodyDirectory& directory, StatusSet& statuses);
-  int ReadEntries(ZvDir& disk, PointerArray<BodyObject>& entries);
-  int StatusOf(uint32_t& status, int& reason, const BodyFile& file, const char* path);
+  [[nodiscard]] int Files(BodyDirectory& directory, StatusSet& statuses);
+  [[nodiscard]] int Subdirectories(BodyDirectory& directory, unsigned depth, StatusSet& statuses);
+  [[nodiscard]] int Unlisted(BodyDirectory& directory, StatusSet& statuses);
+  [[nodiscard]] int ReadEntries(ZvDir& disk, PointerArray<BodyObject>& entries);
+  [[nodiscard]] int StatusOf(uint32_t& status, int& reason, const BodyFile& file, const char* path);
 
   Vesk2ContextStruct* context_;
   Findings& findings_;

@@ -55,7 +55,7 @@ FileItemList& Manifest::ListOf(uint32_t status) {
 namespace {
 
 // Makes a chain of items in the order of the findings.
-int MakeItems(Findings& findings, FileItemList& made) {
+[[nodiscard]] int MakeItems(Findings& findings, FileItemList& made) {
   FileItem** tail = nullptr;
   for (uint32_t i = 0; i < findings.Count(); ++i) {
     Finding& record = findings.At(i);
@@ -74,7 +74,7 @@ int MakeItems(Findings& findings, FileItemList& made) {
   return 0;
 }
 
-int CompareEntries(const void* a, const void* b) {
+[[nodiscard]] int CompareEntries(const void* a, const void* b) {
   const FileItem* const left = static_cast<const Manifest::Reason*>(a)->entry;
   const FileItem* const right = static_cast<const Manifest::Reason*>(b)->entry;
   if (left == right) return 0;
@@ -82,8 +82,8 @@ int CompareEntries(const void* a, const void* b) {
 }
 
 // Adds the reasons of the findings to the `count` there are; `item` is the first of their chain.
-int AddReasons(std::unique_ptr<Manifest::Reason[]>& reasons, uint32_t& count, Findings& findings,
-               const FileItem* item) {
+[[nodiscard]] int AddReasons(std::unique_ptr<Manifest::Reason[]>& reasons, uint32_t& count,
+                             Findings& findings, const FileItem* item) {
   uint32_t size = count;
   for (uint32_t i = 0; i < findings.Count(); ++i) size += findings.At(i).reason != 0 ? 1 : 0;
   std::unique_ptr<Manifest::Reason[]> made(TryNewArray<Manifest::Reason>(size));

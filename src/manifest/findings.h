@@ -16,7 +16,7 @@ class StatusSet {
   void Add(uint32_t status) { statuses_ |= status; }
   // The worst finding decides: VESK2_ERR_HASH_MISMATCH over VESK2_ERR_FILE_NOT_FOUND over
   // VESK2_ERR_EXTRA_FILES over 0.
-  int Code() const;
+  [[nodiscard]] int Code() const;
 
  private:
   uint32_t statuses_ = 0;

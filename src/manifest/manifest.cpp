@@ -19,12 +19,12 @@ using ZVsysutil::zv_fstrdup;
 using ZVsysutil::zv_join_path;
 using ZVsysutil::zv_strdup;
 
-int ComparePaths(const void* a, const void* b) {
+[[nodiscard]] int ComparePaths(const void* a, const void* b) {
   return zv_filenamecmp(*static_cast<const char* const*>(a), *static_cast<const char* const*>(b));
 }
 
 // Copies the names of a record, to the front of `list`.
-int PushCopy(const FileItem& item, FileItemList& list) {
+[[nodiscard]] int PushCopy(const FileItem& item, FileItemList& list) {
   std::unique_ptr<char[]> name(zv_fstrdup(item.name));
   std::unique_ptr<char[]> nameA(zv_strdup(item.nameA));
   VESK2_REQUIRE((name || item.name == nullptr) && (nameA || item.nameA == nullptr),
@@ -38,8 +38,8 @@ int PushCopy(const FileItem& item, FileItemList& list) {
   return 0;
 }
 
-int ReadBody(Manifest& manifest, bool verifyChain, long notBefore, long notAfter,
-             BufferOwner& body) {
+[[nodiscard]] int ReadBody(Manifest& manifest, bool verifyChain, long notBefore, long notAfter,
+                           BufferOwner& body) {
   ZvBuffer* read = nullptr;
   const int code = manifest.ReadManifest(verifyChain, notBefore, notAfter, &read);
   body.reset(read);

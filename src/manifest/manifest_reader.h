@@ -25,29 +25,29 @@ class ManifestReader {
         notAfter_(notAfter) {}
 
   // See Manifest::ReadManifest.
-  int Read(ZvBuffer** body);
+  [[nodiscard]] int Read(ZvBuffer** body);
 
  private:
-  int ReadFile(ZvBuffer** body);
+  [[nodiscard]] int ReadFile(ZvBuffer** body);
   // Refuse returns `code`, which ends the reading, or keeps it as the answer and returns 0.
-  int Refuse(int code);
-  int ReadHead();
-  int ReadVersion();
-  int ReadType();
-  int ReadSigningTime();
-  int ReadSignatureBlock();
-  int ReadSigner();
-  int ReadSignature(Cert& cert);
-  int ReadRevocationLists(SExpression* lists);
-  int SetPeriod();
-  int MakeTime(Ref<TimeStamp>& stamp, long seconds);
-  int LoadEntries();
-  int LoadLists(SExpression* carried);
-  int ProveAuthority();
-  int AskAuthority(SExpression* carried);
-  int ProveBody(ZvBuffer** body);
-  int InspectBody(const unsigned char* bytes, size_t length, int contentCode);
-  int CheckDigest(const unsigned char* body, unsigned int length);
+  [[nodiscard]] int Refuse(int code);
+  [[nodiscard]] int ReadHead();
+  [[nodiscard]] int ReadVersion();
+  [[nodiscard]] int ReadType();
+  [[nodiscard]] int ReadSigningTime();
+  [[nodiscard]] int ReadSignatureBlock();
+  [[nodiscard]] int ReadSigner();
+  [[nodiscard]] int ReadSignature(Cert& cert);
+  [[nodiscard]] int ReadRevocationLists(SExpression* lists);
+  [[nodiscard]] int SetPeriod();
+  [[nodiscard]] int MakeTime(Ref<TimeStamp>& stamp, long seconds);
+  [[nodiscard]] int LoadEntries();
+  [[nodiscard]] int LoadLists(SExpression* carried);
+  [[nodiscard]] int ProveAuthority();
+  [[nodiscard]] int AskAuthority(SExpression* carried);
+  [[nodiscard]] int ProveBody(ZvBuffer** body);
+  [[nodiscard]] int InspectBody(const unsigned char* bytes, size_t length, int contentCode);
+  [[nodiscard]] int CheckDigest(const unsigned char* body, unsigned int length);
 
   Vesk2ContextStruct* Context() const { return manifest_.context; }
 

@@ -66,7 +66,7 @@ constexpr size_t kEntryRoom = 96;
 struct ManifestWriter::Parts {
   explicit Parts(Vesk2ContextStruct* ctx) : context(ctx) {}
 
-  int Entry(std::string_view opening, const char* name) {
+  [[nodiscard]] int Entry(std::string_view opening, const char* name) {
     VESK2_REQUIRE(open > 0 && name != nullptr && IsBareName(name), VESK2_ERR_INVALID_PARAM);
     VESK2_REQUIRE(std::strlen(name) <= Limits::kMaxBodyPath, VESK2_ERR_MAX_BYTE_STRING);
     VESK2_TRY(body.Reserve(std::strlen(name) + kEntryRoom));
@@ -191,12 +191,12 @@ int ManifestWriter::AddList(CrlSequence* list) {
 
 namespace {
 
-int Print(FILE* stream, std::string_view text) {
+[[nodiscard]] int Print(FILE* stream, std::string_view text) {
   const bool written = ZVsysutil::zv_write(stream, text.data(), text.size()) == text.size();
   return written ? 0 : VESK2_ERR_WRITE_FILE;
 }
 
-int PrintElements(FILE* stream, const SExpression* list) {
+[[nodiscard]] int PrintElements(FILE* stream, const SExpression* list) {
   if (list == nullptr) return 0;
   for (auto it = list->Begin(); it; it.Next()) VESK2_TRY(it.Value()->PrintCanonical(stream));
   return 0;

@@ -23,19 +23,19 @@ constexpr size_t kBufferSize = 1024;
 
 // What a loop that nobody watches tells: the calls of it cost nothing.
 struct Unwatched {
-  int Read(size_t) { return 0; }
-  int End() { return 0; }
+  [[nodiscard]] int Read(size_t) { return 0; }
+  [[nodiscard]] int End() { return 0; }
 };
 
 // Tells the callbacks about every kTold bytes.
 class Watched {
  public:
   explicit Watched(const Vesk2FileCallbacks& callbacks) : callbacks_(callbacks) {}
-  int Read(size_t count) {
+  [[nodiscard]] int Read(size_t count) {
     untold_ += count;
     return untold_ >= kTold ? End() : 0;
   }
-  int End() {
+  [[nodiscard]] int End() {
     const size_t count = std::exchange(untold_, 0);
     if (count == 0 || callbacks_.fileBytes == nullptr) return 0;
     return callbacks_.fileBytes(callbacks_.user, count) == 0 ? 0 : VESK2_ERR_USER_INTERRUPT;
@@ -49,7 +49,7 @@ class Watched {
 };
 
 template <typename Watch>
-int FeedFile(ZVCLMHashContextData* hash, ZvFile* file, uint32_t handle, Watch watch) {
+[[nodiscard]] int FeedFile(ZVCLMHashContextData* hash, ZvFile* file, uint32_t handle, Watch watch) {
   const std::unique_ptr<unsigned char[]> buffer(TryNewArray<unsigned char>(kBufferSize));
   VESK2_REQUIRE(buffer, VESK2_ERR_MEM_ALLOC);
   unsigned char* const bytes = buffer.get();
@@ -62,8 +62,8 @@ int FeedFile(ZVCLMHashContextData* hash, ZvFile* file, uint32_t handle, Watch wa
   return watch.End();
 }
 
-int DigestOpened(ZvFile* file, unsigned char* digest, uint32_t handle,
-                 const Vesk2FileCallbacks* callbacks) {
+[[nodiscard]] int DigestOpened(ZvFile* file, unsigned char* digest, uint32_t handle,
+                               const Vesk2FileCallbacks* callbacks) {
   ZVCLMHashContextData* started = nullptr;
   VESK2_TRY(zvclm_HashAlloc(&started, ZVCLM_HASH_SHA256, handle));
   const HashOwner hash(started, HashFree{handle});

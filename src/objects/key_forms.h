@@ -24,8 +24,10 @@ struct RsaForm {
   static constexpr std::array<KeyNumber<Record>, 2> kNumbers{
       {{"e", &Record::e}, {"n", &Record::n}}};
   static constexpr ZVCLMBigInt* Record::*kLength = &Record::n;
-  static int Init(Record* record) { return zvclm_RSAKeyStructInit(kDataId, record); }
-  static void Wipe(Record* record) { zvclm_RSAKeyStructZeroize(kDataId, record); }
+  [[nodiscard]] static int Init(Record* record) { return zvclm_RSAKeyStructInit(kDataId, record); }
+  static void Wipe(Record* record) {
+    static_cast<void>(zvclm_RSAKeyStructZeroize(kDataId, record));
+  }
 };
 
 struct DsaForm {
@@ -38,10 +40,12 @@ struct DsaForm {
       {{"p", &Record::p}, {"g", &Record::g}, {"q", &Record::q}, {"y", &Record::y}}};
   static constexpr ZVCLMBigInt* Record::*kLength = &Record::p;
   static constexpr uint32_t kParameterSize = 48;
-  static int Init(Record* record) {
+  [[nodiscard]] static int Init(Record* record) {
     return zvclm_DSSKeyStructInit(kDataId, record, kParameterSize);
   }
-  static void Wipe(Record* record) { zvclm_DSSKeyStructZeroize(kDataId, record); }
+  static void Wipe(Record* record) {
+    static_cast<void>(zvclm_DSSKeyStructZeroize(kDataId, record));
+  }
 };
 
 // A record whose numbers are wiped when it goes.

@@ -13,7 +13,8 @@ namespace ZvVesk2 {
 namespace {
 
 // A number of the crypto layer as a byte string, without leading zeros.
-int NumberText(Ref<ByteString>& out, const ZVCLMBigInt* number, Vesk2ContextStruct* context) {
+[[nodiscard]] int NumberText(Ref<ByteString>& out, const ZVCLMBigInt* number,
+                             Vesk2ContextStruct* context) {
   const int size = zvclm_BigIntGetBufferSize(number);
   VESK2_REQUIRE(size >= 0, VESK2_ERR_BIG_INT_BUFFER_SIZE);
   auto length = static_cast<uint32_t>(size);

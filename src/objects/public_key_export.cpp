@@ -9,8 +9,8 @@
 namespace ZvVesk2 {
 namespace {
 
-int ExportKey(const ZVCLMPublicKeyData* key, int format, unsigned char*& out, unsigned int& length,
-              uint32_t handle) {
+[[nodiscard]] int ExportKey(const ZVCLMPublicKeyData* key, int format, unsigned char*& out,
+                            unsigned int& length, uint32_t handle) {
   // Asking for the size is answered with "too small".
   const int asked = zvclm_PublicKeyExport(key, format, 0, nullptr, &length, handle);
   VESK2_REQUIRE(asked == 0 || asked == ZVCLM_ERR_BUFFER_TOO_SMALL, asked);

@@ -34,7 +34,8 @@ struct Digest {
 
 // The digest of `object`, which must be the one that `hash` states. Hints count: the signer's hash
 // was made with them, and without them anyone could re-hint what is signed.
-int MatchingDigest(Digest& digest, ZvclmHashID id, const Hash* hash, SExpression* object) {
+[[nodiscard]] int MatchingDigest(Digest& digest, ZvclmHashID id, const Hash* hash,
+                                 SExpression* object) {
   unsigned char* computed = nullptr;
   VESK2_TRY(object->ComputeHash(computed, digest.length, id, false));
   digest.bytes.reset(computed);
@@ -52,8 +53,8 @@ struct Check {
   const void* parameters;
   uint32_t handle;
 
-  int Run(const unsigned char* digest, unsigned int digestLength, const unsigned char* signature,
-          unsigned int signatureLength) const {
+  [[nodiscard]] int Run(const unsigned char* digest, unsigned int digestLength,
+                        const unsigned char* signature, unsigned int signatureLength) const {
     int valid = 0;
     VESK2_TRY(zvclm_PublicKeyVerifySignature(key, scheme, parameters, digest, digestLength,
                                              signature, signatureLength, &valid, handle));

@@ -10,7 +10,7 @@ namespace ZvVesk2 {
 namespace {
 
 template <typename T, typename Base>
-int ImportAs(Base*& out, ZvBuffer* buffer, Vesk2ContextStruct* context) {
+[[nodiscard]] int ImportAs(Base*& out, ZvBuffer* buffer, Vesk2ContextStruct* context) {
   Ref<T> made;
   VESK2_TRY(ImportNew(made, buffer, context));
   out = made.Release();
@@ -19,7 +19,7 @@ int ImportAs(Base*& out, ZvBuffer* buffer, Vesk2ContextStruct* context) {
 
 // "(1" begins "(10:public-key", "(4" begins "(4:hash".
 template <typename Base>
-int ImportPrincipal(Base*& out, ZvBuffer* buffer, Vesk2ContextStruct* context) {
+[[nodiscard]] int ImportPrincipal(Base*& out, ZvBuffer* buffer, Vesk2ContextStruct* context) {
   if (buffer->LooksAt("(1")) return ImportAs<PublicKey>(out, buffer, context);
   if (buffer->LooksAt("(4")) return ImportAs<Hash>(out, buffer, context);
   return VESK2_ERR_PRINCIPAL;

@@ -16,7 +16,7 @@ SExpression::Iterator Members(const SExpression& list) {
 }
 
 // One count: a raw byte, the first of its text.
-int ReadCount(unsigned int& count, ZvBuffer* buffer, ByteString* text) {
+[[nodiscard]] int ReadCount(unsigned int& count, ZvBuffer* buffer, ByteString* text) {
   VESK2_TRY(text->Import(buffer));
   VESK2_REQUIRE(text->GetLength() > 0, VESK2_ERR_PARSE_FILE);
   count = text->GetData()[0];

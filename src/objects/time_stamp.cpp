@@ -37,7 +37,7 @@ constexpr std::array<Field, 5> kFields{{
 
 // The value of `count` characters, taken as digits without a test.
 template <typename Char>
-int Digits(const Char* text, size_t count) {
+[[nodiscard]] int Digits(const Char* text, size_t count) {
   int value = 0;
   for (size_t i = 0; i < count; ++i) value = value * 10 + (text[i] - '0');
   return value;
@@ -49,7 +49,7 @@ long ToSeconds(const std::tm& fields) {
 }
 
 // Reads the fields that `text` has; the others are those of the period's first second.
-int ParseFields(std::tm& fields, const char* text, size_t length) {
+[[nodiscard]] int ParseFields(std::tm& fields, const char* text, size_t length) {
   fields = {};
   fields.tm_mday = 1;
   fields.tm_year = Digits(text, kYearLength) - 1900;
@@ -75,7 +75,7 @@ void NextPeriod(std::tm& fields, size_t length) {
 
 // Both texts by their first 19 bytes. Stamps come from text that nobody checked: bytes that one
 // does not have count as 0.
-int Compare(const TimeStamp& a, const TimeStamp& b) {
+[[nodiscard]] int Compare(const TimeStamp& a, const TimeStamp& b) {
   const auto bytes = [](const TimeStamp& stamp) {
     std::array<unsigned char, kLength> text{};
     const unsigned int count = std::min(stamp.GetLength(), kLength);

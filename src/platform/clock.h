@@ -9,7 +9,7 @@ namespace ZVsysutil {
 // The current time in seconds since the epoch; also stored in *out when it is not null.
 long zv_time(long* out);
 // Splits `seconds` into UTC fields. 0, or -1 for a year outside 0 to 9999 (four digits of text).
-int zv_gmtime(std::tm* out, const long* seconds);
+[[nodiscard]] int zv_gmtime(std::tm* out, const long* seconds);
 // The exact inverse: UTC fields to seconds. Fields out of range carry over (month 12 is January of
 // the next year).
 long zv_mktime(const std::tm* fields);

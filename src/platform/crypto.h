@@ -48,33 +48,38 @@ extern "C" {
 
 // zvclm_HashAlloc starts a hash in *context, which must be null. 0, ZVCLM_ERR_NULL_PARAM,
 // ZVCLM_ERR_UNKNOWN_HASH for an id that is none of ZvclmHashID's, or ZVCLM_ERR_NO_MEM.
-int zvclm_HashAlloc(ZVCLMHashContextData** context, ZvclmHashID id, uint32_t handle);
-int zvclm_HashInfo(ZvclmHashID id, ZVCLMHashInfo* info);
+[[nodiscard]] int zvclm_HashAlloc(ZVCLMHashContextData** context, ZvclmHashID id, uint32_t handle);
+[[nodiscard]] int zvclm_HashInfo(ZvclmHashID id, ZVCLMHashInfo* info);
 // Writes the digest; the context can then only be freed.
-int zvclm_HashFinal(ZVCLMHashContextData* context, unsigned char* digest, uint32_t handle);
+[[nodiscard]] int zvclm_HashFinal(ZVCLMHashContextData* context, unsigned char* digest,
+                                  uint32_t handle);
 void zvclm_HashFree(ZVCLMHashContextData* context, uint32_t handle);
-int zvclm_HashUpdateSlow(ZVCLMHashContextData* context, const unsigned char* data, size_t length);
+[[nodiscard]] int zvclm_HashUpdateSlow(ZVCLMHashContextData* context, const unsigned char* data,
+                                       size_t length);
 
 // zvclm_PublicKeyExport writes the key as DER SubjectPublicKeyInfo (format 0) or as a binary SSH
 // key blob (format 3) into *length bytes at `out`, and sets *length. With a null `out` it only sets
 // *length and returns ZVCLM_ERR_BUFFER_TOO_SMALL. *length is left alone on any other failure.
-int zvclm_PublicKeyExport(const ZVCLMPublicKeyData* key, int format, uint32_t parameters,
-                          unsigned char* out, uint32_t* length, uint32_t handle);
+[[nodiscard]] int zvclm_PublicKeyExport(const ZVCLMPublicKeyData* key, int format,
+                                        uint32_t parameters, unsigned char* out, uint32_t* length,
+                                        uint32_t handle);
 
 // zvclm_PublicKeyVerifySignature checks `signature` over `digest`. *valid is 0 from the start and 1
 // only for a good signature; a malformed one, or a key outside the limits, is 0 with *valid 0.
 // Returns other codes only for null arguments and lack of memory. `parameters` is the record of the
 // scheme. A DSA signature is over a SHA-1 digest: r and s, in two equal halves of q's length.
-int zvclm_PublicKeyVerifySignature(const ZVCLMPublicKeyData* key, int scheme,
-                                   const void* parameters, const unsigned char* digest,
-                                   uint32_t digestLength, const unsigned char* signature,
-                                   uint32_t signatureLength, int* valid, uint32_t handle);
+[[nodiscard]] int zvclm_PublicKeyVerifySignature(const ZVCLMPublicKeyData* key, int scheme,
+                                                 const void* parameters,
+                                                 const unsigned char* digest, uint32_t digestLength,
+                                                 const unsigned char* signature,
+                                                 uint32_t signatureLength, int* valid,
+                                                 uint32_t handle);
 
 }  // extern "C"
 
 // zvclm_HashUpdate feeds `length` bytes. 0, ZVCLM_ERR_NULL_PARAM or ZVCLM_ERR_FAILURE.
-inline int zvclm_HashUpdate(ZVCLMHashContextData* context, const unsigned char* data, size_t length,
-                            uint32_t /*handle*/) {
+[[nodiscard]] inline int zvclm_HashUpdate(ZVCLMHashContextData* context, const unsigned char* data,
+                                          size_t length, uint32_t /*handle*/) {
   if (context != nullptr && data != nullptr &&
       static_cast<size_t>(context->end - context->next) >= length) [[likely]] {
     std::memcpy(context->next, data, length);
@@ -95,7 +100,7 @@ class ZVCLMHashFeed {
   ZVCLMHashFeed(const ZVCLMHashFeed&) = delete;
   ZVCLMHashFeed& operator=(const ZVCLMHashFeed&) = delete;
 
-  int Update(const unsigned char* data, size_t length) {
+  [[nodiscard]] int Update(const unsigned char* data, size_t length) {
     constexpr size_t kWord = 4;
     if (length == kWord && static_cast<size_t>(end_ - next_) >= kWord) [[likely]] {
       std::memcpy(next_, data, kWord);
@@ -115,8 +120,8 @@ class ZVCLMHashFeed {
   unsigned char* end_;
 };
 
-inline int zvclm_HashUpdate(ZVCLMHashFeed& feed, const unsigned char* data, size_t length,
-                            uint32_t /*handle*/) {
+[[nodiscard]] inline int zvclm_HashUpdate(ZVCLMHashFeed& feed, const unsigned char* data,
+                                          size_t length, uint32_t /*handle*/) {
   return feed.Update(data, length);
 }
 

@@ -27,8 +27,8 @@ class Descriptor {
   ~Descriptor() { Reset(-1); }
   Descriptor(const Descriptor&) = delete;
   Descriptor& operator=(const Descriptor&) = delete;
-  int get() const { return fd_; }
-  int release() { return std::exchange(fd_, -1); }
+  [[nodiscard]] int get() const { return fd_; }
+  [[nodiscard]] int release() { return std::exchange(fd_, -1); }
   void Reset(int fd) {
     if (fd_ >= 0) close(fd_);
     fd_ = fd;
@@ -38,18 +38,18 @@ class Descriptor {
   int fd_ = -1;
 };
 
-int OpenError() { return zv_error_code(errno, VESK2_ERR_FILE_OPEN); }
+[[nodiscard]] int OpenError() { return zv_error_code(errno, VESK2_ERR_FILE_OPEN); }
 
 // 0 for a regular file. Opening a device can do something by itself, so what is none is not even
 // opened.
-int RequireRegular(const char* path) {
+[[nodiscard]] int RequireRegular(const char* path) {
   struct stat about {};
   if (path == nullptr) return VESK2_ERR_FILE_OPEN;
   if (stat(path, &about) != 0) return OpenError();
   return S_ISREG(about.st_mode) ? 0 : VESK2_ERR_FILE_OPEN;
 }
 
-int OpenNow(Descriptor& out, const char* path, int flags) {
+[[nodiscard]] int OpenNow(Descriptor& out, const char* path, int flags) {
   do {
     out.Reset(open(path, flags | O_NONBLOCK | O_CLOEXEC | O_NOCTTY, kFileMode));
   } while (out.get() < 0 && errno == EINTR);
@@ -59,7 +59,7 @@ int OpenNow(Descriptor& out, const char* path, int flags) {
 
 // Opens a file, waiting for one that is held. Every attempt is made without blocking, and only
 // after a look that it is still a regular file: a FIFO or a device can take its place meanwhile.
-int OpenOrWait(Descriptor& out, const char* path, int flags) {
+[[nodiscard]] int OpenOrWait(Descriptor& out, const char* path, int flags) {
   int code = OpenNow(out, path, flags);
   if (code != VESK2_ERR_READ_FILE) return code;
   ZvCall call;
@@ -76,14 +76,14 @@ int OpenOrWait(Descriptor& out, const char* path, int flags) {
 
 // O_NONBLOCK keeps the open itself from waiting on a FIFO or a device, or for the holder of a
 // lease. What was opened is judged by its descriptor, so nobody can swap it in between.
-int OpenRegular(Descriptor& out, const char* path, int flags, struct stat* opened) {
+[[nodiscard]] int OpenRegular(Descriptor& out, const char* path, int flags, struct stat* opened) {
   if (path == nullptr) return VESK2_ERR_FILE_OPEN;
   if (const int code = OpenOrWait(out, path, flags)) return code;
   if (fstat(out.get(), opened) != 0) return OpenError();
   return S_ISREG(opened->st_mode) ? 0 : VESK2_ERR_FILE_OPEN;
 }
 
-int OpenForReading(ZvFileOwner& out, const char* path) {
+[[nodiscard]] int OpenForReading(ZvFileOwner& out, const char* path) {
   if (const int code = RequireRegular(path)) return code;
   ZvFileOwner file(new (std::nothrow) ZvFile);
   if (file == nullptr) return VESK2_ERR_MEM_ALLOC;
@@ -103,7 +103,7 @@ bool Share(int fd, mode_t mode) {
   return fchmod(fd, kZvSharedFile) == 0 || (mode & kReadable) == kReadable;
 }
 
-int OpenForWriting(ZvFileOwner& out, const char* path, int mode) {
+[[nodiscard]] int OpenForWriting(ZvFileOwner& out, const char* path, int mode) {
   ZvFileOwner file(new (std::nothrow) ZvFile);
   if (file == nullptr) return VESK2_ERR_MEM_ALLOC;
   Descriptor fd;

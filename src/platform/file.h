@@ -45,12 +45,12 @@ inline constexpr mode_t kZvSharedDirectory = 0755;
 
 // zv_error_code is the code of a system call that failed with `error`: VESK2_ERR_MEM_ALLOC where a
 // resource ran out, else `otherwise`. No other place reads errno.
-int zv_error_code(int error, int otherwise);
+[[nodiscard]] int zv_error_code(int error, int otherwise);
 
 // zv_close closes, flushing first. 0, or VESK2_ERR_WRITE_FILE when written bytes could not be kept.
-int zv_close(ZvFile* file);
+[[nodiscard]] int zv_close(ZvFile* file);
 struct ZvFileCloser {
-  void operator()(ZvFile* file) const { zv_close(file); }
+  void operator()(ZvFile* file) const { static_cast<void>(zv_close(file)); }
 };
 // Owns an open file on the paths where the result of closing does not matter.
 using ZvFileOwner = std::unique_ptr<ZvFile, ZvFileCloser>;
@@ -122,7 +122,7 @@ ZvBuffer* zv_buffer_adopt(unsigned char* data, size_t size);
 [[nodiscard]] int zv_buffer_read_file(ZvBuffer** out, const char* path, bool listed);
 
 // The code of a read error that happened, else 0: VESK2_ERR_READ_FILE, VESK2_ERR_MEM_ALLOC.
-inline int zv_read_error(const ZvFile* file) { return file->failure; }
+[[nodiscard]] inline int zv_read_error(const ZvFile* file) { return file->failure; }
 // Whether a file opened for reading is still the one that was opened: same inode, size and time. 0;
 // VESK2_ERR_READ_FILE; VESK2_ERR_MEM_ALLOC when it cannot be told.
 [[nodiscard]] int zv_check_unchanged(const ZvFile* file);
@@ -134,7 +134,7 @@ size_t zv_write(FILE* stream, const void* data, size_t length);
 [[nodiscard]] int zv_stat(const char* path, struct stat* out);
 // zv_mkdir makes one directory, of mode `mode` whatever the umask. 0 when it is there already, else
 // VESK2_ERR_CREATE_DIR.
-int zv_mkdir(const char* path, mode_t mode);
+[[nodiscard]] int zv_mkdir(const char* path, mode_t mode);
 
 // ZvDir reads the names of a directory that match a pattern ("*" or "*.ext"), sorted bytewise,
 // never "." or "..". The order decides which store file is found first, so it must not depend on
@@ -164,8 +164,8 @@ class ZvDir {
     char* name;
     bool regular;
   };
-  int Load(const char* directory, const char* pattern);
-  int Add(const char* name, bool regular);
+  [[nodiscard]] int Load(const char* directory, const char* pattern);
+  [[nodiscard]] int Add(const char* name, bool regular);
 
   char* directory_ = nullptr;
   Entry* entries_ = nullptr;

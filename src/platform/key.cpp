@@ -47,7 +47,7 @@ Fields FieldsOf(int id, void* record) {
   return {};
 }
 
-int Zeroize(int id, void* record) {
+[[nodiscard]] int Zeroize(int id, void* record) {
   if (record == nullptr) return ZVCLM_ERR_NULL_PARAM;
   const Fields fields = FieldsOf(id, record);
   if (fields.count == 0) return ZVCLM_ERR_KEY_TYPE;

@@ -21,14 +21,14 @@ struct Encoding {
   uint32_t length = 0;
 };
 
-int Allocate(Encoding* out, size_t length) {
+[[nodiscard]] int Allocate(Encoding* out, size_t length) {
   out->bytes.reset(new (std::nothrow) unsigned char[length]);
   out->length = static_cast<uint32_t>(length);
   return out->bytes != nullptr ? 0 : ZVCLM_ERR_NO_MEM;
 }
 
 // Any numbers can be encoded: what fails is a lack of memory, whatever libcrypto calls it.
-int EncodeDer(const ZVCLMPublicKeyData& key, Encoding* out) {
+[[nodiscard]] int EncodeDer(const ZVCLMPublicKeyData& key, Encoding* out) {
   const PkeyOwner pkey = MakePkey(key);
   if (pkey == nullptr) return ZVCLM_ERR_NO_MEM;
   const int length = i2d_PUBKEY(pkey.get(), nullptr);
@@ -50,7 +50,7 @@ unsigned char* WriteLength(unsigned char* at, size_t length) {
   return at;
 }
 
-int EncodeSsh(const ZVCLMPublicKeyData& key, Encoding* out) {
+[[nodiscard]] int EncodeSsh(const ZVCLMPublicKeyData& key, Encoding* out) {
   static constexpr size_t kRsaOrder[] = {kRsaE, kRsaN};
   static constexpr size_t kDsaOrder[] = {kDsaP, kDsaQ, kDsaG, kDsaY};
   const bool rsa = key.type == ZVCLM_KEY_RSA;
@@ -73,7 +73,7 @@ int EncodeSsh(const ZVCLMPublicKeyData& key, Encoding* out) {
   return 0;
 }
 
-int Encode(const ZVCLMPublicKeyData& key, int format, Encoding* out) {
+[[nodiscard]] int Encode(const ZVCLMPublicKeyData& key, int format, Encoding* out) {
   switch (format) {
     case ZVCLM_FORMAT_X509:
       return EncodeDer(key, out);

@@ -34,8 +34,8 @@ class ZvReplacement {
   [[nodiscard]] int Keep(bool replace);
 
  private:
-  int Name();
-  int MakeNamed(mode_t mode);
+  [[nodiscard]] int Name();
+  [[nodiscard]] int MakeNamed(mode_t mode);
   bool HasLock() const;
   bool Publish(bool replace) const;
 

@@ -30,8 +30,8 @@ char* zv_ftoa_copy_n(const void* text, size_t length);
 
 // ---- Names and paths ----
 // Bytewise and case-sensitive: "x.REQ" is not "x.req".
-int zv_filenamecmp(const char* a, const char* b);
-int zv_filenamencmp(const char* a, const char* b, size_t length);
+[[nodiscard]] int zv_filenamecmp(const char* a, const char* b);
+[[nodiscard]] int zv_filenamencmp(const char* a, const char* b, size_t length);
 char* zv_concat_string(const char* a, const char* b);
 // "a/b" with one separator; an empty or null `a` gives `b`, a null `b` gives `a`. Of any length:
 // what opens the path judges that.
@@ -51,7 +51,7 @@ const char* zv_extname(const char* path);
 void zv_binhex(char* out, const unsigned char* data, size_t length);
 // Reads up to `count` numbers of at most 9 digits, split at any single non-digit, from the front of
 // `length` bytes. Returns how many were read.
-int zv_scan_numbers(const unsigned char* text, size_t length, int* values, int count);
+[[nodiscard]] int zv_scan_numbers(const unsigned char* text, size_t length, int* values, int count);
 // Sorts `count` elements of `size` bytes; equal elements keep their order.
 void zv_sort(void* items, size_t count, size_t size, int (*compare)(const void*, const void*));
 

@@ -72,7 +72,7 @@ bool FindVerdict() {
 // The DSA code answers 0 for a bad signature only, and leaves no reason; the RSA code for anything.
 enum class Zero { kIsNo, kNeedsReason };
 
-int Ask(bool* good, EVP_PKEY_CTX* context, Bytes digest, Bytes signature, Zero zero) {
+[[nodiscard]] int Ask(bool* good, EVP_PKEY_CTX* context, Bytes digest, Bytes signature, Zero zero) {
   // A failure that libcrypto found another way around must not pass for the caller's entry.
   ERR_pop_to_mark();
   ERR_set_mark();
@@ -152,7 +152,8 @@ bool IsBlockOf(Bytes block, uint32_t hash, Bytes digest) {
 
 // libcrypto gave no reason for its "no": some malformed blocks leave none. The block is taken out
 // of the signature again, which needs memory only, and looked at. 0 when it cannot be good.
-int ExplainPkcs1No(const ZVCLMPublicKeyData& key, uint32_t hash, Bytes digest, Bytes signature) {
+[[nodiscard]] int ExplainPkcs1No(const ZVCLMPublicKeyData& key, uint32_t hash, Bytes digest,
+                                 Bytes signature) {
   const PkeyContext context = MakeContext(key);
   if (context == nullptr || EVP_PKEY_verify_recover_init(context.get()) != 1 ||
       EVP_PKEY_CTX_set_rsa_padding(context.get(), RSA_NO_PADDING) != 1) {
@@ -180,8 +181,8 @@ bool SetRsaScheme(EVP_PKEY_CTX* context, int scheme, const EVP_MD* hash) {
          EVP_PKEY_CTX_set_rsa_pss_saltlen(context, RSA_PSS_SALTLEN_AUTO) == 1;
 }
 
-int VerifyRsa(bool* good, const ZVCLMPublicKeyData& key, int scheme,
-              const ZVCLMRSAParameters& parameters, Bytes digest, Bytes signature) {
+[[nodiscard]] int VerifyRsa(bool* good, const ZVCLMPublicKeyData& key, int scheme,
+                            const ZVCLMRSAParameters& parameters, Bytes digest, Bytes signature) {
   const uint32_t hashId = parameters.words[3];
   if (!WithinRsaLimits(key) || digest.empty() || digest.size() != HashLength(hashId)) return 0;
   if (!FitsModulus(signature, key.number(kRsaN))) return 0;
@@ -225,7 +226,8 @@ bool ToDer(DerSignature* out, Number r, Number s) {
 
 // The signature is r and s in two equal halves. The digest is always SHA-1's; for one of other
 // lengths (none, say) anybody could make a signature.
-int VerifyDsa(bool* good, const ZVCLMPublicKeyData& key, Bytes digest, Bytes signature) {
+[[nodiscard]] int VerifyDsa(bool* good, const ZVCLMPublicKeyData& key, Bytes digest,
+                            Bytes signature) {
   if (!WithinDsaLimits(key) || digest.size() != HashLength(ZVCLM_HASH_SHA1)) return 0;
   const int half = BN_num_bytes(key.number(kDsaQ));
   if (signature.size() != 2 * static_cast<size_t>(half)) return 0;
@@ -241,8 +243,8 @@ int VerifyDsa(bool* good, const ZVCLMPublicKeyData& key, Bytes digest, Bytes sig
 
 // ---- Either ----
 
-int Verify(bool* good, const ZVCLMPublicKeyData& key, int scheme, const void* parameters,
-           Bytes digest, Bytes signature) {
+[[nodiscard]] int Verify(bool* good, const ZVCLMPublicKeyData& key, int scheme,
+                         const void* parameters, Bytes digest, Bytes signature) {
   if (scheme == ZVCLM_SCHEME_DSA) {
     return key.type == ZVCLM_KEY_DSA ? VerifyDsa(good, key, digest, signature) : 0;
   }

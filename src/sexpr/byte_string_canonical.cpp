@@ -51,13 +51,13 @@ bool Fits(unsigned pos, unsigned wanted, unsigned size) {
   return pos <= size && wanted <= size - pos;
 }
 
-int Feed(ZVCLMHashContextData* hash, std::string_view text, uint32_t handle) {
+[[nodiscard]] int Feed(ZVCLMHashContextData* hash, std::string_view text, uint32_t handle) {
   return zvclm_HashUpdate(hash, reinterpret_cast<const unsigned char*>(text.data()), text.size(),
                           handle);
 }
 
 // Reads "[text]". A hint that is not closed, not known or too long is no hint.
-int ReadHint(ZvBuffer* buffer, ByteString::BsType& type) {
+[[nodiscard]] int ReadHint(ZvBuffer* buffer, ByteString::BsType& type) {
   VESK2_TRY(buffer->Expect("["));
   char text[Limits::kMaxHint + 2] = "[";
   size_t size = 1;
@@ -75,7 +75,7 @@ int ReadHint(ZvBuffer* buffer, ByteString::BsType& type) {
 }
 
 // Reads "<digits>:". Leading zeros are accepted, and so are no digits at all, for 0.
-int ReadLength(ZvBuffer* buffer, unsigned& length) {
+[[nodiscard]] int ReadLength(ZvBuffer* buffer, unsigned& length) {
   length = 0;
   unsigned digits = 0;
   while (IsDigit(buffer->Peek())) {

@@ -22,12 +22,12 @@ namespace {
 
 using Step = Walk::Step;
 
-int ReadList(Ref<DExpression>& out, const char* text, unsigned& pos, Vesk2ContextStruct* context,
-             unsigned level);
+[[nodiscard]] int ReadList(Ref<DExpression>& out, const char* text, unsigned& pos,
+                           Vesk2ContextStruct* context, unsigned level);
 
 // Reads a token, or a list of nesting `level`, and appends it.
-int ReadElement(SExpression& list, const char* text, unsigned& pos, Vesk2ContextStruct* context,
-                unsigned level) {
+[[nodiscard]] int ReadElement(SExpression& list, const char* text, unsigned& pos,
+                              Vesk2ContextStruct* context, unsigned level) {
   Ref<DExpression> element;
   VESK2_TRY(text[pos] == '(' ? ReadList(element, text, pos, context, level)
                              : ByteString::ParseAdvanced(element.Out(), text, pos, context));
@@ -36,8 +36,8 @@ int ReadElement(SExpression& list, const char* text, unsigned& pos, Vesk2Context
   return 0;
 }
 
-int ReadList(Ref<DExpression>& out, const char* text, unsigned& pos, Vesk2ContextStruct* context,
-             unsigned level) {
+[[nodiscard]] int ReadList(Ref<DExpression>& out, const char* text, unsigned& pos,
+                           Vesk2ContextStruct* context, unsigned level) {
   VESK2_REQUIRE(level <= Limits::kMaxDepth, VESK2_ERR_INVALID_S_EXPRESSION);
   SkipSpace(text, pos);
   VESK2_TRY(ExpectChar('(', text, pos));

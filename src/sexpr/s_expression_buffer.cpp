@@ -12,9 +12,10 @@
 namespace ZvVesk2 {
 namespace {
 
-int ReadList(Ref<SExpression>& out, ZvBuffer* buffer, Vesk2ContextStruct* context, unsigned level);
+[[nodiscard]] int ReadList(Ref<SExpression>& out, ZvBuffer* buffer, Vesk2ContextStruct* context,
+                           unsigned level);
 
-int ReadString(Ref<DExpression>& out, ZvBuffer* buffer, Vesk2ContextStruct* context) {
+[[nodiscard]] int ReadString(Ref<DExpression>& out, ZvBuffer* buffer, Vesk2ContextStruct* context) {
   Ref<ByteString> string(TryNew<ByteString>(context));
   VESK2_REQUIRE(string, VESK2_ERR_MEM_ALLOC);
   VESK2_TRY(string->Import(buffer));
@@ -22,8 +23,8 @@ int ReadString(Ref<DExpression>& out, ZvBuffer* buffer, Vesk2ContextStruct* cont
   return 0;
 }
 
-int ReadElement(Ref<DExpression>& out, ZvBuffer* buffer, Vesk2ContextStruct* context,
-                unsigned level) {
+[[nodiscard]] int ReadElement(Ref<DExpression>& out, ZvBuffer* buffer, Vesk2ContextStruct* context,
+                              unsigned level) {
   if (buffer->Peek() != '(') return ReadString(out, buffer, context);
   Ref<SExpression> list;
   VESK2_TRY(ReadList(list, buffer, context, level));
@@ -32,7 +33,8 @@ int ReadElement(Ref<DExpression>& out, ZvBuffer* buffer, Vesk2ContextStruct* con
 }
 
 // Reads a list of nesting `level`.
-int ReadList(Ref<SExpression>& out, ZvBuffer* buffer, Vesk2ContextStruct* context, unsigned level) {
+[[nodiscard]] int ReadList(Ref<SExpression>& out, ZvBuffer* buffer, Vesk2ContextStruct* context,
+                           unsigned level) {
   VESK2_REQUIRE(level <= Limits::kMaxDepth, VESK2_ERR_PARSE_FILE);
   VESK2_TRY(buffer->Expect("("));
   Ref<SExpression> list(TryNew<SExpression>(context));

@@ -18,7 +18,8 @@ char Parenthesis(Step step) { return step == Step::Open ? '(' : ')'; }
 
 // Writes a list at `pos`. Each parenthesis needs `spare` further bytes of room for the outermost
 // list, one for lists within.
-int WriteList(SExpression* list, unsigned char* buf, unsigned& pos, unsigned size, unsigned spare) {
+[[nodiscard]] int WriteList(SExpression* list, unsigned char* buf, unsigned& pos, unsigned size,
+                            unsigned spare) {
   Walk walk(list);
   for (Step step = walk.Next(); step != Step::End; step = walk.Next()) {
     VESK2_REQUIRE(step != Step::TooDeep, VESK2_ERR_BUFFER_OVERFLOW);

@@ -33,7 +33,7 @@ class MemoryReader {
       : buf_(buf), size_(size), pos_(pos), context_(context), search_(search) {}
 
   // Reads a list of nesting `level`.
-  int ReadList(Ref<DExpression>& out, unsigned level) {
+  [[nodiscard]] int ReadList(Ref<DExpression>& out, unsigned level) {
     VESK2_REQUIRE(level <= Limits::kMaxDepth, VESK2_ERR_INVALID_S_EXPRESSION);
     SkipSpace();
     VESK2_TRY(DExpression::Expect("(", buf_, size_, pos_));
@@ -51,18 +51,18 @@ class MemoryReader {
   }
 
   // Whether there is a byte that an element or a ")" can begin with.
-  int Look() const {
+  [[nodiscard]] int Look() const {
     VESK2_REQUIRE(pos_ < size_, VESK2_ERR_BUFFER_OVERFLOW);
     VESK2_REQUIRE(buf_[pos_] != '\0', VESK2_ERR_INVALID_S_EXPRESSION);
     return 0;
   }
 
-  int ReadString(Ref<DExpression>& out) {
+  [[nodiscard]] int ReadString(Ref<DExpression>& out) {
     return ByteString::ParseCanonical(out.Out(), buf_, size_, pos_, context_);
   }
 
   // Reads the elements of a list that has some, and its ")".
-  int ReadElements(SExpression& list, unsigned level) {
+  [[nodiscard]] int ReadElements(SExpression& list, unsigned level) {
     Ref<DExpression> element;
     VESK2_TRY(ReadString(element));
     VESK2_TRY(list.Insert(element.get()));

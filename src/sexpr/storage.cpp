@@ -31,7 +31,7 @@ const char* Root(StorageType type) {
 }
 
 // What lies in the home store is its user's alone; in the global one it is there for everybody.
-int MakeDirectory(const char* path, StorageType type) {
+[[nodiscard]] int MakeDirectory(const char* path, StorageType type) {
   constexpr mode_t kPrivate = 0700;
   return ZVsysutil::zv_mkdir(path,
                              type == StorageGlobal ? ZVsysutil::kZvSharedDirectory : kPrivate);

@@ -43,7 +43,8 @@ namespace {
 
 // [OPENING BYTES ")"], OPENING being for instance "(7:comment"; null when it is not there.
 template <typename Atom>
-int ImportOptional(Ref<Atom>& out, const char* opening, ZvBuffer* buffer, Vesk2ContextStruct* ctx) {
+[[nodiscard]] int ImportOptional(Ref<Atom>& out, const char* opening, ZvBuffer* buffer,
+                                 Vesk2ContextStruct* ctx) {
   if (!buffer->Accept(opening)) return 0;
   VESK2_TRY(ImportNew(out, buffer, ctx));
   return buffer->Expect(")");

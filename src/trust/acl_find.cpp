@@ -65,7 +65,7 @@ bool HoldsInclusively(const AclEntry* entry, const TimeStamp* from, const TimeSt
 }
 
 // The answer for an accepted entry: both values are successes.
-int Granted(SExpression* tag, AclEntry* entry) {
+[[nodiscard]] int Granted(SExpression* tag, AclEntry* entry) {
   return tag->IsEqual(entry->GetTag()) ? VESK2_ERR_AUTH_TAGS_ARE_EQUAL : 0;
 }
 

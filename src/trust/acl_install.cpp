@@ -14,7 +14,7 @@ namespace {
 
 // Whether the entry was read from the store: its path is where the store would put it. One that
 // counted as new for want of memory would be installed a second time.
-int IsStored(bool& stored, const AclEntry* entry) {
+[[nodiscard]] int IsStored(bool& stored, const AclEntry* entry) {
   TextPtr path;
   const int code = FilePath(path, AclEntry::DirectoryName(true), AclEntry::ExtensionName(true),
                             entry->GetFileName(), StorageGlobal);
@@ -24,7 +24,7 @@ int IsStored(bool& stored, const AclEntry* entry) {
 }
 
 // Parts the loaded entries into those of the store and the others.
-int Split(SExpression* loaded, SExpression* stored, SExpression* added) {
+[[nodiscard]] int Split(SExpression* loaded, SExpression* stored, SExpression* added) {
   for (auto it = loaded->Begin(); it; it.Next()) {
     auto* entry = dynamic_cast<AclEntry*>(it.Value());
     if (entry == nullptr) continue;
@@ -39,7 +39,7 @@ int Split(SExpression* loaded, SExpression* stored, SExpression* added) {
 struct Nothing {};
 using StoredTags = TagIndex<Nothing>;
 
-int IndexTags(StoredTags& tags, SExpression* entries) {
+[[nodiscard]] int IndexTags(StoredTags& tags, SExpression* entries) {
   VESK2_TRY(tags.Reserve(entries->Count()));
   for (auto it = entries->Begin(); it; it.Next()) {
     auto* entry = dynamic_cast<AclEntry*>(it.Value());
@@ -51,7 +51,7 @@ int IndexTags(StoredTags& tags, SExpression* entries) {
 
 // Writes the entry into the store under its file's name, unless another trust root has that name,
 // or its tag.
-int Install(AclEntry* entry, StoredTags& tags) {
+[[nodiscard]] int Install(AclEntry* entry, StoredTags& tags) {
   bool hashed = false;
   TagDigest digest;
   VESK2_TRY(DigestTag(hashed, digest, entry->GetTag()));
@@ -66,7 +66,7 @@ int Install(AclEntry* entry, StoredTags& tags) {
   return WriteStored(entry, entry->GetFileName(), false);
 }
 
-int InstallAll(const char* dir, Vesk2ContextStruct* ctx) {
+[[nodiscard]] int InstallAll(const char* dir, Vesk2ContextStruct* ctx) {
   Ref<SExpression> stored;
   Ref<SExpression> added;
   VESK2_TRY(SExpression::Create(stored.Out(), "acls", ctx));

@@ -41,7 +41,7 @@ struct Triple {
   Ref<Signature> signature;
   Ref<SExpression> extra;
 
-  int Import(ZvBuffer* buffer, Vesk2ContextStruct* ctx) {
+  [[nodiscard]] int Import(ZvBuffer* buffer, Vesk2ContextStruct* ctx) {
     VESK2_TRY(ImportNew(cert, buffer, ctx));
     VESK2_TRY(ImportNew(signature, buffer, ctx));
     return SExpression::Import(extra.Out(), buffer, ctx);
@@ -49,7 +49,7 @@ struct Triple {
 };
 
 // Finds and reads the file of a sequence.
-int OpenFile(BufferOwner& buffer, TextPtr& path, const char* name, bool usePath) {
+[[nodiscard]] int OpenFile(BufferOwner& buffer, TextPtr& path, const char* name, bool usePath) {
   const int code =
       FilePath(path, CertSequence::DirectoryName(true), CertSequence::ExtensionName(true), name,
                usePath ? StoragePath : StorageHome);

@@ -11,14 +11,14 @@
 namespace ZvVesk2 {
 namespace {
 
-int OpenStore(Scan& scan) {
+[[nodiscard]] int OpenStore(Scan& scan) {
   TextPtr directory;
   VESK2_REQUIRE(StoreDirectory(directory, CertSequence::DirectoryName(true), StorageHome) == 0,
                 VESK2_ERR_MEM_ALLOC);
   return scan.Open(directory.get(), "*.cert");
 }
 
-int ReadFirst(Ref<Cert>& cert, const char* path, Vesk2ContextStruct* ctx) {
+[[nodiscard]] int ReadFirst(Ref<Cert>& cert, const char* path, Vesk2ContextStruct* ctx) {
   BufferOwner buffer;
   VESK2_TRY(WrapFile(buffer, path, VESK2_ERR_FILE_OPEN));
   Ref<Signature> signature;
@@ -30,7 +30,7 @@ int ReadFirst(Ref<Cert>& cert, const char* path, Vesk2ContextStruct* ctx) {
 const char* NameOf(const char* path) { return std::strrchr(path, '/') + 1; }
 
 // Appends the name together with its terminating 0 byte: callers print the bytes as a C string.
-int AppendName(SExpression* names, const char* name) {
+[[nodiscard]] int AppendName(SExpression* names, const char* name) {
   Ref<ByteString> text(TryNew<ByteString>(names->GetContext()));
   VESK2_REQUIRE(text, VESK2_ERR_MEM_ALLOC);
   VESK2_TRY(text->Set(reinterpret_cast<const unsigned char*>(name),

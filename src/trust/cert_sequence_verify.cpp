@@ -14,7 +14,8 @@ namespace {
 
 // Takes the certificates of a sequence. With `verify`, their signatures are verified: up to the
 // first failure, or all of them for `wholly`.
-int TakeCerts(const CertSequence& sequence, Evidence& evidence, bool verify, bool wholly) {
+[[nodiscard]] int TakeCerts(const CertSequence& sequence, Evidence& evidence, bool verify,
+                            bool wholly) {
   auto at = FirstItem(&sequence);
   VESK2_REQUIRE(at, VESK2_ERR_INVALID_SEQUENCE);
   int failure = 0;
@@ -31,14 +32,14 @@ int TakeCerts(const CertSequence& sequence, Evidence& evidence, bool verify, boo
   return failure;
 }
 
-int LoadEntries(Evidence& evidence, Vesk2ContextStruct* ctx) {
+[[nodiscard]] int LoadEntries(Evidence& evidence, Vesk2ContextStruct* ctx) {
   Ref<SExpression> acls;
   VESK2_TRY(LoadRoots(acls, ctx));
   evidence.SetEntries(acls.get());
   return 0;
 }
 
-int LoadLists(Evidence& evidence, Vesk2ContextStruct* ctx) {
+[[nodiscard]] int LoadLists(Evidence& evidence, Vesk2ContextStruct* ctx) {
   VESK2_TRY(LoadEntries(evidence, ctx));
   Ref<SExpression> lists;
   VESK2_TRY(CrlSequence::ImportStore(lists.Out(), evidence.GetEntries(), ctx));
@@ -46,7 +47,7 @@ int LoadLists(Evidence& evidence, Vesk2ContextStruct* ctx) {
   return 0;
 }
 
-int AskStores(Evidence& evidence, Vesk2ContextStruct* ctx) {
+[[nodiscard]] int AskStores(Evidence& evidence, Vesk2ContextStruct* ctx) {
   VESK2_TRY(LoadLists(evidence, ctx));
   return evidence.MarkRevoked();
 }

@@ -12,12 +12,12 @@
 namespace ZvVesk2 {
 namespace {
 
-int VerifyLink(const ChainLink& link) {
+[[nodiscard]] int VerifyLink(const ChainLink& link) {
   VESK2_REQUIRE(link.cert != nullptr && link.signature != nullptr, VESK2_ERR_SIGNATURE);
   return link.signature->Verify(link.cert);
 }
 
-int AskStores(Evidence& evidence, Vesk2ContextStruct* ctx) {
+[[nodiscard]] int AskStores(Evidence& evidence, Vesk2ContextStruct* ctx) {
   const ZVsysutil::ZvCall call;
   Ref<SExpression> acls;
   VESK2_TRY(AclEntry::Import(acls.Out(), ctx, nullptr));
@@ -29,8 +29,8 @@ int AskStores(Evidence& evidence, Vesk2ContextStruct* ctx) {
 }
 
 // Replaces the lists by what is not revoked of them. Both are as they were after a failure.
-int DropRevoked(Ref<SExpression>& certs, Ref<SExpression>& extras, Evidence& evidence,
-                Vesk2ContextStruct* ctx) {
+[[nodiscard]] int DropRevoked(Ref<SExpression>& certs, Ref<SExpression>& extras, Evidence& evidence,
+                              Vesk2ContextStruct* ctx) {
   for (auto it = certs->Begin(); it; it.Next()) {
     auto* const cert = dynamic_cast<Cert*>(it.Value());
     if (cert != nullptr) VESK2_TRY(evidence.AddCert(cert, nullptr, 0));

@@ -19,7 +19,7 @@ Crl::~Crl() {
 namespace {
 
 // (4:item HASH STAMP)
-int ImportItem(SExpression* list, ZvBuffer* buffer) {
+[[nodiscard]] int ImportItem(SExpression* list, ZvBuffer* buffer) {
   VESK2_TRY(buffer->Expect("(4:item"));
   Ref<Hash> hash;
   VESK2_TRY(ImportNew(hash, buffer, list->GetContext()));
@@ -34,8 +34,8 @@ int ImportItem(SExpression* list, ZvBuffer* buffer) {
 }
 
 // (5:list1 ITEM...), or list2, as `opening` says.
-int ImportItems(SExpression*& out, const char* opening, const char* keyword, ZvBuffer* buffer,
-                Vesk2ContextStruct* ctx) {
+[[nodiscard]] int ImportItems(SExpression*& out, const char* opening, const char* keyword,
+                              ZvBuffer* buffer, Vesk2ContextStruct* ctx) {
   VESK2_TRY(buffer->Expect(opening));
   Ref<SExpression> list;
   VESK2_TRY(SExpression::Create(list.Out(), keyword, ctx));

@@ -8,7 +8,7 @@
 namespace ZvVesk2 {
 namespace {
 
-int AppendItem(SExpression* list, Hash* digest, TimeStamp* from) {
+[[nodiscard]] int AppendItem(SExpression* list, Hash* digest, TimeStamp* from) {
   VESK2_REQUIRE(list != nullptr && digest != nullptr && from != nullptr, VESK2_ERR_INVALID_PARAM);
   VESK2_REQUIRE(digest->GetDigest() != nullptr, VESK2_ERR_INVALID_PARAM);
   Ref<SExpression> item;
@@ -18,7 +18,7 @@ int AppendItem(SExpression* list, Hash* digest, TimeStamp* from) {
   return Append(list, std::move(item));
 }
 
-int AppendItems(SExpression* list, const SExpression* others) {
+[[nodiscard]] int AppendItems(SExpression* list, const SExpression* others) {
   for (auto it = others->Begin(); it; it.Next()) {
     if (it.Value()->IsSExpression()) VESK2_TRY(AppendShared(list, it.Value()));
   }

@@ -50,7 +50,7 @@ namespace {
 
 // Makes a part and reads it. The field is set first: a part that fails stays with its owner.
 template <typename T>
-int ImportPart(T*& field, ZvBuffer* buffer, Vesk2ContextStruct* ctx) {
+[[nodiscard]] int ImportPart(T*& field, ZvBuffer* buffer, Vesk2ContextStruct* ctx) {
   field = TryNew<T>(ctx);
   VESK2_REQUIRE(field != nullptr, VESK2_ERR_MEM_ALLOC);
   return field->Import(buffer);
@@ -105,7 +105,7 @@ int CrlSequence::VerifyValidity(long* notBefore, long* notAfter) {
 namespace {
 
 // The last entry with the tag decides; null when there is none.
-int LastWithTag(AclEntry*& found, SExpression* entries, SExpression* tag) {
+[[nodiscard]] int LastWithTag(AclEntry*& found, SExpression* entries, SExpression* tag) {
   found = nullptr;
   for (auto it = entries->Begin(); it; it.Next()) {
     auto* entry = dynamic_cast<AclEntry*>(it.Value());
@@ -118,14 +118,14 @@ int LastWithTag(AclEntry*& found, SExpression* entries, SExpression* tag) {
 }
 
 // `mismatch` unless the two are equal.
-int RequireEqual(DExpression* a, DExpression* b, int mismatch) {
+[[nodiscard]] int RequireEqual(DExpression* a, DExpression* b, int mismatch) {
   bool equal = false;
   VESK2_TRY(CompareValues(equal, a, b));
   return equal ? 0 : mismatch;
 }
 
 // Whether `subject` is the hash of the list.
-int VerifyHash(Crl* crl, Subject* subject) {
+[[nodiscard]] int VerifyHash(Crl* crl, Subject* subject) {
   auto* const expected = dynamic_cast<Hash*>(subject);
   VESK2_REQUIRE(expected != nullptr, VESK2_ERR_HASH_ID);
   Ref<Hash> computed(TryNew<Hash>(crl->GetContext()));

@@ -16,7 +16,7 @@ namespace {
 // Appends the stored list of one source, if it can be read. A list that is there but could not be
 // read for want of memory, or because another process holds it, is never taken for a missing one:
 // that would bring revoked keys back.
-int LoadSource(SExpression* store, SExpression* tag) {
+[[nodiscard]] int LoadSource(SExpression* store, SExpression* tag) {
   TextPtr name;
   VESK2_TRY(StoreName(name, tag));
   if (!name || *VeskConf::GetGlobalDirectory() == '\0') return 0;

@@ -19,7 +19,7 @@ namespace ZvVesk2 {
 namespace {
 
 // Whether the text of `tag` has a 0 byte in it: as a C string it would name another tag's file.
-int HoldsZeroByte(bool& holds, SExpression* tag) {
+[[nodiscard]] int HoldsZeroByte(bool& holds, SExpression* tag) {
   const unsigned int size = tag->AdvancedLength();
   const std::unique_ptr<unsigned char[]> text(TryNewArray<unsigned char>(size_t{size} + 1));
   VESK2_REQUIRE(text, VESK2_ERR_MEM_ALLOC);
@@ -87,7 +87,7 @@ bool Replaces(const Cert* fresh, const Cert* stored, const TimeStamp* now) {
 }
 
 // Whether the store should take the list: it has none at `path` that can be read, or an older one.
-int IsWanted(bool& wanted, const Cert* fresh, const char* path) {
+[[nodiscard]] int IsWanted(bool& wanted, const Cert* fresh, const char* path) {
   wanted = false;
   Ref<CrlSequence> stored(TryNew<CrlSequence>(fresh->GetContext()));
   VESK2_REQUIRE(stored, VESK2_ERR_MEM_ALLOC);

@@ -20,7 +20,7 @@ constexpr size_t kIssuersPlace = 1;
 
 // A clone that may pass its grant on, whatever the certificate says: the signer certificate, which
 // only names the content, is not a delegation.
-int ClonePropagating(Cert& cert, Ref<Cert>& clone) {
+[[nodiscard]] int ClonePropagating(Cert& cert, Ref<Cert>& clone) {
   clone.Reset(TryNew<Cert>(cert.GetContext()));
   VESK2_REQUIRE(clone, VESK2_ERR_MEM_ALLOC);
   const bool own = cert.GetPropagate();
@@ -30,13 +30,13 @@ int ClonePropagating(Cert& cert, Ref<Cert>& clone) {
   return code;
 }
 
-int CodeOfStatus(int32_t status) {
+[[nodiscard]] int CodeOfStatus(int32_t status) {
   VESK2_REQUIRE(status != Cert::Undetermined, VESK2_ERR_CRL_NOT_FOUND);
   return status == Cert::NotRevoked ? 0 : VESK2_ERR_CERT_REVOKED;
 }
 
 // A list remembers that it was proved, which may have been by other entries.
-int AppendUnproved(SExpression* to, SExpression* from) {
+[[nodiscard]] int AppendUnproved(SExpression* to, SExpression* from) {
   if (from == nullptr) return 0;
   for (auto it = from->Begin(); it; it.Next()) {
     if (auto* const list = dynamic_cast<CrlSequence*>(it.Value())) list->ForgetProof();

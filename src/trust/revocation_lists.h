@@ -46,11 +46,11 @@ class RevocationLists {
     const TimeStamp* latest = nullptr;  // the latest end of a list
   };
 
-  int Load();
-  int LoadRoots();
-  int Find(Answers*& answers, bool critical, SExpression* tag);
-  int Collect(Answers& answers, bool critical, std::span<Source> lists);
-  int Prove(Source& list);
+  [[nodiscard]] int Load();
+  [[nodiscard]] int LoadRoots();
+  [[nodiscard]] int Find(Answers*& answers, bool critical, SExpression* tag);
+  [[nodiscard]] int Collect(Answers& answers, bool critical, std::span<Source> lists);
+  [[nodiscard]] int Prove(Source& list);
 
   SExpression* acls_;
   SExpression* store_;

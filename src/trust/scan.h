@@ -50,7 +50,7 @@ class Scan {
   const char* Path() const { return path_; }
   bool IsListed() const { return files_.isRegular(); }
   // The code of the file read last.
-  int Last() const { return last_; }
+  [[nodiscard]] int Last() const { return last_; }
   // What a scan that came to its end answers: `atEnd`, unless it was ended before.
   [[nodiscard]] int Result(int atEnd) const {
     return IsNoAbsence(last_) ? InOwnWords(last_) : atEnd;

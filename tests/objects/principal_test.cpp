@@ -162,7 +162,7 @@ ZVCLMPublicKeyData* CopyOf(const PublicKey& key) {
   EXPECT_EQ(zvclm_RSAKeyStructInit(ZVCLM_DATA_RSA, &record), 0);
   EXPECT_EQ(zvclm_PublicKeyGetData(key.GetKey(), ZVCLM_DATA_RSA, &record, 0), 0);
   EXPECT_EQ(zvclm_PublicKeyDefine(&copy, ZVCLM_KEY_RSA, ZVCLM_DATA_RSA, &record, 0, 0), 0);
-  zvclm_RSAKeyStructZeroize(ZVCLM_DATA_RSA, &record);
+  EXPECT_EQ(zvclm_RSAKeyStructZeroize(ZVCLM_DATA_RSA, &record), 0);
   return copy;
 }
 

@@ -83,7 +83,7 @@ TEST_F(StoreWrite, TheGlobalStoreIsReadableByAll) {
   other.Write("root.acl", Root());
   for (const mode_t mask : {0000, 0077}) {
     const mode_t old = umask(mask);
-    AclEntry::InstallAcls(other.Path().c_str(), nullptr);
+    EXPECT_EQ(AclEntry::InstallAcls(other.Path().c_str(), nullptr), 0);
     EXPECT_EQ(Offer(Sequence(1, "a")), 0);
     for (const StorageType type : {StorageGlobal, StorageHome}) {
       entry->SetStorageType(type);

@@ -18,7 +18,7 @@ spki_status spki_call_start(spki_engine* engine, const Vesk2ContextStruct* ctx);
 void spki_call_stop(spki_engine* engine);
 // Exports an object and parses it. The list in the slot owns the exported bytes: end it with
 // spki_list_dispose. Codes of SExpression::Export and of the engine.
-int spki_import_sexpr(spki_engine* engine, SExpression* expression, spki_elem** slot);
+[[nodiscard]] int spki_import_sexpr(spki_engine* engine, SExpression* expression, spki_elem** slot);
 
 // The bytes of a chain's canonical form; more than Limits::kMaxResult for one that is too long,
 // which is not measured to its end.

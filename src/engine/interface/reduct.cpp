@@ -33,7 +33,7 @@ struct Granted {
   unsigned int length = 0;
 };
 
-int WriteResult(const Engine::spki_elem* result, Granted& granted) {
+[[nodiscard]] int WriteResult(const Engine::spki_elem* result, Granted& granted) {
   const uint64_t length = Engine::spki_canonical_length(result);
   VESK2_REQUIRE(length <= Limits::kMaxResult, SPKI_ERR_NO_MEM);
   granted.bytes.reset(TryNewArray<unsigned char>(length));
@@ -47,8 +47,8 @@ int WriteResult(const Engine::spki_elem* result, Granted& granted) {
 enum class Entries { All, First };
 
 // The result still points into the imported bytes, so it is written while they are there.
-int Reduce(const Vesk2ContextStruct* ctx, const Arguments& arguments, Entries entries,
-           Granted& granted) {
+[[nodiscard]] int Reduce(const Vesk2ContextStruct* ctx, const Arguments& arguments, Entries entries,
+                         Granted& granted) {
   Engine::EngineCall call;
   Engine::spki_elem* acl = nullptr;
   Engine::spki_elem* sequence = nullptr;
@@ -75,8 +75,8 @@ bool IsEmpty(const Granted& granted) {
   return text == "(3:acl)";
 }
 
-int Find(const Granted& granted, const char* tag, Vesk2ContextStruct* ctx,
-         Ref<SExpression>& found) {
+[[nodiscard]] int Find(const Granted& granted, const char* tag, Vesk2ContextStruct* ctx,
+                       Ref<SExpression>& found) {
   return SExpression::FindSubExpression(found.Out(), granted.bytes.get(), granted.length, tag, ctx);
 }
 

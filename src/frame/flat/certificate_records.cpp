@@ -21,7 +21,7 @@ using ChainOwner = std::unique_ptr<Vesk2CertInfoStruct, ChainFree>;
 
 time_t TimeOf(const TimeStamp* stamp) { return stamp != nullptr ? stamp->ToTime() : 0; }
 
-int ReadHash(Vesk2CertInfoStruct& record, Hash* hash) {
+[[nodiscard]] int ReadHash(Vesk2CertInfoStruct& record, Hash* hash) {
   const unsigned int size = hash->AdvancedLength();
   record.hashText = TryNewArray<char>(size_t{size} + 1);
   VESK2_REQUIRE(record.hashText != nullptr, VESK2_ERR_MEM_ALLOC);
@@ -29,7 +29,8 @@ int ReadHash(Vesk2CertInfoStruct& record, Hash* hash) {
                               record.hashTextLength, size);
 }
 
-int ReadRecord(Vesk2CertInfoStruct& record, Cert* cert, Signature* signature, SExpression* extra) {
+[[nodiscard]] int ReadRecord(Vesk2CertInfoStruct& record, Cert* cert, Signature* signature,
+                             SExpression* extra) {
   record.size = kRecordMark;
   record.notBefore = TimeOf(cert->GetNotBefore());
   record.notAfter = TimeOf(cert->GetNotAfter());
@@ -42,7 +43,7 @@ int ReadRecord(Vesk2CertInfoStruct& record, Cert* cert, Signature* signature, SE
 }
 
 // The records of all triples behind the keyword. None holds the sequence yet.
-int ReadRecords(ChainOwner& chain, CertSequence* sequence) {
+[[nodiscard]] int ReadRecords(ChainOwner& chain, CertSequence* sequence) {
   Vesk2CertInfoStruct* last = nullptr;
   auto item = sequence->Begin();
   for (item.Next(); item;) {

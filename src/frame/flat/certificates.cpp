@@ -17,7 +17,7 @@ namespace {
 // ---- Verifying ----
 
 // Null for a time that is not given.
-int MakeStamp(Ref<TimeStamp>& stamp, time_t time, Vesk2ContextStruct* context) {
+[[nodiscard]] int MakeStamp(Ref<TimeStamp>& stamp, time_t time, Vesk2ContextStruct* context) {
   if (time == 0) return 0;
   stamp.Reset(TryNew<TimeStamp>(context));
   VESK2_REQUIRE(stamp, VESK2_ERR_MEM_ALLOC);
@@ -26,7 +26,8 @@ int MakeStamp(Ref<TimeStamp>& stamp, time_t time, Vesk2ContextStruct* context) {
   return code;
 }
 
-int VerifySequence(CertSequence* sequence, const char* tagText, time_t notBefore, time_t notAfter) {
+[[nodiscard]] int VerifySequence(CertSequence* sequence, const char* tagText, time_t notBefore,
+                                 time_t notAfter) {
   Vesk2ContextStruct* const context = sequence->GetContext();
   Ref<SExpression> tag;
   VESK2_TRY(SExpression::ParseTagAdvanced(tag.Out(), tagText, "tag", context));

@@ -41,7 +41,7 @@ struct RecordFree {
 };
 using RecordOwner = std::unique_ptr<Vesk2CrlInfoStruct, RecordFree>;
 
-int MakeRecord(Vesk2CrlInfoStruct** out, Ref<CrlSequence> sequence) {
+[[nodiscard]] int MakeRecord(Vesk2CrlInfoStruct** out, Ref<CrlSequence> sequence) {
   RecordOwner record(TryNew<Vesk2CrlInfoStruct>());
   VESK2_REQUIRE(record, VESK2_ERR_MEM_ALLOC);
   const Cert* const cert = sequence->GetCert();
@@ -105,7 +105,7 @@ namespace {
 
 // Whether the record's text is all of the tag's body. It ends at a 0 byte in the tag, and what
 // follows would be another tag.
-int IsWholeText(bool& whole, const Vesk2CrlInfoStruct& record) {
+[[nodiscard]] int IsWholeText(bool& whole, const Vesk2CrlInfoStruct& record) {
   SExpression* const tag = record.crl->GetCert()->GetTag();
   const unsigned int size = tag->AdvancedLength();
   const std::unique_ptr<unsigned char[]> text(TryNewArray<unsigned char>(size_t{size} + 1));
@@ -116,7 +116,7 @@ int IsWholeText(bool& whole, const Vesk2CrlInfoStruct& record) {
   return 0;
 }
 
-int RequireTag(const Vesk2CrlInfoStruct& record, const char* tagText) {
+[[nodiscard]] int RequireTag(const Vesk2CrlInfoStruct& record, const char* tagText) {
   VESK2_REQUIRE(record.tag != nullptr, VESK2_ERR_AUTH_TAG_MISSING);
   VESK2_REQUIRE(std::strcmp(tagText, record.tag) == 0, VESK2_ERR_NOT_AUTHORIZED);
   bool whole = false;
