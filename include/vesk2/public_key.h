@@ -4,7 +4,8 @@
 //   (public-key (dsa (p <p>) (g <g>) (q <q>) (y <y>)))      in this order, not p, q, g, y
 //
 // Numbers are big-endian bytes. The identity of a key is its canonical form: a number written with
-// a leading zero is another principal.
+// a leading zero is another principal. A key that was imported or set does not change any more, so
+// that several threads may verify with one and export it, while none counts references to it.
 #ifndef VESK2_PUBLIC_KEY_H
 #define VESK2_PUBLIC_KEY_H
 
@@ -33,10 +34,9 @@ class VESK2_API PublicKey : public Principal {
   [[nodiscard]] int ImportRSA(ZvBuffer* buffer);
   [[nodiscard]] int ImportDSA(ZvBuffer* buffer);
 
-  // SetRSA and SetDSA build the list from a key object and own it from the call on, also when a
-  // later step fails. VESK2_ERR_INVALID_PARAM for null, or an object that has a key already (the
-  // key object then stays the caller's), VESK2_ERR_BIG_INT_BUFFER_SIZE, VESK2_ERR_MEM_ALLOC, the
-  // crypto layer's.
+  // SetRSA and SetDSA adopt a key object and build the list from it. VESK2_ERR_INVALID_PARAM for
+  // null, and for an object that has a key already: it has no place for another, which stays the
+  // caller's then. VESK2_ERR_BIG_INT_BUFFER_SIZE, VESK2_ERR_MEM_ALLOC, the crypto layer's.
   [[nodiscard]] int SetRSA(ZVCLMPublicKeyData* key);
   [[nodiscard]] int SetDSA(ZVCLMPublicKeyData* key);
 
@@ -69,7 +69,7 @@ class VESK2_API PublicKey : public Principal {
   int32_t GetType() const { return keyType; }
   const char* GetAlgorithm() const { return algorithmName; }
   uint32_t GetLength() const { return keyLength; }
-  // The crypto key object, borrowed; null without memory.
+  // The crypto key object, borrowed; null until there is a key.
   ZVCLMPublicKeyData* GetKey() const;
 
  private:
@@ -78,13 +78,9 @@ class VESK2_API PublicKey : public Principal {
   [[nodiscard]] int ImportNumbers(ZvBuffer* buffer);
   template <typename Form>
   [[nodiscard]] int SetNumbers(ZVCLMPublicKeyData* newKey);
-  [[nodiscard]] int MakeKey() const;
-  template <typename Form>
-  [[nodiscard]] int DefineKey() const;
 
   int32_t keyType = -1;
-  bool imported = false;                      // whether the list has all numbers of the key
-  mutable ZVCLMPublicKeyData* key = nullptr;  // of an imported key: null until it is used
+  ZVCLMPublicKeyData* key = nullptr;
   const char* algorithmName = nullptr;
   uint32_t keyLength = 0;
 };

@@ -37,13 +37,6 @@ uint32_t BitLength(const ByteString& number) {
   return 8 * (bytes - 1) + static_cast<uint32_t>(std::bit_width(unsigned{*first}));
 }
 
-// The element behind `at`, which moves there, as a T; null when it is none.
-template <typename T>
-T* NextAs(SExpression::Iterator& at) {
-  if (at) at.Next();
-  return at ? dynamic_cast<T*>(at.Value()) : nullptr;
-}
-
 }  // namespace
 
 PublicKey::PublicKey(Vesk2ContextStruct* ctx) : Principal(ctx) {}
@@ -106,6 +99,8 @@ int PublicKey::ImportNumbers(ZvBuffer* buffer) {
   VESK2_TRY(Insert("public-key"));
   SExpression* numbers = nullptr;
   VESK2_TRY(AppendHead(this, Form::kName, numbers));
+  KeyRecord<Form> record;
+  VESK2_TRY(record.Init());
   uint32_t length = 0;
   for (const auto& number : Form::kNumbers) {
     VESK2_TRY(buffer->Expect("(1:"));
@@ -114,37 +109,14 @@ int PublicKey::ImportNumbers(ZvBuffer* buffer) {
     VESK2_TRY(ImportNew(text, buffer, GetContext()));
     VESK2_TRY(buffer->Expect(")"));
     if (number.field == Form::kLength) length = BitLength(*text);
+    VESK2_TRY(zvclm_BigIntFromBuffer(&record.Number(number), text->GetData(), text->GetLength()));
     VESK2_TRY(AppendPair(numbers, number.name, std::move(text)));
   }
   keyLength = length;
-  imported = true;
-  return 0;
-}
-
-ZVCLMPublicKeyData* PublicKey::GetKey() const { return MakeKey() == 0 ? key : nullptr; }
-
-// A store has many keys, and a chain needs few of them for more than their text.
-int PublicKey::MakeKey() const {
-  if (key != nullptr || !imported) return 0;
-  return keyType == RsaForm::kType ? DefineKey<RsaForm>() : DefineKey<DsaForm>();
-}
-
-template <typename Form>
-int PublicKey::DefineKey() const {
-  KeyRecord<Form> record;
-  VESK2_TRY(record.Init());
-  auto at = Begin();
-  auto* const numbers = NextAs<SExpression>(at);
-  VESK2_REQUIRE(numbers != nullptr, VESK2_ERR_INVALID_PARAM);
-  auto pairs = numbers->Begin();
-  for (const auto& number : Form::kNumbers) {
-    auto* const pair = NextAs<SExpression>(pairs);
-    auto* const text = pair != nullptr ? dynamic_cast<ByteString*>(pair->Last()) : nullptr;
-    VESK2_REQUIRE(text != nullptr, VESK2_ERR_INVALID_PARAM);
-    VESK2_TRY(zvclm_BigIntFromBuffer(&record.Number(number), text->GetData(), text->GetLength()));
-  }
   return zvclm_PublicKeyDefine(&key, Form::kType, Form::kDataId, record.get(), 0, CryptoHandle());
 }
+
+ZVCLMPublicKeyData* PublicKey::GetKey() const { return key; }
 
 template <typename Form>
 int PublicKey::SetNumbers(ZVCLMPublicKeyData* newKey) {

@@ -23,13 +23,11 @@ namespace {
 
 int PublicKey::SshExport(unsigned char*& out, unsigned int& length) {
   out = nullptr;
-  VESK2_TRY(MakeKey());
   return ExportKey(key, ZVCLM_FORMAT_SSH, out, length, CryptoHandle());
 }
 
 int PublicKey::X509Export(unsigned char*& out, unsigned int& length) {
   out = nullptr;
-  VESK2_TRY(MakeKey());
   return ExportKey(key, ZVCLM_FORMAT_X509, out, length, CryptoHandle());
 }
 

@@ -88,7 +88,6 @@ int PublicKey::VerifyRSA(ByteString* algorithm, ByteString* signatureValue, Hash
   VESK2_REQUIRE(id == ZVCLM_HASH_SHA1 || id == ZVCLM_HASH_SHA256, VESK2_ERR_SIGNATURE_ID);
   Digest digest;
   VESK2_TRY(MatchingDigest(digest, id, hash, signedObject));
-  VESK2_TRY(MakeKey());
   const ZVCLMRSAParameters parameters = RsaParameters(id);
   const int scheme = pss ? ZVCLM_SCHEME_RSA_PSS : ZVCLM_SCHEME_RSA_PKCS1;
   return Check{key, scheme, &parameters, CryptoHandle()}.Run(
@@ -104,7 +103,6 @@ int PublicKey::VerifyDSA(ByteString* algorithm, ByteString* signatureValue, Hash
   VESK2_REQUIRE(Matches(algorithm, "dsa-sha1"), VESK2_ERR_SIGNATURE_ID);
   Digest digest;
   VESK2_TRY(MatchingDigest(digest, ZVCLM_HASH_SHA1, hash, signedObject));
-  VESK2_TRY(MakeKey());
   return Check{key, ZVCLM_SCHEME_DSA, &kDsaParameters, CryptoHandle()}.Run(
       digest.bytes.get(), digest.length, signatureValue->GetData(), signatureValue->GetLength());
 }
@@ -132,7 +130,6 @@ int PublicKey::VerifyMobileDSA(ByteString* algorithm, unsigned char* signature, 
   if (dataLength > 0) VESK2_TRY(hash->Update(data, dataLength));
   VESK2_TRY(hash->Finalize());
   const ByteString* const digest = hash->GetDigest();
-  VESK2_TRY(MakeKey());
   return Check{key, ZVCLM_SCHEME_DSA, &kDsaParameters, CryptoHandle()}.Run(
       digest->GetData(), digest->GetLength(), signature + kHeader, kValue);
 }
