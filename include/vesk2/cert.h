@@ -73,11 +73,6 @@ class VESK2_API Cert : public SExpression {
   SExpression* GetRevocationElement() const { return revocationElement; }
   int32_t GetRevocationStatus() const { return revocationStatus; }
 
-  // The chain builders hide the revocation element, or force propagation, for the time of one Clone
-  // and put the old value back.
-  void SetPropagate(bool value) { propagate = value; }
-  void SetRevocationElement(SExpression* borrowed) { revocationElement = borrowed; }
-
  private:
   friend class RevocationLists;  // which sets the status
   // The elements that Import reads and Set builds, in order.

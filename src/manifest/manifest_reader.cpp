@@ -45,8 +45,8 @@ int ManifestReader::Read(ZvBuffer** body) {
   VESK2_REQUIRE(!LacksMemory(code), code);
   VESK2_TRY(refusal_);
   VESK2_TRY(code);
-  manifest_.version = std::move(version_);
-  manifest_.type = std::move(type_);
+  manifest_.version = std::move(head_.version);
+  manifest_.type = std::move(head_.type);
   manifest_.signingTime = std::move(signingTime_);
   return 0;
 }
@@ -84,17 +84,17 @@ int ManifestReader::ReadVersion() {
   // The second text is the signer's own; it is only carried into the digest.
   Ref<ByteString> text;
   VESK2_TRY(ImportNew(text, buffer_.get(), Context()));
-  VESK2_TRY(SExpression::Create(version_.Out(), "version", Context()));
-  VESK2_TRY(Append(version_.get(), std::move(number)));
-  return Append(version_.get(), std::move(text));
+  VESK2_TRY(SExpression::Create(head_.version.Out(), "version", Context()));
+  VESK2_TRY(Append(head_.version.get(), std::move(number)));
+  return Append(head_.version.get(), std::move(text));
 }
 
 int ManifestReader::ReadType() {
   Ref<ByteString> name;
   VESK2_TRY(ImportNew(name, buffer_.get(), Context()));
   VESK2_REQUIRE(name->IsEqual("plain"), VESK2_ERR_MANIFEST_TYPE);
-  VESK2_TRY(SExpression::Create(type_.Out(), "type", Context()));
-  return Append(type_.get(), std::move(name));
+  VESK2_TRY(SExpression::Create(head_.type.Out(), "type", Context()));
+  return Append(head_.type.get(), std::move(name));
 }
 
 int ManifestReader::ReadSigningTime() {
@@ -102,8 +102,8 @@ int ManifestReader::ReadSigningTime() {
   // Stamps are compared by their 19 characters; a shorter or longer text is no moment.
   VESK2_REQUIRE(signingTime_->GetLength() == kStampLength, VESK2_ERR_TIME_STAMP);
   evidence_.SetSigningTime(signingTime_.get());
-  VESK2_TRY(SExpression::Create(timeElement_.Out(), "time-of-signing", Context()));
-  return Append(timeElement_.get(), Ref<TimeStamp>::Share(signingTime_.get()));
+  VESK2_TRY(SExpression::Create(head_.time.Out(), "time-of-signing", Context()));
+  return Append(head_.time.get(), Ref<TimeStamp>::Share(signingTime_.get()));
 }
 
 int ManifestReader::ReadSignatureBlock() {
@@ -200,7 +200,7 @@ int ManifestReader::ProveBody(ZvBuffer** body) {
   VESK2_REQUIRE(buffer_->Remaining() > 0, VESK2_ERR_PARSE_FILE);
   const size_t length = buffer_->Remaining() - 1;
   const unsigned char* const bytes = buffer_->Data();
-  const int digest = CheckDigest(bytes, static_cast<unsigned int>(length));
+  const int digest = CheckDigest(bytes, length);
   VESK2_TRY(Refuse(digest));
   if (refusal_ != 0) return InspectBody(bytes, length, digest);
   buffer_->Skip(length);
@@ -223,17 +223,11 @@ int ManifestReader::InspectBody(const unsigned char* bytes, size_t length, int c
   return 0;
 }
 
-int ManifestReader::CheckDigest(const unsigned char* body, unsigned int length) {
+int ManifestReader::CheckDigest(const unsigned char* body, size_t length) {
   auto* const signedDigest = dynamic_cast<Hash*>(signer_->GetSubject());
   VESK2_REQUIRE(signedDigest != nullptr, VESK2_ERR_NOT_OBJECT_CERT);
-  Ref<Hash> digest(TryNew<Hash>(Context()));
-  VESK2_REQUIRE(digest, VESK2_ERR_MEM_ALLOC);
-  VESK2_TRY(digest->Init(signedDigest->GetAlgorithm()));
-  VESK2_TRY(digest->Update(version_.get()));
-  VESK2_TRY(digest->Update(type_.get()));
-  VESK2_TRY(digest->Update(timeElement_.get()));
-  VESK2_TRY(digest->Update(body, length));
-  VESK2_TRY(digest->Finalize());
+  Ref<Hash> digest;
+  VESK2_TRY(SignedDigest(digest, signedDigest->GetAlgorithm(), head_, body, length));
   bool same = false;
   VESK2_TRY(CompareValues(same, digest.get(), signedDigest));
   return same ? 0 : VESK2_ERR_HASH_MATCH;

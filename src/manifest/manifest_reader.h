@@ -10,6 +10,7 @@
 #include <vesk2/ref.h>
 
 #include "src/frame/handles.h"
+#include "src/manifest/signed_digest.h"
 
 namespace ZvVesk2 {
 
@@ -47,7 +48,7 @@ class ManifestReader {
   [[nodiscard]] int AskAuthority(SExpression* carried);
   [[nodiscard]] int ProveBody(ZvBuffer** body);
   [[nodiscard]] int InspectBody(const unsigned char* bytes, size_t length, int contentCode);
-  [[nodiscard]] int CheckDigest(const unsigned char* body, unsigned int length);
+  [[nodiscard]] int CheckDigest(const unsigned char* body, size_t length);
 
   Vesk2ContextStruct* Context() const { return manifest_.context; }
 
@@ -61,10 +62,8 @@ class ManifestReader {
   const long notBefore_;
   const long notAfter_;
   BufferOwner buffer_;
-  Ref<SExpression> version_;
-  Ref<SExpression> type_;
-  Ref<TimeStamp> signingTime_;
-  Ref<SExpression> timeElement_;  // (time-of-signing <stamp>)
+  ManifestHead head_;
+  Ref<TimeStamp> signingTime_;  // the one in the head
   Ref<Cert> signer_;
 };
 

@@ -118,7 +118,7 @@ int CertSequence::VerifyChain2(SExpression* goodCerts, SExpression*& tag, SExpre
   for (auto it = goodCerts->Begin(); it; it.Next()) {
     auto* const cert = dynamic_cast<Cert*>(it.Value());
     VESK2_REQUIRE(cert != nullptr, VESK2_ERR_INVALID_SEQUENCE);
-    VESK2_TRY(AppendCopy(chain.get(), cert));
+    VESK2_TRY(AppendIrrevocable(chain.get(), *cert));
   }
   return Verify::ReductB(GetContext(), acls.get(), chain.get(), leaf->GetSubject(), tag, notBefore,
                          notAfter);

@@ -38,15 +38,26 @@ int LoadRoots(Ref<SExpression>& acls, Vesk2ContextStruct* ctx) {
   return code == 0 || IsNoAbsence(code) ? code : VESK2_ERR_ACL_ENTRY_NOT_FOUND;
 }
 
-int AppendCopy(SExpression* chain, Cert* cert) {
-  Ref<Cert> copy(TryNew<Cert>(cert->GetContext()));
-  VESK2_REQUIRE(copy, VESK2_ERR_MEM_ALLOC);
-  SExpression* const own = cert->GetRevocationElement();
-  cert->SetRevocationElement(nullptr);
-  const int code = copy->Clone(cert);
-  cert->SetRevocationElement(own);
-  VESK2_TRY(code);
-  return Append(chain, std::move(copy));
+namespace {
+
+[[nodiscard]] int AppendClone(SExpression* chain, const Cert& cert, bool propagate,
+                              SExpression* revocationElement) {
+  Ref<Cert> clone(TryNew<Cert>(cert.GetContext()));
+  VESK2_REQUIRE(clone, VESK2_ERR_MEM_ALLOC);
+  VESK2_TRY(clone->Set(cert.GetIssuer(), cert.GetSubject(), propagate, cert.GetTag(),
+                       cert.GetNotBefore(), cert.GetNotAfter(), cert.GetComment(),
+                       revocationElement));
+  return Append(chain, std::move(clone));
+}
+
+}  // namespace
+
+int AppendIrrevocable(SExpression* chain, const Cert& cert) {
+  return AppendClone(chain, cert, cert.GetPropagate(), nullptr);
+}
+
+int AppendPropagating(SExpression* chain, const Cert& cert) {
+  return AppendClone(chain, cert, true, cert.GetRevocationElement());
 }
 
 }  // namespace ZvVesk2

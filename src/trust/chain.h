@@ -30,9 +30,11 @@ SExpression::Iterator FirstItem(const SExpression* sequence);
 // and a file that another process holds (VESK2_ERR_READ_FILE) are no absence and come through.
 [[nodiscard]] int LoadRoots(Ref<SExpression>& acls, Vesk2ContextStruct* ctx);
 
-// AppendCopy appends a copy of the certificate without its revocation element, which the reduction
-// knows nothing of.
-[[nodiscard]] int AppendCopy(SExpression* chain, Cert* cert);
+// The two changes that a chain makes to a certificate, each in a clone that shares the other parts.
+// AppendIrrevocable leaves out the revocation element, which the reduction knows nothing of.
+// AppendPropagating lets it pass its grant on, whatever it says.
+[[nodiscard]] int AppendIrrevocable(SExpression* chain, const Cert& cert);
+[[nodiscard]] int AppendPropagating(SExpression* chain, const Cert& cert);
 
 }  // namespace ZvVesk2
 

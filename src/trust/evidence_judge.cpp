@@ -15,20 +15,9 @@
 namespace ZvVesk2 {
 namespace {
 
-// The second certificate of a manifest, counted from 0: the signer's own.
+// The second certificate of a manifest, counted from 0: the signer's own. It need not be allowed to
+// pass its grant on: the signer certificate, which only names the content, is no delegation.
 constexpr size_t kIssuersPlace = 1;
-
-// A clone that may pass its grant on, whatever the certificate says: the signer certificate, which
-// only names the content, is not a delegation.
-[[nodiscard]] int ClonePropagating(Cert& cert, Ref<Cert>& clone) {
-  clone.Reset(TryNew<Cert>(cert.GetContext()));
-  VESK2_REQUIRE(clone, VESK2_ERR_MEM_ALLOC);
-  const bool own = cert.GetPropagate();
-  cert.SetPropagate(true);
-  const int code = clone->Clone(&cert);
-  cert.SetPropagate(own);
-  return code;
-}
 
 [[nodiscard]] int CodeOfStatus(int32_t status) {
   VESK2_REQUIRE(status != Cert::Undetermined, VESK2_ERR_CRL_NOT_FOUND);
@@ -118,11 +107,9 @@ int Evidence::BuildChain(Ref<SExpression>& out) const {
 }
 
 int Evidence::AppendLink(SExpression* chain, size_t index, size_t place) const {
-  if (kind == Chain) return AppendCopy(chain, GetCert(index));
-  if (place != kIssuersPlace) return AppendShared(chain, GetCert(index));
-  Ref<Cert> clone;
-  VESK2_TRY(ClonePropagating(*GetCert(index), clone));
-  return Append(chain, std::move(clone));
+  if (kind == Chain) return AppendIrrevocable(chain, *GetCert(index));
+  if (place == kIssuersPlace) return AppendPropagating(chain, *GetCert(index));
+  return AppendShared(chain, GetCert(index));
 }
 
 // (valid <stamp>) for the moment of signing, else (valid [(not-before <stamp>)] [(not-after

@@ -1,14 +1,15 @@
 // Flat functions: verifying certificate sequences, and listing those of a directory.
 #include <vesk2/cert_sequence.h>
-#include <vesk2/file_item.h>
+#include <vesk2/manifest.h>
 
 #include <memory>
 
 #include "src/frame/check.h"
 #include "src/frame/flat/ascii_text.h"
-#include "src/platform/file.h"
+#include "src/manifest/ignore.h"
 #include "src/platform/text.h"
 #include "src/platform/wait.h"
+#include "src/trust/scan.h"
 
 using namespace ZvVesk2;
 
@@ -65,11 +66,6 @@ int Vesk2CertVerifyFileA(const char* path, const char* tagText, time_t notBefore
 
 namespace {
 
-struct ItemsFree {
-  void operator()(FileItem* chain) const { FileItemDelete(chain); }
-};
-using ItemsOwner = std::unique_ptr<FileItem, ItemsFree>;
-
 // A record of one name; null without memory.
 FileItem* MakeItem(const char* name) {
   std::unique_ptr<char[]> copy(ZVsysutil::zv_fstrdup(name));
@@ -81,14 +77,16 @@ FileItem* MakeItem(const char* name) {
 }  // namespace
 
 FileItem* CertFind(const char* directory) {
-  const std::unique_ptr<char[]> store(directory == nullptr ? CertSequence::CalcDir(StorageHome)
-                                                           : nullptr);
-  ZVsysutil::ZvDir reader;
-  if (reader.open(directory != nullptr ? directory : store.get(), "*.cert") != 0) return nullptr;
-  ItemsOwner chain;
+  constexpr const char* kPattern = "*.cert";
+  Scan scan;
+  const int code = directory != nullptr
+                       ? scan.Open(directory, kPattern)
+                       : scan.OpenStore(CertSequence::DirectoryName(true), kPattern, StorageHome);
+  if (code != 0) return nullptr;
+  FileItemList chain;
   FileItem* last = nullptr;
-  while (const char* name = reader.read(false)) {
-    FileItem* const item = MakeItem(name);
+  while (scan.Next()) {
+    FileItem* const item = MakeItem(BareName(scan.Path()));
     if (item == nullptr) return nullptr;
     if (last == nullptr) {
       chain.reset(item);
@@ -98,7 +96,7 @@ FileItem* CertFind(const char* directory) {
     last = item;
   }
   // Half a list would pass for the whole one.
-  return reader.failed() ? nullptr : chain.release();
+  return scan.Result(0) == 0 ? chain.release() : nullptr;
 }
 
 FileItem* CertFindA(const char* directory) {
