@@ -36,7 +36,7 @@ class VESK2_API AclEntry : public SExpression {
   static char* CalcPath(const char* name, StorageType type);
 
   // Create builds an entry. `subject` and `tag` are required (VESK2_ERR_INVALID_PARAM), `out` must
-  // be null. The references to subject, tag, times and comment are taken over, on success only.
+  // be null. Create takes over the references to subject, tag, times and comment.
   // `generation` 0 writes no element; of others the low byte is written.
   [[nodiscard]] static int Create(AclEntry*& out, Subject* subject, bool propagate,
                                   SExpression* tag, TimeStamp* notBefore, TimeStamp* notAfter,

@@ -7,6 +7,11 @@
 // return borrowed pointers, valid as long as the list holds the element. Counts are plain integers:
 // a value belongs to one thread.
 //
+// Arguments, in every header: what a call shares, it counts for itself, and the caller keeps the
+// reference that it had. What a call takes over, a reference or an array, belongs to the callee
+// after success only: after a failure it is the caller's as before. What a call adopts belongs to
+// the callee from the call on, whatever it answers.
+//
 // Two encodings. Canonical: a list is "(" elements ")", a byte string its length in decimal, ":"
 // and the bytes; the stream form puts a display hint "[bin]", "[utf-8]" or "[num]" before the
 // length. Advanced: bare words separated by blanks, for text that people type and read; it has no
@@ -210,15 +215,15 @@ class VESK2_API SExpression : public DExpression {
 
   // ---- Building lists ----
 
-  // Create makes the list (tag value), or (tag) without a value. The list takes over the reference
-  // to a ByteString `value`, only on success. Errors are Insert's and VESK2_ERR_MEM_ALLOC.
+  // Create makes the list (tag value), or (tag) without a value. It takes over the reference to a
+  // ByteString `value`. Errors are Insert's and VESK2_ERR_MEM_ALLOC.
   [[nodiscard]] static int Create(SExpression*& out, const char* tag, ByteString* value,
                                   Vesk2ContextStruct* context);
   [[nodiscard]] static int Create(SExpression*& out, const char* tag, const char* value,
                                   Vesk2ContextStruct* context);
   [[nodiscard]] static int Create(SExpression*& out, const char* tag, Vesk2ContextStruct* context);
 
-  // Insert appends and takes over the caller's reference, only on success. VESK2_ERR_PARAM_NULL,
+  // Insert appends and takes over the caller's reference. VESK2_ERR_PARAM_NULL,
   // VESK2_ERR_MEM_ALLOC. The text form appends a new byte string; an empty or null text gives
   // VESK2_ERR_INVALID_PARAM.
   [[nodiscard]] int Insert(DExpression* value);

@@ -8,8 +8,8 @@ namespace ZvVesk2 {
 
 using ::FileItem;
 
-// FileItemCreate makes a record that takes over `name` and `nameA` (arrays from new[]); whichever
-// is missing is derived from the other. Null without memory, the strings then still the caller's.
+// FileItemCreate makes a record, which takes over `name` and `nameA`, arrays from new[]; whichever
+// is missing is derived from the other. Null without memory.
 VESK2_API FileItem* FileItemCreate(char* name, char* nameA);
 
 // FileItemDelete frees a chain and returns the number of records freed.

@@ -39,8 +39,9 @@ class VESK2_API Hash : public Principal {
   [[nodiscard]] int Update(const unsigned char* data, unsigned int length);
   // Finalize appends the digest to the list; GetValue stays null (only Import fills it).
   [[nodiscard]] int Finalize();
-  // Set builds a value from a known digest. `data`, an array from new[], is adopted, also on
-  // failure; its length is not compared with the algorithm's.
+  // Set builds a value from a known digest. It adopts `data`, an array from new[], whose length is
+  // not compared with the algorithm's. VESK2_ERR_HASH_ID for an unknown algorithm,
+  // VESK2_ERR_INVALID_PARAM for null and for an object in use, VESK2_ERR_MEM_ALLOC.
   [[nodiscard]] int Set(ZvclmHashID id, unsigned char* data, unsigned int length);
 
   // DumpFingerprint turns "(hash NAME BYTES)" of `length` bytes into "NAME HEX", terminated, in

@@ -64,7 +64,7 @@ class VESK2_API Manifest {
 
   // ---- Settings; see vesk2.h ----
   void SetFailOnExtraEntries(bool value) { failOnExtraEntries = value; }
-  // Takes over `owned`, an array from new[], or null.
+  // Adopts `owned`, an array from new[], or null.
   void SetExtraAclDirectory(char* owned) {
     extraAclDirectory.reset(owned);
     lostSetting = false;

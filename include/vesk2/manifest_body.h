@@ -33,7 +33,7 @@ class VESK2_API BodyObject {
   bool GetIsDirectory() const { return isDirectory; }
   Vesk2ContextStruct* GetContext() const { return context; }
 
-  // Takes over `owned`, an array from new[].
+  // Adopts `owned`, an array from new[].
   void SetName(char* owned) { name.reset(owned); }
   void SetStatus(uint32_t value) { status = value; }
   void SetIsDirectory(bool value) { isDirectory = value; }

@@ -168,8 +168,8 @@ extern "C" {
 // record's zeroize form frees. Returns as zvclm_PublicKeyDefine does.
 [[nodiscard]] VESK2_API int zvclm_PublicKeyGetData(const ZVCLMPublicKeyData* key, int id,
                                                    void* record, uint32_t handle);
-// zvclm_PublicKeyFree frees a key; null is allowed. A key given to SetRSA or SetDSA is no longer
-// the caller's to free.
+// zvclm_PublicKeyFree frees a key; null is allowed. A key that SetRSA or SetDSA adopted is not the
+// caller's to free.
 VESK2_API void zvclm_PublicKeyFree(ZVCLMPublicKeyData* key, uint32_t handle);
 
 }  // extern "C"

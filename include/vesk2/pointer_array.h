@@ -19,8 +19,7 @@ class VESK2_API PointerArray {
   PointerArray(const PointerArray&) = delete;
   PointerArray& operator=(const PointerArray&) = delete;
 
-  // push appends and takes ownership. 1, or 0 without memory (the element is then still the
-  // caller's).
+  // push appends, and takes over the element. 1, or 0 without memory.
   [[nodiscard]] int push(T* element);
   // get(0): the element at the cursor. Negative: that element, then the cursor moves on. Positive:
   // the cursor moves on, then its element. Null at and past the end.

@@ -23,11 +23,10 @@ class VESK2_API Signature : public SExpression {
   [[nodiscard]] int Import(ZvBuffer* buffer);
   using SExpression::Import;
 
-  // Create makes a signature from its parts. `value` (1 to 8192 bytes) is copied; the references to
-  // `hash` and `principal` are taken over on success only. `signature` must be null and nothing
-  // else null or empty (VESK2_ERR_INVALID_PARAM). After a later failure the half-built object is in
-  // `signature`, for the caller to free, with references of its own: `hash` and `principal` are
-  // then still the caller's to free.
+  // Create makes a signature from its parts. It takes over the references to `hash` and
+  // `principal`, and copies `value` (1 to 8192 bytes). `signature` must be null and nothing else
+  // null or empty (VESK2_ERR_INVALID_PARAM). After a later failure the half-built object is in
+  // `signature`, for the caller to free; it has references of its own.
   [[nodiscard]] static int Create(Signature*& signature, Hash* hash, Principal* principal,
                                   const char* algorithm, unsigned char* value, unsigned int length,
                                   Vesk2ContextStruct* context);

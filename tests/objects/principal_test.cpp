@@ -172,11 +172,6 @@ TEST(PublicKeyTest, BuildsTheListFromAKeyObject) {
   ASSERT_EQ(built->SetRSA(CopyOf(*source)), 0);
   // Without leading zeros, and 0 as one byte.
   EXPECT_EQ(Canonical(built), RsaText("[bin]" + Str({"\0", 1}), "[bin]1:n"));
-  ZVCLMPublicKeyData* const refused = CopyOf(*source);
-  EXPECT_EQ(built->SetRSA(refused), VESK2_ERR_INVALID_PARAM);
-  zvclm_PublicKeyFree(refused, 0);  // still ours
-  // Owned from the call on, although it is of the other kind.
-  EXPECT_NE(NewKey()->SetDSA(CopyOf(*source)), 0);
 }
 
 TEST(PublicKeyTest, LivesInPubFiles) {
