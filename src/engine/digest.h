@@ -23,11 +23,13 @@ struct spki_digest {
 
 // Starts a hash with the engine's provider, which it and its pieces are charged to; `digest` is
 // fresh.
-spki_status spki_digest_start(spki_engine* engine, spki_digest* digest, ZvclmHashID id);
+[[nodiscard]] spki_status spki_digest_start(spki_engine* engine, spki_digest* digest,
+                                            ZvclmHashID id);
 // Feeds one piece; a null one and an empty one are skipped.
-spki_status spki_digest_update(spki_digest* digest, const void* data, size_t length);
+[[nodiscard]] spki_status spki_digest_update(spki_digest* digest, const void* data, size_t length);
 // Writes the digest, zero-padded. Nothing more can be fed.
-spki_status spki_digest_finish(spki_digest* digest, unsigned char (&out)[kSpkiDigestSize]);
+[[nodiscard]] spki_status spki_digest_finish(spki_digest* digest,
+                                             unsigned char (&out)[kSpkiDigestSize]);
 
 }  // namespace ZvVesk2::Engine
 

@@ -34,7 +34,8 @@ void FillEntry(spki_engine* engine, spki_elem* entry, const spki_tuple* tuple) {
 }
 
 // Appends the entry of a tuple behind `last`.
-spki_status EmitEntry(spki_engine* engine, const spki_tuple* tuple, spki_elem** last) {
+[[nodiscard]] spki_status EmitEntry(spki_engine* engine, const spki_tuple* tuple,
+                                    spki_elem** last) {
   spki_elem* list = nullptr;
   VESK2_TRY(spki_parse_template(engine, &list, kEntry));
   const spki_elem_owner entry = Own(engine, list);

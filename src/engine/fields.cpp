@@ -24,20 +24,21 @@ bool IsKey(const spki_elem* list) {
   return keyword == SPKI_KW_HASH || keyword == SPKI_KW_PUBLIC_KEY;
 }
 
-spki_status ReadPropagate(spki_engine* /*engine*/, spki_tuple* tuple, spki_elem* /*list*/) {
+[[nodiscard]] spki_status ReadPropagate(spki_engine* /*engine*/, spki_tuple* tuple,
+                                        spki_elem* /*list*/) {
   VESK2_REQUIRE(!tuple->propagate, SPKI_ERR_TOO_MANY_PROPAGATE);
   tuple->propagate = true;
   return 0;
 }
 
-spki_status ReadTag(spki_engine* engine, spki_tuple* tuple, spki_elem* list) {
+[[nodiscard]] spki_status ReadTag(spki_engine* engine, spki_tuple* tuple, spki_elem* list) {
   VESK2_REQUIRE(tuple->tag == nullptr, SPKI_ERR_TOO_MANY_TAGS);
   spki_elem_assign(engine, &tuple->tag, list);
   return 0;
 }
 
-// A later date replaces an earlier one without a word: stored credentials rely on it.
-spki_status ReadDate(spki_engine* engine, spki_tuple* tuple, spki_elem* list) {
+// Of two dates of one kind the later one in the text counts: there are stored credentials with two.
+[[nodiscard]] spki_status ReadDate(spki_engine* engine, spki_tuple* tuple, spki_elem* list) {
   spki_atom* date = nullptr;
   VESK2_TRY(spki_validity_date(list, &date));
   const bool before = HeadKeyword(list) == SPKI_KW_NOT_BEFORE;
@@ -45,7 +46,7 @@ spki_status ReadDate(spki_engine* engine, spki_tuple* tuple, spki_elem* list) {
   return 0;
 }
 
-spki_status ReadValid(spki_engine* engine, spki_tuple* tuple, spki_elem* list) {
+[[nodiscard]] spki_status ReadValid(spki_engine* engine, spki_tuple* tuple, spki_elem* list) {
   for (const spki_elem* elem = list->next; elem != nullptr; elem = elem->next) {
     spki_elem* date = ListOf(elem);
     const int32_t keyword = HeadKeyword(date);
@@ -55,7 +56,7 @@ spki_status ReadValid(spki_engine* engine, spki_tuple* tuple, spki_elem* list) {
   return 0;
 }
 
-spki_status ReadIssuer(spki_engine* engine, spki_tuple* tuple, spki_elem* list) {
+[[nodiscard]] spki_status ReadIssuer(spki_engine* engine, spki_tuple* tuple, spki_elem* list) {
   VESK2_REQUIRE(tuple->member != kSpkiAclEntry, SPKI_ERR_ACL_HAS_ISSUER);
   VESK2_REQUIRE(tuple->issuer == nullptr, SPKI_ERR_TOO_MANY_ISSUERS);
   spki_elem* key = ListOf(list->next);
@@ -71,7 +72,7 @@ spki_status ReadIssuer(spki_engine* engine, spki_tuple* tuple, spki_elem* list) 
 }
 
 // The names from `name` on.
-spki_status ReadNames(spki_engine* engine, spki_tuple* tuple, const spki_elem* name) {
+[[nodiscard]] spki_status ReadNames(spki_engine* engine, spki_tuple* tuple, const spki_elem* name) {
   VESK2_REQUIRE(StringOf(name) != nullptr, SPKI_ERR_SUBJECT_SYNTAX);
   uint32_t count = 0;
   for (const spki_elem* rest = name->next; rest != nullptr; rest = rest->next) {
@@ -82,7 +83,8 @@ spki_status ReadNames(spki_engine* engine, spki_tuple* tuple, const spki_elem* n
   return 0;
 }
 
-spki_status ReadNameSubject(spki_engine* engine, spki_tuple* tuple, const spki_elem* list) {
+[[nodiscard]] spki_status ReadNameSubject(spki_engine* engine, spki_tuple* tuple,
+                                          const spki_elem* list) {
   const spki_elem* first = list->next;
   if (spki_elem* key = ListOf(first)) {
     VESK2_TRY(spki_resolve_principal(engine, key, &tuple->subject));
@@ -93,7 +95,7 @@ spki_status ReadNameSubject(spki_engine* engine, spki_tuple* tuple, const spki_e
   return ReadNames(engine, tuple, first);
 }
 
-spki_status ReadSubject(spki_engine* engine, spki_tuple* tuple, spki_elem* list) {
+[[nodiscard]] spki_status ReadSubject(spki_engine* engine, spki_tuple* tuple, spki_elem* list) {
   VESK2_REQUIRE(tuple->subject_list == nullptr, SPKI_ERR_TOO_MANY_SUBJECTS);
   spki_elem_assign(engine, &tuple->subject_list, list);
   return spki_tuple_subject(engine, tuple, ListOf(list->next));
@@ -110,7 +112,7 @@ constexpr Field kFields[] = {
     {SPKI_KW_SUBJECT, ReadSubject},
 };
 
-spki_status ReadField(spki_engine* engine, spki_tuple* tuple, spki_elem* list) {
+[[nodiscard]] spki_status ReadField(spki_engine* engine, spki_tuple* tuple, spki_elem* list) {
   for (const Field& field : kFields) {
     if (HeadKeyword(list) == field.keyword) return field.read(engine, tuple, list);
   }

@@ -8,11 +8,12 @@ namespace ZvVesk2::Engine {
 
 // Reads every field of an (entry ...) or (cert ...) list. Principals that it names are entered in
 // the table. Stops at the first error.
-spki_status spki_tuple_fields(spki_engine* engine, spki_tuple* tuple, const spki_elem* credential,
-                              bool acl);
+[[nodiscard]] spki_status spki_tuple_fields(spki_engine* engine, spki_tuple* tuple,
+                                            const spki_elem* credential, bool acl);
 // Reads X of (subject X), or a member of a k-of-n subject. A name without a key is the issuer's. A
 // k-of-n subject leaves the tuple's subject null.
-spki_status spki_tuple_subject(spki_engine* engine, spki_tuple* tuple, spki_elem* list);
+[[nodiscard]] spki_status spki_tuple_subject(spki_engine* engine, spki_tuple* tuple,
+                                             spki_elem* list);
 
 }  // namespace ZvVesk2::Engine
 

@@ -10,9 +10,9 @@
 namespace ZvVesk2::Engine {
 namespace {
 
-spki_status Begin(spki_reduction* run, spki_work* work, spki_tuple** made);
+[[nodiscard]] spki_status Begin(spki_reduction* run, spki_work* work, spki_tuple** made);
 
-spki_status Push(spki_reduction* run, spki_tuple* tuple) {
+[[nodiscard]] spki_status Push(spki_reduction* run, spki_tuple* tuple) {
   spki_engine* engine = run->engine;
   VESK2_TRY(spki_charge(engine, &spki_budget::tuples, 1, Limits::kMaxTuples));
   auto* work = static_cast<spki_work*>(spki_allocate(engine, sizeof(spki_work)));
@@ -34,7 +34,7 @@ void Pop(spki_reduction* run) {
 }
 
 // One step of the insertion on top.
-spki_status Advance(spki_reduction* run) {
+[[nodiscard]] spki_status Advance(spki_reduction* run) {
   VESK2_TRY(run->engine->budget.spent);
   if (run->work->step == nullptr) {
     Pop(run);
@@ -47,7 +47,7 @@ spki_status Advance(spki_reduction* run) {
 }
 
 // This one first, with what its subject issued.
-spki_status Downward(spki_reduction* run, spki_work* work, spki_tuple** made) {
+[[nodiscard]] spki_status Downward(spki_reduction* run, spki_work* work, spki_tuple** made) {
   while (const spki_tuple* second = spki_next_tuple(run, work)) {
     if (!second->reaches) continue;
     VESK2_TRY(spki_tuple_combine(run->engine, work->tuple, second, made));
@@ -58,7 +58,7 @@ spki_status Downward(spki_reduction* run, spki_work* work, spki_tuple** made) {
 }
 
 // What the issuer received first, with this one.
-spki_status Upward(spki_reduction* run, spki_work* work, spki_tuple** made) {
+[[nodiscard]] spki_status Upward(spki_reduction* run, spki_work* work, spki_tuple** made) {
   while (const spki_tuple* first = spki_next_tuple(run, work)) {
     if (!first->propagate) continue;
     VESK2_TRY(spki_tuple_combine(run->engine, first, work->tuple, made));
@@ -70,7 +70,7 @@ spki_status Upward(spki_reduction* run, spki_work* work, spki_tuple** made) {
 }
 
 // A member of a threshold never goes upward: it would grant on its own what k of them must.
-spki_status Receive(spki_reduction* run, spki_work* work, spki_tuple** /*made*/) {
+[[nodiscard]] spki_status Receive(spki_reduction* run, spki_work* work, spki_tuple** /*made*/) {
   spki_tuple* tuple = work->tuple;
   VESK2_TRY(spki_tuple_push(run->engine, &tuple->subject->received, tuple));
   const bool upward = tuple->member <= 0 && tuple->issuer != nullptr && tuple->reaches;
@@ -79,7 +79,7 @@ spki_status Receive(spki_reduction* run, spki_work* work, spki_tuple** /*made*/)
   return 0;
 }
 
-spki_status Issue(spki_reduction* run, spki_work* work) {
+[[nodiscard]] spki_status Issue(spki_reduction* run, spki_work* work) {
   spki_tuple* tuple = work->tuple;
   spki_entry** list = tuple->issuer == nullptr ? &run->engine->acl_tuples : &tuple->issuer->issued;
   bool filed = false;
@@ -88,7 +88,7 @@ spki_status Issue(spki_reduction* run, spki_work* work) {
   return 0;
 }
 
-spki_status Begin(spki_reduction* run, spki_work* work, spki_tuple** made) {
+[[nodiscard]] spki_status Begin(spki_reduction* run, spki_work* work, spki_tuple** made) {
   const spki_tuple* tuple = work->tuple;
   if (tuple->subject == nullptr) return spki_threshold_expand(run, work);
   if (tuple->subject_name != nullptr) return spki_name_use(run, work);

@@ -2,7 +2,7 @@
 // known by number, and the pools that nodes are taken from and returned to.
 //
 // The engine never sees the object model. What crosses into it are canonical bytes
-// (src/engine/interface.h), and atoms point into those bytes: a buffer outlives every node made
+// (src/engine/interface), and atoms point into those bytes: a buffer outlives every node made
 // from it.
 //
 // Counting: a new record has one reference. Storing a record into a slot (spki_*_assign) takes a
@@ -114,7 +114,7 @@ struct spki_engine {
 // What spki_engine_start returns when the allocator yields nothing; the one positive failure.
 inline constexpr spki_status kSpkiNoPool = 16386;
 
-spki_status spki_engine_start(spki_engine* engine, const spki_allocator* allocator);
+[[nodiscard]] spki_status spki_engine_start(spki_engine* engine, const spki_allocator* allocator);
 void spki_engine_stop(spki_engine* engine, const spki_allocator* allocator);
 
 // Allocation from the engine's pool, counted against the budget of live records; null when there is
@@ -213,12 +213,12 @@ struct spki_input {
   const unsigned char* end;
 };
 
-spki_status spki_parse_list(spki_engine* engine, spki_elem** slot, spki_input* input);
-spki_status spki_parse_atom(spki_engine* engine, spki_atom** slot, spki_input* input);
-spki_status spki_parse_length(uint32_t* length, spki_input* input);
+[[nodiscard]] spki_status spki_parse_list(spki_engine* engine, spki_elem** slot, spki_input* input);
+[[nodiscard]] spki_status spki_parse_atom(spki_engine* engine, spki_atom** slot, spki_input* input);
+[[nodiscard]] spki_status spki_parse_length(uint32_t* length, spki_input* input);
 
 // Folds a crypto result into an engine code; every unlisted value is success, deliberately.
-spki_status spki_map_crypto_status(int status);
+[[nodiscard]] spki_status spki_map_crypto_status(int status);
 
 }  // namespace ZvVesk2::Engine
 

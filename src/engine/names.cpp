@@ -12,8 +12,8 @@ namespace {
 
 // The use with its first name replaced by what the definition says; none when they are never valid
 // together.
-spki_status Resolve(spki_engine* engine, const spki_tuple* use, const spki_tuple* definition,
-                    spki_tuple** made) {
+[[nodiscard]] spki_status Resolve(spki_engine* engine, const spki_tuple* use,
+                                  const spki_tuple* definition, spki_tuple** made) {
   VESK2_TRY(spki_charge_combination(engine));
   spki_tuple_owner copy = Own(engine, spki_tuple_copy(engine, use));
   VESK2_REQUIRE(copy != nullptr, SPKI_ERR_NO_MEM);
@@ -30,7 +30,7 @@ spki_status Resolve(spki_engine* engine, const spki_tuple* use, const spki_tuple
   return engine->budget.spent;
 }
 
-spki_status ResolveUses(spki_reduction* run, spki_work* work, spki_tuple** made) {
+[[nodiscard]] spki_status ResolveUses(spki_reduction* run, spki_work* work, spki_tuple** made) {
   while (const spki_tuple* use = spki_next_tuple(run, work)) {
     VESK2_TRY(Resolve(run->engine, use, work->tuple, made));
     if (*made != nullptr) return 0;
@@ -39,7 +39,8 @@ spki_status ResolveUses(spki_reduction* run, spki_work* work, spki_tuple** made)
   return 0;
 }
 
-spki_status ResolveDefinitions(spki_reduction* run, spki_work* work, spki_tuple** made) {
+[[nodiscard]] spki_status ResolveDefinitions(spki_reduction* run, spki_work* work,
+                                             spki_tuple** made) {
   while (const spki_tuple* definition = spki_next_tuple(run, work)) {
     VESK2_TRY(Resolve(run->engine, work->tuple, definition, made));
     if (*made != nullptr) return 0;
@@ -49,8 +50,8 @@ spki_status ResolveDefinitions(spki_reduction* run, spki_work* work, spki_tuple*
 }
 
 // What is listed under a name in a table; null for nothing.
-spki_status ListedUnder(spki_engine* engine, const spki_table& table, const Digest& name,
-                        spki_entry** list) {
+[[nodiscard]] spki_status ListedUnder(spki_engine* engine, const spki_table& table,
+                                      const Digest& name, spki_entry** list) {
   spki_node* node = nullptr;
   VESK2_TRY(spki_table_find(engine, table, name, &node));
   *list = node == nullptr ? nullptr : node->tuples;

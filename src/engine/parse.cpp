@@ -33,7 +33,7 @@ size_t Remaining(const spki_input* input) {
 }
 
 // At a "[".
-spki_status ParseHint(spki_atom* atom, spki_input* input) {
+[[nodiscard]] spki_status ParseHint(spki_atom* atom, spki_input* input) {
   ++input->position;
   VESK2_TRY(spki_parse_length(&atom->hint_length, input));
   atom->hint = input->position;
@@ -46,7 +46,7 @@ spki_status ParseHint(spki_atom* atom, spki_input* input) {
   return closed ? 0 : SPKI_ERR_DISP_HINT_NOT_CLOSED;
 }
 
-spki_status ParseString(spki_atom* atom, spki_input* input) {
+[[nodiscard]] spki_status ParseString(spki_atom* atom, spki_input* input) {
   VESK2_TRY(spki_parse_length(&atom->length, input));
   VESK2_REQUIRE(atom->length <= Remaining(input), SPKI_ERR_STRING_TOO_LONG);
   atom->data = input->position;
@@ -54,7 +54,7 @@ spki_status ParseString(spki_atom* atom, spki_input* input) {
   return 0;
 }
 
-spki_status ParseHead(spki_engine* engine, spki_elem* head, spki_input* input) {
+[[nodiscard]] spki_status ParseHead(spki_engine* engine, spki_elem* head, spki_input* input) {
   spki_atom* slot = nullptr;
   VESK2_TRY(spki_parse_atom(engine, &slot, input));
   const spki_atom_owner atom = Own(engine, slot);
@@ -68,10 +68,12 @@ spki_status ParseHead(spki_engine* engine, spki_elem* head, spki_input* input) {
   return 0;
 }
 
-spki_status ParseList(spki_engine* engine, spki_elem** slot, spki_input* input, unsigned depth);
+[[nodiscard]] spki_status ParseList(spki_engine* engine, spki_elem** slot, spki_input* input,
+                                    unsigned depth);
 
 // One element behind the head, at the byte that decides what it is.
-spki_status ParseElement(spki_engine* engine, spki_elem* elem, spki_input* input, unsigned depth) {
+[[nodiscard]] spki_status ParseElement(spki_engine* engine, spki_elem* elem, spki_input* input,
+                                       unsigned depth) {
   const int next = Peek(input);
   if (next == '(') {
     elem->kind = SPKI_ELEM_LIST;
@@ -82,7 +84,8 @@ spki_status ParseElement(spki_engine* engine, spki_elem* elem, spki_input* input
   return spki_parse_atom(engine, &elem->value.atom, input);
 }
 
-spki_status ParseList(spki_engine* engine, spki_elem** slot, spki_input* input, unsigned depth) {
+[[nodiscard]] spki_status ParseList(spki_engine* engine, spki_elem** slot, spki_input* input,
+                                    unsigned depth) {
   VESK2_REQUIRE(depth <= Limits::kMaxDepth, SPKI_ERR_BAD_SEXP);
   const unsigned char* start = input->position;
   VESK2_REQUIRE(Next(input) == '(', SPKI_ERR_BAD_SEXP_START);

@@ -40,7 +40,7 @@ void Free(void* memory, void* pool) {
   allocator->release(header, allocator->user);
 }
 
-spki_status Create(void* record, const spki_allocator* allocator, void** pool) {
+[[nodiscard]] spki_status Create(void* record, const spki_allocator* allocator, void** pool) {
   // Callers' allocators are their own; a record that a pool cannot live in is refused.
   if (reinterpret_cast<uintptr_t>(record) % alignof(spki_pool) != 0) return SPKI_ERR_NO_MEM;
   auto* self = new (record) spki_pool{{nullptr, nullptr}, allocator};

@@ -19,7 +19,7 @@ namespace {
 constexpr size_t kSha1Size = 20;
 
 // A new principal, known by `node`.
-spki_status NewPrincipal(spki_engine* engine, spki_node* node, spki_elem* key) {
+[[nodiscard]] spki_status NewPrincipal(spki_engine* engine, spki_node* node, spki_elem* key) {
   auto* principal = static_cast<spki_principal*>(spki_allocate(engine, sizeof(spki_principal)));
   VESK2_REQUIRE(principal != nullptr, SPKI_ERR_NO_MEM);
   *principal = {};
@@ -32,8 +32,8 @@ spki_status NewPrincipal(spki_engine* engine, spki_node* node, spki_elem* key) {
 }
 
 // The principal of a digest, made for `list` when there is none.
-spki_status FindPrincipal(spki_engine* engine, const Digest& digest, spki_elem* list,
-                          spki_principal** slot) {
+[[nodiscard]] spki_status FindPrincipal(spki_engine* engine, const Digest& digest, spki_elem* list,
+                                        spki_principal** slot) {
   spki_node* node = nullptr;
   bool made = false;
   VESK2_TRY(spki_table_enter(engine, &engine->principals, digest, &node, &made));
@@ -44,7 +44,7 @@ spki_status FindPrincipal(spki_engine* engine, const Digest& digest, spki_elem* 
 
 // Where another principal stands already, it stays: it was registered later, and the last one
 // counts.
-spki_status EnterBySha1(spki_engine* engine, spki_principal* principal) {
+[[nodiscard]] spki_status EnterBySha1(spki_engine* engine, spki_principal* principal) {
   spki_digest_sink sink;
   Digest digest;
   VESK2_TRY(spki_digest_start(engine, &sink.digest, ZVCLM_HASH_SHA1));
@@ -59,7 +59,7 @@ spki_status EnterBySha1(spki_engine* engine, spki_principal* principal) {
 
 // Enters every key by its SHA-1 too, once a credential may name one so; few ever do. All keys are
 // registered by then.
-spki_status EnterKeysBySha1(spki_engine* engine) {
+[[nodiscard]] spki_status EnterKeysBySha1(spki_engine* engine) {
   if (engine->keys_by_sha1) return 0;
   engine->keys_by_sha1 = true;
   for (spki_principal* key = engine->newest; key != nullptr; key = key->older) {
@@ -75,7 +75,7 @@ bool MayBeSha1(const Digest& digest) {
 }
 
 // The digest that (hash <algorithm> <value>) holds, zero-padded.
-spki_status ReadHash(const spki_elem* hash, Digest& digest) {
+[[nodiscard]] spki_status ReadHash(const spki_elem* hash, Digest& digest) {
   VESK2_REQUIRE(HeadKeyword(hash) == SPKI_KW_HASH, SPKI_ERR_NOT_HASH_SEXP);
   const spki_atom* algorithm = StringOf(hash->next);
   VESK2_REQUIRE(algorithm != nullptr && algorithm->keyword >= 1, SPKI_ERR_UNKNOWN_HASH_ALG);

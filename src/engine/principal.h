@@ -20,13 +20,16 @@ struct spki_principal {
 
 // Registers every (public-key ...) list at any depth, the list itself included. All lists come
 // before the first principal of a hash.
-spki_status spki_register_keys(spki_engine* engine, spki_elem* list);
+[[nodiscard]] spki_status spki_register_keys(spki_engine* engine, spki_elem* list);
 
 // Each finds the principal of a list, or enters a new one in the table. `*slot` is borrowed.
-spki_status spki_principal_of_key(spki_engine* engine, spki_elem* key, spki_principal** slot);
-spki_status spki_principal_of_hash(spki_engine* engine, spki_elem* hash, spki_principal** slot);
+[[nodiscard]] spki_status spki_principal_of_key(spki_engine* engine, spki_elem* key,
+                                                spki_principal** slot);
+[[nodiscard]] spki_status spki_principal_of_hash(spki_engine* engine, spki_elem* hash,
+                                                 spki_principal** slot);
 // By the list's head; SPKI_ERR_KEY_OR_HASH_EXPECTED for any other.
-spki_status spki_resolve_principal(spki_engine* engine, spki_elem* list, spki_principal** slot);
+[[nodiscard]] spki_status spki_resolve_principal(spki_engine* engine, spki_elem* list,
+                                                 spki_principal** slot);
 
 // Releases all principals, what they issued and received, and the table.
 void spki_principals_clear(spki_engine* engine);

@@ -36,7 +36,8 @@ bool ApplyRequest(spki_reduction* run, spki_tuple* tuple) {
   return true;
 }
 
-spki_status spki_credential_to_tuple(spki_reduction* run, const spki_elem* credential) {
+[[nodiscard]] spki_status spki_credential_to_tuple(spki_reduction* run,
+                                                   const spki_elem* credential) {
   spki_engine* engine = run->engine;
   VESK2_REQUIRE(credential != nullptr, SPKI_ERR_NULL_PARAM);
   const spki_tuple_owner tuple = Own(engine, spki_tuple_new(engine));
@@ -58,7 +59,8 @@ spki_status spki_credential_to_tuple(spki_reduction* run, const spki_elem* crede
   return spki_tuple_insert(run, tuple.get());
 }
 
-spki_status spki_walk_credentials(spki_reduction* run, const spki_elem* chain, const Kind& kind) {
+[[nodiscard]] spki_status spki_walk_credentials(spki_reduction* run, const spki_elem* chain,
+                                                const Kind& kind) {
   for (const spki_elem* elem = chain; elem != nullptr; elem = elem->next) {
     const spki_elem* list = ListOf(elem);
     const int32_t keyword = HeadKeyword(list);

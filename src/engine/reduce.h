@@ -13,8 +13,9 @@ namespace ZvVesk2::Engine {
 // release. Entries in `sequence` and certificates in `acl` are ignored: an (entry ...) in an
 // untrusted sequence would be a trust root. Everything that the tables held is released before it
 // returns.
-spki_status spki_reduce(spki_engine* engine, spki_elem* acl, spki_elem* sequence, spki_elem* third,
-                        spki_elem* requestedTag, spki_elem* fifth, spki_elem** result);
+[[nodiscard]] spki_status spki_reduce(spki_engine* engine, spki_elem* acl, spki_elem* sequence,
+                                      spki_elem* third, spki_elem* requestedTag, spki_elem* fifth,
+                                      spki_elem** result);
 
 }  // namespace ZvVesk2::Engine
 

@@ -52,27 +52,27 @@ struct spki_reduction {
 const spki_tuple* spki_next_tuple(spki_reduction* run, spki_work* work);
 
 // Inserts the tuple of a credential and all that follow from it.
-spki_status spki_tuple_insert(spki_reduction* run, spki_tuple* tuple);
+[[nodiscard]] spki_status spki_tuple_insert(spki_reduction* run, spki_tuple* tuple);
 // Marks a tuple that no other was derived from, when its subject is the requester. Without a
 // requester every such tuple is.
 void spki_mark_reach(const spki_reduction* run, spki_tuple* tuple);
 
 // Beginnings of insertions, by what the tuple's subject is; each sets work->step.
 // A k-of-n subject: one member tuple for each of its subjects.
-spki_status spki_threshold_expand(spki_reduction* run, spki_work* work);
+[[nodiscard]] spki_status spki_threshold_expand(spki_reduction* run, spki_work* work);
 // A member tuple that has got to a principal. Makes what the threshold then grants to it, and goes
 // on with `next` unless the tuple was collected before.
-spki_status spki_threshold_collect(spki_reduction* run, spki_work* work, spki_step next,
-                                   spki_tuple** made);
+[[nodiscard]] spki_status spki_threshold_collect(spki_reduction* run, spki_work* work,
+                                                 spki_step next, spki_tuple** made);
 // A definition of a name, (issuer (name K N)), and a subject that is one.
-spki_status spki_name_define(spki_reduction* run, spki_work* work);
-spki_status spki_name_use(spki_reduction* run, spki_work* work);
+[[nodiscard]] spki_status spki_name_define(spki_reduction* run, spki_work* work);
+[[nodiscard]] spki_status spki_name_use(spki_reduction* run, spki_work* work);
 
 // Releases what an unfinished insertion, and what waits for it, holds; and every threshold.
 void spki_work_clear(spki_reduction* run);
 void spki_thresholds_clear(spki_reduction* run);
 // Builds the list (acl (entry ...) ...) of what reaches the requester.
-spki_status spki_emit_entries(spki_engine* engine, spki_elem** result);
+[[nodiscard]] spki_status spki_emit_entries(spki_engine* engine, spki_elem** result);
 
 }  // namespace ZvVesk2::Engine
 

@@ -52,8 +52,8 @@ spki_node* NewNode(spki_engine* engine, spki_table* table, const Digest& digest)
 }
 
 // Hangs a new node into the way of its digest, above `nearest`, which shares most of its bits.
-spki_status Hang(spki_engine* engine, spki_table* table, spki_node* node,
-                 const spki_node* nearest) {
+[[nodiscard]] spki_status Hang(spki_engine* engine, spki_table* table, spki_node* node,
+                               const spki_node* nearest) {
   node->bit = FirstDifference(node->digest, nearest->digest);
   spki_node* end = nullptr;
   spki_node* above = Descend(engine, table->first, node->digest, node->bit, &end);

@@ -82,7 +82,8 @@ spki_elem* spki_elem_max(spki_engine* engine, spki_elem* a, spki_elem* b);
 spki_elem* spki_elem_min(spki_engine* engine, spki_elem* a, spki_elem* b);
 
 // Parses a fixed canonical text into a slot; the list's heads carry no `text`.
-spki_status spki_parse_template(spki_engine* engine, spki_elem** slot, const char* text);
+[[nodiscard]] spki_status spki_parse_template(spki_engine* engine, spki_elem** slot,
+                                              const char* text);
 
 }  // namespace ZvVesk2::Engine
 

@@ -40,8 +40,8 @@ const spki_elem* ThresholdList(const spki_elem* subject) {
   return HeadKeyword(subject) == SPKI_KW_SUBJECT ? ListOf(subject->next) : subject;
 }
 
-spki_status NewThreshold(spki_reduction* run, const spki_tuple* carrier, uint32_t k, uint32_t n,
-                         spki_threshold** slot) {
+[[nodiscard]] spki_status NewThreshold(spki_reduction* run, const spki_tuple* carrier, uint32_t k,
+                                       uint32_t n, spki_threshold** slot) {
   spki_engine* engine = run->engine;
   auto* threshold = static_cast<spki_threshold*>(spki_allocate(engine, sizeof(spki_threshold)));
   VESK2_REQUIRE(threshold != nullptr, SPKI_ERR_NO_MEM);
@@ -57,7 +57,7 @@ spki_status NewThreshold(spki_reduction* run, const spki_tuple* carrier, uint32_
 }
 
 // The tuple of the next subject.
-spki_status NextMember(spki_reduction* run, spki_work* work, spki_tuple** made) {
+[[nodiscard]] spki_status NextMember(spki_reduction* run, spki_work* work, spki_tuple** made) {
   if (work->member == nullptr) {
     work->step = nullptr;
     return 0;

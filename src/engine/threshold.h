@@ -21,8 +21,9 @@ struct spki_threshold {
 
 // Searches k positions with a tuple to the subject of `arriving`, its own among them, that agree on
 // a tag and a period. *made is what the threshold then grants to that subject; null for none.
-spki_status spki_threshold_search(spki_engine* engine, const spki_threshold* threshold,
-                                  const spki_tuple* arriving, spki_tuple** made);
+[[nodiscard]] spki_status spki_threshold_search(spki_engine* engine,
+                                                const spki_threshold* threshold,
+                                                const spki_tuple* arriving, spki_tuple** made);
 
 }  // namespace ZvVesk2::Engine
 

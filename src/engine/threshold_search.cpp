@@ -27,14 +27,14 @@ class Search {
   ~Search();
 
   // Finds the candidates: for each position with a tuple to the subject, the first of them.
-  spki_status Prepare();
-  spki_status Run(spki_tuple** made);
+  [[nodiscard]] spki_status Prepare();
+  [[nodiscard]] spki_status Run(spki_tuple** made);
 
  private:
   const spki_entry* Fitting(const spki_entry* entry);
   void Start(uint32_t depth);
   bool Move(uint32_t depth);
-  spki_status Join(uint32_t depth, bool* agree);
+  [[nodiscard]] spki_status Join(uint32_t depth, bool* agree);
   void Drop(uint32_t depth);
 
   spki_engine* engine_;

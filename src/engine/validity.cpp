@@ -29,9 +29,11 @@ bool IsEmpty(spki_engine* engine, const spki_tuple* tuple) {
          spki_atom_later(engine, tuple->not_before, tuple->not_after);
 }
 
-spki_status Apply(spki_engine* engine, spki_tuple* tuple, const spki_elem* constraint);
+[[nodiscard]] spki_status Apply(spki_engine* engine, spki_tuple* tuple,
+                                const spki_elem* constraint);
 
-spki_status ApplyParts(spki_engine* engine, spki_tuple* tuple, const spki_elem* part) {
+[[nodiscard]] spki_status ApplyParts(spki_engine* engine, spki_tuple* tuple,
+                                     const spki_elem* part) {
   for (; part != nullptr; part = part->next) {
     VESK2_TRY(spki_charge_step(engine));
     if (const spki_elem* nested = ListOf(part)) VESK2_TRY(Apply(engine, tuple, nested));
@@ -41,7 +43,8 @@ spki_status ApplyParts(spki_engine* engine, spki_tuple* tuple, const spki_elem* 
   return 0;
 }
 
-spki_status Apply(spki_engine* engine, spki_tuple* tuple, const spki_elem* constraint) {
+[[nodiscard]] spki_status Apply(spki_engine* engine, spki_tuple* tuple,
+                                const spki_elem* constraint) {
   const int32_t keyword = HeadKeyword(constraint);
   if (keyword == SPKI_KW_VALID) return ApplyParts(engine, tuple, constraint->next);
   if (keyword != SPKI_KW_NOT_BEFORE && keyword != SPKI_KW_NOT_AFTER) return 0;

@@ -14,12 +14,12 @@ bool spki_validity_meet(spki_engine* engine, spki_tuple* tuple, const spki_tuple
 // Narrows a tuple by a constraint: (not-before d), (not-after d), or a (valid ...) of those and of
 // bare strings, each an instant that must lie in the period. SPKI_ERR_DATE_INTERSECTION when
 // nothing is left.
-spki_status spki_validity_narrow(spki_engine* engine, spki_tuple* tuple,
-                                 const spki_elem* constraint);
+[[nodiscard]] spki_status spki_validity_narrow(spki_engine* engine, spki_tuple* tuple,
+                                               const spki_elem* constraint);
 
 // The date of a (not-before d) or (not-after d), borrowed. A list without one is SPKI_ERR_BAD_SEXP:
 // a bound that was meant must not be read as no bound.
-spki_status spki_validity_date(const spki_elem* list, spki_atom** date);
+[[nodiscard]] spki_status spki_validity_date(const spki_elem* list, spki_atom** date);
 
 }  // namespace ZvVesk2::Engine
 

@@ -10,7 +10,7 @@
 namespace ZvVesk2::Engine {
 namespace {
 
-spki_status DigestChain(spki_engine* engine, const spki_elem* chain, Digest& out) {
+[[nodiscard]] spki_status DigestChain(spki_engine* engine, const spki_elem* chain, Digest& out) {
   spki_digest_sink sink;
   VESK2_TRY(spki_digest_start(engine, &sink.digest, ZVCLM_HASH_SHA256));
   VESK2_TRY(spki_write_pieces(chain, &sink));
@@ -18,10 +18,10 @@ spki_status DigestChain(spki_engine* engine, const spki_elem* chain, Digest& out
 }
 
 // Says what stands where: neither a string nor a value begins with the mark of an absent one.
-spki_status PutAtom(const spki_atom* atom, spki_sink* sink) {
+[[nodiscard]] spki_status PutAtom(const spki_atom* atom, spki_sink* sink) {
   return atom == nullptr ? sink->Put("-", 1) : spki_write_atom(atom, sink);
 }
-spki_status PutChain(spki_engine* engine, spki_elem* chain, spki_sink* sink) {
+[[nodiscard]] spki_status PutChain(spki_engine* engine, spki_elem* chain, spki_sink* sink) {
   if (chain == nullptr) return sink->Put("-", 1);
   Digest value;
   VESK2_TRY(spki_chain_value(engine, chain, value));

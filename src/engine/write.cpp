@@ -14,7 +14,7 @@ namespace ZvVesk2::Engine {
 namespace {
 
 // Length, colon and bytes.
-spki_status PutString(const void* data, uint32_t length, spki_sink* sink) {
+[[nodiscard]] spki_status PutString(const void* data, uint32_t length, spki_sink* sink) {
   char prefix[16];
   char* end = std::to_chars(prefix, prefix + sizeof prefix, length).ptr;
   *end++ = ':';
@@ -22,7 +22,7 @@ spki_status PutString(const void* data, uint32_t length, spki_sink* sink) {
   return data == nullptr || length == 0 ? 0 : sink->Put(data, length);
 }
 
-spki_status PutElem(const spki_elem* elem, spki_sink* sink) {
+[[nodiscard]] spki_status PutElem(const spki_elem* elem, spki_sink* sink) {
   switch (elem->kind) {
     case SPKI_ELEM_KEYWORD: {
       const spki_keyword_entry* row = spki_keyword_row(elem->value.keyword);

@@ -10,7 +10,7 @@ namespace ZvVesk2::Engine {
 
 // Takes one piece; empty pieces are never given. The first failure ends the walk.
 struct spki_sink {
-  virtual spki_status Put(const void* data, size_t length) = 0;
+  [[nodiscard]] virtual spki_status Put(const void* data, size_t length) = 0;
 
  protected:
   ~spki_sink() = default;
@@ -20,14 +20,14 @@ struct spki_sink {
 struct spki_digest_sink final : spki_sink {
   spki_digest digest;
 
-  spki_status Put(const void* data, size_t length) override {
+  [[nodiscard]] spki_status Put(const void* data, size_t length) override {
     return spki_digest_update(&digest, data, length);
   }
 };
 
-spki_status spki_write_pieces(const spki_elem* chain, spki_sink* sink);
+[[nodiscard]] spki_status spki_write_pieces(const spki_elem* chain, spki_sink* sink);
 // One byte string with its display hint, as it stands in a list.
-spki_status spki_write_atom(const spki_atom* atom, spki_sink* sink);
+[[nodiscard]] spki_status spki_write_atom(const spki_atom* atom, spki_sink* sink);
 
 }  // namespace ZvVesk2::Engine
 

@@ -13,7 +13,7 @@ namespace ZvVesk2::Engine {
 
 // Starts an engine on the library's own allocator, with the context's crypto handle (0 without a
 // context).
-spki_status spki_call_start(spki_engine* engine, const Vesk2ContextStruct* ctx);
+[[nodiscard]] spki_status spki_call_start(spki_engine* engine, const Vesk2ContextStruct* ctx);
 // Stops it.
 void spki_call_stop(spki_engine* engine);
 // Exports an object and parses it. The list in the slot owns the exported bytes: end it with

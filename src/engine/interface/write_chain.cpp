@@ -13,7 +13,7 @@ namespace {
 struct LengthSink final : spki_sink {
   uint64_t length = 0;
 
-  spki_status Put(const void* /*data*/, size_t size) override {
+  [[nodiscard]] spki_status Put(const void* /*data*/, size_t size) override {
     length += size;
     return length > Limits::kMaxResult ? SPKI_ERR_NO_MEM : 0;
   }
@@ -23,7 +23,7 @@ struct MemorySink final : spki_sink {
   unsigned char* cursor;
 
   explicit MemorySink(unsigned char* start) : cursor(start) {}
-  spki_status Put(const void* data, size_t size) override {
+  [[nodiscard]] spki_status Put(const void* data, size_t size) override {
     std::memcpy(cursor, data, size);
     cursor += size;
     return 0;
