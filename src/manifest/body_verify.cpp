@@ -53,8 +53,8 @@ class DiskCheck {
   [[nodiscard]] int Directory(BodyDirectory& directory, unsigned depth, StatusSet& statuses) {
     VESK2_TRY(Files(directory, statuses));
     VESK2_TRY(Subdirectories(directory, depth, statuses));
-    // The root may hold more than the manifest lists (the manifest itself, for one): callers rely
-    // on its not being searched.
+    // The root is not searched: it may hold more than the manifest lists, the manifest itself for
+    // one.
     if (depth == 0) return 0;
     return Unlisted(directory, statuses);
   }
@@ -143,7 +143,7 @@ int DiskCheck::Unlisted(BodyDirectory& directory, StatusSet& statuses) {
     ZvDir disk;
     const int code = disk.open(directory.GetName(), "*");
     VESK2_REQUIRE(code != VESK2_ERR_MEM_ALLOC, code);
-    // The parent records it once more: callers see such a directory twice.
+    // The parent records it once more: such a directory stands twice in the list.
     if (code != 0) {
       statuses.reason = code;
       return findings_.AddDirectory(directory.GetName(), BodyObject::Invalid, statuses, code);

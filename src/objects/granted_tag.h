@@ -12,8 +12,8 @@ namespace ZvVesk2 {
 //   (3:acl(5:entry SUBJECT [(9:propagate)] TAG ...)...)
 //
 // The reduction writes no version; where there is one it is taken for the subject and the subject
-// for the tag, and callers rely on that form only. VESK2_ERR_INVALID_PARAM for null or no bytes and
-// for an `out` that is not null, else the code of the reader that stopped.
+// for the tag. VESK2_ERR_INVALID_PARAM for null or no bytes and for an `out` that is not null, else
+// the code of the reader that stopped.
 [[nodiscard]] int ReadGrantedTag(SExpression*& out, unsigned char* data, unsigned int length,
                                  Vesk2ContextStruct* ctx);
 

@@ -139,8 +139,8 @@ long TimeStamp::DayBegin(long seconds) {
   return ToSeconds(fields);
 }
 
-// A missing stamp answers no to every question, "or equal" included: callers test for absence first
-// and rely on no answer making a period longer.
+// A missing stamp answers no to every question, "or equal" included: no answer about what is absent
+// may make a period longer.
 bool TimeStamp::IsBefore(const TimeStamp* other) const {
   return other != nullptr && Compare(*this, *other) < 0;
 }

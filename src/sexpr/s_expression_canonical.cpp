@@ -24,7 +24,7 @@ char Parenthesis(Step step) { return step == Step::Open ? '(' : ')'; }
   for (Step step = walk.Next(); step != Step::End; step = walk.Next()) {
     VESK2_REQUIRE(step != Step::TooDeep, VESK2_ERR_BUFFER_OVERFLOW);
     if (step == Step::Atom) {
-      // What does not fit is left out; only parentheses report it, and callers rely on that.
+      // A string that does not fit is left out; only parentheses report a lack of room.
       (void)walk.Value()->Export(buf, pos, size);
       continue;
     }

@@ -3,8 +3,8 @@
 //   "(" <byte string> { <white space> ( <byte string> | <list> ) } <white space> ")"
 //
 // with white space also before the "(". The first element is always read as a byte string: a "(" in
-// its place is taken for the separator of an empty one. An empty list ends before its ")". Stored
-// texts rely on both.
+// its place is taken for the separator of an empty one. An empty list ends before its ")".
+// Both are kept because texts in stores read so.
 #include <vesk2/expression.h>
 #include <vesk2/ref.h>
 

@@ -42,8 +42,8 @@ bool IsGrantee(AclEntry* entry, Principal* principal) {
 }
 
 // Whether an entry holds at `from` (may be null: not asked) and now. The two look-ups differ at the
-// very ends of the period, and callers rely on both forms: here an entry has ended at its
-// not-after, and not begun at its not-before when that is now. Both ends are compared with the
+// very ends of the period, and keep to what each has always answered: here an entry has ended at
+// its not-after, and not begun at its not-before when that is now. Both ends are compared with the
 // start of the caller's period; its end plays no part.
 bool HoldsStrictly(const AclEntry* entry, const TimeStamp* from, const TimeStamp* now) {
   const TimeStamp* const begin = entry->GetNotBefore();

@@ -90,7 +90,7 @@ using StoredTags = TagIndex<Nothing>;
 }  // namespace
 
 int AclEntry::InstallAcls(const char* dir, Vesk2ContextStruct* ctx) {
-  // What could be installed is, and nothing else is reported: callers rely on the plain success.
+  // What can be installed is; an entry that cannot is no failure of the call.
   static_cast<void>(InstallAll(dir, ctx));
   return 0;
 }

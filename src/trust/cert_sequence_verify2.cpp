@@ -85,8 +85,8 @@ int CertSequence::VerifySignatures2(SExpression* goodCerts, SExpression* goodExt
     VESK2_TRY(ReadLink(link, at));
     const int code = VerifyLink(link);
     VESK2_REQUIRE(!LacksMemory(code), VESK2_ERR_MEM_ALLOC);
-    // After a failure the extra item is taken for the next certificate. Callers rely on where the
-    // walk goes on, and on its end: a sequence that it leaves in the middle of a triple is refused.
+    // After a failure the extra item is taken for the next certificate: what follows is counted
+    // from there, and a sequence that ends in the middle of a triple is refused.
     if (code != 0) continue;
     VESK2_TRY(AppendShared(goodCerts, link.cert));
     VESK2_TRY(AppendShared(goodExtras, link.extra));

@@ -132,7 +132,7 @@ int RevocationLists::AskNonCritical(SExpression* tag, SExpression* object,
   const ItemIndex::Item* item = nullptr;
   VESK2_TRY(answers->items.Find(item, object));
   if (item != nullptr && Counts(*item, notBefore)) return VESK2_ERR_CERT_REVOKED;
-  // Where some list covers the period, the latest end lies after its start.
+  // Some list was current in the period if the latest end is not before the period's start.
   VESK2_REQUIRE(answers->latest != nullptr, VESK2_ERR_CRL_NOT_FOUND);
   return notBefore != nullptr && answers->latest->IsBefore(notBefore) ? VESK2_ERR_NOT_AFTER : 0;
 }

@@ -133,7 +133,7 @@ int Vesk2CrlVerify(Vesk2CrlInfoStruct* record, const char* tagText, time_t from,
   VESK2_TRY(AclEntry::Import(acls.Out(), record->crl->GetContext(), nullptr));
   VESK2_TRY(InOwnWords(record->crl->VerifySelf(acls.get())));
   if (from == 0 || to == 0) return 0;
-  // The names of the two codes are crossed; callers know them so.
+  // Each code is named for the bound that was asked about and is missed.
   VESK2_REQUIRE(record->notBefore <= to, VESK2_ERR_NOT_AFTER);
   VESK2_REQUIRE(record->notAfter >= from, VESK2_ERR_NOT_BEFORE);
   return 0;
