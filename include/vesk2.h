@@ -6,8 +6,7 @@
  *
  * Conventions
  *   - Functions return an int: 0 is success, a positive value is a VESK2_ERR_* code, a negative one
- *     an SPKI_ERR_* code of the reduction engine (Vesk2CertVerify, VerifyManifest and their kin
- * only).
+ *     an SPKI_ERR_* code of the reduction engine, from the functions that verify a chain only.
  *   - Times are seconds since 1970-01-01 00:00:00 UTC; 0 means "not given". Lengths are bytes.
  *   - Text is 0-terminated bytes. A function whose name ends in A takes 8-bit ASCII text where its
  *     base function takes the platform's file-name string; on Linux both are bytes.
@@ -27,11 +26,14 @@
 
 #if defined(__GNUC__)
 #define VESK2_API __attribute__((visibility("default")))
+/* What belongs to an exported class and is not for callers. */
+#define VESK2_LOCAL __attribute__((visibility("hidden")))
 /* The result is the answer that the call was made for: a program that drops it trusts whatever it
  * asked about. Compilers warn of that; a cast to void does not silence all of them. */
 #define VESK2_VERDICT VESK2_API __attribute__((warn_unused_result))
 #else
 #define VESK2_API
+#define VESK2_LOCAL
 #define VESK2_VERDICT
 #endif
 
@@ -39,7 +41,7 @@
 
 /* One row a code: number, constant, the text that Vesk2ErrorMessage returns. 0 and 1 have no
  * constant of their own in the list of failures. Code 67's text is a sentence, and 41 and 42 are
- * spelled ERROR: callers and their logs rely on both. */
+ * spelled ERROR: what searches logs for these texts finds them so. */
 #define VESK2_ERROR_TABLE(X)                                                  \
   X(0, VESK2_SUCCESS, "Success")                                              \
   X(1, VESK2_GENERAL_FAILURE, "Failure")                                      \
@@ -346,10 +348,11 @@ VESK2_API int SetFileCallbacks(Manifest* manifest, const Vesk2FileCallbacks* cal
  * verification all the same. */
 VESK2_API void SetStoreUpdate(Manifest* manifest, int update);
 
-/* VerifyManifest proves the manifest's signatures, that its chain grants the tag within the period
- * from `notBefore` to `notAfter` (the periods must meet; both times 0: at the moment of signing),
- * that the body is the one that was signed, and compares the directory with it. Unlisted entries
- * are looked for below the root only, not in `directory` itself. Fills the four result lists.
+/* VerifyManifest proves the manifest's signatures, that its chain grants the tag for a period that
+ * meets the one from `notBefore` to `notAfter` (both times 0: that grants it at the moment of
+ * signing), that the body is the one that was signed, and compares the directory with it. Unlisted
+ * entries are looked for below the root only, not in `directory` itself. Fills the four result
+ * lists.
  *
  * About the tree, told by the lists (with four empty lists none of these is about the tree):
  *   0                             the directory is as signed, by an authorized signer

@@ -97,27 +97,27 @@ class VESK2_API AclEntry : public SExpression {
   [[nodiscard]] static int InstallAcls(const char* dir, Vesk2ContextStruct* ctx);
 
   // The parts, borrowed; null, false or 0 when absent.
-  SExpression* GetVersion() const { return version; }
-  Subject* GetSubject() const { return subject; }
-  bool GetPropagate() const { return propagate; }
-  SExpression* GetTag() const { return tag; }
-  TimeStamp* GetNotBefore() const { return notBefore; }
-  TimeStamp* GetNotAfter() const { return notAfter; }
-  unsigned int GetGeneration() const { return generation; }
-  ByteString* GetComment() const { return comment; }
+  SExpression* GetVersion() const;
+  Subject* GetSubject() const;
+  bool GetPropagate() const;
+  SExpression* GetTag() const;
+  TimeStamp* GetNotBefore() const;
+  TimeStamp* GetNotAfter() const;
+  unsigned int GetGeneration() const;
+  ByteString* GetComment() const;
 
  private:
   struct Parts;
   // Writes the list of an empty object and sets the fields.
-  [[nodiscard]] int Build(Parts&& parts);
+  [[nodiscard]] VESK2_LOCAL int Build(Parts&& parts);
   // The file form of Import, of a path that a directory may have `listed` as a regular file.
-  [[nodiscard]] int ImportFile(const char* name, bool listed);
+  [[nodiscard]] VESK2_LOCAL int ImportFile(const char* name, bool listed);
   // Appends every entry of a directory that can be read. The result is that of the last file
   // handled: a bad last file is reported although the others were loaded.
-  [[nodiscard]] static int LoadDirectory(SExpression* list, const char* directory);
+  [[nodiscard]] VESK2_LOCAL static int LoadDirectory(SExpression* list, const char* directory);
   // The two halves of Import: up to the tag, and what follows it.
-  [[nodiscard]] int ImportGrant(Parts& parts, ZvBuffer* buffer) const;
-  [[nodiscard]] int ImportRest(Parts& parts, ZvBuffer* buffer) const;
+  [[nodiscard]] VESK2_LOCAL int ImportGrant(Parts& parts, ZvBuffer* buffer) const;
+  [[nodiscard]] VESK2_LOCAL int ImportRest(Parts& parts, ZvBuffer* buffer) const;
 
   SExpression* version = nullptr;
   Subject* subject = nullptr;

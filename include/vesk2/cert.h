@@ -31,7 +31,7 @@ class VESK2_API Cert : public SExpression {
 
   explicit Cert(Vesk2ContextStruct* context);
   // No context. (A bare nullptr would not tell the other two constructors apart.)
-  explicit Cert(std::nullptr_t) : Cert(static_cast<Vesk2ContextStruct*>(nullptr)) {}
+  explicit Cert(std::nullptr_t);
   // A certificate view of a trust root: the fields borrow the entry's objects and no list is built.
   // The entry must outlive it.
   explicit Cert(AclEntry* entry);
@@ -62,26 +62,26 @@ class VESK2_API Cert : public SExpression {
   [[nodiscard]] int IsRevoked(bool& revoked);
 
   // The parts, borrowed; null when absent.
-  SExpression* GetVersion() const { return version; }
-  Principal* GetIssuer() const { return issuer; }
-  Subject* GetSubject() const { return subject; }
-  bool GetPropagate() const { return propagate; }
-  SExpression* GetTag() const { return tag; }
-  TimeStamp* GetNotBefore() const { return notBefore; }
-  TimeStamp* GetNotAfter() const { return notAfter; }
-  ByteString* GetComment() const { return comment; }
-  SExpression* GetRevocationElement() const { return revocationElement; }
-  int32_t GetRevocationStatus() const { return revocationStatus; }
+  SExpression* GetVersion() const;
+  Principal* GetIssuer() const;
+  Subject* GetSubject() const;
+  bool GetPropagate() const;
+  SExpression* GetTag() const;
+  TimeStamp* GetNotBefore() const;
+  TimeStamp* GetNotAfter() const;
+  ByteString* GetComment() const;
+  SExpression* GetRevocationElement() const;
+  int32_t GetRevocationStatus() const;
 
  private:
   friend class RevocationLists;  // which sets the status
   // The elements that Import reads and Set builds, in order.
-  [[nodiscard]] int AppendVersion();
-  [[nodiscard]] int AppendPropagate();
-  [[nodiscard]] int ImportParties(ZvBuffer* buffer);
-  [[nodiscard]] int ImportValidity(ZvBuffer* buffer);
-  [[nodiscard]] int ImportElement(ZvBuffer* buffer, SExpression*& field);
-  [[nodiscard]] int SetValidity(TimeStamp* newNotBefore, TimeStamp* newNotAfter);
+  [[nodiscard]] VESK2_LOCAL int AppendVersion();
+  [[nodiscard]] VESK2_LOCAL int AppendPropagate();
+  [[nodiscard]] VESK2_LOCAL int ImportParties(ZvBuffer* buffer);
+  [[nodiscard]] VESK2_LOCAL int ImportValidity(ZvBuffer* buffer);
+  [[nodiscard]] VESK2_LOCAL int ImportElement(ZvBuffer* buffer, SExpression*& field);
+  [[nodiscard]] VESK2_LOCAL int SetValidity(TimeStamp* newNotBefore, TimeStamp* newNotAfter);
 
   SExpression* version = nullptr;
   Principal* issuer = nullptr;

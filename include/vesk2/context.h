@@ -20,8 +20,8 @@ class VESK2_API VeskConf {
   static const char* GetGlobalDirectory();
 
  private:
-  static char home_dir[Limits::kPathBuffer];
-  static char global_dir[Limits::kPathBuffer];
+  VESK2_LOCAL static char home_dir[Limits::kPathBuffer];
+  VESK2_LOCAL static char global_dir[Limits::kPathBuffer];
 };
 
 // V2Version returns 10100, V2VersionExtra and V2VersionExtraA the tag "r2441".

@@ -50,15 +50,15 @@ class VESK2_API Crl : public SExpression {
   [[nodiscard]] int RevokeAllOf(const Crl* other);
 
   // The two lists, borrowed; each is headed by its keyword.
-  SExpression* GetList1() const { return list1; }
-  SExpression* GetList2() const { return list2; }
+  SExpression* GetList1() const;
+  SExpression* GetList2() const;
   // The tag of the certificate that vouched for this list; null until CrlSequence::VerifySelf
   // succeeded.
-  SExpression* GetIssuerTag() const { return issuerTag; }
+  SExpression* GetIssuerTag() const;
 
  private:
   friend class CrlSequence;
-  void ForgetVoucher();
+  VESK2_LOCAL void ForgetVoucher();
   SExpression* list1 = nullptr;
   SExpression* list2 = nullptr;
   SExpression* issuerTag = nullptr;
@@ -163,9 +163,9 @@ class VESK2_API CrlSequence : public SExpression {
                                        TimeStamp* notAfter);
 
   // The parts, borrowed; null until imported.
-  Crl* GetCrl() const { return crl; }
-  Cert* GetCert() const { return cert; }
-  Signature* GetSignature() const { return signature; }
+  Crl* GetCrl() const;
+  Cert* GetCert() const;
+  Signature* GetSignature() const;
 
  private:
   Crl* crl = nullptr;

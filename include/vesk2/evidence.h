@@ -35,18 +35,18 @@ class VESK2_API Evidence {
   [[nodiscard]] int Copy(const Evidence& other);
 
   // ---- What was read, borrowed; null for what was not ----
-  Kind GetKind() const { return kind; }
+  Kind GetKind() const;
   // The certificates, the end of the chain (of a manifest, the signer certificate) at 0. `index`
   // must be below the count.
-  size_t CountCerts() const { return count; }
+  size_t CountCerts() const;
   Cert* GetCert(size_t index) const;
   Signature* GetSignature(size_t index) const;
   // The entries (acl <AclEntry>...) as they were loaded; AclEntry::GetFileName tells whence.
-  SExpression* GetEntries() const { return entries.get(); }
+  SExpression* GetEntries() const;
   // The revocation lists of the store and those that a manifest carries, lists of CrlSequence.
-  SExpression* GetStoredLists() const { return storedLists.get(); }
-  SExpression* GetCarriedLists() const { return carriedLists.get(); }
-  TimeStamp* GetSigningTime() const { return signingTime.get(); }
+  SExpression* GetStoredLists() const;
+  SExpression* GetCarriedLists() const;
+  TimeStamp* GetSigningTime() const;
   // The period that was asked about, null where it is open; about a manifest without one, the time
   // of signing twice.
   TimeStamp* GetFirst() const;
@@ -64,9 +64,9 @@ class VESK2_API Evidence {
   SExpression* GetRevocationSource(size_t index) const;
   // 0 when the signer certificate names the digest of the manifest's content. 0 when the listing
   // can be read, else the code, and the byte of the file at which it stops making sense.
-  [[nodiscard]] int GetContentCode() const { return contentCode; }
-  [[nodiscard]] int GetListingCode() const { return listingCode; }
-  size_t GetListingPosition() const { return listingPosition; }
+  [[nodiscard]] int GetContentCode() const;
+  [[nodiscard]] int GetListingCode() const;
+  size_t GetListingPosition() const;
 
   // ---- Changes ----
   //
@@ -112,14 +112,14 @@ class VESK2_API Evidence {
 
  private:
   struct Link;
-  [[nodiscard]] int Reserve(size_t wanted);
-  [[nodiscard]] int Assumed(bool& assumed, SExpression* source) const;
-  [[nodiscard]] int CheckForm() const;
-  [[nodiscard]] int MakePeriod(Ref<SExpression>& out) const;
-  [[nodiscard]] int BuildChain(Ref<SExpression>& out) const;
-  [[nodiscard]] int AppendLink(SExpression* chain, size_t index, size_t place) const;
-  bool AskedAboutSigning() const { return kind == SignedManifest && !first && !last; }
-  Subject* AskedSubject() const;
+  [[nodiscard]] VESK2_LOCAL int Reserve(size_t wanted);
+  [[nodiscard]] VESK2_LOCAL int Assumed(bool& assumed, SExpression* source) const;
+  [[nodiscard]] VESK2_LOCAL int CheckForm() const;
+  [[nodiscard]] VESK2_LOCAL int MakePeriod(Ref<SExpression>& out) const;
+  [[nodiscard]] VESK2_LOCAL int BuildChain(Ref<SExpression>& out) const;
+  [[nodiscard]] VESK2_LOCAL int AppendLink(SExpression* chain, size_t index, size_t place) const;
+  VESK2_LOCAL bool AskedAboutSigning() const;
+  VESK2_LOCAL Subject* AskedSubject() const;
 
   Vesk2ContextStruct* context;
   Kind kind = Chain;

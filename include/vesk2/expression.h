@@ -27,8 +27,10 @@
 #include <vesk2/limits.h>
 #include <vesk2/platform.h>
 
+#include <cstddef>
 #include <cstdint>
 #include <cstdio>
+#include <new>
 
 struct ZVCLMHashContextData;
 
@@ -46,6 +48,12 @@ enum StorageType : int32_t {
 
 class VESK2_API DExpression {
  public:
+  // new has the library take the memory, as much as the class needs there: a program may have been
+  // compiled when it needed less.
+  static void* operator new(size_t size);
+  static void* operator new(size_t size, const std::nothrow_t&) noexcept;
+  static void operator delete(void* object);
+
   explicit DExpression(Vesk2ContextStruct* context);
   DExpression(const DExpression&) = delete;
   DExpression& operator=(const DExpression&) = delete;
@@ -107,10 +115,10 @@ class VESK2_API DExpression {
   [[nodiscard]] static int Expect(const char* text, const unsigned char* buf, unsigned int size,
                                   unsigned int& pos);
 
-  Vesk2ContextStruct* GetContext() const { return context; }
-  int32_t GetRefCount() const { return refCount; }
+  Vesk2ContextStruct* GetContext() const;
+  int32_t GetRefCount() const;
   // The context's crypto handle, 0 without a context.
-  uint32_t CryptoHandle() const { return context != nullptr ? context->cryptoHandle : 0; }
+  uint32_t CryptoHandle() const;
 
  private:
   int32_t refCount = 1;
@@ -141,7 +149,7 @@ class VESK2_API ByteString : public DExpression {
   [[nodiscard]] int PrintAdvanced(int (*write)(const char* text, unsigned int length, void* user),
                                   void* user, int depth) override;
   [[nodiscard]] int PrintCanonical(FILE* stream) override;
-  bool IsSExpression() const override { return false; }
+  bool IsSExpression() const override;
   // ToString returns a new 0-terminated copy, cut at a 0 byte; free it with Vesk2Free. Null without
   // memory.
   virtual char* ToString();
@@ -167,16 +175,16 @@ class VESK2_API ByteString : public DExpression {
   [[nodiscard]] static int ParseAdvanced(DExpression*& out, const char* text, unsigned int& pos,
                                          Vesk2ContextStruct* context);
 
-  BsType GetType() const { return type; }
-  unsigned int GetLength() const { return length; }
+  BsType GetType() const;
+  unsigned int GetLength() const;
   // The bytes, not terminated; null until there were any.
-  const unsigned char* GetData() const { return data; }
+  const unsigned char* GetData() const;
 
  protected:
   // Makes room for `size` bytes by the rule of Set; the contents are then the caller's to write.
-  [[nodiscard]] int Reserve(unsigned int size);
+  [[nodiscard]] VESK2_LOCAL int Reserve(unsigned int size);
   // Deletes the bytes.
-  void Clear();
+  VESK2_LOCAL void Clear();
 
   BsType type = BsNone;
   unsigned int length = 0;
@@ -207,7 +215,7 @@ class VESK2_API SExpression : public DExpression {
   [[nodiscard]] int PrintAdvanced(int (*write)(const char* text, unsigned int length, void* user),
                                   void* user, int depth) override;
   [[nodiscard]] int PrintCanonical(FILE* stream) override;
-  bool IsSExpression() const override { return true; }
+  bool IsSExpression() const override;
   // The class's directory below a store root and its file extension; empty when it has none.
   virtual const char* DirectoryName() const;
   virtual const char* ExtensionName() const;
@@ -246,12 +254,12 @@ class VESK2_API SExpression : public DExpression {
   // Whether x->IsEqual(e) for some element e.
   bool Contains(SExpression* x);
 
-  // Walks the elements: for (auto it = list->Begin(); it; it.Next()) use(it.Value());
-  struct Node {
-    Node* next = nullptr;
-    DExpression* value = nullptr;  // the list holds one reference
-    bool own = false;              // whether it stands in a list itself
-  };
+  // Iterator walks the elements: for (auto it = list->Begin(); it; it.Next()) use(it.Value());
+  // It is one pointer and stays one.
+ private:
+  struct Node;
+
+ public:
   class VESK2_API Iterator {
    public:
     explicit Iterator(const Node* node) : node_(node) {}
@@ -262,7 +270,7 @@ class VESK2_API SExpression : public DExpression {
    private:
     const Node* node_;
   };
-  Iterator Begin() const { return Iterator(first); }
+  Iterator Begin() const;
 
   // ---- Canonical and advanced text ----
 
@@ -351,14 +359,21 @@ class VESK2_API SExpression : public DExpression {
   // The last component of the file name as a new string (free with Vesk2Free); null without one.
   char* BaseName();
 
-  StorageType GetStorageType() const { return storageType; }
-  const char* GetFileName() const { return fileName; }
+  StorageType GetStorageType() const;
+  const char* GetFileName() const;
 
  protected:
   // Replaces the file name by a copy of `path`, as it stands.
-  [[nodiscard]] int SetFilePath(const char* path);
+  [[nodiscard]] VESK2_LOCAL int SetFilePath(const char* path);
 
  private:
+  struct Node {
+    Node* next = nullptr;
+    DExpression* value = nullptr;  // the list holds one reference
+    bool own = false;              // whether it stands in a list itself
+  };
+  VESK2_LOCAL static void DeleteNode(Node* node);
+
   StorageType storageType = StorageHome;
   unsigned int ownUsed = 0;  // of ownNodes
   Node* first = nullptr;

@@ -63,9 +63,9 @@ class VESK2_API Hash : public Principal {
                                     const Vesk2FileCallbacks* callbacks);
 
   // ZVCLM_HASH_NONE until Init, Set or Import.
-  ZvclmHashID GetAlgorithm() const { return algorithm; }
+  ZvclmHashID GetAlgorithm() const;
   // The digest of an imported hash, else null.
-  ByteString* GetValue() const { return value; }
+  ByteString* GetValue() const;
   // The digest of any complete hash: the value, else the third element; null when there is none.
   ByteString* GetDigest() const;
 

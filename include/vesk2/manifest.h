@@ -63,12 +63,9 @@ class VESK2_API Manifest {
   };
 
   // ---- Settings; see vesk2.h ----
-  void SetFailOnExtraEntries(bool value) { failOnExtraEntries = value; }
+  void SetFailOnExtraEntries(bool value);
   // Adopts `owned`, an array from new[], or null.
-  void SetExtraAclDirectory(char* owned) {
-    extraAclDirectory.reset(owned);
-    lostSetting = false;
-  }
+  void SetExtraAclDirectory(char* owned);
   // The same with a copy of the text. Without memory for it VESK2_ERR_MEM_ALLOC, which every
   // verification answers then, until the setting is made again: without the directory, and the
   // revocation sources that it names, it would answer another question.
@@ -76,28 +73,26 @@ class VESK2_API Manifest {
   // Replaces the ignored entries by copies, in reverse order. VESK2_ERR_MEM_ALLOC leaves none.
   [[nodiscard]] int SetIgnoredEntries(const FileItem* list);
   [[nodiscard]] int SetFileCallbacks(const Vesk2FileCallbacks* callbacks);
-  void SetStoreUpdate(bool value) { storeUpdate = value; }
+  void SetStoreUpdate(bool value);
   // SetEvidence has ReadManifest and VerifyManifest keep what they read and found in `borrowed`,
   // which must outlive them; null takes it back. They then read on after a refusal, for the
   // evidence only: codes, positions and what is stored stay as they are without it.
-  void SetEvidence(Evidence* borrowed) { evidence = borrowed; }
+  void SetEvidence(Evidence* borrowed);
 
   // ---- What the object holds, borrowed ----
-  Vesk2ContextStruct* GetContext() const { return context; }
-  const char* GetDirectory() const { return directory.get(); }
-  const char* GetManifestPath() const { return manifestPath.get(); }
-  SExpression* GetTag() const { return tag.get(); }
-  bool GetFailOnExtraEntries() const { return failOnExtraEntries; }
-  const char* GetExtraAclDirectory() const { return extraAclDirectory.get(); }
-  bool GetStoreUpdate() const { return storeUpdate; }
+  Vesk2ContextStruct* GetContext() const;
+  const char* GetDirectory() const;
+  const char* GetManifestPath() const;
+  SExpression* GetTag() const;
+  bool GetFailOnExtraEntries() const;
+  const char* GetExtraAclDirectory() const;
+  bool GetStoreUpdate() const;
   // Null when none are set.
-  const Vesk2FileCallbacks* GetFileCallbacks() const {
-    return fileCallbacks.size != 0 ? &fileCallbacks : nullptr;
-  }
-  FileItem* GetValid() const { return valid.get(); }
-  FileItem* GetInvalid() const { return invalid.get(); }
-  FileItem* GetMissing() const { return missing.get(); }
-  FileItem* GetExtra() const { return extra.get(); }
+  const Vesk2FileCallbacks* GetFileCallbacks() const;
+  FileItem* GetValid() const;
+  FileItem* GetInvalid() const;
+  FileItem* GetMissing() const;
+  FileItem* GetExtra() const;
   // GetReason tells why an entry of the lists above is there although it was not compared:
   //   VESK2_ERR_FILE_OPEN  it could not be opened: a changed file, which is there, because another
   //                        process held it for Limits::kMaxHeldWait
@@ -105,26 +100,26 @@ class VESK2_API Manifest {
   //   VESK2_ERR_FIND_DIR   the directory is missing, or its entries could not be read
   // 0 when it was compared, and for any other entry.
   [[nodiscard]] int GetReason(const FileItem* entry) const;
-  FileItem* GetIgnoredEntries() const { return ignoredEntries.get(); }
+  FileItem* GetIgnoredEntries() const;
   // Null before and after a failed read.
-  SExpression* GetVersion() const { return version.get(); }
-  SExpression* GetType() const { return type.get(); }
-  TimeStamp* GetSigningTime() const { return signingTime.get(); }
+  SExpression* GetVersion() const;
+  SExpression* GetType() const;
+  TimeStamp* GetSigningTime() const;
   // The byte of the manifest file that the last read had come to: after an error of a reader, where
   // the text stopped making sense.
-  size_t GetReadPosition() const { return readPosition; }
+  size_t GetReadPosition() const;
   // The listing that the last VerifyManifest with SetEvidence proved and compared, its root named
   // by the directory; null when it did not come to that.
-  BodyDirectory* GetListing() const { return listing.get(); }
+  BodyDirectory* GetListing() const;
 
  private:
   friend class ManifestReader;
-  void ClearRead();
-  void ClearResults();
-  [[nodiscard]] int BuildIgnoreList(const char* base, PointerArray<char>& list) const;
+  VESK2_LOCAL void ClearRead();
+  VESK2_LOCAL void ClearResults();
+  [[nodiscard]] VESK2_LOCAL int BuildIgnoreList(const char* base, PointerArray<char>& list) const;
   // Moves the records of a comparison to the front of the four lists.
-  [[nodiscard]] int Publish(Findings& findings);
-  FileItemList& ListOf(uint32_t status);
+  [[nodiscard]] VESK2_LOCAL int Publish(Findings& findings);
+  VESK2_LOCAL FileItemList& ListOf(uint32_t status);
 
   Vesk2ContextStruct* context;
   std::unique_ptr<char[]> directory;

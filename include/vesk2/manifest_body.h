@@ -20,7 +20,7 @@ class VESK2_API BodyObject {
   // Status of a result record.
   enum Status : uint32_t { StatusNone = 0, Valid = 1, Invalid = 2, Missing = 4, Extra = 8 };
 
-  explicit BodyObject(Vesk2ContextStruct* ctx) : context(ctx) {}
+  explicit BodyObject(Vesk2ContextStruct* ctx);
   virtual ~BodyObject();
   BodyObject(const BodyObject&) = delete;
   BodyObject& operator=(const BodyObject&) = delete;
@@ -28,17 +28,17 @@ class VESK2_API BodyObject {
   // Cmp orders two BodyObject* (given by address) by name, bytewise; one without a name comes last.
   [[nodiscard]] static int Cmp(const void* a, const void* b);
 
-  const char* GetName() const { return name.get(); }
-  uint32_t GetStatus() const { return status; }
-  bool GetIsDirectory() const { return isDirectory; }
-  Vesk2ContextStruct* GetContext() const { return context; }
+  const char* GetName() const;
+  uint32_t GetStatus() const;
+  bool GetIsDirectory() const;
+  Vesk2ContextStruct* GetContext() const;
 
   // Adopts `owned`, an array from new[].
-  void SetName(char* owned) { name.reset(owned); }
-  void SetStatus(uint32_t value) { status = value; }
-  void SetIsDirectory(bool value) { isDirectory = value; }
+  void SetName(char* owned);
+  void SetStatus(uint32_t value);
+  void SetIsDirectory(bool value);
   // Hands the name to the caller.
-  [[nodiscard]] char* TakeName() { return name.release(); }
+  [[nodiscard]] char* TakeName();
 
  private:
   Vesk2ContextStruct* context;
@@ -49,7 +49,7 @@ class VESK2_API BodyObject {
 
 class VESK2_API BodyFile : public BodyObject {
  public:
-  explicit BodyFile(Vesk2ContextStruct* ctx) : BodyObject(ctx) {}
+  explicit BodyFile(Vesk2ContextStruct* ctx);
   ~BodyFile() override;
 
   bool Equal(const unsigned char* digest, int length) const;
@@ -57,8 +57,8 @@ class VESK2_API BodyFile : public BodyObject {
   // Stores a digest of exactly 32 bytes.
   void SetHash(const unsigned char* digest);
 
-  uint32_t GetHashLength() const { return hashLength; }
-  const unsigned char* GetHash() const { return hash; }
+  uint32_t GetHashLength() const;
+  const unsigned char* GetHash() const;
 
  private:
   uint32_t hashLength = 0;
@@ -81,21 +81,22 @@ class VESK2_API BodyDirectory : public BodyObject {
   [[nodiscard]] int ParseBody(ZvBuffer* buffer, PointerArray<char>* ignoreList);
   [[nodiscard]] int ParseDir(ZvBuffer* buffer, PointerArray<char>* ignoreList);
 
-  PointerArray<BodyObject>& GetFiles() { return files; }
-  PointerArray<BodyObject>& GetSubdirectories() { return subdirectories; }
-  PointerArray<char>& GetIgnored() { return ignored; }
+  PointerArray<BodyObject>& GetFiles();
+  PointerArray<BodyObject>& GetSubdirectories();
+  PointerArray<char>& GetIgnored();
 
  private:
   // `length` is that of this directory's path within the body.
-  [[nodiscard]] int ParseEntries(ZvBuffer* buffer, PointerArray<char>* ignoreList, unsigned depth,
-                                 size_t length);
-  [[nodiscard]] int ParseEntry(ZvBuffer* buffer, PointerArray<char>* ignoreList, unsigned depth,
-                               size_t length);
-  [[nodiscard]] int ParseName(ZvBuffer* buffer, std::unique_ptr<char[]>& bare, size_t& length);
-  [[nodiscard]] int ParseFile(ZvBuffer* buffer, size_t length);
-  [[nodiscard]] int ParseSubdirectory(ZvBuffer* buffer, PointerArray<char>* ignoreList,
-                                      unsigned depth, size_t length);
-  [[nodiscard]] int CollectIgnored(PointerArray<char>* ignoreList);
+  [[nodiscard]] VESK2_LOCAL int ParseEntries(ZvBuffer* buffer, PointerArray<char>* ignoreList,
+                                             unsigned depth, size_t length);
+  [[nodiscard]] VESK2_LOCAL int ParseEntry(ZvBuffer* buffer, PointerArray<char>* ignoreList,
+                                           unsigned depth, size_t length);
+  [[nodiscard]] VESK2_LOCAL int ParseName(ZvBuffer* buffer, std::unique_ptr<char[]>& bare,
+                                          size_t& length);
+  [[nodiscard]] VESK2_LOCAL int ParseFile(ZvBuffer* buffer, size_t length);
+  [[nodiscard]] VESK2_LOCAL int ParseSubdirectory(ZvBuffer* buffer, PointerArray<char>* ignoreList,
+                                                  unsigned depth, size_t length);
+  [[nodiscard]] VESK2_LOCAL int CollectIgnored(PointerArray<char>* ignoreList);
 
   PointerArray<BodyObject> files;
   PointerArray<BodyObject> subdirectories;

@@ -36,10 +36,10 @@ class VESK2_API ZvBuffer {
 
   // Remaining is the number of bytes not yet consumed, Position that of those consumed: after a
   // failed Import, the byte at which the text stopped making sense.
-  size_t Remaining() const { return size_ - position_; }
-  size_t Position() const { return position_; }
+  size_t Remaining() const;
+  size_t Position() const;
   // The next Remaining() bytes, borrowed until the buffer is freed.
-  const unsigned char* Data() const { return data_ + position_; }
+  const unsigned char* Data() const;
 
   ZvBuffer(const ZvBuffer&) = delete;
   ZvBuffer& operator=(const ZvBuffer&) = delete;
@@ -49,8 +49,8 @@ class VESK2_API ZvBuffer {
   friend VESK2_API ZvBuffer* zv_buffer_wrap_file(const char* path);
   friend ZvBuffer* zv_buffer_adopt(unsigned char* data, size_t size);
   friend VESK2_API void zv_buffer_free(ZvBuffer* buffer);
-  ZvBuffer(unsigned char* data, size_t size) : data_(data), size_(size) {}
-  ~ZvBuffer();
+  VESK2_LOCAL ZvBuffer(unsigned char* data, size_t size);
+  VESK2_LOCAL ~ZvBuffer();
 
   unsigned char* data_;
   size_t size_;

@@ -12,10 +12,10 @@ namespace ZvVesk2 {
 template <typename T>
 class VESK2_API PointerArray {
  public:
-  PointerArray() = default;
+  PointerArray();
   // With ownsArrays, clear frees every element as an array. (char elements always are.)
-  explicit PointerArray(bool elementsAreArrays) : ownsArrays(elementsAreArrays) {}
-  ~PointerArray() { clear(); }
+  explicit PointerArray(bool elementsAreArrays);
+  ~PointerArray();
   PointerArray(const PointerArray&) = delete;
   PointerArray& operator=(const PointerArray&) = delete;
 
@@ -25,19 +25,19 @@ class VESK2_API PointerArray {
   // the cursor moves on, then its element. Null at and past the end.
   T* get(int mode);
   T* begin();
-  T* next() { return get(-1); }
-  void reset() { cursor = 0; }
+  T* next();
+  void reset();
   // at gives an element by its place and leaves the cursor alone; null past the end.
-  T* at(uint32_t index) const { return index < count ? items[index] : nullptr; }
+  T* at(uint32_t index) const;
   // sort orders the pointers; the comparator gets pointers to two elements of type T*.
   void sort(int (*compare)(const void*, const void*));
   // clear frees every element and the array.
   void clear();
 
-  uint32_t GetCount() const { return count; }
+  uint32_t GetCount() const;
   // GetCapacity grows by steps of 32 with the count; the memory beneath grows by doubling.
-  uint32_t GetCapacity() const { return (count + 31) / 32 * 32; }
-  uint32_t GetCursor() const { return cursor; }
+  uint32_t GetCapacity() const;
+  uint32_t GetCursor() const;
 
  private:
   T** items = nullptr;

@@ -66,18 +66,18 @@ class VESK2_API PublicKey : public Principal {
   [[nodiscard]] int X509Export(unsigned char*& out, unsigned int& length);
 
   // 1 RSA, 0 DSA, -1 none; the algorithm's name, or null; the key length in bits.
-  int32_t GetType() const { return keyType; }
-  const char* GetAlgorithm() const { return algorithmName; }
-  uint32_t GetLength() const { return keyLength; }
+  int32_t GetType() const;
+  const char* GetAlgorithm() const;
+  uint32_t GetLength() const;
   // The crypto key object, borrowed; null until there is a key.
   ZVCLMPublicKeyData* GetKey() const;
 
  private:
-  bool IsEmpty() const;
+  VESK2_LOCAL bool IsEmpty() const;
   template <typename Form>
-  [[nodiscard]] int ImportNumbers(ZvBuffer* buffer);
+  [[nodiscard]] VESK2_LOCAL int ImportNumbers(ZvBuffer* buffer);
   template <typename Form>
-  [[nodiscard]] int SetNumbers(ZVCLMPublicKeyData* newKey);
+  [[nodiscard]] VESK2_LOCAL int SetNumbers(ZVCLMPublicKeyData* newKey);
 
   int32_t keyType = -1;
   ZVCLMPublicKeyData* key = nullptr;

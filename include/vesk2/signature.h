@@ -39,13 +39,13 @@ class VESK2_API Signature : public SExpression {
   [[nodiscard]] int Verify(SExpression* object);
 
   // The parts, borrowed from the list; null until imported or created.
-  Hash* GetHash() const { return hash; }
-  Principal* GetPrincipal() const { return principal; }
-  ByteString* GetAlgorithm() const { return algorithm; }
-  ByteString* GetValue() const { return value; }
+  Hash* GetHash() const;
+  Principal* GetPrincipal() const;
+  ByteString* GetAlgorithm() const;
+  ByteString* GetValue() const;
 
  private:
-  [[nodiscard]] int AppendValue(Ref<ByteString> newAlgorithm, Ref<ByteString> newValue);
+  [[nodiscard]] VESK2_LOCAL int AppendValue(Ref<ByteString> newAlgorithm, Ref<ByteString> newValue);
 
   Hash* hash = nullptr;
   Principal* principal = nullptr;

@@ -70,7 +70,7 @@ class VESK2_API Name : public Subject {
   // Set names an empty object. Errors are ByteString::Set's and Insert's.
   [[nodiscard]] int Set(const char* text);
 
-  const ByteString* GetName() const { return name; }
+  const ByteString* GetName() const;
 
  private:
   ByteString* name = nullptr;  // owned; the list holds another copy
@@ -100,8 +100,8 @@ class VESK2_API ThresholdSubject : public Subject {
   // GetSubjects makes a new list that shares the members; the caller frees it.
   [[nodiscard]] int GetSubjects(SExpression*& members);
 
-  unsigned int GetK() const { return k; }
-  unsigned int GetN() const { return n; }
+  unsigned int GetK() const;
+  unsigned int GetN() const;
 
  private:
   unsigned int k = 0;

@@ -8,8 +8,10 @@
 
 namespace ZvVesk2 {
 
-// The destructors live here, so that each class has one vtable, in the library.
+BodyObject::BodyObject(Vesk2ContextStruct* ctx) : context(ctx) {}
 BodyObject::~BodyObject() = default;
+
+BodyFile::BodyFile(Vesk2ContextStruct* ctx) : BodyObject(ctx) {}
 BodyFile::~BodyFile() = default;
 
 int BodyObject::Cmp(const void* a, const void* b) {
@@ -37,5 +39,22 @@ void BodyFile::SetHash(const unsigned char* digest) {
 
 BodyDirectory::BodyDirectory(Vesk2ContextStruct* ctx) : BodyObject(ctx) { SetIsDirectory(true); }
 BodyDirectory::~BodyDirectory() = default;
+
+const char* BodyObject::GetName() const { return name.get(); }
+uint32_t BodyObject::GetStatus() const { return status; }
+bool BodyObject::GetIsDirectory() const { return isDirectory; }
+Vesk2ContextStruct* BodyObject::GetContext() const { return context; }
+void BodyObject::SetName(char* owned) { name.reset(owned); }
+void BodyObject::SetStatus(uint32_t value) { status = value; }
+void BodyObject::SetIsDirectory(bool value) { isDirectory = value; }
+char* BodyObject::TakeName() { return name.release(); }
+
+uint32_t BodyFile::GetHashLength() const { return hashLength; }
+
+PointerArray<BodyObject>& BodyDirectory::GetFiles() { return files; }
+PointerArray<BodyObject>& BodyDirectory::GetSubdirectories() { return subdirectories; }
+PointerArray<char>& BodyDirectory::GetIgnored() { return ignored; }
+
+const unsigned char* BodyFile::GetHash() const { return hash; }
 
 }  // namespace ZvVesk2

@@ -147,4 +147,32 @@ int Manifest::CompareManifest(const char* otherManifestPath) {
   return Compare(body1.get(), body2.get());
 }
 
+void Manifest::SetFailOnExtraEntries(bool value) { failOnExtraEntries = value; }
+void Manifest::SetStoreUpdate(bool value) { storeUpdate = value; }
+void Manifest::SetEvidence(Evidence* borrowed) { evidence = borrowed; }
+Vesk2ContextStruct* Manifest::GetContext() const { return context; }
+const char* Manifest::GetDirectory() const { return directory.get(); }
+const char* Manifest::GetManifestPath() const { return manifestPath.get(); }
+SExpression* Manifest::GetTag() const { return tag.get(); }
+bool Manifest::GetFailOnExtraEntries() const { return failOnExtraEntries; }
+const char* Manifest::GetExtraAclDirectory() const { return extraAclDirectory.get(); }
+bool Manifest::GetStoreUpdate() const { return storeUpdate; }
+FileItem* Manifest::GetValid() const { return valid.get(); }
+FileItem* Manifest::GetInvalid() const { return invalid.get(); }
+FileItem* Manifest::GetMissing() const { return missing.get(); }
+FileItem* Manifest::GetExtra() const { return extra.get(); }
+FileItem* Manifest::GetIgnoredEntries() const { return ignoredEntries.get(); }
+SExpression* Manifest::GetVersion() const { return version.get(); }
+SExpression* Manifest::GetType() const { return type.get(); }
+TimeStamp* Manifest::GetSigningTime() const { return signingTime.get(); }
+size_t Manifest::GetReadPosition() const { return readPosition; }
+BodyDirectory* Manifest::GetListing() const { return listing.get(); }
+void Manifest::SetExtraAclDirectory(char* owned) {
+  extraAclDirectory.reset(owned);
+  lostSetting = false;
+}
+const Vesk2FileCallbacks* Manifest::GetFileCallbacks() const {
+  return fileCallbacks.size != 0 ? &fileCallbacks : nullptr;
+}
+
 }  // namespace ZvVesk2

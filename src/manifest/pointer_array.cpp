@@ -18,6 +18,15 @@ constexpr uint32_t kFirstSlots = 8;  // most directories are small
 }  // namespace
 
 template <typename T>
+PointerArray<T>::PointerArray() = default;
+template <typename T>
+PointerArray<T>::PointerArray(bool elementsAreArrays) : ownsArrays(elementsAreArrays) {}
+template <typename T>
+PointerArray<T>::~PointerArray() {
+  clear();
+}
+
+template <typename T>
 int PointerArray<T>::push(T* element) {
   if (count == slots) {
     if (slots > UINT32_MAX / 2) return 0;
@@ -45,6 +54,36 @@ template <typename T>
 T* PointerArray<T>::begin() {
   reset();
   return next();
+}
+
+template <typename T>
+T* PointerArray<T>::next() {
+  return get(-1);
+}
+
+template <typename T>
+void PointerArray<T>::reset() {
+  cursor = 0;
+}
+
+template <typename T>
+T* PointerArray<T>::at(uint32_t index) const {
+  return index < count ? items[index] : nullptr;
+}
+
+template <typename T>
+uint32_t PointerArray<T>::GetCount() const {
+  return count;
+}
+
+template <typename T>
+uint32_t PointerArray<T>::GetCapacity() const {
+  return (count + 31) / 32 * 32;
+}
+
+template <typename T>
+uint32_t PointerArray<T>::GetCursor() const {
+  return cursor;
 }
 
 template <typename T>

@@ -7,6 +7,8 @@ namespace ZvVesk2 {
 
 Cert::Cert(Vesk2ContextStruct* ctx) : SExpression(ctx) {}
 
+Cert::Cert(std::nullptr_t) : Cert(static_cast<Vesk2ContextStruct*>(nullptr)) {}
+
 Cert::~Cert() = default;
 
 // "(4:cert" ["(7:version1:1)"] "(6:issuer" <principal> ")" "(7:subject" <subject> ")"
@@ -126,5 +128,16 @@ int Cert::AppendPropagate() {
   propagate = true;
   return 0;
 }
+
+SExpression* Cert::GetVersion() const { return version; }
+Principal* Cert::GetIssuer() const { return issuer; }
+Subject* Cert::GetSubject() const { return subject; }
+bool Cert::GetPropagate() const { return propagate; }
+SExpression* Cert::GetTag() const { return tag; }
+TimeStamp* Cert::GetNotBefore() const { return notBefore; }
+TimeStamp* Cert::GetNotAfter() const { return notAfter; }
+ByteString* Cert::GetComment() const { return comment; }
+SExpression* Cert::GetRevocationElement() const { return revocationElement; }
+int32_t Cert::GetRevocationStatus() const { return revocationStatus; }
 
 }  // namespace ZvVesk2

@@ -106,4 +106,7 @@ ByteString* Hash::GetDigest() const {
   return element ? dynamic_cast<ByteString*>(element.Value()) : nullptr;
 }
 
+ZvclmHashID Hash::GetAlgorithm() const { return algorithm; }
+ByteString* Hash::GetValue() const { return value; }
+
 }  // namespace ZvVesk2

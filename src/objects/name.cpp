@@ -24,4 +24,6 @@ int Name::Set(const char* text) {
   return Insert(text);
 }
 
+const ByteString* Name::GetName() const { return name; }
+
 }  // namespace ZvVesk2

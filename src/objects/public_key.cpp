@@ -139,4 +139,8 @@ int PublicKey::SetNumbers(ZVCLMPublicKeyData* newKey) {
   return 0;
 }
 
+int32_t PublicKey::GetType() const { return keyType; }
+const char* PublicKey::GetAlgorithm() const { return algorithmName; }
+uint32_t PublicKey::GetLength() const { return keyLength; }
+
 }  // namespace ZvVesk2

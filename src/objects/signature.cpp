@@ -81,4 +81,9 @@ int Signature::Verify(SExpression* object) {
   return InOwnWords(principal->Verify(algorithm, value, hash, object));
 }
 
+Hash* Signature::GetHash() const { return hash; }
+Principal* Signature::GetPrincipal() const { return principal; }
+ByteString* Signature::GetAlgorithm() const { return algorithm; }
+ByteString* Signature::GetValue() const { return value; }
+
 }  // namespace ZvVesk2

@@ -87,4 +87,7 @@ int ThresholdSubject::GetSubjects(SExpression*& members) {
   return 0;
 }
 
+unsigned int ThresholdSubject::GetK() const { return k; }
+unsigned int ThresholdSubject::GetN() const { return n; }
+
 }  // namespace ZvVesk2

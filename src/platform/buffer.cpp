@@ -13,6 +13,8 @@
 
 namespace ZVsysutil {
 
+ZvBuffer::ZvBuffer(unsigned char* data, size_t size) : data_(data), size_(size) {}
+
 ZvBuffer::~ZvBuffer() { delete[] data_; }
 
 bool ZvBuffer::LooksAt(const char* text) const {
@@ -76,5 +78,9 @@ ZvBuffer* zv_buffer_wrap_file(const char* path) {
 }
 
 void zv_buffer_free(ZvBuffer* buffer) { delete buffer; }
+
+size_t ZvBuffer::Remaining() const { return size_ - position_; }
+size_t ZvBuffer::Position() const { return position_; }
+const unsigned char* ZvBuffer::Data() const { return data_ + position_; }
 
 }  // namespace ZVsysutil

@@ -77,4 +77,9 @@ char* ByteString::ToString() {
   return ZVsysutil::zv_atof_copy_n(data != nullptr ? static_cast<const void*>(data) : "", length);
 }
 
+bool ByteString::IsSExpression() const { return false; }
+ByteString::BsType ByteString::GetType() const { return type; }
+unsigned int ByteString::GetLength() const { return length; }
+const unsigned char* ByteString::GetData() const { return data; }
+
 }  // namespace ZvVesk2

@@ -12,6 +12,18 @@
 
 namespace ZvVesk2 {
 
+// What the classes have grown by since version 1.1.0, the most of any: a program that was compiled
+// with a smaller one asks for that much less than is needed.
+constexpr size_t kGrown = 0;
+
+void* DExpression::operator new(size_t size) { return ::operator new(size + kGrown); }
+
+void* DExpression::operator new(size_t size, const std::nothrow_t& nothrow) noexcept {
+  return ::operator new(size + kGrown, nothrow);
+}
+
+void DExpression::operator delete(void* object) { ::operator delete(object); }
+
 DExpression::DExpression(Vesk2ContextStruct* owner) : context(owner) {}
 
 DExpression::~DExpression() = default;
@@ -94,6 +106,12 @@ int DExpression::Expect(const char* text, const unsigned char* buf, unsigned int
   VESK2_REQUIRE(pos <= size && length <= size - pos, VESK2_ERR_BUFFER_OVERFLOW);
   pos += static_cast<unsigned int>(length);
   return 0;
+}
+
+Vesk2ContextStruct* DExpression::GetContext() const { return context; }
+int32_t DExpression::GetRefCount() const { return refCount; }
+uint32_t DExpression::CryptoHandle() const {
+  return context != nullptr ? context->cryptoHandle : 0;
 }
 
 }  // namespace ZvVesk2

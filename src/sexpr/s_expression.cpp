@@ -9,13 +9,6 @@
 #include "src/frame/check.h"
 
 namespace ZvVesk2 {
-namespace {
-
-void DeleteNode(SExpression::Node* node) {
-  if (!node->own) delete node;
-}
-
-}  // namespace
 
 SExpression::SExpression(Vesk2ContextStruct* owner) : DExpression(owner) {}
 
@@ -29,6 +22,10 @@ const char* SExpression::DirectoryName() const { return ""; }
 const char* SExpression::ExtensionName() const { return ""; }
 
 bool SExpression::IsHash() const { return false; }
+
+void SExpression::DeleteNode(Node* node) {
+  if (!node->own) delete node;
+}
 
 // ---- Building ----
 
@@ -147,5 +144,10 @@ bool SExpression::Contains(SExpression* x) {
 DExpression* SExpression::Iterator::Value() const { return node_->value; }
 
 void SExpression::Iterator::Next() { node_ = node_->next; }
+
+bool SExpression::IsSExpression() const { return true; }
+SExpression::Iterator SExpression::Begin() const { return Iterator(first); }
+StorageType SExpression::GetStorageType() const { return storageType; }
+const char* SExpression::GetFileName() const { return fileName; }
 
 }  // namespace ZvVesk2

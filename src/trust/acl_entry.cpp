@@ -166,4 +166,13 @@ int AclEntry::ParseTagCanonical(SExpression*& out, unsigned char* data, unsigned
   return ReadGrantedTag(out, data, length, ctx);
 }
 
+SExpression* AclEntry::GetVersion() const { return version; }
+Subject* AclEntry::GetSubject() const { return subject; }
+bool AclEntry::GetPropagate() const { return propagate; }
+SExpression* AclEntry::GetTag() const { return tag; }
+TimeStamp* AclEntry::GetNotBefore() const { return notBefore; }
+TimeStamp* AclEntry::GetNotAfter() const { return notAfter; }
+ByteString* AclEntry::GetComment() const { return comment; }
+unsigned int AclEntry::GetGeneration() const { return generation; }
+
 }  // namespace ZvVesk2

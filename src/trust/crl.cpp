@@ -70,4 +70,8 @@ int Crl::BuildSExpression() {
   return AppendShared(this, list2);
 }
 
+SExpression* Crl::GetList1() const { return list1; }
+SExpression* Crl::GetList2() const { return list2; }
+SExpression* Crl::GetIssuerTag() const { return issuerTag; }
+
 }  // namespace ZvVesk2

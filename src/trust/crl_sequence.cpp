@@ -90,7 +90,7 @@ int CrlSequence::VerifyValidity(long* notBefore, long* notAfter) {
   const long end = cert->GetNotAfter() != nullptr ? cert->GetNotAfter()->ToTime() : 0;
   int code = 0;
   if (*notBefore != 0 && *notAfter != 0) {
-    // The names of the two codes are crossed; callers know them so.
+    // Each code is named for the bound that was asked about and is missed.
     if (begin > *notAfter) {
       code = VESK2_ERR_NOT_AFTER;
     } else if (end < *notBefore) {
@@ -160,5 +160,9 @@ void CrlSequence::ForgetProof() {
   crl->issuerTag->Free();
   crl->issuerTag = nullptr;
 }
+
+Crl* CrlSequence::GetCrl() const { return crl; }
+Cert* CrlSequence::GetCert() const { return cert; }
+Signature* CrlSequence::GetSignature() const { return signature; }
 
 }  // namespace ZvVesk2

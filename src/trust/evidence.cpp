@@ -139,4 +139,15 @@ void Evidence::SetContent(int code, int codeOfListing, size_t position) {
   listingPosition = position;
 }
 
+Evidence::Kind Evidence::GetKind() const { return kind; }
+size_t Evidence::CountCerts() const { return count; }
+SExpression* Evidence::GetEntries() const { return entries.get(); }
+SExpression* Evidence::GetStoredLists() const { return storedLists.get(); }
+SExpression* Evidence::GetCarriedLists() const { return carriedLists.get(); }
+TimeStamp* Evidence::GetSigningTime() const { return signingTime.get(); }
+int Evidence::GetContentCode() const { return contentCode; }
+int Evidence::GetListingCode() const { return listingCode; }
+size_t Evidence::GetListingPosition() const { return listingPosition; }
+bool Evidence::AskedAboutSigning() const { return kind == SignedManifest && !first && !last; }
+
 }  // namespace ZvVesk2
