@@ -18,6 +18,8 @@
 
 namespace ZvVesk2 {
 
+class CrlSequence;
+
 class VESK2_API Evidence {
  public:
   // A manifest leaves revoked certificates out and names its content first; a chain is refused for
@@ -62,6 +64,11 @@ class VESK2_API Evidence {
   int32_t GetRevocationStatus(size_t index) const;
   // The tag of the lists that speak for the certificate; null when it names none.
   SExpression* GetRevocationSource(size_t index) const;
+  // The list that decided the status: the one that names the certificate or its key, with the date
+  // since when (null: always), else of the lists of its source the one that ends last. Null for
+  // none.
+  CrlSequence* GetRevocationList(size_t index) const;
+  TimeStamp* GetRevokedSince(size_t index) const;
   // 0 when the signer certificate names the digest of the manifest's content. 0 when the listing
   // can be read, else the code, and the byte of the file at which it stops making sense.
   [[nodiscard]] int GetContentCode() const;
@@ -75,6 +82,8 @@ class VESK2_API Evidence {
   [[nodiscard]] int AddCert(Cert* cert, Signature* signature, int signatureCode);
   // RemoveCerts removes all. The question stays the one about the end of the chain that there was.
   void RemoveCerts();
+  // RemoveCert removes one. What was found about the others stays.
+  void RemoveCert(size_t index);
   void SetEntries(SExpression* acl);
   // The entries that may grant; null for all. The others still vouch for revocation lists.
   void SetGrantingEntries(SExpression* acl);
@@ -100,19 +109,22 @@ class VESK2_API Evidence {
   [[nodiscard]] int CheckRevoked() const;
   // Reduce asks whether what is left grants the tag: Verify::ReductA's codes. Prove checks the
   // answers about revocation first.
-  [[nodiscard]] int Reduce(SExpression* tag) const;
-  [[nodiscard]] int Prove(SExpression* tag) const;
+  [[nodiscard]] int Reduce(SExpression* tag);
+  [[nodiscard]] int Prove(SExpression* tag);
   // Judge takes all the steps: the code that a verification of this would give.
   [[nodiscard]] int Judge(SExpression* tag);
   // Grants returns what is granted, whatever is asked: the outputs of Verify::ReductB.
   [[nodiscard]] int Grants(SExpression*& tag, SExpression*& notBefore,
                            SExpression*& notAfter) const;
-  // Size is about how many bytes one Judge works on.
+  // Size is about how many bytes one Judge works on, GetWork what the last reduction cost (see
+  // Verify::WorkDone): what a further question about the same may cost.
   size_t Size() const;
+  uint64_t GetWork() const { return work; }
 
  private:
   struct Link;
   [[nodiscard]] VESK2_LOCAL int Reserve(size_t wanted);
+  [[nodiscard]] VESK2_LOCAL int MarkLink(RevocationLists& revocations, Link& link) const;
   [[nodiscard]] VESK2_LOCAL int Assumed(bool& assumed, SExpression* source) const;
   [[nodiscard]] VESK2_LOCAL int CheckForm() const;
   [[nodiscard]] VESK2_LOCAL int MakePeriod(Ref<SExpression>& out) const;
@@ -139,6 +151,7 @@ class VESK2_API Evidence {
   int contentCode = 0;
   int listingCode = 0;
   size_t listingPosition = 0;
+  uint64_t work = 0;
 };
 
 }  // namespace ZvVesk2

@@ -20,12 +20,12 @@ Cert::Cert(AclEntry* entry)
       notAfter(entry->GetNotAfter()),
       comment(entry->GetComment()) {}
 
-int RevocationLists::Mark(Cert* cert, const TimeStamp* notBefore) {
+int RevocationLists::Mark(Decision& decision, Cert* cert, const TimeStamp* notBefore) {
   // Chain verification looks at the status alone: it speaks for the certificate only when both
   // questions were answered.
   cert->revocationStatus = Cert::Undetermined;
 
-  const int key = AskCritical(nullptr, cert->GetSubject());
+  const int key = AskCritical(decision, nullptr, cert->GetSubject());
   if (key == VESK2_ERR_KEY_REVOKED) {
     cert->revocationStatus = Cert::KeyRevoked;
     return 0;
@@ -35,7 +35,7 @@ int RevocationLists::Mark(Cert* cert, const TimeStamp* notBefore) {
   if (cert->GetRevocationElement() != nullptr) {
     Ref<SExpression> source;
     VESK2_TRY(MakeTag(source, cert->GetRevocationElement()));
-    const int listed = AskNonCritical(source.get(), cert, notBefore);
+    const int listed = AskNonCritical(decision, source.get(), cert, notBefore);
     if (listed == VESK2_ERR_CERT_REVOKED) {
       cert->revocationStatus = Cert::RevokedByCrl;
       return 0;
@@ -49,7 +49,8 @@ int RevocationLists::Mark(Cert* cert, const TimeStamp* notBefore) {
 int Cert::IsRevoked(bool& revoked, SExpression* acls, SExpression* crls, TimeStamp* from,
                     TimeStamp*) {
   revoked = false;
-  VESK2_TRY(RevocationLists(acls, crls).Mark(this, from));
+  RevocationLists::Decision decision;
+  VESK2_TRY(RevocationLists(acls, crls).Mark(decision, this, from));
   revoked = revocationStatus != NotRevoked;
   return 0;
 }

@@ -84,10 +84,12 @@ int RevocationLists::Collect(Answers& answers, bool critical, std::span<Source> 
   for (const Source& list : lists) {
     SExpression* const named = ItemsOf(list.value.sequence, critical);
     if (list.value.proof != Proof::kHolds || named->Count() < 2) continue;
-    answers.items.Add(named);
-    const TimeStamp* const end = list.value.sequence->GetCert()->GetNotAfter();
-    if (end == nullptr) continue;
-    if (answers.latest == nullptr || end->IsAfter(answers.latest)) answers.latest = end;
+    CrlSequence* const sequence = list.value.sequence;
+    answers.items.Add(named, sequence);
+    const TimeStamp* const end = sequence->GetCert()->GetNotAfter();
+    if (end == nullptr || (answers.latest != nullptr && !end->IsAfter(answers.latest))) continue;
+    answers.latest = end;
+    answers.last = sequence;
   }
   answers.items.Sort();
   answers.ready = true;
@@ -113,25 +115,33 @@ int RevocationLists::Find(Answers*& answers, bool critical, SExpression* tag) {
   return 0;
 }
 
-int RevocationLists::AskCritical(SExpression* tag, SExpression* object) {
+int RevocationLists::AskCritical(Decision& decision, SExpression* tag, SExpression* object) {
+  decision = {};
   VESK2_REQUIRE(object != nullptr, VESK2_ERR_PARAM_NULL);
   Answers* answers = nullptr;
   VESK2_TRY(Find(answers, true, tag));
   if (answers == nullptr) return 0;
   const ItemIndex::Item* item = nullptr;
   VESK2_TRY(answers->items.Find(item, object));
-  return item != nullptr ? VESK2_ERR_KEY_REVOKED : 0;
+  if (item == nullptr) return 0;
+  decision = {item->list, item->from};
+  return VESK2_ERR_KEY_REVOKED;
 }
 
-int RevocationLists::AskNonCritical(SExpression* tag, SExpression* object,
+int RevocationLists::AskNonCritical(Decision& decision, SExpression* tag, SExpression* object,
                                     const TimeStamp* notBefore) {
+  decision = {};
   VESK2_REQUIRE(object != nullptr, VESK2_ERR_PARAM_NULL);
   Answers* answers = nullptr;
   VESK2_TRY(Find(answers, false, tag));
   VESK2_REQUIRE(answers != nullptr, VESK2_ERR_CRL_NOT_FOUND);
+  decision.list = answers->last;
   const ItemIndex::Item* item = nullptr;
   VESK2_TRY(answers->items.Find(item, object));
-  if (item != nullptr && Counts(*item, notBefore)) return VESK2_ERR_CERT_REVOKED;
+  if (item != nullptr && Counts(*item, notBefore)) {
+    decision = {item->list, item->from};
+    return VESK2_ERR_CERT_REVOKED;
+  }
   // Some list was current in the period if the latest end is not before the period's start.
   VESK2_REQUIRE(answers->latest != nullptr, VESK2_ERR_CRL_NOT_FOUND);
   return notBefore != nullptr && answers->latest->IsBefore(notBefore) ? VESK2_ERR_NOT_AFTER : 0;
@@ -142,7 +152,8 @@ int RevocationLists::MarkAll(SExpression* certs, const TimeStamp* notBefore) {
   for (auto it = certs->Begin(); it; it.Next()) {
     auto* const cert = dynamic_cast<Cert*>(it.Value());
     if (cert == nullptr) continue;
-    const int code = Mark(cert, notBefore);
+    Decision decision;
+    const int code = Mark(decision, cert, notBefore);
     VESK2_REQUIRE(!LacksMemory(code), VESK2_ERR_MEM_ALLOC);
   }
   return 0;
@@ -150,13 +161,15 @@ int RevocationLists::MarkAll(SExpression* certs, const TimeStamp* notBefore) {
 
 int CrlSequence::CheckStatusCritical(SExpression* aclEntries, SExpression* store, SExpression* tag,
                                      SExpression* object) {
-  return RevocationLists(aclEntries, store).AskCritical(tag, object);
+  RevocationLists::Decision decision;
+  return RevocationLists(aclEntries, store).AskCritical(decision, tag, object);
 }
 
 int CrlSequence::CheckStatusNonCritical(SExpression* aclEntries, SExpression* store,
                                         SExpression* tag, SExpression* object, TimeStamp* notBefore,
                                         TimeStamp*) {
-  return RevocationLists(aclEntries, store).AskNonCritical(tag, object, notBefore);
+  RevocationLists::Decision decision;
+  return RevocationLists(aclEntries, store).AskNonCritical(decision, tag, object, notBefore);
 }
 
 int CrlSequence::MarkRevoked(SExpression* certs, SExpression* aclEntries, SExpression* store,

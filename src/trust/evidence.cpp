@@ -22,6 +22,7 @@ void Evidence::Clear(Kind newKind) {
   subject.Reset();
   for (Ref<TimeStamp>* stamp : {&signingTime, &first, &last, &revocationTime}) stamp->Reset();
   SetContent(0, 0, 0);
+  work = 0;
 }
 
 int Evidence::Copy(const Evidence& other) {
@@ -29,8 +30,13 @@ int Evidence::Copy(const Evidence& other) {
   VESK2_TRY(Reserve(other.count));
   for (; count < other.count; ++count) {
     const Link& each = other.links[count];
-    links[count] = {Ref<Cert>::Share(each.cert.get()), Ref<Signature>::Share(each.signature.get()),
-                    Ref<SExpression>::Share(each.source.get()), each.signatureCode, each.status};
+    links[count] = {Ref<Cert>::Share(each.cert.get()),
+                    Ref<Signature>::Share(each.signature.get()),
+                    Ref<SExpression>::Share(each.source.get()),
+                    each.signatureCode,
+                    each.status,
+                    Ref<CrlSequence>::Share(each.list.get()),
+                    Ref<TimeStamp>::Share(each.since.get())};
   }
   entries = Ref<SExpression>::Share(other.entries.get());
   granting = Ref<SExpression>::Share(other.granting.get());
@@ -43,6 +49,7 @@ int Evidence::Copy(const Evidence& other) {
   last = Ref<TimeStamp>::Share(other.last.get());
   revocationTime = Ref<TimeStamp>::Share(other.revocationTime.get());
   SetContent(other.contentCode, other.listingCode, other.listingPosition);
+  work = other.work;
   return 0;
 }
 
@@ -53,6 +60,8 @@ Signature* Evidence::GetSignature(size_t index) const { return links[index].sign
 int Evidence::GetSignatureCode(size_t index) const { return links[index].signatureCode; }
 int32_t Evidence::GetRevocationStatus(size_t index) const { return links[index].status; }
 SExpression* Evidence::GetRevocationSource(size_t index) const { return links[index].source.get(); }
+CrlSequence* Evidence::GetRevocationList(size_t index) const { return links[index].list.get(); }
+TimeStamp* Evidence::GetRevokedSince(size_t index) const { return links[index].since.get(); }
 
 TimeStamp* Evidence::GetFirst() const {
   return AskedAboutSigning() ? signingTime.get() : first.get();
@@ -102,6 +111,12 @@ void Evidence::RemoveCerts() {
   if (!subject) subject = Ref<Subject>::Share(AskedSubject());
   links.reset();
   count = capacity = 0;
+}
+
+void Evidence::RemoveCert(size_t index) {
+  if (!subject) subject = Ref<Subject>::Share(AskedSubject());
+  std::move(links.get() + index + 1, links.get() + count, links.get() + index);
+  links[--count] = Link();
 }
 
 void Evidence::SetEntries(SExpression* acl) { entries = Ref<SExpression>::Share(acl); }

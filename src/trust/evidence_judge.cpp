@@ -49,21 +49,24 @@ int Evidence::MarkRevoked() {
   VESK2_REQUIRE(lists, VESK2_ERR_MEM_ALLOC);
   VESK2_TRY(AppendUnproved(lists.get(), storedLists.get()));
   VESK2_TRY(AppendUnproved(lists.get(), carriedLists.get()));
-  Ref<SExpression> certs(TryNew<SExpression>(context));
-  VESK2_REQUIRE(certs, VESK2_ERR_MEM_ALLOC);
-  for (size_t i = 0; i < count; ++i) VESK2_TRY(AppendShared(certs.get(), GetCert(i)));
-  // The status decides; a certificate about which nothing is known is treated like a revoked one,
-  // but never because there was no memory to ask.
   RevocationLists revocations(entries.get(), lists.get());
-  VESK2_TRY(revocations.MarkAll(certs.get(), GetRevocationFirst()));
-  for (size_t i = 0; i < count; ++i) {
-    Link& link = links[i];
-    link.status = link.cert->GetRevocationStatus();
-    if (link.status != Cert::Undetermined) continue;
-    bool listed = false;
-    VESK2_TRY(Assumed(listed, link.source.get()));
-    if (listed) link.status = Cert::NotRevoked;
-  }
+  for (size_t i = 0; i < count; ++i) VESK2_TRY(MarkLink(revocations, links[i]));
+  return 0;
+}
+
+// The status decides; a certificate about which nothing is known is treated like a revoked one, but
+// never because there was no memory to ask.
+int Evidence::MarkLink(RevocationLists& revocations, Link& link) const {
+  RevocationLists::Decision decision;
+  const int code = revocations.Mark(decision, link.cert.get(), GetRevocationFirst());
+  VESK2_REQUIRE(!LacksMemory(code), VESK2_ERR_MEM_ALLOC);
+  link.status = link.cert->GetRevocationStatus();
+  link.list = Ref<CrlSequence>::Share(decision.list);
+  link.since = Ref<TimeStamp>::Share(decision.since);
+  if (link.status != Cert::Undetermined) return 0;
+  bool listed = false;
+  VESK2_TRY(Assumed(listed, link.source.get()));
+  if (listed) link.status = Cert::NotRevoked;
   return 0;
 }
 
@@ -127,16 +130,19 @@ int Evidence::MakePeriod(Ref<SExpression>& out) const {
   return 0;
 }
 
-int Evidence::Reduce(SExpression* tag) const {
+int Evidence::Reduce(SExpression* tag) {
   Ref<SExpression> chain;
   VESK2_TRY(BuildChain(chain));
   Ref<SExpression> period;
   VESK2_TRY(MakePeriod(period));
-  return Verify::ReductA(context, granting ? granting.get() : entries.get(), chain.get(),
-                         AskedSubject(), tag, period.get());
+  const uint64_t before = Verify::WorkDone();
+  const int code = Verify::ReductA(context, granting ? granting.get() : entries.get(), chain.get(),
+                                   AskedSubject(), tag, period.get());
+  work = Verify::WorkDone() - before;
+  return code;
 }
 
-int Evidence::Prove(SExpression* tag) const {
+int Evidence::Prove(SExpression* tag) {
   VESK2_TRY(CheckRevoked());
   return Reduce(tag);
 }

@@ -2,6 +2,7 @@
 #ifndef VESK2_SRC_TRUST_EVIDENCE_LINK_H
 #define VESK2_SRC_TRUST_EVIDENCE_LINK_H
 
+#include <vesk2/crl.h>
 #include <vesk2/evidence.h>
 
 namespace ZvVesk2 {
@@ -12,6 +13,8 @@ struct Evidence::Link {
   Ref<SExpression> source;
   int signatureCode = 0;
   int32_t status = Cert::Undetermined;  // until the lists were asked
+  Ref<CrlSequence> list;                // see RevocationLists::Decision
+  Ref<TimeStamp> since;
 };
 
 }  // namespace ZvVesk2

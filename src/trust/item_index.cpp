@@ -59,8 +59,8 @@ int ItemIndex::Reserve(size_t count) {
   return 0;
 }
 
-void ItemIndex::Add(SExpression* list) {
-  for (auto it = list->Begin(); it; it.Next()) {
+void ItemIndex::Add(SExpression* items, CrlSequence* list) {
+  for (auto it = items->Begin(); it; it.Next()) {
     auto* const item = dynamic_cast<SExpression*>(it.Value());
     if (item == nullptr) continue;
     auto at = item->Begin();
@@ -71,7 +71,7 @@ void ItemIndex::Add(SExpression* list) {
     if (digest.empty()) continue;
     auto* const date = dynamic_cast<TimeStamp*>(item->Last());
     const bool isDated = date != nullptr && IsStamp(date);
-    items_[count_++] = {named->GetAlgorithm(), digest, isDated ? date : nullptr};
+    items_[count_++] = {named->GetAlgorithm(), digest, isDated ? date : nullptr, list};
     algorithms_ |= Bit(named->GetAlgorithm());
   }
 }
@@ -85,7 +85,7 @@ const Item* ItemIndex::Find(ZvclmHashID algorithm, Bytes digest) const {
     if (item.algorithm != wanted.algorithm) return item.algorithm < wanted.algorithm;
     return item.digest < wanted.digest;
   };
-  const Item wanted{algorithm, digest, nullptr};
+  const Item wanted{algorithm, digest, nullptr, nullptr};
   const Item* const first = std::lower_bound(begin, end, wanted, before);
   return first != end && Names(*first, algorithm, digest) ? first : nullptr;
 }

@@ -11,6 +11,8 @@
 
 namespace ZvVesk2 {
 
+class CrlSequence;
+
 // Whether a stamp has the full form "####-##-##_##:##:##", so that comparing it means something.
 bool IsStamp(const TimeStamp* stamp);
 
@@ -19,18 +21,19 @@ class ItemIndex {
   using Bytes = std::basic_string_view<unsigned char>;
 
   // What the items say of one object: the earliest date from which it is revoked; null: always,
-  // since no date that could be compared is given.
+  // since no date that could be compared is given. `list` is where that item stands.
   struct Item {
     ZvclmHashID algorithm;
     Bytes digest;
-    const TimeStamp* from;
+    TimeStamp* from;
+    CrlSequence* list;
   };
 
   // Reserve makes room for `count` items, before the first is added. VESK2_ERR_MEM_ALLOC.
   [[nodiscard]] int Reserve(size_t count);
-  // Add takes in the items (item HASH DATE) of a list, headed by its keyword, and borrows their
+  // Add takes in the items (item HASH DATE), headed by their keyword, of a list, and borrows their
   // bytes. What is no item, or is of an unknown hash, names nothing.
-  void Add(SExpression* list);
+  void Add(SExpression* items, CrlSequence* list);
   // Sort makes the items findable. None may be added afterwards.
   void Sort();
 

@@ -17,15 +17,22 @@ namespace ZvVesk2 {
 
 class RevocationLists {
  public:
+  // What decided an answer: the list that names the object, and since when it does (null: always);
+  // else the list of the source that ends last, if there is one.
+  struct Decision {
+    CrlSequence* list = nullptr;
+    TimeStamp* since = nullptr;
+  };
+
   // `acls` vouch for the lists in `store`; either may be null, and both outlive this object.
   RevocationLists(SExpression* acls, SExpression* store) : acls_(acls), store_(store) {}
 
   // See CrlSequence::CheckStatusCritical and CheckStatusNonCritical.
-  [[nodiscard]] int AskCritical(SExpression* tag, SExpression* object);
-  [[nodiscard]] int AskNonCritical(SExpression* tag, SExpression* object,
+  [[nodiscard]] int AskCritical(Decision& decision, SExpression* tag, SExpression* object);
+  [[nodiscard]] int AskNonCritical(Decision& decision, SExpression* tag, SExpression* object,
                                    const TimeStamp* notBefore);
   // See Cert::IsRevoked. The status tells whether it was revoked.
-  [[nodiscard]] int Mark(Cert* cert, const TimeStamp* notBefore);
+  [[nodiscard]] int Mark(Decision& decision, Cert* cert, const TimeStamp* notBefore);
   // See CrlSequence::MarkRevoked.
   [[nodiscard]] int MarkAll(SExpression* certs, const TimeStamp* notBefore);
   // Store offers those of the `carried` lists that are proved to the store, in their order. All are
@@ -44,6 +51,7 @@ class RevocationLists {
     bool ready = false;
     ItemIndex items;
     const TimeStamp* latest = nullptr;  // the latest end of a list
+    CrlSequence* last = nullptr;        // that list
   };
 
   [[nodiscard]] int Load();
