@@ -47,6 +47,7 @@
 #include <vesk2/context.h>
 #include <vesk2/crl.h>
 #include <vesk2/evidence.h>
+#include <vesk2/explanation.h>
 #include <vesk2/expression.h>
 #include <vesk2/file_item.h>
 #include <vesk2/hash.h>
@@ -62,5 +63,6 @@
 #include <vesk2/subject.h>
 #include <vesk2/time_stamp.h>
 #include <vesk2/verify.h>
+#include <vesk2/wording.h>
 
 #endif  // VESK2_HPP

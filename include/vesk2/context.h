@@ -34,6 +34,10 @@ VESK2_API const char* V2Error(int code);
 // V2SpkiError returns the text of an engine code; one without a text gives
 // "VESK_UNKNOWN_SPKI_ERROR".
 VESK2_API const char* V2SpkiError(int code);
+// V2CodeName returns the constant's name of a code of either kind; null for a number that is none.
+VESK2_API const char* V2CodeName(int code);
+// V2CodeWords returns what a code means, for people; empty where that depends on who answered it.
+VESK2_API const char* V2CodeWords(int code);
 
 }  // namespace ZvVesk2
 

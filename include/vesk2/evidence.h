@@ -38,6 +38,7 @@ class VESK2_API Evidence {
 
   // ---- What was read, borrowed; null for what was not ----
   Kind GetKind() const;
+  Vesk2ContextStruct* GetContext() const;
   // The certificates, the end of the chain (of a manifest, the signer certificate) at 0. `index`
   // must be below the count.
   size_t CountCerts() const;
@@ -116,6 +117,10 @@ class VESK2_API Evidence {
   // Grants returns what is granted, whatever is asked: the outputs of Verify::ReductB.
   [[nodiscard]] int Grants(SExpression*& tag, SExpression*& notBefore,
                            SExpression*& notAfter) const;
+  // RelevantEntries makes the list of the entries that name a key of the chain: that grant to it,
+  // to its digest, or to a k-of-n that counts it. `out` must be null. VESK2_ERR_INVALID_PARAM,
+  // VESK2_ERR_MEM_ALLOC.
+  [[nodiscard]] int RelevantEntries(SExpression*& out) const;
   // Size is about how many bytes one Judge works on, GetWork what the last reduction cost (see
   // Verify::WorkDone): what a further question about the same may cost.
   size_t Size() const;

@@ -56,6 +56,10 @@ inline constexpr uint32_t kMaxSetMembers = 4096;
 // Names still to resolve below one subject: (name K N N N ...) definitions can feed themselves.
 inline constexpr uint32_t kMaxNameRest = 64;
 
+// Reasons that one explanation names: periods of certificates that miss one another can be as many
+// as the square of the certificates.
+inline constexpr size_t kMaxReasons = 1000;
+
 // Keys and signatures, tested when a signature is checked and not when a key is read: a key is an
 // identity first. Outside these a signature is simply not valid.
 inline constexpr int kMaxRsaModulusBits = 16384;

@@ -155,6 +155,7 @@ void Evidence::SetContent(int code, int codeOfListing, size_t position) {
 }
 
 Evidence::Kind Evidence::GetKind() const { return kind; }
+Vesk2ContextStruct* Evidence::GetContext() const { return context; }
 size_t Evidence::CountCerts() const { return count; }
 SExpression* Evidence::GetEntries() const { return entries.get(); }
 SExpression* Evidence::GetStoredLists() const { return storedLists.get(); }

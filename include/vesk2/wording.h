@@ -1,0 +1,38 @@
+// wording.h: what people are told about objects: texts that are safe for a terminal, whoever wrote
+// the object. This library's own explanations use them too.
+//
+// Each returns a new text, to be released with Vesk2Free, or null when memory runs out or, for an
+// object, when it is nested too deeply to be written.
+#ifndef VESK2_WORDING_H
+#define VESK2_WORDING_H
+
+#include <vesk2/acl_entry.h>
+#include <vesk2/subject.h>
+#include <vesk2/time_stamp.h>
+
+#include <cstddef>
+
+namespace ZvVesk2::Wording {
+
+// Escape writes control bytes (ESC and DEL among them), invalid UTF-8 and the characters that
+// reorder or break lines on a terminal as \xNN, and a backslash as "\\", so that the result is
+// unambiguous.
+VESK2_API char* Escape(const void* bytes, size_t length);
+// Fingerprint is "sha256:" and the digest of the canonical form without hints: the identity of a
+// key.
+VESK2_API char* Fingerprint(DExpression* expression);
+// OfSubject is the fingerprint of a key, the algorithm and the digest of a hash, and "2 of" and the
+// fingerprints of the members of a k-of-n.
+VESK2_API char* OfSubject(Subject* subject);
+// OfEntry is the name of an entry's file in the store, and of another one its path.
+VESK2_API char* OfEntry(const AclEntry* entry);
+// OfList is the advanced text of a list, with all of words that hold a 0 byte; with a keyword, of
+// the body of a list that is headed by it. OfTag is that of a tag, "everything" for null.
+VESK2_API char* OfList(SExpression* list, const char* keyword);
+VESK2_API char* OfTag(SExpression* tag);
+// OfPeriod is "from STAMP until STAMP", as far as given, "at STAMP" for one moment, or "always".
+VESK2_API char* OfPeriod(const TimeStamp* notBefore, const TimeStamp* notAfter);
+
+}  // namespace ZvVesk2::Wording
+
+#endif  // VESK2_WORDING_H

@@ -1,0 +1,103 @@
+// Explanation: by which way authority came. One entry is enough for most answers, and most of a
+// chain is needed: the entry is found by letting each grant alone, and the certificates by leaving
+// out each of them. The library's own rules judge what is left.
+#include <utility>
+
+#include <vesk2/crl.h>
+
+#include "src/trust/explanation_state.h"
+#include "src/trust/lists.h"
+
+namespace ZvVesk2 {
+
+int Explanation::Path::Find() {
+  VESK2_TRY(FindEntry());
+  if (state_.entry == nullptr) return 0;  // several entries together
+  VESK2_TRY(FindCerts());
+  if (!state_.complete) {
+    state_.entry = nullptr;
+    state_.pathCount = 0;
+    return 0;
+  }
+  FindEnd();
+  return 0;
+}
+
+int Explanation::Path::FindEntry() {
+  for (auto it = state_.relevant->Begin(); it && state_.entry == nullptr; it.Next()) {
+    auto* const entry = static_cast<AclEntry*>(it.Value());
+    if (!state_.Afford(evidence_.Size())) return 0;
+    bool granted = false;
+    VESK2_TRY(GrantAlone(granted, entry));
+    if (granted) state_.entry = entry;
+  }
+  return 0;
+}
+
+int Explanation::Path::GrantAlone(bool& granted, AclEntry* entry) {
+  Ref<SExpression> list;
+  VESK2_TRY(SExpression::Create(list.Out(), "acl", evidence_.GetContext()));
+  VESK2_TRY(AppendShared(list.get(), entry));
+  VESK2_TRY(alone_.Copy(evidence_));
+  alone_.SetGrantingEntries(list.get());
+  const int code = state_.ProveMembers(alone_);
+  VESK2_REQUIRE(!LacksMemory(code), code);
+  granted = code == 0;
+  return 0;
+}
+
+int Explanation::Path::FindCerts() {
+  const size_t count = evidence_.CountCerts();
+  state_.path.reset(TryNewArray<size_t>(count));
+  VESK2_REQUIRE(state_.path, VESK2_ERR_MEM_ALLOC);
+  // A manifest's signer certificate and the signer's own have their places.
+  size_t second = 1;
+  while (second < count && evidence_.GetRevocationStatus(second) != Cert::NotRevoked) ++second;
+  for (size_t i = count; i-- > 0;) {
+    bool gone = false;
+    VESK2_TRY(CanGo(gone, i, second));
+    if (!state_.complete) return 0;
+    if (!gone) state_.path[state_.pathCount++] = i;
+  }
+  return 0;
+}
+
+int Explanation::Path::CanGo(bool& gone, size_t index, size_t second) {
+  const bool manifest = state_.IsManifest();
+  if (manifest ? index == 0 || index == second : alone_.CountCerts() == 1) return 0;
+  if (manifest && evidence_.GetRevocationStatus(index) != Cert::NotRevoked) {
+    gone = true;  // it was left out already
+    alone_.RemoveCert(index);
+    return 0;
+  }
+  if (!state_.Afford(evidence_.Size())) return 0;
+  Evidence without(evidence_.GetContext());
+  VESK2_TRY(without.Copy(alone_));
+  without.RemoveCert(index);
+  const int code = state_.ProveMembers(without);
+  VESK2_REQUIRE(!LacksMemory(code), code);
+  gone = code == 0;
+  if (gone) alone_.RemoveCert(index);
+  return 0;
+}
+
+// ---- Until when ----
+
+void Explanation::Path::FindEnd() {
+  EndsAt(state_.entry->GetNotAfter(), EntryEnds, kNone);
+  for (size_t i = 0; i < state_.pathCount; ++i) {
+    const size_t cert = state_.path[i];
+    EndsAt(evidence_.GetCert(cert)->GetNotAfter(), CertEnds, cert);
+    const CrlSequence* const list = evidence_.GetRevocationList(cert);
+    if (list != nullptr) EndsAt(list->GetCert()->GetNotAfter(), ListEnds, cert);
+  }
+}
+
+void Explanation::Path::EndsAt(TimeStamp* end, End kind, size_t cert) {
+  if (end == nullptr || (state_.end != nullptr && !end->IsBefore(state_.end))) return;
+  state_.end = end;
+  state_.endKind = kind;
+  state_.endCert = cert;
+}
+
+}  // namespace ZvVesk2

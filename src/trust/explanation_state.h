@@ -1,0 +1,145 @@
+// What an Explanation holds: the question, what may still be spent, and what was found.
+#ifndef VESK2_SRC_TRUST_EXPLANATION_STATE_H
+#define VESK2_SRC_TRUST_EXPLANATION_STATE_H
+
+#include <vesk2/acl_entry.h>
+#include <vesk2/explanation.h>
+
+#include "src/trust/principals.h"
+#include "src/trust/text_writer.h"
+
+namespace ZvVesk2 {
+
+struct Explanation::Held {
+  Reason reason = {};
+  std::unique_ptr<char[]> text;
+};
+
+struct Explanation::State {
+  explicit State(Vesk2ContextStruct* ctx) : evidence(ctx) {}
+
+  // ---- The question ----
+  Evidence evidence;
+  Principals principals;
+  Ref<SExpression> relevant;  // the entries that name a key of the chain
+  Ref<SExpression> tag;
+  Ref<SExpression> members;
+  bool IsManifest() const { return evidence.GetKind() == Evidence::SignedManifest; }
+  // Runs `ask` on each tag that must be granted until it returns anything but 0.
+  template <typename Ask>
+  int EachMember(Ask ask) const;
+  // The code of the first tag that the evidence does not prove.
+  [[nodiscard]] int ProveMembers(Evidence& changed) const;
+
+  // ---- What it may cost ----
+  void StartCounting();
+  // Afford counts `bytes` that are about to be worked on; false when no more may be spent.
+  bool Afford(uint64_t bytes = 0);
+  bool complete = true;
+
+  // ---- Reasons ----
+  // Adds a reason with its text; past the limit it only counts.
+  [[nodiscard]] int Add(Reason reason, TextWriter& text);
+  void DropReasons(size_t from);
+  std::unique_ptr<Held[]> reasons;
+  size_t count = 0;
+  size_t capacity = 0;
+  size_t found = 0;
+
+  // ---- The path ----
+  AclEntry* entry = nullptr;
+  std::unique_ptr<size_t[]> path;
+  size_t pathCount = 0;
+  TimeStamp* end = nullptr;
+  End endKind = NoEnd;
+  size_t endCert = kNone;
+
+ private:
+  uint64_t workLimit = 0;
+  uint64_t bytesLimit = 0;
+  uint64_t bytesSpent = 0;
+};
+
+template <typename Ask>
+int Explanation::State::EachMember(Ask ask) const {
+  if (!members) return ask(tag.get());
+  int code = 0;
+  for (auto it = members->Begin(); it && code == 0; it.Next()) {
+    if (auto* const member = dynamic_cast<SExpression*>(it.Value())) code = ask(member);
+  }
+  return code;
+}
+
+// Where authority was lost.
+class Explanation::Losses {
+ public:
+  Losses(State& state, std::string_view file, std::string_view extraDirectory)
+      : state_(state), evidence_(state.evidence), file_(file), extraDirectory_(extraDirectory) {}
+  // Looks for what can have led to the code.
+  [[nodiscard]] int Find(int code);
+
+ private:
+  int Signatures();
+  int Order();
+  int Content();
+  int Revocations();
+  int Certificates();
+  int Link(size_t index);
+  int Conflicts();
+  int Roots();
+  int Root(AclEntry* entry);
+  int Threshold(AclEntry* entry, ThresholdSubject* threshold);
+  int NoEntryAtAll();
+  int Rest();
+  int Unreadable();
+  int TryReduction(int& code, bool isEntry, DExpression* credential);
+  int Period(const Reason& where, const TimeStamp* notBefore, const TimeStamp* notAfter);
+  int Tag(const Reason& where, SExpression* tag);
+
+  // A reason of a kind about a certificate, or an entry, and the text that begins with its name.
+  static Reason About(Kind kind, size_t cert) {
+    return {kind, 0, cert, kNone, nullptr, nullptr, nullptr};
+  }
+  static Reason About(Kind kind, AclEntry* entry) {
+    return {kind, 0, kNone, kNone, entry, nullptr, nullptr};
+  }
+  TextWriter& Name(TextWriter& text, const Reason& reason) const;
+  TextWriter& CertName(TextWriter& text, size_t index) const;
+  TextWriter& Asked(TextWriter& text) const;
+
+  using Step = int (Losses::*)();
+  struct Row {
+    int code;
+    Step steps[4];
+  };
+  static const Row kRows[];
+
+  State& state_;
+  Evidence& evidence_;
+  std::string_view file_;
+  std::string_view extraDirectory_;
+};
+
+// By which way authority came, and until when it lasts.
+class Explanation::Path {
+ public:
+  explicit Path(State& state)
+      : state_(state), evidence_(state.evidence), alone_(evidence_.GetContext()) {}
+  [[nodiscard]] int Find();
+
+ private:
+  int FindEntry();
+  int GrantAlone(bool& granted, AclEntry* entry);
+  int FindCerts();
+  int CanGo(bool& gone, size_t index, size_t second);
+  void FindEnd();
+  void EndsAt(TimeStamp* end, End kind, size_t cert);
+
+  State& state_;
+  Evidence& evidence_;
+  Evidence alone_;  // what is left: one entry, and the certificates that are needed
+};
+
+}  // namespace ZvVesk2
+
+#endif  // VESK2_SRC_TRUST_EXPLANATION_STATE_H
