@@ -129,7 +129,6 @@ class VESK2_API Evidence {
  private:
   struct Link;
   [[nodiscard]] VESK2_LOCAL int Reserve(size_t wanted);
-  [[nodiscard]] VESK2_LOCAL int MarkLink(RevocationLists& revocations, Link& link) const;
   [[nodiscard]] VESK2_LOCAL int Assumed(bool& assumed, SExpression* source) const;
   [[nodiscard]] VESK2_LOCAL int CheckForm() const;
   [[nodiscard]] VESK2_LOCAL int MakePeriod(Ref<SExpression>& out) const;

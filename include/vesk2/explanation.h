@@ -17,6 +17,7 @@
 namespace ZvVesk2 {
 
 class AclEntry;
+struct ExplanationState;
 
 class VESK2_API Explanation {
  public:
@@ -98,15 +99,10 @@ class VESK2_API Explanation {
   size_t GetEndCert() const;
 
  private:
-  struct Held;
-  struct State;
-  class Losses;
-  class Path;
-
   Vesk2ContextStruct* context;
   std::unique_ptr<char[]> file;
   std::unique_ptr<char[]> extraDirectory;
-  std::unique_ptr<State> state;
+  std::unique_ptr<ExplanationState> state;
 };
 
 }  // namespace ZvVesk2

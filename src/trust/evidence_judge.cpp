@@ -50,23 +50,21 @@ int Evidence::MarkRevoked() {
   VESK2_TRY(AppendUnproved(lists.get(), storedLists.get()));
   VESK2_TRY(AppendUnproved(lists.get(), carriedLists.get()));
   RevocationLists revocations(entries.get(), lists.get());
-  for (size_t i = 0; i < count; ++i) VESK2_TRY(MarkLink(revocations, links[i]));
-  return 0;
-}
-
-// The status decides; a certificate about which nothing is known is treated like a revoked one, but
-// never because there was no memory to ask.
-int Evidence::MarkLink(RevocationLists& revocations, Link& link) const {
-  RevocationLists::Decision decision;
-  const int code = revocations.Mark(decision, link.cert.get(), GetRevocationFirst());
-  VESK2_REQUIRE(!LacksMemory(code), VESK2_ERR_MEM_ALLOC);
-  link.status = link.cert->GetRevocationStatus();
-  link.list = Ref<CrlSequence>::Share(decision.list);
-  link.since = Ref<TimeStamp>::Share(decision.since);
-  if (link.status != Cert::Undetermined) return 0;
-  bool listed = false;
-  VESK2_TRY(Assumed(listed, link.source.get()));
-  if (listed) link.status = Cert::NotRevoked;
+  for (size_t i = 0; i < count; ++i) {
+    Link& link = links[i];
+    RevocationLists::Decision decision;
+    // The status decides; a certificate about which nothing is known is treated like a revoked one,
+    // but never because there was no memory to ask.
+    const int code = revocations.Mark(decision, link.cert.get(), GetRevocationFirst());
+    VESK2_REQUIRE(!LacksMemory(code), VESK2_ERR_MEM_ALLOC);
+    link.status = link.cert->GetRevocationStatus();
+    link.list = Ref<CrlSequence>::Share(decision.list);
+    link.since = Ref<TimeStamp>::Share(decision.since);
+    if (link.status != Cert::Undetermined) continue;
+    bool listed = false;
+    VESK2_TRY(Assumed(listed, link.source.get()));
+    if (listed) link.status = Cert::NotRevoked;
+  }
   return 0;
 }
 

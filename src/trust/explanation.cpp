@@ -51,7 +51,7 @@ int Explanation::Explain(const Evidence& evidence, int code, SExpression* tag,
                          SExpression* members) {
   state.reset();
   VESK2_REQUIRE(tag != nullptr, VESK2_ERR_PARAM_NULL);
-  std::unique_ptr<State> fresh(TryNew<State>(context));
+  std::unique_ptr<ExplanationState> fresh(TryNew<ExplanationState>(context));
   VESK2_REQUIRE(fresh, VESK2_ERR_MEM_ALLOC);
   VESK2_TRY(fresh->evidence.Copy(evidence));
   VESK2_TRY(fresh->principals.Load(fresh->evidence));
@@ -60,33 +60,35 @@ int Explanation::Explain(const Evidence& evidence, int code, SExpression* tag,
   fresh->members = Ref<SExpression>::Share(members);
   fresh->StartCounting();
   const auto view = [](const char* text) { return text != nullptr ? text : ""; };
-  VESK2_TRY(code == 0 ? Path(*fresh).Find()
-                      : Losses(*fresh, view(file.get()), view(extraDirectory.get())).Find(code));
+  VESK2_TRY(
+      code == 0
+          ? ExplanationPath(*fresh).Find()
+          : ExplanationLosses(*fresh, view(file.get()), view(extraDirectory.get())).Find(code));
   state = std::move(fresh);
   return 0;
 }
 
 // ---- What it may cost ----
 
-void Explanation::State::StartCounting() {
+void ExplanationState::StartCounting() {
   workLimit = Verify::WorkDone() + std::max(kLeastWork, kMultiple * evidence.GetWork());
   bytesLimit = std::max(kLeastBytes, kMultiple * uint64_t{evidence.Size()});
 }
 
-bool Explanation::State::Afford(uint64_t bytes) {
+bool ExplanationState::Afford(uint64_t bytes) {
   bytesSpent += bytes;
   if (Verify::WorkDone() > workLimit || bytesSpent > bytesLimit) complete = false;
   return complete;
 }
 
-int Explanation::State::ProveMembers(Evidence& changed) const {
+int ExplanationState::ProveMembers(Evidence& changed) const {
   const int code = EachMember([&](SExpression* member) { return changed.Prove(member); });
   return LacksMemory(code) ? VESK2_ERR_MEM_ALLOC : code;
 }
 
 // ---- Reasons ----
 
-int Explanation::State::Add(Reason reason, TextWriter& text) {
+int ExplanationState::Add(Reason reason, TextWriter& text) {
   ++found;
   if (count == Limits::kMaxReasons) complete = false;
   if (!Afford(text.length())) return 0;
@@ -106,7 +108,7 @@ int Explanation::State::Add(Reason reason, TextWriter& text) {
   return 0;
 }
 
-void Explanation::State::DropReasons(size_t from) {
+void ExplanationState::DropReasons(size_t from) {
   while (count > from) reasons[--count] = Held();
 }
 

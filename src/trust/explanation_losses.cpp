@@ -12,23 +12,25 @@
 
 namespace ZvVesk2 {
 
-const Explanation::Losses::Row Explanation::Losses::kRows[] = {
-    {VESK2_ERR_SIGNATURE, {&Losses::Signatures}},
-    {VESK2_ERR_SIGNATURE_ID, {&Losses::Signatures}},
-    {VESK2_ERR_HASH_MISMATCH, {&Losses::Signatures}},
-    {VESK2_ERR_NOT_IMPLEMENTED, {&Losses::Signatures}},
-    {VESK2_ERR_HASH_MATCH, {&Losses::Content}},
-    {VESK2_ERR_NOT_OBJECT_CERT, {&Losses::Order}},
-    {VESK2_ERR_SIGNING_CERT_ORDER, {&Losses::Order, &Losses::Revocations}},
-    {VESK2_ERR_CERT_REVOKED, {&Losses::Revocations}},
-    {VESK2_ERR_CRL_NOT_FOUND, {&Losses::Revocations}},
+const ExplanationLosses::Row ExplanationLosses::kRows[] = {
+    {VESK2_ERR_SIGNATURE, {&ExplanationLosses::Signatures}},
+    {VESK2_ERR_SIGNATURE_ID, {&ExplanationLosses::Signatures}},
+    {VESK2_ERR_HASH_MISMATCH, {&ExplanationLosses::Signatures}},
+    {VESK2_ERR_NOT_IMPLEMENTED, {&ExplanationLosses::Signatures}},
+    {VESK2_ERR_HASH_MATCH, {&ExplanationLosses::Content}},
+    {VESK2_ERR_NOT_OBJECT_CERT, {&ExplanationLosses::Order}},
+    {VESK2_ERR_SIGNING_CERT_ORDER, {&ExplanationLosses::Order, &ExplanationLosses::Revocations}},
+    {VESK2_ERR_CERT_REVOKED, {&ExplanationLosses::Revocations}},
+    {VESK2_ERR_CRL_NOT_FOUND, {&ExplanationLosses::Revocations}},
     {VESK2_ERR_NOT_AUTHORIZED,
-     {&Losses::Revocations, &Losses::Certificates, &Losses::Roots, &Losses::Rest}},
+     {&ExplanationLosses::Revocations, &ExplanationLosses::Certificates, &ExplanationLosses::Roots,
+      &ExplanationLosses::Rest}},
     {VESK2_ERR_PACKAGE_NOT_GRANTED,
-     {&Losses::Revocations, &Losses::Certificates, &Losses::Roots, &Losses::Rest}},
+     {&ExplanationLosses::Revocations, &ExplanationLosses::Certificates, &ExplanationLosses::Roots,
+      &ExplanationLosses::Rest}},
 };
 
-int Explanation::Losses::Find(int code) {
+int ExplanationLosses::Find(int code) {
   if (code < 0) return evidence_.CountCerts() > 0 ? Unreadable() : 0;
   for (const Row& row : kRows) {
     if (row.code != code) continue;
@@ -41,17 +43,17 @@ int Explanation::Losses::Find(int code) {
 
 // ---- Names ----
 
-TextWriter& Explanation::Losses::CertName(TextWriter& text, size_t index) const {
+TextWriter& ExplanationLosses::CertName(TextWriter& text, size_t index) const {
   text << "certificate " << index + 1 << " (issuer ";
   return text.Of(evidence_.GetCert(index)->GetIssuer()) << ")";
 }
 
-TextWriter& Explanation::Losses::Name(TextWriter& text, const Reason& reason) const {
+TextWriter& ExplanationLosses::Name(TextWriter& text, const Reason& reason) const {
   if (reason.entry == nullptr) return CertName(text, reason.cert);
   return (text << "ACL entry ").Of(reason.entry);
 }
 
-TextWriter& Explanation::Losses::Asked(TextWriter& text) const {
+TextWriter& ExplanationLosses::Asked(TextWriter& text) const {
   const TimeStamp* const first = evidence_.GetFirst();
   if (first != nullptr && first == evidence_.GetSigningTime()) {
     return (text << "the manifest was signed at ").Of(first);
@@ -61,9 +63,9 @@ TextWriter& Explanation::Losses::Asked(TextWriter& text) const {
 
 // ---- What a certificate is ----
 
-int Explanation::Losses::Signatures() {
+int ExplanationLosses::Signatures() {
   for (size_t i = 0; i < evidence_.CountCerts(); ++i) {
-    Reason reason = About(SignatureFails, i);
+    Reason reason = About(Explanation::SignatureFails, i);
     reason.code = evidence_.GetSignatureCode(i);
     if (reason.code == 0) continue;
     TextWriter text;
@@ -73,12 +75,12 @@ int Explanation::Losses::Signatures() {
   return 0;
 }
 
-int Explanation::Losses::Order() {
+int ExplanationLosses::Order() {
   if (!state_.IsManifest() || evidence_.CountCerts() == 0) return 0;
   TextWriter text;
   if (!evidence_.GetCert(0)->GetSubject()->IsHash()) {
     CertName(text, 0) << " is not for the digest of a manifest";
-    return state_.Add(About(OutOfOrder, size_t{0}), text);
+    return state_.Add(About(Explanation::OutOfOrder, size_t{0}), text);
   }
   Principal* const signer = evidence_.GetCert(0)->GetIssuer();
   if (evidence_.CountCerts() < 2) return 0;
@@ -86,12 +88,12 @@ int Explanation::Losses::Order() {
   if (subject->IsEqual(signer)) return 0;
   (CertName(text, 1) << " is for ").Of(subject) << ", not for the signer ";
   text.Fingerprint(signer);
-  return state_.Add(About(OutOfOrder, 1), text);
+  return state_.Add(About(Explanation::OutOfOrder, 1), text);
 }
 
-int Explanation::Losses::Content() {
+int ExplanationLosses::Content() {
   if (const int code = evidence_.GetListingCode(); code != 0) {
-    Reason reason = About(OtherContent, kNone);
+    Reason reason = About(Explanation::OtherContent, kNone);
     reason.code = code;
     TextWriter text;
     if (!file_.empty()) text.Escaped(file_) << ": ";
@@ -101,12 +103,12 @@ int Explanation::Losses::Content() {
   if (evidence_.CountCerts() == 0) return 0;
   TextWriter text;
   CertName(text, 0) << " is for another version, time or listing";
-  return state_.Add(About(OtherContent, size_t{0}), text);
+  return state_.Add(About(Explanation::OtherContent, size_t{0}), text);
 }
 
-int Explanation::Losses::Revocations() {
+int ExplanationLosses::Revocations() {
   for (size_t i = 0; i < evidence_.CountCerts(); ++i) {
-    Reason reason = About(Revoked, i);
+    Reason reason = About(Explanation::Revoked, i);
     reason.source = evidence_.GetRevocationSource(i);
     TextWriter text;
     switch (evidence_.GetRevocationStatus(i)) {
@@ -116,11 +118,11 @@ int Explanation::Losses::Revocations() {
         CertName(text, i) << " is revoked";
         break;
       case Cert::KeyRevoked:
-        reason.kind = KeyRevoked;
+        reason.kind = Explanation::KeyRevoked;
         (CertName(text, i) << " is for a revoked key, ").Of(evidence_.GetCert(i)->GetSubject());
         break;
       default:
-        reason.kind = Undetermined;
+        reason.kind = Explanation::Undetermined;
         CertName(text, i) << ": no current revocation list tells whether it is revoked";
         if (reason.source != nullptr) (text << "; its source is ").Tag(reason.source);
     }
@@ -129,11 +131,12 @@ int Explanation::Losses::Revocations() {
   return 0;
 }
 
-int Explanation::Losses::Certificates() {
+int ExplanationLosses::Certificates() {
   for (size_t i = 0; i < evidence_.CountCerts() && state_.complete; ++i) {
     const Cert* const cert = evidence_.GetCert(i);
-    VESK2_TRY(Period(About(OutOfPeriod, i), cert->GetNotBefore(), cert->GetNotAfter()));
-    VESK2_TRY(Tag(About(NarrowTag, i), cert->GetTag()));
+    VESK2_TRY(
+        Period(About(Explanation::OutOfPeriod, i), cert->GetNotBefore(), cert->GetNotAfter()));
+    VESK2_TRY(Tag(About(Explanation::NarrowTag, i), cert->GetTag()));
     // A manifest's first speaks for the content, and the second is used as if it could be passed
     // on.
     if (i > (state_.IsManifest() ? 1U : 0U)) VESK2_TRY(Link(i));
@@ -142,7 +145,7 @@ int Explanation::Losses::Certificates() {
 }
 
 // Whether the next one follows from it.
-int Explanation::Losses::Link(size_t index) {
+int ExplanationLosses::Link(size_t index) {
   const Cert* const cert = evidence_.GetCert(index);
   bool leads = false;
   VESK2_TRY(state_.principals.NamesOtherIssuer(leads, cert->GetSubject(), index));
@@ -150,15 +153,15 @@ int Explanation::Losses::Link(size_t index) {
   TextWriter text;
   if (leads) {
     CertName(text, index) << " does not let its subject pass the grant on (no --propagate)";
-    return state_.Add(About(NotPassedOn, index), text);
+    return state_.Add(About(Explanation::NotPassedOn, index), text);
   }
   (CertName(text, index) << " is for ").Of(cert->GetSubject())
       << ", which issued no certificate of this chain";
-  return state_.Add(About(LeadsNowhere, index), text);
+  return state_.Add(About(Explanation::LeadsNowhere, index), text);
 }
 
 // Periods that each meet what was asked and not one another.
-int Explanation::Losses::Conflicts() {
+int ExplanationLosses::Conflicts() {
   const size_t count = evidence_.CountCerts();
   const TimeStamp* latest = nullptr;
   for (size_t j = 0; j < count; ++j) {
@@ -171,7 +174,7 @@ int Explanation::Losses::Conflicts() {
     for (size_t j = 0; j < count && state_.complete; ++j) {
       const TimeStamp* const begin = evidence_.GetCert(j)->GetNotBefore();
       if (i == j || begin == nullptr || !end->IsBefore(begin)) continue;
-      Reason reason = About(OutOfPeriod, i);
+      Reason reason = About(Explanation::OutOfPeriod, i);
       reason.otherCert = j;
       TextWriter text;
       (CertName(text, i) << " is valid until ").Of(end) << ", ";
@@ -184,8 +187,8 @@ int Explanation::Losses::Conflicts() {
 
 // ---- What was granted ----
 
-int Explanation::Losses::Period(const Reason& where, const TimeStamp* notBefore,
-                                const TimeStamp* notAfter) {
+int ExplanationLosses::Period(const Reason& where, const TimeStamp* notBefore,
+                              const TimeStamp* notAfter) {
   if (notAfter != nullptr && notAfter->IsBefore(evidence_.GetFirst())) {
     TextWriter text;
     (Name(text, where) << " was valid until ").Of(notAfter) << ", ";
@@ -199,7 +202,7 @@ int Explanation::Losses::Period(const Reason& where, const TimeStamp* notBefore,
   return state_.Add(where, text);
 }
 
-int Explanation::Losses::Tag(const Reason& where, SExpression* tag) {
+int ExplanationLosses::Tag(const Reason& where, SExpression* tag) {
   if (tag == nullptr) return 0;
   SExpression* beyond = nullptr;
   static_cast<void>(state_.EachMember([&](SExpression* member) {
@@ -215,7 +218,7 @@ int Explanation::Losses::Tag(const Reason& where, SExpression* tag) {
 }
 
 // Entries that name a key of the chain and do not help; none of it when one does.
-int Explanation::Losses::Roots() {
+int ExplanationLosses::Roots() {
   const size_t before = state_.count;
   for (auto it = state_.relevant->Begin(); it && state_.complete; it.Next()) {
     const size_t found = state_.found;
@@ -227,26 +230,27 @@ int Explanation::Losses::Roots() {
   return state_.relevant->Begin() ? 0 : NoEntryAtAll();
 }
 
-int Explanation::Losses::Root(AclEntry* entry) {
+int ExplanationLosses::Root(AclEntry* entry) {
   bool issues = false;
   VESK2_TRY(state_.principals.NamesIssuer(issues, entry->GetSubject()));
   if (!entry->GetPropagate() && issues) {
-    const Reason reason = About(NotPassedOn, entry);
+    const Reason reason = About(Explanation::NotPassedOn, entry);
     TextWriter text;
     Name(text, reason) << " does not let its key pass the grant on";
     VESK2_TRY(state_.Add(reason, text));
   }
-  VESK2_TRY(Period(About(OutOfPeriod, entry), entry->GetNotBefore(), entry->GetNotAfter()));
-  VESK2_TRY(Tag(About(NarrowTag, entry), entry->GetTag()));
+  VESK2_TRY(
+      Period(About(Explanation::OutOfPeriod, entry), entry->GetNotBefore(), entry->GetNotAfter()));
+  VESK2_TRY(Tag(About(Explanation::NarrowTag, entry), entry->GetTag()));
   auto* const threshold = dynamic_cast<ThresholdSubject*>(entry->GetSubject());
   return threshold != nullptr ? Threshold(entry, threshold) : 0;
 }
 
-int Explanation::Losses::Threshold(AclEntry* entry, ThresholdSubject* threshold) {
+int ExplanationLosses::Threshold(AclEntry* entry, ThresholdSubject* threshold) {
   size_t present = 0;
   VESK2_TRY(state_.principals.CountMembers(present, threshold));
   if (present >= threshold->GetK()) return 0;
-  const Reason reason = About(TooFewKeys, entry);
+  const Reason reason = About(Explanation::TooFewKeys, entry);
   TextWriter text;
   Name(text, reason) << " wants " << size_t{threshold->GetK()} << " of "
                      << size_t{threshold->GetN()} << " keys, and " << present << " of them "
@@ -254,7 +258,7 @@ int Explanation::Losses::Threshold(AclEntry* entry, ThresholdSubject* threshold)
   return state_.Add(reason, text);
 }
 
-int Explanation::Losses::NoEntryAtAll() {
+int ExplanationLosses::NoEntryAtAll() {
   TextWriter text;
   const std::unique_ptr<char[]> store(
       ZVsysutil::zv_join_path(VeskConf::GetGlobalDirectory(), AclEntry::DirectoryName(true)));
@@ -268,11 +272,11 @@ int Explanation::Losses::NoEntryAtAll() {
     VESK2_TRY(state_.principals.IsFirstOf(first, issuer, i));
     if (first) (text << " ").Fingerprint(issuer);
   }
-  return state_.Add(About(NoEntry, kNone), text);
+  return state_.Add(About(Explanation::NoEntry, kNone), text);
 }
 
 // What the chain does grant, beside what was asked for.
-int Explanation::Losses::Rest() {
+int ExplanationLosses::Rest() {
   if (!state_.Afford(evidence_.Size())) return 0;
   Ref<SExpression> tag;
   Ref<SExpression> limits[2];
@@ -290,25 +294,25 @@ int Explanation::Losses::Rest() {
     }
     (text << ", asked was ").Tag(state_.tag.get()) << " ";
     text.Period(evidence_.GetFirst(), evidence_.GetLast());
-    return state_.Add(About(NotCombined, kNone), text);
+    return state_.Add(About(Explanation::NotCombined, kNone), text);
   }
   if (state_.count > 0) return 0;
   text << "the certificates and the ACL entries do not combine to what was asked, ";
   text.Tag(state_.tag.get());
-  return state_.Add(About(NotCombined, kNone), text);
+  return state_.Add(About(Explanation::NotCombined, kNone), text);
 }
 
 // ---- What the reduction cannot read ----
 
 // One such credential is enough to stop it.
-int Explanation::Losses::Unreadable() {
+int ExplanationLosses::Unreadable() {
   const auto tell = [this](Reason reason) {
     TextWriter text;
     (Name(text, reason) << ": ").Code(reason.code);
     return reason.code < 0 ? state_.Add(reason, text) : 0;
   };
   for (size_t i = 0; i < evidence_.CountCerts() && state_.Afford(); ++i) {
-    Reason reason = About(CannotBeRead, i);
+    Reason reason = About(Explanation::CannotBeRead, i);
     VESK2_TRY(TryReduction(reason.code, false, evidence_.GetCert(i)));
     VESK2_TRY(tell(reason));
   }
@@ -316,7 +320,7 @@ int Explanation::Losses::Unreadable() {
   for (auto it = evidence_.GetEntries()->Begin(); it && state_.Afford(); it.Next()) {
     auto* const entry = dynamic_cast<AclEntry*>(it.Value());
     if (entry == nullptr) continue;
-    Reason reason = About(CannotBeRead, entry);
+    Reason reason = About(Explanation::CannotBeRead, entry);
     VESK2_TRY(TryReduction(reason.code, true, entry));
     VESK2_TRY(tell(reason));
   }
@@ -324,11 +328,11 @@ int Explanation::Losses::Unreadable() {
   if (state_.found > 0 || !evidence_.GetCert(0)->GetSubject()->IsThresholdSubject()) return 0;
   TextWriter text;
   CertName(text, 0) << " is for several keys together, about whom nothing can be asked";
-  return state_.Add(About(CannotBeRead, size_t{0}), text);
+  return state_.Add(About(Explanation::CannotBeRead, size_t{0}), text);
 }
 
 // The reduction's answer about one credential alone.
-int Explanation::Losses::TryReduction(int& code, bool isEntry, DExpression* credential) {
+int ExplanationLosses::TryReduction(int& code, bool isEntry, DExpression* credential) {
   Vesk2ContextStruct* const context = evidence_.GetContext();
   Ref<SExpression> acl;
   Ref<SExpression> sequence;

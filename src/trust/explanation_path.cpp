@@ -10,7 +10,7 @@
 
 namespace ZvVesk2 {
 
-int Explanation::Path::Find() {
+int ExplanationPath::Find() {
   VESK2_TRY(FindEntry());
   if (state_.entry == nullptr) return 0;  // several entries together
   VESK2_TRY(FindCerts());
@@ -23,7 +23,7 @@ int Explanation::Path::Find() {
   return 0;
 }
 
-int Explanation::Path::FindEntry() {
+int ExplanationPath::FindEntry() {
   for (auto it = state_.relevant->Begin(); it && state_.entry == nullptr; it.Next()) {
     auto* const entry = static_cast<AclEntry*>(it.Value());
     if (!state_.Afford(evidence_.Size())) return 0;
@@ -34,7 +34,7 @@ int Explanation::Path::FindEntry() {
   return 0;
 }
 
-int Explanation::Path::GrantAlone(bool& granted, AclEntry* entry) {
+int ExplanationPath::GrantAlone(bool& granted, AclEntry* entry) {
   Ref<SExpression> list;
   VESK2_TRY(SExpression::Create(list.Out(), "acl", evidence_.GetContext()));
   VESK2_TRY(AppendShared(list.get(), entry));
@@ -46,7 +46,7 @@ int Explanation::Path::GrantAlone(bool& granted, AclEntry* entry) {
   return 0;
 }
 
-int Explanation::Path::FindCerts() {
+int ExplanationPath::FindCerts() {
   const size_t count = evidence_.CountCerts();
   state_.path.reset(TryNewArray<size_t>(count));
   VESK2_REQUIRE(state_.path, VESK2_ERR_MEM_ALLOC);
@@ -62,7 +62,7 @@ int Explanation::Path::FindCerts() {
   return 0;
 }
 
-int Explanation::Path::CanGo(bool& gone, size_t index, size_t second) {
+int ExplanationPath::CanGo(bool& gone, size_t index, size_t second) {
   const bool manifest = state_.IsManifest();
   if (manifest ? index == 0 || index == second : alone_.CountCerts() == 1) return 0;
   if (manifest && evidence_.GetRevocationStatus(index) != Cert::NotRevoked) {
@@ -83,17 +83,17 @@ int Explanation::Path::CanGo(bool& gone, size_t index, size_t second) {
 
 // ---- Until when ----
 
-void Explanation::Path::FindEnd() {
-  EndsAt(state_.entry->GetNotAfter(), EntryEnds, kNone);
+void ExplanationPath::FindEnd() {
+  EndsAt(state_.entry->GetNotAfter(), Explanation::EntryEnds, kNone);
   for (size_t i = 0; i < state_.pathCount; ++i) {
     const size_t cert = state_.path[i];
-    EndsAt(evidence_.GetCert(cert)->GetNotAfter(), CertEnds, cert);
+    EndsAt(evidence_.GetCert(cert)->GetNotAfter(), Explanation::CertEnds, cert);
     const CrlSequence* const list = evidence_.GetRevocationList(cert);
-    if (list != nullptr) EndsAt(list->GetCert()->GetNotAfter(), ListEnds, cert);
+    if (list != nullptr) EndsAt(list->GetCert()->GetNotAfter(), Explanation::ListEnds, cert);
   }
 }
 
-void Explanation::Path::EndsAt(TimeStamp* end, End kind, size_t cert) {
+void ExplanationPath::EndsAt(TimeStamp* end, End kind, size_t cert) {
   if (end == nullptr || (state_.end != nullptr && !end->IsBefore(state_.end))) return;
   state_.end = end;
   state_.endKind = kind;

@@ -10,13 +10,17 @@
 
 namespace ZvVesk2 {
 
-struct Explanation::Held {
-  Reason reason = {};
-  std::unique_ptr<char[]> text;
-};
+struct ExplanationState {
+  using Kind = Explanation::Kind;
+  using Reason = Explanation::Reason;
+  using End = Explanation::End;
+  static constexpr size_t kNone = Explanation::kNone;
+  struct Held {
+    Reason reason = {};
+    std::unique_ptr<char[]> text;
+  };
 
-struct Explanation::State {
-  explicit State(Vesk2ContextStruct* ctx) : evidence(ctx) {}
+  explicit ExplanationState(Vesk2ContextStruct* ctx) : evidence(ctx) {}
 
   // ---- The question ----
   Evidence evidence;
@@ -51,7 +55,7 @@ struct Explanation::State {
   std::unique_ptr<size_t[]> path;
   size_t pathCount = 0;
   TimeStamp* end = nullptr;
-  End endKind = NoEnd;
+  End endKind = Explanation::NoEnd;
   size_t endCert = kNone;
 
  private:
@@ -61,7 +65,7 @@ struct Explanation::State {
 };
 
 template <typename Ask>
-int Explanation::State::EachMember(Ask ask) const {
+int ExplanationState::EachMember(Ask ask) const {
   if (!members) return ask(tag.get());
   int code = 0;
   for (auto it = members->Begin(); it && code == 0; it.Next()) {
@@ -71,9 +75,13 @@ int Explanation::State::EachMember(Ask ask) const {
 }
 
 // Where authority was lost.
-class Explanation::Losses {
+class ExplanationLosses {
  public:
-  Losses(State& state, std::string_view file, std::string_view extraDirectory)
+  using Kind = Explanation::Kind;
+  using Reason = Explanation::Reason;
+  static constexpr size_t kNone = Explanation::kNone;
+
+  ExplanationLosses(ExplanationState& state, std::string_view file, std::string_view extraDirectory)
       : state_(state), evidence_(state.evidence), file_(file), extraDirectory_(extraDirectory) {}
   // Looks for what can have led to the code.
   [[nodiscard]] int Find(int code);
@@ -107,23 +115,26 @@ class Explanation::Losses {
   TextWriter& CertName(TextWriter& text, size_t index) const;
   TextWriter& Asked(TextWriter& text) const;
 
-  using Step = int (Losses::*)();
+  using Step = int (ExplanationLosses::*)();
   struct Row {
     int code;
     Step steps[4];
   };
   static const Row kRows[];
 
-  State& state_;
+  ExplanationState& state_;
   Evidence& evidence_;
   std::string_view file_;
   std::string_view extraDirectory_;
 };
 
 // By which way authority came, and until when it lasts.
-class Explanation::Path {
+class ExplanationPath {
  public:
-  explicit Path(State& state)
+  using End = Explanation::End;
+  static constexpr size_t kNone = Explanation::kNone;
+
+  explicit ExplanationPath(ExplanationState& state)
       : state_(state), evidence_(state.evidence), alone_(evidence_.GetContext()) {}
   [[nodiscard]] int Find();
 
@@ -135,7 +146,7 @@ class Explanation::Path {
   void FindEnd();
   void EndsAt(TimeStamp* end, End kind, size_t cert);
 
-  State& state_;
+  ExplanationState& state_;
   Evidence& evidence_;
   Evidence alone_;  // what is left: one entry, and the certificates that are needed
 };
