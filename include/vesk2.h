@@ -247,6 +247,45 @@ typedef struct Vesk2CrlInfoStruct {
   char* tag;        /* body of the certificate's tag as text, or null */
 } Vesk2CrlInfoStruct;
 
+/* One reason why an answer is no. Texts are safe for a terminal, whoever wrote what they name. */
+typedef struct Vesk2ReasonStruct {
+  const char* kind;          /* a stable word, static: see Vesk2ExplanationStruct */
+  char* text;                /* the reason in words */
+  uint32_t certificate;      /* its number in the chain, counted from 1; 0: about none */
+  uint32_t otherCertificate; /* the one whose period it does not meet, else 0 */
+  char* entry;  /* the ACL entry: the name of its file in the store, or its path; or null */
+  char* source; /* the tag of the revocation lists that were asked, or null */
+  struct Vesk2ReasonStruct* next;
+} Vesk2ReasonStruct;
+
+/* Why an answer is what it is, and what was found on the way to it. The record, its texts and its
+ * reasons are the caller's, to be freed together with Vesk2FreeExplanation. The kinds of reasons:
+ *   signature, order, content, unreadable      of what was read
+ *   revoked, key-revoked, undetermined         by the revocation lists, or for want of one
+ *   period, tag, link, propagate               of a certificate or an ACL entry
+ *   no-entry, threshold, combination           of the ACL store */
+typedef struct Vesk2ExplanationStruct {
+  uint32_t size;              /* sizeof the library's record; members may be added at its end */
+  int32_t code;               /* the answer */
+  int32_t isComplete;         /* 0 when looking for reasons was stopped, for what it cost */
+  Vesk2ReasonStruct* reasons; /* in a chain, the first place where authority was lost first */
+  /* Of a manifest. The numbers are 0 unless the tree was compared. */
+  char* signer;     /* the fingerprint of the key that signed it; null unless its signature holds */
+  time_t signedAt;  /* as the manifest says; 0 when that was not read */
+  uint64_t listed;  /* files that the manifest lists */
+  uint64_t valid;   /* files as they were signed */
+  uint64_t changed; /* files that differ, and directories that could not be listed */
+  uint64_t missing; /* files */
+  uint64_t extra;   /* files and directories that are not listed */
+  /* What authority rests on, when there is any. */
+  char* entry;            /* the ACL entry, as above; null when several grant together */
+  uint32_t* certificates; /* the numbers of those that are needed, from the root on */
+  uint32_t certificateCount;
+  time_t holdsUntil;   /* asked about a later moment, the answer would be no; 0: it has no end */
+  const char* endedBy; /* what ends then, static: certificate, entry or list; or null */
+  uint32_t endCertificate; /* that certificate, or the one that the list speaks for; else 0 */
+} Vesk2ExplanationStruct;
+
 #ifdef __cplusplus
 extern "C" {
 #endif
@@ -296,6 +335,17 @@ VESK2_API const char* Vesk2VersionExtraA(void);
 /* Vesk2ErrorMessage returns the text of a code from 0 to 76, for any other (77 included)
  * "VESK_UNKNOWN_ERROR". */
 VESK2_API const char* Vesk2ErrorMessage(int code);
+/* Vesk2ErrorName returns the constant's name of a code of either table; for a number that is none
+ * "VESK_UNKNOWN_ERROR". */
+VESK2_API const char* Vesk2ErrorName(int code);
+/* Vesk2ErrorWords says in words what a code of either table means: what a program shows to people,
+ * the codes of the reduction included. A code without words gives its name. */
+VESK2_API const char* Vesk2ErrorWords(int code);
+
+/* Vesk2Escape returns a copy of `length` bytes that is safe to be shown, to be released with
+ * Vesk2Free: control bytes, invalid UTF-8 and characters that turn or break lines are \xNN, and a
+ * backslash is doubled. Null for null, and when memory runs out. */
+VESK2_API char* Vesk2Escape(const void* bytes, size_t length);
 
 /* ---- Name records -------------------------------------------------------------------------- */
 
@@ -385,6 +435,13 @@ VESK2_API void SetStoreUpdate(Manifest* manifest, int update);
  *   VESK2_ERR_MEM_ALLOC           memory or descriptors ran out; nothing was decided then */
 VESK2_VERDICT int VerifyManifest(Manifest* manifest, time_t notBefore, time_t notAfter);
 
+/* VerifyManifestExplained is VerifyManifest and tells why: *out receives the explanation, of a yes,
+ * of a no and of a file that cannot be read alike. After a refusal the rest of the manifest is read
+ * for it; the answer stays the same. *out is null when memory ran out: the answer stands. Keeps
+ * nothing of its own. VESK2_ERR_PARAM_NULL for a null `out`. */
+VESK2_API int VerifyManifestExplained(Manifest* manifest, time_t notBefore, time_t notAfter,
+                                      Vesk2ExplanationStruct** out);
+
 /* CompareManifest compares this manifest's body (the reference) with that of another manifest.
  * Signatures and digests of both are proved, authority is not. Results as in VerifyManifest. */
 VESK2_VERDICT int CompareManifest(Manifest* manifest, const char* otherManifestPath);
@@ -439,6 +496,20 @@ VESK2_VERDICT int Vesk2CertVerifyFile(const char* path, const char* tagText, tim
                                       time_t notAfter);
 VESK2_VERDICT int Vesk2CertVerifyFileA(const char* path, const char* tagText, time_t notBefore,
                                        time_t notAfter);
+
+/* The same, telling why: *out receives the explanation of a yes or a no. It is null when the
+ * question could not be asked (the codes of the readers and of the tag's parser), and when memory
+ * ran out: the answer stands. VESK2_ERR_PARAM_NULL for a null `out`, too. */
+VESK2_API int Vesk2CertVerifyExplained(Vesk2CertInfoStruct* chain, const char* tagText,
+                                       time_t notBefore, time_t notAfter,
+                                       Vesk2ExplanationStruct** out);
+VESK2_API int Vesk2CertVerifyFileExplained(const char* path, const char* tagText, time_t notBefore,
+                                           time_t notAfter, Vesk2ExplanationStruct** out);
+VESK2_API int Vesk2CertVerifyFileExplainedA(const char* path, const char* tagText, time_t notBefore,
+                                            time_t notAfter, Vesk2ExplanationStruct** out);
+
+/* Vesk2FreeExplanation frees an explanation with all that belongs to it; null is allowed. */
+VESK2_API void Vesk2FreeExplanation(Vesk2ExplanationStruct* explanation);
 
 /* CertFind lists the "*.cert" files of a directory (null: the home store's) as bare names, in byte
  * order, or null when there are none or no such directory. Free with FreeFileItemList. */

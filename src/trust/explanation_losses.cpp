@@ -1,12 +1,8 @@
 // Explanation: where authority was lost on its way from the entries to the end of a chain. Each
 // step puts one question to every certificate or entry; the code tells which can have led to it.
-#include <algorithm>
-
-#include <vesk2/context.h>
 #include <vesk2/limits.h>
 #include <vesk2/verify.h>
 
-#include "src/platform/text.h"
 #include "src/trust/explanation_state.h"
 #include "src/trust/lists.h"
 
@@ -28,6 +24,8 @@ const ExplanationLosses::Row ExplanationLosses::kRows[] = {
     {VESK2_ERR_PACKAGE_NOT_GRANTED,
      {&ExplanationLosses::Revocations, &ExplanationLosses::Certificates, &ExplanationLosses::Roots,
       &ExplanationLosses::Rest}},
+    {VESK2_ERR_ACL_ENTRY_NOT_FOUND, {&ExplanationLosses::NoStore}},
+    {VESK2_ERR_FILE_NOT_FOUND, {&ExplanationLosses::NoStore}},
 };
 
 int ExplanationLosses::Find(int code) {
@@ -51,6 +49,11 @@ TextWriter& ExplanationLosses::CertName(TextWriter& text, size_t index) const {
 TextWriter& ExplanationLosses::Name(TextWriter& text, const Reason& reason) const {
   if (reason.entry == nullptr) return CertName(text, reason.cert);
   return (text << "ACL entry ").Of(reason.entry);
+}
+
+TextWriter& ExplanationLosses::Store(TextWriter& text) const {
+  text.AclStore();
+  return extraDirectory_.empty() ? text : (text << " or ").Escaped(extraDirectory_);
 }
 
 TextWriter& ExplanationLosses::Asked(TextWriter& text) const {
@@ -260,18 +263,20 @@ int ExplanationLosses::Threshold(AclEntry* entry, ThresholdSubject* threshold) {
 
 int ExplanationLosses::NoEntryAtAll() {
   TextWriter text;
-  const std::unique_ptr<char[]> store(
-      ZVsysutil::zv_join_path(VeskConf::GetGlobalDirectory(), AclEntry::DirectoryName(true)));
-  VESK2_REQUIRE(store, VESK2_ERR_MEM_ALLOC);
-  (text << "no ACL entry in ").Escaped(store.get());
-  if (!extraDirectory_.empty()) (text << " or ").Escaped(extraDirectory_);
-  text << " names a key of this chain:";
+  Store(text << "no ACL entry in ") << " names a key of this chain:";
   for (size_t i = 0; i < evidence_.CountCerts(); ++i) {
     Principal* const issuer = evidence_.GetCert(i)->GetIssuer();
     bool first = false;
     VESK2_TRY(state_.principals.IsFirstOf(first, issuer, i));
     if (first) (text << " ").Fingerprint(issuer);
   }
+  return state_.Add(About(Explanation::NoEntry, kNone), text);
+}
+
+int ExplanationLosses::NoStore() {
+  if (evidence_.GetEntries() != nullptr || evidence_.CountCerts() == 0) return 0;
+  TextWriter text;
+  Store(text << "no ACL entry can be loaded from ") << ": nothing is trusted";
   return state_.Add(About(Explanation::NoEntry, kNone), text);
 }
 

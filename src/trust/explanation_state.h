@@ -98,6 +98,7 @@ class ExplanationLosses {
   int Root(AclEntry* entry);
   int Threshold(AclEntry* entry, ThresholdSubject* threshold);
   int NoEntryAtAll();
+  int NoStore();
   int Rest();
   int Unreadable();
   int TryReduction(int& code, bool isEntry, DExpression* credential);
@@ -113,6 +114,7 @@ class ExplanationLosses {
   }
   TextWriter& Name(TextWriter& text, const Reason& reason) const;
   TextWriter& CertName(TextWriter& text, size_t index) const;
+  TextWriter& Store(TextWriter& text) const;
   TextWriter& Asked(TextWriter& text) const;
 
   using Step = int (ExplanationLosses::*)();

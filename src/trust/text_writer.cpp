@@ -140,11 +140,21 @@ TextWriter& TextWriter::Of(Subject* subject) {
   return *this;
 }
 
+std::unique_ptr<char[]> TextWriter::StorePath() {
+  std::unique_ptr<char[]> path(
+      ZVsysutil::zv_join_path(VeskConf::GetGlobalDirectory(), AclEntry::DirectoryName(true)));
+  if (!path && code_ == 0) code_ = VESK2_ERR_MEM_ALLOC;
+  return path;
+}
+
+TextWriter& TextWriter::AclStore() {
+  const std::unique_ptr<char[]> path = StorePath();
+  return path ? Escaped(path.get()) : *this;
+}
+
 TextWriter& TextWriter::Of(const AclEntry* entry) {
   const std::string_view path = entry->GetFileName() != nullptr ? entry->GetFileName() : "";
-  const std::unique_ptr<char[]> store(
-      ZVsysutil::zv_join_path(VeskConf::GetGlobalDirectory(), AclEntry::DirectoryName(true)));
-  if (!store && code_ == 0) code_ = VESK2_ERR_MEM_ALLOC;
+  const std::unique_ptr<char[]> store = StorePath();
   const std::string_view directory = store ? store.get() : "";
   const bool inStore = path.size() > directory.size() && path.starts_with(directory) &&
                        path[directory.size()] == '/' && path.rfind('/') == directory.size();

@@ -23,6 +23,8 @@ class TextWriter {
   TextWriter& Fingerprint(DExpression* expression);
   TextWriter& Of(Subject* subject);
   TextWriter& Of(const AclEntry* entry);
+  // The directory of the ACL store.
+  TextWriter& AclStore();
   TextWriter& List(SExpression* list, std::string_view keyword);
   TextWriter& Tag(SExpression* tag);
   TextWriter& Period(const TimeStamp* notBefore, const TimeStamp* notAfter);
@@ -35,6 +37,7 @@ class TextWriter {
   [[nodiscard]] int Take(std::unique_ptr<char[]>& out);
 
  private:
+  [[nodiscard]] std::unique_ptr<char[]> StorePath();
   bool Reserve(size_t more);
   void Hex(const unsigned char* bytes, size_t length);
 

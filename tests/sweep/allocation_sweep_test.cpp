@@ -554,6 +554,18 @@ std::vector<Case> FlatCases() {
             return Outcome{Vesk2CertVerifyFile(W().File("chain"), "install (app calc)", 0, 0)};
           },
           true),
+      // Without memory for the explanation the answer stands.
+      Plain(
+          "Vesk2CertVerifyFileExplained",
+          [] {
+            Vesk2ExplanationStruct* why = nullptr;
+            const int code =
+                Vesk2CertVerifyFileExplained(W().File("chain"), "install (app mail)", 0, 0, &why);
+            const bool fits = why == nullptr || why->code == code;
+            Vesk2FreeExplanation(why);
+            return Outcome{code == VESK2_ERR_PACKAGE_NOT_GRANTED ? 0 : code, fits && code != 0};
+          },
+          true),
       Plain(
           "Vesk2CrlVerifyFile",
           [] {
@@ -569,14 +581,15 @@ std::vector<Case> FlatCases() {
          };
        },
        true},
-      {"VerifyManifest with evidence",
+      {"VerifyManifestExplained",
        [make] {
          return [manifest = make()] {
-           Evidence evidence(nullptr);
-           manifest->SetEvidence(&evidence);
-           const int code = VerifyManifest(manifest.get(), 0, 0);
-           manifest->SetEvidence(nullptr);
-           return Outcome{code, code != 0 || manifest->GetListing() != nullptr};
+           Vesk2ExplanationStruct* why = nullptr;
+           const int code = VerifyManifestExplained(manifest.get(), 0, 0, &why);
+           const bool fits =
+               why == nullptr || (why->code == code && (code != 0 || why->valid == 1));
+           Vesk2FreeExplanation(why);
+           return Outcome{code, fits && (code != 0 || manifest->GetListing() != nullptr)};
          };
        },
        true},

@@ -113,6 +113,9 @@ TEST_F(Explaining, Refusals) {
     EXPECT_EQ(Verify(items, asked, at), code) << reasons;
     EXPECT_EQ(Told(explanation), reasons) << code;
   }
+  std::filesystem::remove_all(global.File("acl"));
+  EXPECT_EQ(Verify(leaf, "(ftp)", ""), VESK2_ERR_ACL_ENTRY_NOT_FOUND);
+  EXPECT_EQ(Told(explanation), "no-entry");
 }
 
 // A manifest's own reasons, from evidence that is put together by hand.

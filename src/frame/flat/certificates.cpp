@@ -6,6 +6,7 @@
 
 #include "src/frame/check.h"
 #include "src/frame/flat/ascii_text.h"
+#include "src/frame/flat/explanations.h"
 #include "src/manifest/ignore.h"
 #include "src/platform/text.h"
 #include "src/platform/wait.h"
@@ -27,8 +28,9 @@ namespace {
   return code;
 }
 
+// `out` is null when nobody wants to know why. `path` is for its texts.
 [[nodiscard]] int VerifySequence(CertSequence* sequence, const char* tagText, time_t notBefore,
-                                 time_t notAfter) {
+                                 time_t notAfter, const char* path, Vesk2ExplanationStruct** out) {
   Vesk2ContextStruct* const context = sequence->GetContext();
   Ref<SExpression> tag;
   VESK2_TRY(SExpression::ParseTagAdvanced(tag.Out(), tagText, "tag", context));
@@ -37,7 +39,22 @@ namespace {
   VESK2_TRY(MakeStamp(from, notBefore, context));
   VESK2_TRY(MakeStamp(to, notAfter, context));
   // No subject: the chain is presented for whoever its first certificate is about.
-  return InOwnWords(sequence->Verify(nullptr, tag.get(), from.get(), to.get()));
+  if (out == nullptr) {
+    return InOwnWords(sequence->Verify(nullptr, tag.get(), from.get(), to.get()));
+  }
+  Evidence evidence(context);
+  const int code = InOwnWords(sequence->Verify(nullptr, tag.get(), from.get(), to.get(), evidence));
+  *out = ExplainAnswer({evidence, code, code, tag.get(), path, nullptr});
+  return code;
+}
+
+int VerifyFile(const char* path, const char* tagText, time_t notBefore, time_t notAfter,
+               Vesk2ExplanationStruct** out) {
+  VESK2_REQUIRE(path != nullptr, VESK2_ERR_PARAM_NULL);
+  const ZVsysutil::ZvCall call;
+  Ref<CertSequence> sequence;
+  VESK2_TRY(CertSequence::Import(sequence.Out(), path, true, nullptr));
+  return VerifySequence(sequence.get(), tagText, notBefore, notAfter, path, out);
 }
 
 }  // namespace
@@ -45,15 +62,35 @@ namespace {
 int Vesk2CertVerify(Vesk2CertInfoStruct* chain, const char* tagText, time_t notBefore,
                     time_t notAfter) {
   VESK2_REQUIRE(chain != nullptr, VESK2_ERR_PARAM_NULL);
-  return VerifySequence(chain->sequence, tagText, notBefore, notAfter);
+  return VerifySequence(chain->sequence, tagText, notBefore, notAfter, nullptr, nullptr);
+}
+
+int Vesk2CertVerifyExplained(Vesk2CertInfoStruct* chain, const char* tagText, time_t notBefore,
+                             time_t notAfter, Vesk2ExplanationStruct** out) {
+  VESK2_REQUIRE(out != nullptr, VESK2_ERR_PARAM_NULL);
+  *out = nullptr;
+  VESK2_REQUIRE(chain != nullptr, VESK2_ERR_PARAM_NULL);
+  return VerifySequence(chain->sequence, tagText, notBefore, notAfter, nullptr, out);
 }
 
 int Vesk2CertVerifyFile(const char* path, const char* tagText, time_t notBefore, time_t notAfter) {
-  VESK2_REQUIRE(path != nullptr, VESK2_ERR_PARAM_NULL);
-  const ZVsysutil::ZvCall call;
-  Ref<CertSequence> sequence;
-  VESK2_TRY(CertSequence::Import(sequence.Out(), path, true, nullptr));
-  return VerifySequence(sequence.get(), tagText, notBefore, notAfter);
+  return VerifyFile(path, tagText, notBefore, notAfter, nullptr);
+}
+
+int Vesk2CertVerifyFileExplained(const char* path, const char* tagText, time_t notBefore,
+                                 time_t notAfter, Vesk2ExplanationStruct** out) {
+  VESK2_REQUIRE(out != nullptr, VESK2_ERR_PARAM_NULL);
+  *out = nullptr;
+  return VerifyFile(path, tagText, notBefore, notAfter, out);
+}
+
+int Vesk2CertVerifyFileExplainedA(const char* path, const char* tagText, time_t notBefore,
+                                  time_t notAfter, Vesk2ExplanationStruct** out) {
+  VESK2_REQUIRE(out != nullptr, VESK2_ERR_PARAM_NULL);
+  *out = nullptr;
+  const AsciiText name(path);
+  VESK2_REQUIRE(!name.OutOfMemory(), VESK2_ERR_MEM_ALLOC);
+  return VerifyFile(name.get(), tagText, notBefore, notAfter, out);
 }
 
 int Vesk2CertVerifyFileA(const char* path, const char* tagText, time_t notBefore, time_t notAfter) {

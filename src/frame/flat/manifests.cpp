@@ -7,6 +7,7 @@
 
 #include "src/frame/check.h"
 #include "src/frame/flat/ascii_text.h"
+#include "src/frame/flat/explanations.h"
 #include "src/platform/text.h"
 
 using ZvVesk2::AsciiText;
@@ -64,6 +65,24 @@ void SetStoreUpdate(Manifest* manifest, int update) { manifest->SetStoreUpdate(u
 
 int VerifyManifest(Manifest* manifest, time_t notBefore, time_t notAfter) {
   return ZvVesk2::InOwnWords(manifest->VerifyManifest(notBefore, notAfter));
+}
+
+int VerifyManifestExplained(Manifest* manifest, time_t notBefore, time_t notAfter,
+                            Vesk2ExplanationStruct** out) {
+  VESK2_REQUIRE(out != nullptr, VESK2_ERR_PARAM_NULL);
+  *out = nullptr;
+  ZvVesk2::Evidence evidence(manifest->GetContext());
+  manifest->SetEvidence(&evidence);
+  const int code = VerifyManifest(manifest, notBefore, notAfter);
+  manifest->SetEvidence(nullptr);
+  // Where the tree was compared, authority was proved.
+  const int authority = manifest->GetListing() != nullptr ? 0 : code;
+  Vesk2ExplanationStruct* const explanation =
+      ZvVesk2::ExplainAnswer({evidence, code, authority, manifest->GetTag(),
+                              manifest->GetManifestPath(), manifest->GetExtraAclDirectory()});
+  if (explanation != nullptr && authority == 0) ZvVesk2::CountEntries(*explanation, *manifest);
+  *out = explanation;
+  return code;
 }
 
 int CompareManifest(Manifest* manifest, const char* otherManifestPath) {

@@ -1,5 +1,5 @@
-// Flat functions: conversion between the two forms of text.
-#include <vesk2.h>
+// Flat functions: conversion between the two forms of text, and escaping.
+#include <vesk2/wording.h>
 
 #include <cstring>
 
@@ -19,4 +19,8 @@ char* Vesk2AsciiToWide(const char* text, uint32_t length, unsigned int* outLengt
     *outLength = static_cast<unsigned int>(ZVsysutil::zv_fstrlen(copy));
   }
   return copy;
+}
+
+char* Vesk2Escape(const void* bytes, size_t length) {
+  return bytes != nullptr ? ZvVesk2::Wording::Escape(bytes, length) : nullptr;
 }
