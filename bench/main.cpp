@@ -1,14 +1,8 @@
-// Runs the comparisons. The two ways of each take turns, so that a busy machine slows both; the
-// best time of each gives the ratios on the last lines.
-#include <benchmark/benchmark.h>
-
-#include <algorithm>
+// Measures the figures and prints one table of them.
 #include <cstdio>
-#include <limits>
-#include <map>
+#include <exception>
 #include <string>
 #include <string_view>
-#include <vector>
 
 #include "bench/bench.h"
 #include "bench/worst.h"
@@ -16,82 +10,60 @@
 namespace bench {
 namespace {
 
-const Comparison* const kComparisons[] = {&kHashFile, &kCertVerify};
+constexpr char kHelp[] =
+    "usage: vesk2_bench [--quick] [ID...]   the table, or the figures whose ids begin so\n"
+    "       vesk2_bench --worst             the worst inputs known\n";
 
-void Register(const Comparison& comparison, const char* name, bool (*way)()) {
-  const int64_t bytes = comparison.bytes;
-  benchmark::RegisterBenchmark(name,
-                               [way, bytes](benchmark::State& state) {
-                                 for (auto _ : state) {
-                                   if (!way()) state.SkipWithError("a wrong result");
-                                 }
-                                 if (bytes > 0) state.SetBytesProcessed(state.iterations() * bytes);
-                               })
-      ->Iterations(comparison.iterations)
-      ->Repetitions(static_cast<int>(comparison.repetitions))
-      ->Unit(benchmark::kMillisecond);
+void Print(const Figure& figure, const Outcome& outcome) {
+  std::string value = "-";
+  const char* verdict = "FAILED";
+  if (outcome.kind == Outcome::kNotInstalled) verdict = "not installed";
+  if (outcome.kind == Outcome::kMeasured) {
+    char text[32];
+    std::snprintf(text, sizeof text, figure.goal < 20 ? "%.2f" : "%.0f", outcome.value);
+    value = text;
+    verdict = outcome.value <= figure.goal ? "met" : "MISSED";
+  }
+  std::printf("%-5s %-46s  %-42s  %7s  %6g  %s%s%s\n", figure.id, figure.what, figure.yardstick,
+              value.c_str(), figure.goal, verdict, outcome.note.empty() ? "" : ": ",
+              outcome.note.c_str());
+  std::fflush(stdout);
 }
 
-// Prints the summaries and keeps the best time of each benchmark, in milliseconds.
-class BestTimes : public benchmark::ConsoleReporter {
- public:
-  void ReportRuns(const std::vector<Run>& runs) override {
-    for (const Run& run : runs) {
-      if (run.run_type != Run::RT_Iteration || run.error_occurred) continue;
-      const double time = run.GetAdjustedCPUTime();
-      const auto [best, first] = best_.try_emplace(run.run_name.function_name, time);
-      if (!first) best->second = std::min(best->second, time);
+// Whether all that was asked for was measured. A goal that was missed is no failure of the run.
+bool PrintTable(const Effort& effort, const std::vector<std::string_view>& ids) {
+  bool whole = true;
+  std::printf("%-5s %-46s  %-42s  %7s  %6s\n", "", "figure", "yardstick", "ratio", "goal");
+  for (const auto& group : {HashFigures, TreeFigures, StoreFigures, ChainFigures}) {
+    for (const Figure& figure : group()) {
+      bool wanted = ids.empty();
+      for (const std::string_view id : ids) wanted |= std::string_view(figure.id).starts_with(id);
+      if (!wanted) continue;
+      const Outcome outcome = figure.measure(effort);
+      Print(figure, outcome);
+      whole &= outcome.kind != Outcome::kFailed;
     }
-    const bool summary = !runs.empty() && runs.front().run_type == Run::RT_Aggregate;
-    if (summary) ConsoleReporter::ReportRuns(runs);
   }
-  double Of(const char* name) const {
-    const auto best = best_.find(name);
-    return best != best_.end() ? best->second : std::numeric_limits<double>::quiet_NaN();
-  }
-
- private:
-  std::map<std::string, double> best_;
-};
-
-struct CleanUp {
-  ~CleanUp() {
-    for (const Comparison* comparison : kComparisons) comparison->clean();
-  }
-};
-
-int Run(int count, char** arguments) {
-  std::vector<char*> all(arguments, arguments + count);
-  std::string interleaving = "--benchmark_enable_random_interleaving=true";
-  all.insert(all.begin() + 1, interleaving.data());
-  count = static_cast<int>(all.size());
-  benchmark::Initialize(&count, all.data());
-
-  const CleanUp cleanUp;
-  for (const Comparison* comparison : kComparisons) {
-    if (!comparison->prepare()) {
-      std::fprintf(stderr, "vesk2_bench: %s and %s do not agree\n", comparison->name,
-                   comparison->reference);
-      return 1;
-    }
-    Register(*comparison, comparison->name, comparison->library);
-    Register(*comparison, comparison->reference, comparison->bare);
-  }
-  BestTimes best;
-  benchmark::RunSpecifiedBenchmarks(&best);
-  for (const Comparison* comparison : kComparisons) {
-    const double ours = best.Of(comparison->name);
-    const double theirs = best.Of(comparison->reference);
-    std::printf("\n%-20s %9.3f ms\n%-20s %9.3f ms\nratio                %9.2f\n", comparison->name,
-                ours, comparison->reference, theirs, ours / theirs);
-  }
-  return 0;
+  return whole;
 }
 
 }  // namespace
 }  // namespace bench
 
 int main(int count, char** arguments) {
-  if (count == 2 && std::string_view(arguments[1]) == "--worst") return bench::RunWorst();
-  return bench::Run(count, arguments);
+  bench::Effort effort;
+  std::vector<std::string_view> ids;
+  for (int i = 1; i < count; ++i) {
+    const std::string_view word = arguments[i];
+    if (word == "--worst") return bench::RunWorst();
+    if (word == "--quick") {
+      effort.quick = true;
+    } else if (word.starts_with("-")) {
+      std::fputs(bench::kHelp, word == "--help" ? stdout : stderr);
+      return word == "--help" ? 0 : 2;
+    } else {
+      ids.push_back(word);
+    }
+  }
+  return bench::PrintTable(effort, ids) ? 0 : 1;
 }

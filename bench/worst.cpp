@@ -16,6 +16,7 @@
 #include <string>
 #include <vector>
 
+#include "bench/bench.h"
 #include "tests/support/test_load.h"
 #include "tests/support/test_manifest.h"
 #include "tests/support/test_object.h"
@@ -88,21 +89,9 @@ Work VerifyChain(size_t bytes) {
   };
 }
 
-// The command with these arguments, its output thrown away.
+// The command with these arguments.
 void Command(const std::vector<std::string>& arguments) {
-  const pid_t pid = fork();
-  if (pid == 0) {
-    std::vector<char*> words;
-    for (const std::string& word : arguments) words.push_back(const_cast<char*>(word.c_str()));
-    words.push_back(nullptr);
-    (void)!std::freopen("/dev/null", "w", stdout);
-    (void)!std::freopen("/dev/null", "w", stderr);
-    execv(words[0], words.data());
-    _exit(127);
-  }
-  int status = 0;
-  waitpid(pid, &status, 0);
-  if (WIFEXITED(status) && WEXITSTATUS(status) == 127) std::abort();
+  if (Run(arguments) == 127) std::abort();
 }
 
 Work CommandVerifyChain(size_t bytes) {
