@@ -1,5 +1,5 @@
 /* verify_chain: reads a certificate sequence, shows what each certificate says, and asks whether
- * the chain grants an authorization on this machine now. A C program that uses vesk2.h alone.
+ * the chain grants an authorization now, on this machine. A C program that uses vesk2.h alone.
  *
  *   verify_chain HOME GLOBAL SEQUENCE TAG
  *
@@ -50,6 +50,7 @@ static void print_chain(const Vesk2CertInfoStruct* chain) {
 
 int main(int count, char** arguments) {
   Vesk2CertInfoStruct* chain = NULL;
+  time_t now;
   int code;
   if (count != 5) {
     fprintf(stderr, "usage: verify_chain HOME GLOBAL SEQUENCE TAG\n");
@@ -67,8 +68,9 @@ int main(int count, char** arguments) {
     return FAILED;
   }
   print_chain(chain);
-  /* Without a moment that is asked about, a chain that has run out would pass. */
-  code = Vesk2CertVerify(chain, arguments[4], time(NULL), time(NULL));
+  /* Without a moment to ask about, a chain that has run out would pass. */
+  now = time(NULL);
+  code = Vesk2CertVerify(chain, arguments[4], now, now);
   if (code == 0) {
     printf("granted\n");
   } else {

@@ -71,7 +71,7 @@ const Row* FindRow(int code) {
 
 }  // namespace
 
-int V2Version() { return 10100; }
+int V2Version() { return VESK2_VERSION_NUMBER; }
 
 const char* V2VersionExtra() { return "r2441"; }
 
