@@ -9,4 +9,5 @@ names() {
 }
 version=$2 faults=0
 names '## ' CHANGELOG.md
+names '__version__ = "' bindings/python/vesk2/__init__.py
 exit $faults
