@@ -6,7 +6,6 @@
 #include <string>
 #include <vector>
 
-#include "tools/vesk2/explain/authority.h"
 #include "tools/vesk2/explain/hypothesis.h"
 #include "tools/vesk2/explain/policy.h"
 #include "tools/vesk2/explain/remedy.h"

@@ -3,8 +3,10 @@
 
 #include <algorithm>
 #include <filesystem>
+#include <set>
 
 #include "tools/vesk2/files/stores.h"
+#include "tools/vesk2/objects/texts.h"
 #include "tools/vesk2/say/report.h"
 
 #include <vesk2/hash.h>
@@ -39,16 +41,26 @@ void TakeCerts(Evidence& evidence) {
   }
 }
 
+std::set<const DExpression*> RelevantEntries(const ZvVesk2::Evidence& proved) {
+  Ref<SExpression> list;
+  Check(proved.RelevantEntries(list.Out()), "looking at the ACL entries");
+  std::set<const DExpression*> relevant;
+  for (auto it = list->Begin(); it; it.Next()) relevant.insert(it.Value());
+  return relevant;
+}
+
 void TakeEntries(Evidence& evidence) {
   const SExpression* acls = evidence.proved->GetEntries();
   if (acls == nullptr) return;
+  const std::set<const DExpression*> relevant = RelevantEntries(*evidence.proved);
   for (auto it = acls->Begin(); it; it.Next()) {
     auto* entry = dynamic_cast<AclEntry*>(it.Value());
     if (entry == nullptr) continue;
     const std::filesystem::path path(entry->GetFileName() != nullptr ? entry->GetFileName() : "");
     const bool inStore = path.parent_path() == std::filesystem::path(AclDirectory());
-    evidence.entries.push_back(
-        {Ref<AclEntry>::Share(entry), inStore ? path.filename().string() : path.string(), inStore});
+    evidence.entries.push_back({Ref<AclEntry>::Share(entry),
+                                inStore ? path.filename().string() : path.string(), inStore,
+                                relevant.count(entry) != 0});
   }
 }
 
@@ -78,12 +90,15 @@ Evidence GatherEvidence(const Question& question) {
   evidence.first = proved.GetFirst();
   evidence.last = proved.GetLast();
   evidence.contentSigned = proved.GetContentCode() == 0 && proved.GetListingCode() == 0;
-  if (proved.GetListingCode() != 0) {
-    evidence.damage = "byte " + std::to_string(proved.GetListingPosition()) + ": " +
-                      Reason(proved.GetListingCode());
-  }
   return evidence;
 }
+
+std::string CertName(const Evidence& evidence, size_t index) {
+  return "certificate " + std::to_string(index + 1) + " (issuer " +
+         SubjectText(*evidence.certs[index].cert->GetIssuer()) + ")";
+}
+
+std::string EntryName(const EntryEvidence& entry) { return "ACL entry " + Escape(entry.file); }
 
 bool Names(Subject* subject, DExpression* key) {
   if (subject->IsEqual(key)) return true;

@@ -41,6 +41,7 @@ struct EntryEvidence {
   Ref<ZvVesk2::AclEntry> entry;
   std::string file;  // its name in the store, or its path
   bool inStore = false;
+  bool relevant = false;  // it names a key of the chain
 };
 
 struct Evidence {
@@ -50,7 +51,6 @@ struct Evidence {
   std::vector<std::string> carried;    // the canonical text of a manifest's lists
   Ref<TimeStamp> signedAt;             // of a manifest
   bool contentSigned = true;           // a manifest's signer names the content that is there
-  std::string damage;                  // where a manifest's listing stops making sense
   // The period asked about; null where it is open.
   TimeStamp* first = nullptr;
   TimeStamp* last = nullptr;
@@ -61,6 +61,9 @@ struct Evidence {
 // GatherEvidence takes apart what was proved for a question.
 Evidence GatherEvidence(const Question& question);
 
+// "certificate N (issuer FINGERPRINT)".
+std::string CertName(const Evidence& evidence, size_t index);
+std::string EntryName(const EntryEvidence& entry);
 // Whether a subject is a key, names it by its digest or counts it among its k-of-n.
 bool Names(ZvVesk2::Subject* subject, DExpression* key);
 // The tag of the lists that a certificate's revocation element names; null without one.

@@ -5,22 +5,23 @@
 #include <ctime>
 #include <filesystem>
 
-#include "tools/vesk2/explain/authority.h"
 #include "tools/vesk2/explain/effort.h"
 #include "tools/vesk2/explain/find_remedies.h"
-#include "tools/vesk2/explain/hypothesis.h"
-#include "tools/vesk2/explain/revocation.h"
 #include "tools/vesk2/explain/tell_remedies.h"
 #include "tools/vesk2/files/stores.h"
 #include "tools/vesk2/objects/shapes.h"
 #include "tools/vesk2/objects/texts.h"
 #include "tools/vesk2/say/report.h"
 
+#include <vesk2/explanation.h>
+#include <vesk2/wording.h>
+
 namespace vesk2_command {
 namespace {
 
 using ZvVesk2::AclEntry;
 using ZvVesk2::Cert;
+using ZvVesk2::Explanation;
 
 // Enough of a fingerprint to tell keys apart by eye.
 std::string Short(const std::string& fingerprints) {
@@ -92,23 +93,23 @@ const char* StateWord(int32_t state) {
   }
 }
 
-Json AskedRevocation(const Evidence& evidence, const RevocationLists& lists, size_t index,
-                     int32_t state) {
-  SExpression* source = evidence.certs[index].source.get();
+Json AskedRevocation(const Evidence& evidence, size_t index) {
   Json json = RevocationJson(*evidence.certs[index].cert);
-  json["state"] = StateWord(state);
-  if (const CrlSequence* list = lists.Deciding(source)) json["list"] = ListJson(*list);
+  json["state"] = StateWord(evidence.proved->GetRevocationStatus(index));
+  json["since"] = StampJson(evidence.proved->GetRevokedSince(index));
+  const CrlSequence* list = evidence.proved->GetRevocationList(index);
+  if (list != nullptr) json["list"] = ListJson(*list);
   return json;
 }
 
 // ---- Facts ----
 
-Json ToldCert(const Evidence& evidence, const RevocationLists& lists, size_t index, int32_t state) {
+Json ToldCert(const Evidence& evidence, size_t index) {
   const CertEvidence& each = evidence.certs[index];
   Json json = CertJson(*each.cert);
   json["certificate"] = index + 1;
   json["signature"] = SignatureJson(each.code);
-  json["revocation"] = AskedRevocation(evidence, lists, index, state);
+  json["revocation"] = AskedRevocation(evidence, index);
   return json;
 }
 
@@ -138,59 +139,117 @@ std::string CertText(const Evidence& evidence, size_t index, const Json& json) {
 }
 
 // The certificates, and the entries that name one of their keys.
-void TellFacts(const Evidence& evidence, const RevocationLists& lists) {
-  const std::vector<int32_t> states = RevocationStates(evidence);
+void TellFacts(const Evidence& evidence) {
   Json& chain = Result()["chain"] = Json::array();
   for (size_t i = 0; i < evidence.certs.size(); ++i) {
-    chain.push_back(ToldCert(evidence, lists, i, states[i]));
+    chain.push_back(ToldCert(evidence, i));
     Note(CertText(evidence, i, chain.back()));
   }
   Json& acl = Result()["acl"] = Json::array();
   for (const EntryEvidence& each : evidence.entries) {
-    if (!IsRelevant(each, evidence)) continue;
+    if (!each.relevant) continue;
     acl.push_back(EntryJson(*each.entry, Escape(each.file)));
     Note(EntryName(each) + ": trusts " + GrantText(*each.entry));
   }
 }
 
-void TellLosses(const std::vector<Loss>& losses) {
+// ---- Why ----
+
+// Has the library explain a code.
+void Ask(Explanation& explanation, const Question& question, int code) {
+  const std::string& directory = question.aclDirectory;
+  Check(
+      explanation.SetNames(question.file.c_str(), directory.empty() ? nullptr : directory.c_str()),
+      "explaining");
+  const Request& request = *question.request;
+  Ref<SExpression> members(new SExpression(nullptr));
+  for (const auto& member : request.members) InsertShared(*members, member.tag.get());
+  Check(explanation.Explain(*question.proved, code, request.tag.get(), members.get()),
+        "explaining");
+}
+
+void RequireComplete(const Explanation& explanation) {
+  if (!explanation.IsComplete()) throw Trouble("it has cost several times as much as the answer");
+}
+
+Json NumberJson(size_t index) { return index != Explanation::kNone ? Json(index + 1) : Json(); }
+
+Json ReasonJson(const Explanation::Reason& reason) {
+  Json json = {{"kind", Explanation::Word(reason.kind)},
+               {"text", reason.text},
+               {"certificate", NumberJson(reason.cert)},
+               {"other_certificate", NumberJson(reason.otherCert)},
+               {"entry", Json()},
+               {"source", Json()}};
+  if (reason.entry != nullptr) json["entry"] = Owned(ZvVesk2::Wording::OfEntry(reason.entry));
+  if (reason.source != nullptr) json["source"] = TagText(reason.source);
+  return json;
+}
+
+void TellLosses(const Question& question, int code) {
   Json& lost = Result()["lost"] = Json::array();
-  for (const Loss& loss : losses) {
-    Note(loss.text);
-    lost.push_back({{"kind", loss.kind}, {"text", loss.text}});
+  if (question.proved == nullptr) return;
+  Explanation explanation(nullptr);
+  Ask(explanation, question, code);
+  for (size_t i = 0; i < explanation.CountReasons(); ++i) {
+    const Explanation::Reason& reason = explanation.GetReason(i);
+    Note(reason.text);
+    lost.push_back(ReasonJson(reason));
   }
+  RequireComplete(explanation);
 }
 
 // ---- The path of a yes ----
 
-void TellPath(const Question& question, const Evidence& evidence, const RevocationLists& lists) {
-  Json json = {{"path", Json::array()}, {"ends", Json()}, {"lists", Json::array()}};
-  const std::optional<AuthorityPath> path = FindPath(question, evidence);
-  if (!path) {
-    Note("authority comes by several ACL entries together");
-    Result()["authority"] = json;
-    return;
+Json EndWord(const Explanation& explanation) {
+  constexpr const char* kWords[] = {nullptr, "certificate", "entry", "list"};
+  const char* word = kWords[explanation.GetEndKind()];
+  return word != nullptr ? Json(word) : Json();
+}
+
+std::string EndText(const Explanation& explanation) {
+  if (explanation.GetEnd() == nullptr) return "it has no end";
+  const std::string cert = "certificate " + std::to_string(explanation.GetEndCert() + 1);
+  const auto kind = explanation.GetEndKind();
+  const std::string what = kind == Explanation::EntryEnds  ? "the ACL entry"
+                           : kind == Explanation::CertEnds ? cert
+                                                           : "the list of " + cert;
+  return "it ends at " + StampText(*explanation.GetEnd()) + ", with " + what;
+}
+
+void TellPath(const Question& question, const Evidence& evidence) {
+  Explanation explanation(nullptr);
+  Ask(explanation, question, 0);
+  RequireComplete(explanation);
+  Json& json = Result()["authority"] = {{"path", Json::array()},
+                                        {"ends", StampJson(explanation.GetEnd())},
+                                        {"ended_by", EndWord(explanation)},
+                                        {"end_certificate", NumberJson(explanation.GetEndCert())},
+                                        {"lists", Json::array()}};
+  const AclEntry* entry = explanation.GetEntry();
+  if (entry == nullptr) return Note("authority comes by several ACL entries together");
+  const auto named = std::find_if(evidence.entries.begin(), evidence.entries.end(),
+                                  [&](const auto& each) { return each.entry.get() == entry; });
+  std::string text = EntryName(*named);
+  json["path"].push_back(Escape(named->file));
+  for (size_t i = 0; i < explanation.CountPath(); ++i) {
+    const size_t number = explanation.GetPathCert(i) + 1;
+    text += " -> certificate " + std::to_string(number);
+    json["path"].push_back(number);
   }
-  std::string text = EntryName(*path->entry);
-  json["path"].push_back(Escape(path->entry->file));
-  for (const size_t index : path->certs) {
-    text += " -> certificate " + std::to_string(index + 1);
-    json["path"].push_back(index + 1);
-  }
-  json["ends"] = StampJson(path->ends);
   Note("authority: " + text + " -> " + SubjectText(*evidence.certs[0].cert->GetSubject()));
-  Note(path->ends != nullptr ? "it ends at " + StampText(*path->ends) : "it has no end");
-  for (const size_t index : path->certs) {
+  Note(EndText(explanation));
+  for (size_t i = 0; i < explanation.CountPath(); ++i) {
+    const size_t index = explanation.GetPathCert(i);
     SExpression* source = evidence.certs[index].source.get();
-    const CrlSequence* list = lists.Deciding(source);
-    if (list == nullptr) continue;
+    const CrlSequence* list = evidence.proved->GetRevocationList(index);
+    if (source == nullptr || list == nullptr) continue;
     Json used = {{"source", TagText(source)}};
     used.update(ListJson(*list));
     json["lists"].push_back(used);
     Note("it rests on " + TagText(source) + ": " + ListText(used));
   }
   if (json["lists"].empty()) Note("no certificate of it asks for a revocation list");
-  Result()["authority"] = json;
 }
 
 // An explanation that cannot be had must not stand in for the answer.
@@ -209,8 +268,8 @@ void Explain(Tell&& tell) {
 void ExplainRefusal(const Question& question, int code) {
   Explain([&] {
     const Evidence evidence = GatherEvidence(question);
-    TellFacts(evidence, RevocationLists(evidence));
-    TellLosses(FindLosses(question, evidence, code));
+    TellFacts(evidence);
+    TellLosses(question, code);
     TellRemedies(FindRemedies(question, evidence, code));
   });
 }
@@ -222,17 +281,16 @@ void ExplainTree(const Question& question) {
 void ExplainGrant(const Question& question) {
   Explain([&] {
     const Evidence evidence = GatherEvidence(question);
-    const RevocationLists lists(evidence);
-    TellFacts(evidence, lists);
-    TellPath(question, evidence, lists);
+    TellFacts(evidence);
+    TellPath(question, evidence);
   });
 }
 
 void ExplainTrouble(const Question& question, int code) {
   Explain([&] {
     const Evidence evidence = GatherEvidence(question);
-    if (GetStyle().json && !evidence.certs.empty()) TellFacts(evidence, RevocationLists(evidence));
-    if (code < 0) TellLosses(FindLosses(question, evidence, code));
+    if (GetStyle().json && !evidence.certs.empty()) TellFacts(evidence);
+    if (code < 0) TellLosses(question, code);
   });
 }
 

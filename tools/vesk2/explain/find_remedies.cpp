@@ -74,9 +74,7 @@ void CarryStores(Remedy& remedy) {
 class Finder {
  public:
   Finder(const Question& question, const Evidence& evidence)
-      : question_(question), evidence_(evidence), maker_(question, evidence) {
-    states_ = RevocationStates(evidence);
-  }
+      : question_(question), evidence_(evidence), maker_(question, evidence) {}
 
   std::vector<Remedy> Find() {
     // A root of trust is named when nothing else helps.
@@ -102,7 +100,7 @@ class Finder {
     for (size_t i = 0; i < evidence_.certs.size(); ++i) {
       const bool needed = !question_.manifest || i == 0;
       const size_t count = required_.size();
-      const bool revoked = states_[i] == Cert::RevokedByCrl || states_[i] == Cert::KeyRevoked;
+      const bool revoked = State(i) == Cert::RevokedByCrl || State(i) == Cert::KeyRevoked;
       if (needed && revoked) return false;
       if (evidence_.certs[i].code != 0) {
         const size_t before = count;
@@ -110,10 +108,12 @@ class Finder {
         if (required_.size() == before) maker_.Renew(required_, i, Reach::kAsItIs);
         if (required_.size() == before) return false;
       }
-      if (needed && states_[i] == Cert::Undetermined && !Determine(required_, i)) return false;
+      if (needed && State(i) == Cert::Undetermined && !Determine(required_, i)) return false;
     }
     return true;
   }
+
+  int32_t State(size_t index) const { return evidence_.proved->GetRevocationStatus(index); }
 
   // One list serves all certificates of a source.
   bool Determine(std::vector<Edit>& edits, size_t index) const {
@@ -140,13 +140,13 @@ class Finder {
         optional_.pop_back();
       }
       if (!question_.manifest || i == 0) continue;
-      if (states_[i] == Cert::Undetermined) (void)Determine(optional_, i);
+      if (State(i) == Cert::Undetermined) (void)Determine(optional_, i);
     }
     maker_.CoSign(optional_);
     size_t entries = 0;
     for (const EntryEvidence& each : evidence_.entries) {
       if (entries == kMaxEntries) break;
-      if (!IsRelevant(each, evidence_)) continue;
+      if (!each.relevant) continue;
       ++entries;
       maker_.Widen(optional_, each);
     }
@@ -225,7 +225,6 @@ class Finder {
   const Question& question_;
   const Evidence& evidence_;
   EditMaker maker_;
-  std::vector<int32_t> states_;
   std::vector<Edit> required_;
   std::vector<Edit> optional_;
   bool roots_ = false;  // new ones are among the candidates
@@ -235,19 +234,19 @@ class Finder {
 // Where the way back is not a command: a revoked key's holder has to begin anew, and whose lists
 // count is decided by who keeps the store.
 std::vector<Remedy> ByHand(const Evidence& evidence) {
-  const std::vector<int32_t> states = RevocationStates(evidence);
   std::vector<Remedy> remedies;
-  for (size_t i = 0; i < states.size(); ++i) {
+  for (size_t i = 0; i < evidence.certs.size(); ++i) {
+    const int32_t state = evidence.proved->GetRevocationStatus(i);
     const CertEvidence& each = evidence.certs[i];
     const std::string subject = SubjectText(*each.cert->GetSubject());
     Remedy remedy;
-    if (states[i] == Cert::KeyRevoked) {
+    if (state == Cert::KeyRevoked) {
       remedy = {"new-key",
                 subject + " is revoked: its holder needs a new key, and certificates for it"};
-    } else if (states[i] == Cert::RevokedByCrl) {
+    } else if (state == Cert::RevokedByCrl) {
       remedy = {"new-key", CertName(evidence, i) + " is revoked: " + subject +
                                " needs a new key, and a certificate for it"};
-    } else if (states[i] == Cert::Undetermined && Voucher(evidence, each.source.get()) == nullptr) {
+    } else if (state == Cert::Undetermined && Voucher(evidence, each.source.get()) == nullptr) {
       remedy = {"revocation-list",
                 "find out who revokes for " + TagText(each.source.get()) +
                     ", grant that key this tag, and import its list: no ACL entry says whose lists "

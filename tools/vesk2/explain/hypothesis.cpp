@@ -34,38 +34,20 @@ class World {
     return code;
   }
 
-  Granted Grants() {
-    Granted granted;
-    MarkRevoked();
-    (void)changed_.Grants(granted.tag.Out(), granted.notBefore.Out(), granted.notAfter.Out());
-    return granted;
-  }
-
-  std::vector<int32_t> States() {
-    MarkRevoked();
-    std::vector<int32_t> states;
-    for (size_t i = 0; i < changed_.CountCerts(); ++i) {
-      states.push_back(changed_.GetRevocationStatus(i));
-    }
-    return states;
-  }
-
  private:
-  void MarkRevoked() { Check(changed_.MarkRevoked(), "asking the revocation lists"); }
   void Add(Cert& cert, ZvVesk2::Signature* signature, int code) {
     Check(changed_.AddCert(&cert, signature, code), "judging a change");
   }
 
   void ChangeCerts() {
     if (hypothesis_.signedAgain.empty() && hypothesis_.certs.empty() &&
-        hypothesis_.coSigners.empty() && hypothesis_.withoutCerts.empty()) {
+        hypothesis_.coSigners.empty()) {
       return;
     }
     changed_.RemoveCerts();
     for (Cert* cert : hypothesis_.signedAgain) Add(*cert, nullptr, 0);
     if (!hypothesis_.signedAgain.empty()) return;
     for (size_t i = 0; i < evidence_.certs.size(); ++i) {
-      if (hypothesis_.withoutCerts.count(i) != 0) continue;
       const CertEvidence& each = evidence_.certs[i];
       const auto other = hypothesis_.certs.find(i);
       const bool replaced = other != hypothesis_.certs.end();
@@ -92,9 +74,6 @@ class World {
   // The store's entries in byte order of their files' names, as the library reads them, and those
   // of the other directory.
   void ChangeEntries() {
-    if (hypothesis_.only != nullptr) {
-      changed_.SetGrantingEntries(EntryList({const_cast<AclEntry*>(hypothesis_.only)}).get());
-    }
     if (hypothesis_.entries.empty() && changed_.GetEntries() != nullptr) return;
     std::map<std::string, AclEntry*> store;
     std::vector<AclEntry*> others;
@@ -120,15 +99,6 @@ int Judge(const Question& question, const Evidence& evidence, const Hypothesis& 
   std::vector<SExpression*> tags;
   for (const auto& member : question.request->members) tags.push_back(member.tag.get());
   return World(evidence, hypothesis).Judge(tags);
-}
-
-Granted WhatIsGranted(const Question&, const Evidence& evidence) {
-  const Hypothesis asItIs;
-  return World(evidence, asItIs).Grants();
-}
-
-std::vector<int32_t> RevocationStates(const Evidence& evidence, const Hypothesis& hypothesis) {
-  return World(evidence, hypothesis).States();
 }
 
 }  // namespace vesk2_command

@@ -5,7 +5,6 @@
 #define VESK2_TOOLS_HYPOTHESIS_H
 
 #include <map>
-#include <set>
 #include <string>
 #include <vector>
 
@@ -19,8 +18,6 @@ struct Hypothesis {
       coSigners;                                      // who certify the same as these, beside them
   std::map<std::string, ZvVesk2::AclEntry*> entries;  // these in the store, by file name
   std::vector<SExpression*> freshLists;  // sources with a current list that revokes no more
-  std::set<size_t> withoutCerts;
-  const ZvVesk2::AclEntry* only = nullptr;  // this entry alone grants
   // Signed again: these two certificates alone, at this moment unless a period was asked about.
   std::vector<ZvVesk2::Cert*> signedAgain;
   TimeStamp* at = nullptr;
@@ -29,16 +26,6 @@ struct Hypothesis {
 // Judge returns the code that the library would give for the authority of the chain or manifest: 0
 // or the first refusal. A set is granted when each member is.
 int Judge(const Question& question, const Evidence& evidence, const Hypothesis& hypothesis = {});
-// What the chain grants whatever is asked; null members for what it does not limit, or grant.
-struct Granted {
-  Ref<SExpression> tag = {};
-  Ref<SExpression> notBefore = {};  // (not-before STAMP)
-  Ref<SExpression> notAfter = {};
-};
-Granted WhatIsGranted(const Question& question, const Evidence& evidence);
-
-// The revocation status of each certificate: Cert::RevocationStatus.
-std::vector<int32_t> RevocationStates(const Evidence& evidence, const Hypothesis& hypothesis = {});
 
 }  // namespace vesk2_command
 

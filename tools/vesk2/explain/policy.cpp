@@ -3,8 +3,6 @@
 
 #include <algorithm>
 
-#include "tools/vesk2/explain/authority.h"
-
 namespace vesk2_command {
 
 using ZvVesk2::CrlSequence;
@@ -33,7 +31,7 @@ bool Policy::IsListed(const CertEvidence& each) const {
 bool Policy::StandsInTheWay(const Question& question, const EntryEvidence& each) const {
   auto* several = dynamic_cast<ThresholdSubject*>(each.entry->GetSubject());
   if (several == nullptr || several->GetK() < 2) return false;
-  if (IsRelevant(each, evidence_)) return true;
+  if (each.relevant) return true;
   SExpression* tag = each.entry->GetTag();
   const auto& members = question.request->members;
   return std::any_of(members.begin(), members.end(), [&](const Request::Member& member) {

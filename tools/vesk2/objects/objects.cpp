@@ -9,6 +9,7 @@
 #include "tools/vesk2/say/report.h"
 
 #include <vesk2/limits.h>
+#include <vesk2/wording.h>
 
 namespace vesk2_command {
 namespace {
@@ -79,26 +80,14 @@ std::string Canonical(DExpression& expression) {
 }
 
 std::string Fingerprint(DExpression& expression) {
-  unsigned char* digest = nullptr;
-  unsigned int length = 0;
-  Check(expression.ComputeHash(digest, length, ZVCLM_HASH_SHA256, true), "digest of a key");
-  const std::unique_ptr<unsigned char[]> owner(digest);
-  return "sha256:" + Hex({reinterpret_cast<char*>(digest), length});
+  return Owned(ZvVesk2::Wording::Fingerprint(&expression));
 }
 
 std::string AdvancedText(SExpression& list, const std::string& keyword) {
-  const unsigned size = list.AdvancedLength();
-  if (size > ZvVesk2::Limits::kMaxExport) throw Trouble("an object too large to be written");
-  std::string text(size_t{size} + 1, '\0');
-  unsigned length = 0;
-  Check(list.ExportAdvanced(reinterpret_cast<unsigned char*>(text.data()), length, size),
-        "writing an object");
-  text.resize(length);
-  const std::string head = "(" + keyword + " ";
-  if (!keyword.empty() && text.starts_with(head)) {
-    text = text.substr(head.size(), text.size() - head.size() - 1);
+  if (list.AdvancedLength() > ZvVesk2::Limits::kMaxExport) {
+    throw Trouble("an object too large to be written");
   }
-  return Escape(text);
+  return Owned(ZvVesk2::Wording::OfList(&list, keyword.c_str()));
 }
 
 std::string TagText(SExpression* tag) {

@@ -4,39 +4,16 @@
 #include "tools/vesk2/objects/objects.h"
 #include "tools/vesk2/say/report.h"
 
-#include <vesk2/hash.h>
+#include <vesk2/wording.h>
 
 namespace vesk2_command {
 
-using ZvVesk2::Hash;
-using ZvVesk2::Subject;
-using ZvVesk2::ThresholdSubject;
+namespace Wording = ZvVesk2::Wording;
 
-std::string SubjectText(Subject& subject) {
-  if (const auto* hash = dynamic_cast<Hash*>(&subject)) {
-    const char* name = hash->GetAlgorithm() == ZVCLM_HASH_SHA256 ? "sha256:"
-                       : hash->GetAlgorithm() == ZVCLM_HASH_SHA1 ? "sha1:"
-                                                                 : "rmd160:";
-    return name + Hex(BytesOf(*hash->GetDigest()));
-  }
-  auto* threshold = dynamic_cast<ThresholdSubject*>(&subject);
-  if (threshold == nullptr) return Fingerprint(subject);
-  std::string text = std::to_string(threshold->GetK()) + " of";
-  Ref<SExpression> members;
-  Check(threshold->GetSubjects(members.Out()), "reading a subject");
-  for (auto it = members->Begin(); it; it.Next()) text += " " + Fingerprint(*it.Value());
-  return text;
-}
+std::string SubjectText(ZvVesk2::Subject& subject) { return Owned(Wording::OfSubject(&subject)); }
 
 std::string PeriodText(const TimeStamp* notBefore, const TimeStamp* notAfter) {
-  if (notBefore == nullptr && notAfter == nullptr) return "always";
-  if (notBefore != nullptr && notAfter != nullptr && !notBefore->IsBefore(notAfter) &&
-      !notBefore->IsAfter(notAfter)) {
-    return "at " + StampText(*notBefore);
-  }
-  const std::string from = notBefore != nullptr ? "from " + StampText(*notBefore) : "";
-  const std::string until = notAfter != nullptr ? "until " + StampText(*notAfter) : "";
-  return from + (from.empty() || until.empty() ? "" : " ") + until;
+  return Owned(Wording::OfPeriod(notBefore, notAfter));
 }
 
 std::string SourceText(SExpression& element) {

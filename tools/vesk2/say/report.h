@@ -34,6 +34,8 @@ class Trouble : public std::runtime_error {
   std::optional<uint64_t> byte = {};
 };
 
+// Owned takes over a text that the library made; it could not where there was no memory.
+std::string Owned(char* made);
 // Escape writes control bytes (ESC and DEL among them), invalid UTF-8 and the characters that
 // reorder or break lines on a terminal as \xNN, and a backslash as "\\", so that the result is
 // unambiguous.

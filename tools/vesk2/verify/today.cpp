@@ -1,8 +1,6 @@
 // today.cpp: judging a manifest by what is revoked now.
 #include "tools/vesk2/verify/today.h"
 
-#include "tools/vesk2/explain/authority.h"
-#include "tools/vesk2/explain/revocation.h"
 #include "tools/vesk2/say/report.h"
 
 namespace vesk2_command {
@@ -31,21 +29,20 @@ int Today::Judge(SExpression* tag) const {
 
 ExitCode Today::Refuse(const Question& question, int code) const {
   const Evidence evidence = GatherEvidence(question);
-  const RevocationLists lists(evidence);
   const std::string signedAt = StampText(*proved_.GetSigningTime());
   std::string unknown;
   for (size_t i = 0; i < today_.CountCerts(); ++i) {
     const int32_t status = today_.GetRevocationStatus(i);
     if (status == Cert::NotRevoked || proved_.GetRevocationStatus(i) != Cert::NotRevoked) continue;
-    SExpression* source = today_.GetRevocationSource(i);
     if (status != Cert::Undetermined) {
       const bool key = status == Cert::KeyRevoked;
-      const std::string since = lists.RevokedSince(*today_.GetCert(i), source, key);
-      return No(VESK2_ERR_CERT_REVOKED, CertName(evidence, i) + (key ? ", its key," : "") +
-                                            " is revoked since " + Escape(since) +
-                                            "; the manifest says it was signed at " + signedAt);
+      const TimeStamp* since = today_.GetRevokedSince(i);
+      return No(VESK2_ERR_CERT_REVOKED,
+                CertName(evidence, i) + (key ? ", its key," : "") + " is revoked" +
+                    (since != nullptr ? " since " + StampText(*since) : "") +
+                    "; the manifest says it was signed at " + signedAt);
     }
-    const CrlSequence* list = lists.Deciding(source);
+    const CrlSequence* list = today_.GetRevocationList(i);
     if (!unknown.empty() || list == nullptr) continue;
     unknown = "revocation unknown since " + StampText(*list->GetCert()->GetNotAfter()) +
               ": then ended the list that tells of " + CertName(evidence, i);
