@@ -22,6 +22,7 @@
 #include "src/objects/build.h"
 #include "src/platform/wait.h"
 #include "src/sexpr/same.h"
+#include "src/trust/lists.h"
 #include "src/trust/revocation_lists.h"
 
 namespace ZvVesk2 {
@@ -147,17 +148,10 @@ int ManifestReader::ReadRevocationLists(SExpression* lists) {
 int ManifestReader::SetPeriod() {
   Ref<TimeStamp> first;
   Ref<TimeStamp> last;
-  if (notBefore_ != 0) VESK2_TRY(MakeTime(first, notBefore_));
-  if (notAfter_ != 0) VESK2_TRY(MakeTime(last, notAfter_));
+  if (notBefore_ != 0) VESK2_TRY(MakeStamp(first, notBefore_, Context()));
+  if (notAfter_ != 0) VESK2_TRY(MakeStamp(last, notAfter_, Context()));
   evidence_.SetPeriod(first.get(), last.get());
   return 0;
-}
-
-int ManifestReader::MakeTime(Ref<TimeStamp>& stamp, long seconds) {
-  stamp.Reset(TryNew<TimeStamp>(Context()));
-  VESK2_REQUIRE(stamp, VESK2_ERR_MEM_ALLOC);
-  const int code = stamp->Set(seconds);
-  return code != -1 ? code : VESK2_ERR_TIME_STAMP;  // a year that has no text
 }
 
 int ManifestReader::LoadEntries() {

@@ -41,7 +41,6 @@ class ManifestReader {
   [[nodiscard]] int ReadSignature(Cert& cert);
   [[nodiscard]] int ReadRevocationLists(SExpression* lists);
   [[nodiscard]] int SetPeriod();
-  [[nodiscard]] int MakeTime(Ref<TimeStamp>& stamp, long seconds);
   [[nodiscard]] int LoadEntries();
   [[nodiscard]] int LoadLists(SExpression* carried);
   [[nodiscard]] int ProveAuthority();

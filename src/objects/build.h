@@ -7,6 +7,7 @@
 
 #include <vesk2/expression.h>
 #include <vesk2/ref.h>
+#include <vesk2/time_stamp.h>
 
 #include "src/frame/check.h"
 #include "src/frame/handles.h"
@@ -58,6 +59,15 @@ template <typename T>
   SExpression* pair = nullptr;
   VESK2_TRY(AppendHead(list, name, pair));
   return Append(pair, std::move(value), field);
+}
+
+// AppendBounds appends (not-before <stamp>) and (not-after <stamp>) to a list (valid), each unless
+// it is null, and points the fields at them.
+[[nodiscard]] inline int AppendBounds(SExpression* valid, Ref<TimeStamp> begin, Ref<TimeStamp> end,
+                                      TimeStamp*& beginField, TimeStamp*& endField) {
+  if (begin) VESK2_TRY(AppendPair(valid, "not-before", std::move(begin), beginField));
+  if (end) VESK2_TRY(AppendPair(valid, "not-after", std::move(end), endField));
+  return 0;
 }
 
 }  // namespace ZvVesk2

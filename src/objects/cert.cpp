@@ -102,13 +102,8 @@ int Cert::SetValidity(TimeStamp* newNotBefore, TimeStamp* newNotAfter) {
   if (newNotBefore == nullptr && newNotAfter == nullptr) return 0;
   SExpression* valid = nullptr;
   VESK2_TRY(AppendHead(this, "valid", valid));
-  if (newNotBefore != nullptr) {
-    VESK2_TRY(AppendPair(valid, "not-before", Ref<TimeStamp>::Share(newNotBefore), notBefore));
-  }
-  if (newNotAfter != nullptr) {
-    VESK2_TRY(AppendPair(valid, "not-after", Ref<TimeStamp>::Share(newNotAfter), notAfter));
-  }
-  return 0;
+  return AppendBounds(valid, Ref<TimeStamp>::Share(newNotBefore),
+                      Ref<TimeStamp>::Share(newNotAfter), notBefore, notAfter);
 }
 
 int Cert::Clone(Cert* other) {

@@ -71,12 +71,8 @@ int AclEntry::Build(Parts&& parts) {
   if (parts.valid) {
     SExpression* valid = nullptr;
     VESK2_TRY(AppendHead(this, "valid", valid));
-    if (parts.notBefore) {
-      VESK2_TRY(AppendPair(valid, "not-before", std::move(parts.notBefore), notBefore));
-    }
-    if (parts.notAfter) {
-      VESK2_TRY(AppendPair(valid, "not-after", std::move(parts.notAfter), notAfter));
-    }
+    VESK2_TRY(AppendBounds(valid, std::move(parts.notBefore), std::move(parts.notAfter), notBefore,
+                           notAfter));
   }
   if (parts.generation) {
     ByteString* number = nullptr;

@@ -122,8 +122,10 @@ int Evidence::MakePeriod(Ref<SExpression>& out) const {
   if (AskedAboutSigning()) {
     VESK2_TRY(Append(valid.get(), Ref<TimeStamp>::Share(signingTime.get())));
   }
-  if (first) VESK2_TRY(AppendPair(valid.get(), "not-before", Ref<TimeStamp>::Share(first.get())));
-  if (last) VESK2_TRY(AppendPair(valid.get(), "not-after", Ref<TimeStamp>::Share(last.get())));
+  TimeStamp* begin = nullptr;
+  TimeStamp* end = nullptr;
+  VESK2_TRY(AppendBounds(valid.get(), Ref<TimeStamp>::Share(first.get()),
+                         Ref<TimeStamp>::Share(last.get()), begin, end));
   out = std::move(valid);
   return 0;
 }

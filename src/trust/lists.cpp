@@ -23,15 +23,19 @@ bool EndsInRevoke(SExpression* tag) {
   return keyword != nullptr && keyword->IsEqual("revoke");
 }
 
-int MakeNow(Ref<TimeStamp>& out, Vesk2ContextStruct* ctx) {
-  Ref<TimeStamp> now(TryNew<TimeStamp>(ctx));
-  VESK2_REQUIRE(now, VESK2_ERR_MEM_ALLOC);
-  const int code = now->Set(ZVsysutil::zv_time(nullptr));
-  // -1, a clock out of range, is no code of the library.
+int MakeStamp(Ref<TimeStamp>& out, long seconds, Vesk2ContextStruct* ctx) {
+  Ref<TimeStamp> stamp(TryNew<TimeStamp>(ctx));
+  VESK2_REQUIRE(stamp, VESK2_ERR_MEM_ALLOC);
+  const int code = stamp->Set(seconds);
+  // -1 is no code of the library.
   VESK2_REQUIRE(code != -1, VESK2_ERR_TIME_STAMP);
   VESK2_TRY(code);
-  out = std::move(now);
+  out = std::move(stamp);
   return 0;
+}
+
+int MakeNow(Ref<TimeStamp>& out, Vesk2ContextStruct* ctx) {
+  return MakeStamp(out, ZVsysutil::zv_time(nullptr), ctx);
 }
 
 }  // namespace ZvVesk2

@@ -25,7 +25,9 @@ using TextPtr = std::unique_ptr<char[]>;
 // tag then names a source of revocation lists.
 bool EndsInRevoke(SExpression* tag);
 
-// MakeNow makes a stamp of the current time.
+// MakeStamp makes a stamp of a moment; VESK2_ERR_TIME_STAMP for a year that has no text. MakeNow
+// makes one of the current time.
+[[nodiscard]] int MakeStamp(Ref<TimeStamp>& out, long seconds, Vesk2ContextStruct* ctx);
 [[nodiscard]] int MakeNow(Ref<TimeStamp>& out, Vesk2ContextStruct* ctx);
 
 }  // namespace ZvVesk2
