@@ -109,11 +109,13 @@ int PublicKey::ImportNumbers(ZvBuffer* buffer) {
     VESK2_TRY(ImportNew(text, buffer, GetContext()));
     VESK2_TRY(buffer->Expect(")"));
     if (number.field == Form::kLength) length = BitLength(*text);
-    VESK2_TRY(zvclm_BigIntFromBuffer(&record.Number(number), text->GetData(), text->GetLength()));
+    VESK2_TRY(InOwnWords(
+        zvclm_BigIntFromBuffer(&record.Number(number), text->GetData(), text->GetLength())));
     VESK2_TRY(AppendPair(numbers, number.name, std::move(text)));
   }
   keyLength = length;
-  return zvclm_PublicKeyDefine(&key, Form::kType, Form::kDataId, record.get(), 0, CryptoHandle());
+  return InOwnWords(
+      zvclm_PublicKeyDefine(&key, Form::kType, Form::kDataId, record.get(), 0, CryptoHandle()));
 }
 
 ZVCLMPublicKeyData* PublicKey::GetKey() const { return key; }
