@@ -76,7 +76,9 @@ class VESK2_API Manifest {
   void SetStoreUpdate(bool value);
   // SetEvidence has ReadManifest and VerifyManifest keep what they read and found in `borrowed`,
   // which must outlive them; null takes it back. They then read on after a refusal, for the
-  // evidence only: codes, positions and what is stored stay as they are without it.
+  // evidence only: codes, positions and what is stored stay as they are without it. ReadManifest
+  // without `verifyChain` then tells all that the file says, proved or not: its version, type and
+  // time, the lists that it carries, and its listing where that can be read.
   void SetEvidence(Evidence* borrowed);
 
   // ---- What the object holds, borrowed ----
@@ -101,7 +103,7 @@ class VESK2_API Manifest {
   // 0 when it was compared, and for any other entry.
   [[nodiscard]] int GetReason(const FileItem* entry) const;
   FileItem* GetIgnoredEntries() const;
-  // Null before and after a failed read.
+  // Null before and after a failed read (but see SetEvidence).
   SExpression* GetVersion() const;
   SExpression* GetType() const;
   TimeStamp* GetSigningTime() const;
@@ -109,7 +111,8 @@ class VESK2_API Manifest {
   // the text stopped making sense.
   size_t GetReadPosition() const;
   // The listing that the last VerifyManifest with SetEvidence proved and compared, its root named
-  // by the directory; null when it did not come to that.
+  // by the directory; or the one that ReadManifest told (see there), its root without a name. Null
+  // when it did not come to that.
   BodyDirectory* GetListing() const;
 
  private:

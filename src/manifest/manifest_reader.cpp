@@ -35,6 +35,7 @@ constexpr unsigned kStampLength = 19;
 int ManifestReader::Read(ZvBuffer** body) {
   if (body != nullptr) *body = nullptr;
   manifest_.ClearRead();
+  if (Inspects()) manifest_.listing.reset();
   evidence_.Clear(Evidence::SignedManifest);
   const ZVsysutil::ZvCall call;
   const char* const path = manifest_.manifestPath.get();
@@ -44,18 +45,25 @@ int ManifestReader::Read(ZvBuffer** body) {
   const int code = ReadFile(body);
   manifest_.readPosition = refusal_ != 0 ? refusedAt_ : buffer_->Position();
   VESK2_REQUIRE(!LacksMemory(code), code);
+  if (Inspects()) Publish();
   VESK2_TRY(refusal_);
   VESK2_TRY(code);
-  manifest_.version = std::move(head_.version);
-  manifest_.type = std::move(head_.type);
-  manifest_.signingTime = std::move(signingTime_);
+  Publish();
   return 0;
+}
+
+void ManifestReader::Publish() {
+  manifest_.version = Ref<SExpression>::Share(version_.get());
+  manifest_.type = Ref<SExpression>::Share(type_.get());
+  manifest_.signingTime = Ref<TimeStamp>::Share(signingTime_.get());
 }
 
 int ManifestReader::ReadFile(ZvBuffer** body) {
   VESK2_TRY(ReadHead());
   VESK2_TRY(ReadSignatureBlock());
-  VESK2_TRY(verifyChain_ ? ProveAuthority() : ReadRevocationLists(nullptr));
+  Ref<SExpression> carried(TryNew<SExpression>(Context()));
+  VESK2_REQUIRE(carried, VESK2_ERR_MEM_ALLOC);
+  VESK2_TRY(verifyChain_ ? ProveAuthority(*carried) : ReadRevocationLists(*carried));
   return ProveBody(body);
 }
 
@@ -133,13 +141,14 @@ int ManifestReader::ReadSignature(Cert& cert) {
   return Refuse(code);
 }
 
-// Reads the revocation lists that the manifest carries, into `lists` unless it is null.
-int ManifestReader::ReadRevocationLists(SExpression* lists) {
+// Reads the revocation lists that the manifest carries.
+int ManifestReader::ReadRevocationLists(SExpression& lists) {
+  evidence_.SetLists(nullptr, &lists);
   VESK2_TRY(buffer_->Expect("(3:crl"));
   while (buffer_->Peek() == '(') {
     Ref<CrlSequence> sequence;
     VESK2_TRY(ImportNew(sequence, buffer_.get(), Context()));
-    if (lists != nullptr) VESK2_TRY(Append(lists, std::move(sequence)));
+    VESK2_TRY(Append(&lists, std::move(sequence)));
   }
   return buffer_->Expect(")");
 }
@@ -168,15 +177,11 @@ int ManifestReader::LoadLists(SExpression* carried) {
   return evidence_.MarkRevoked();
 }
 
-int ManifestReader::ProveAuthority() {
+int ManifestReader::ProveAuthority(SExpression& carried) {
   VESK2_TRY(Refuse(SetPeriod()));
   VESK2_TRY(Refuse(LoadEntries()));
-  Ref<SExpression> carried(TryNew<SExpression>(Context()));
-  VESK2_REQUIRE(carried, VESK2_ERR_MEM_ALLOC);
-  const int read = ReadRevocationLists(carried.get());
-  evidence_.SetLists(nullptr, carried.get());
-  VESK2_TRY(read);
-  return evidence_.GetEntries() != nullptr ? AskAuthority(carried.get()) : 0;
+  VESK2_TRY(ReadRevocationLists(carried));
+  return evidence_.GetEntries() != nullptr ? AskAuthority(&carried) : 0;
 }
 
 int ManifestReader::AskAuthority(SExpression* carried) {
@@ -196,7 +201,8 @@ int ManifestReader::ProveBody(ZvBuffer** body) {
   const unsigned char* const bytes = buffer_->Data();
   const int digest = CheckDigest(bytes, length);
   VESK2_TRY(Refuse(digest));
-  if (refusal_ != 0) return InspectBody(bytes, length, digest);
+  if (refusal_ != 0 || Inspects()) VESK2_TRY(InspectBody(bytes, length, digest));
+  if (refusal_ != 0) return 0;
   buffer_->Skip(length);
   VESK2_TRY(buffer_->Expect(")"));
   if (body == nullptr) return 0;
@@ -204,16 +210,18 @@ int ManifestReader::ProveBody(ZvBuffer** body) {
   return *body != nullptr ? 0 : VESK2_ERR_FILE_OPEN;
 }
 
-// Notes whether a body that is refused is at least whole.
+// Notes whether a body, refused or not, is whole.
 int ManifestReader::InspectBody(const unsigned char* bytes, size_t length, int contentCode) {
   const size_t start = buffer_->Position();
   const BufferOwner body(ZVsysutil::zv_buffer_wrap(bytes, length));
   VESK2_REQUIRE(body, VESK2_ERR_MEM_ALLOC);
-  BodyDirectory listing(Context());
-  int code = listing.ParseBody(body.get(), nullptr);
+  std::unique_ptr<BodyDirectory> listing(TryNew<BodyDirectory>(Context()));
+  VESK2_REQUIRE(listing, VESK2_ERR_MEM_ALLOC);
+  int code = listing->ParseBody(body.get(), nullptr);
   VESK2_REQUIRE(!LacksMemory(code), code);
   if (code == 0 && body->Remaining() != 0) code = VESK2_ERR_PARSE_FILE;
   evidence_.SetContent(contentCode, code, start + body->Position());
+  if (Inspects() && code == 0) manifest_.listing = std::move(listing);
   return 0;
 }
 

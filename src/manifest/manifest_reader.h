@@ -1,6 +1,7 @@
 // ManifestReader: one reading of one manifest file. It works on its own references and touches the
 // manifest's version, type and signing time only when everything held: what callers read from those
-// is always what was proved.
+// is always what was proved. Only who asks for the evidence of a manifest whose authority is not to
+// be judged is told what the file says.
 #ifndef VESK2_SRC_MANIFEST_MANIFEST_READER_H
 #define VESK2_SRC_MANIFEST_MANIFEST_READER_H
 
@@ -39,15 +40,19 @@ class ManifestReader {
   [[nodiscard]] int ReadSignatureBlock();
   [[nodiscard]] int ReadSigner();
   [[nodiscard]] int ReadSignature(Cert& cert);
-  [[nodiscard]] int ReadRevocationLists(SExpression* lists);
+  [[nodiscard]] int ReadRevocationLists(SExpression& lists);
   [[nodiscard]] int SetPeriod();
   [[nodiscard]] int LoadEntries();
   [[nodiscard]] int LoadLists(SExpression* carried);
-  [[nodiscard]] int ProveAuthority();
+  [[nodiscard]] int ProveAuthority(SExpression& carried);
   [[nodiscard]] int AskAuthority(SExpression* carried);
   [[nodiscard]] int ProveBody(ZvBuffer** body);
   [[nodiscard]] int InspectBody(const unsigned char* bytes, size_t length, int contentCode);
   [[nodiscard]] int CheckDigest(const unsigned char* body, size_t length);
+
+  void Publish();
+  // Whether what the file says is wanted, proved or not.
+  bool Inspects() const { return readsOn_ && !verifyChain_; }
 
   Vesk2ContextStruct* Context() const { return manifest_.context; }
 

@@ -442,6 +442,46 @@ TEST_F(ManifestTest, ReadsWithoutTheChainAndHandsTheBodyOver) {
   EXPECT_EQ(read, nullptr);
 }
 
+// Whoever asks for the evidence is told what the file says, whatever that is worth; the answer
+// stays.
+TEST_F(ManifestTest, TellsWhatARefusedManifestSays) {
+  parts.lists = RevocationList("", signer.Public());
+  const std::string good = ManifestFile(parts);
+  const struct {
+    const char* from;
+    const char* to;
+    int code;
+    size_t certs, lists;
+    bool whole;
+  } rows[] = {
+      {"", "", 0, 2, 1, true},
+      {"4:text", "4:tixt", VESK2_ERR_HASH_MATCH, 2, 1, true},
+      {"7:rsa-1.5", "7:rsa-1.6", VESK2_ERR_SIGNATURE_ID, 2, 1, true},
+      {"version1:1", "version1:2", VESK2_ERR_MANIFEST_VERSION, 0, 0, false},
+      {"(3:crl(8:", "(3:crl(9:", VESK2_ERR_PARSE_FILE, 2, 0, false},
+      {"12:random-token", "12:random-tokem", VESK2_ERR_HASH_MATCH, 2, 1, false},
+  };
+  for (const auto& row : rows) {
+    SCOPED_TRACE(row.to);
+    std::string text = good;
+    text.replace(text.find(row.from), std::string(row.from).size(), row.to);
+    Manifest manifest(nullptr);
+    Open(manifest, text);
+    EXPECT_EQ(manifest.ReadManifest(false, 0, 0, nullptr), row.code);
+    EXPECT_EQ(manifest.GetVersion() != nullptr, row.code == 0);
+    EXPECT_EQ(manifest.GetListing(), nullptr);
+    Evidence evidence(nullptr);
+    manifest.SetEvidence(&evidence);
+    EXPECT_EQ(manifest.ReadManifest(false, 0, 0, nullptr), row.code);
+    EXPECT_EQ(evidence.CountCerts(), row.certs);
+    const SExpression* const lists = evidence.GetCarriedLists();
+    EXPECT_EQ(lists != nullptr ? lists->Count() : 0, row.lists);
+    EXPECT_EQ(manifest.GetListing() != nullptr, row.whole);
+    EXPECT_EQ(manifest.GetVersion() != nullptr && manifest.GetType() != nullptr, row.certs > 0);
+    if (row.whole) EXPECT_EQ(evidence.GetListingPosition() + 1, text.size());
+  }
+}
+
 TEST_F(ManifestTest, ComparesTwoManifests) {
   ManifestText other = parts;
   other.body = Body(FileEntry("a", "a") + FileEntry("x", ""));

@@ -89,7 +89,7 @@ ExitCode Run(const Options& options) {
                  ParseTag(options.tag), ParsePeriod(options.period), options.comment});
   const bool issuer = !options.issuerOf.empty();
   CheckGrant(*entry, issuer ? options.issuerOf : options.subjectOf, issuer, options.strict);
-  GrantEntry(*entry, {name, options.flags.force, options.flags.dryRun});
+  GrantEntry(*entry, {name, options.flags});
   Result()["entry"] = DescribeEntry(*entry, name + ".acl").members();
   // The lists of a revocation source are believed without it.
   if (!options.propagate && !IsRevocationTag(entry->GetTag())) {

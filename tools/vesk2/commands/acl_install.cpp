@@ -36,11 +36,11 @@ ExitCode Run(const Options& options) {
     CheckEntry(*entries.back(), path);
     const std::string name = EntryName(options, path);
     if (!names.insert(name).second) throw Trouble("two entries " + Escape(name), "usage");
-    RefuseTaken(*entries.back(), {name, options.flags.force});
+    RefuseTaken(*entries.back(), {name, options.flags});
   }
   for (size_t i = 0; i < entries.size(); ++i) {
     const std::string name = EntryName(options, options.files[i]);
-    GrantEntry(*entries[i], {name, options.flags.force, options.flags.dryRun});
+    GrantEntry(*entries[i], {name, options.flags});
     Result()["entries"].push_back(DescribeEntry(*entries[i], name + ".acl").members());
   }
   return kYes;

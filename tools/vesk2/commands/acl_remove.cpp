@@ -7,8 +7,8 @@
 
 #include "tools/vesk2/commands/command.h"
 #include "tools/vesk2/files/files.h"
-#include "tools/vesk2/files/stores.h"
 #include "tools/vesk2/say/report.h"
+#include "tools/vesk2/stores/grant.h"
 
 namespace vesk2_command {
 namespace {
@@ -18,11 +18,8 @@ struct Options {
   bool dryRun = false;
 };
 
-std::string EntryPath(const std::string& name) {
-  if (name.empty() || name.find('/') != std::string::npos) {
-    throw Trouble("\"" + Escape(name) + "\": a name, not a path", "usage");
-  }
-  const std::string path = AclDirectory() + "/" + name + (name.ends_with(".acl") ? "" : ".acl");
+std::string ExistingPath(const std::string& name) {
+  const std::string path = EntryPath(name, "\"" + Escape(name) + "\"");
   if (faccessat(AT_FDCWD, path.c_str(), F_OK, AT_SYMLINK_NOFOLLOW) != 0)
     throw FileTrouble(path, std::strerror(errno), "io");
   return path;
@@ -30,7 +27,7 @@ std::string EntryPath(const std::string& name) {
 
 ExitCode Run(const Options& options) {
   std::vector<std::string> paths;
-  for (const std::string& name : options.names) paths.push_back(EntryPath(name));
+  for (const std::string& name : options.names) paths.push_back(ExistingPath(name));
   for (const std::string& path : paths) {
     if (!options.dryRun && unlink(path.c_str()) != 0) {
       throw FileTrouble(path, std::strerror(errno), "io");

@@ -7,9 +7,8 @@
 #include "tools/vesk2/files/stores.h"
 #include "tools/vesk2/objects/texts.h"
 #include "tools/vesk2/stores/acl_store.h"
-#include "tools/vesk2/stores/crl_drop.h"
+#include "tools/vesk2/stores/crl_compare.h"
 #include "tools/vesk2/stores/crl_store.h"
-#include "tools/vesk2/stores/crl_stored.h"
 
 namespace vesk2_command {
 namespace {

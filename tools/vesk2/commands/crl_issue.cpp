@@ -5,9 +5,8 @@
 #include "tools/vesk2/objects/texts.h"
 #include "tools/vesk2/say/report.h"
 #include "tools/vesk2/stores/acl_store.h"
-#include "tools/vesk2/stores/crl_drop.h"
+#include "tools/vesk2/stores/crl_compare.h"
 #include "tools/vesk2/stores/crl_store.h"
-#include "tools/vesk2/stores/crl_stored.h"
 
 #include <vesk2/acl_entry.h>
 #include <vesk2/limits.h>
@@ -38,73 +37,50 @@ ZvclmHashID HashId(const std::string& name) {
   return name == "sha1" ? ZVCLM_HASH_SHA1 : ZVCLM_HASH_SHA256;
 }
 
-// (item (hash NAME DIGEST) DATE)
-std::string Item(const std::string& hash, const std::string& digest, const TimeStamp& date) {
-  const std::string stamp(reinterpret_cast<const char*>(date.GetData()), date.GetLength());
-  return "(" + Atom("item") + "(" + Atom("hash") + Atom(hash) + Atom(digest) + ")" + Atom(stamp) +
-         ")";
-}
-
-std::string Digest(DExpression& object, const std::string& hash, bool ignoreHints) {
-  unsigned char* digest = nullptr;
-  unsigned int length = 0;
-  Check(object.ComputeHash(digest, length, HashId(hash), ignoreHints), "digest of an object");
-  const std::unique_ptr<unsigned char[]> owner(digest);
-  return {reinterpret_cast<char*>(digest), length};
-}
-
-// FILE or FILE:N: the digest of the first or N-th certificate of a file, as it stands there.
-std::string CertDigest(const std::string& argument, const std::string& hash) {
+// FILE or FILE:N: the hash of the first or N-th certificate of a file, as it stands there.
+Ref<Hash> HashOfCert(const std::string& argument, ZvclmHashID id) {
   const Place place = ParsePlace(argument);
   const size_t number = place.number != 0 ? place.number : 1;
   const std::vector<SignedCert> certs = ReadCerts(place.path);
   RequireCert(certs, number, place.path);
-  return Digest(*certs[number - 1].cert, hash, false);
+  return HashOf(*certs[number - 1].cert, id);
 }
 
 Ref<Crl> MakeList(const Options& options, CrlSequence* old, const Drops& drops) {
+  constexpr const char* kWhat = "building a revocation list";
+  const ZvclmHashID id = HashId(options.hash);
   const Ref<TimeStamp> date = ParseTime(options.date, false);
-  std::string certs;
-  std::string keys;
+  Ref<Crl> list;
+  Check(Crl::Create(list.Out(), nullptr), kWhat);
   for (const std::string& argument : options.certs) {
-    certs += Item(options.hash, CertDigest(argument, options.hash), *date);
+    Check(list->RevokeCertificate(HashOfCert(argument, id).get(), date.get()), kWhat);
   }
   for (const std::string& path : options.keys) {
-    keys += Item(options.hash, Digest(*ReadPublicKey(path), options.hash, true), *date);
+    Check(list->RevokeKey(HashOf(*ReadPublicKey(path), id, true).get(), date.get()), kWhat);
   }
-  if (old != nullptr) {
-    certs += drops.ItemsOf(*old->GetCrl()->GetList1());
-    keys += drops.ItemsOf(*old->GetCrl()->GetList2());
-  }
+  if (old != nullptr) drops.CarryOver(*old->GetCrl(), *list);
   // A list without items counts as absent, and every certificate that depends on it as
   // undetermined. This item is the digest of nothing.
-  if (certs.empty()) {
-    certs = Item(options.hash, std::string(options.hash == "sha1" ? 20 : 32, '\0'), *date);
+  if (list->GetList1()->Count() < 2) {
+    const std::string nothing(id == ZVCLM_HASH_SHA1 ? 20 : 32, '\0');
+    Check(list->RevokeCertificate(MakeHash(id, nothing).get(), date.get()), kWhat);
   }
-  const Buffer buffer =
-      WrapBytes("(3:crl(7:version1:1)(5:list1" + certs + ")(5:list2" + keys + "))");
-  Ref<Crl> list(new Crl(nullptr));
-  Check(list->Import(buffer.get()), "building a revocation list");
   return list;
 }
 
-Ref<Hash> HashOf(Crl& list, const std::string& name) {
-  Ref<Hash> hash(new Hash(nullptr));
-  Check(hash->Init(HashId(name)), "hashing");
-  Check(hash->Update(&list), "hashing");
-  Check(hash->Finalize(), "hashing");
-  return hash;
-}
-
-// The list as a file holds it.
-std::string SignList(Crl& list, SExpression* tag, const SigningKey& key, const Options& options) {
-  const Ref<Hash> subject = HashOf(list, options.hash);
+// The list with the word of its issuer.
+Ref<CrlSequence> SignList(Crl& list, SExpression* tag, const SigningKey& key,
+                          const Options& options) {
+  const Ref<Hash> subject = HashOf(list, HashId(options.hash));
   Grant grant{subject.get()};
   grant.tag = tag;
   grant.period = ParsePeriod(options.period);
   const SignedCert issued = IssueCert(key, grant, options.signer.algorithm);
-  return "(" + Atom("sequence") + Canonical(list) + Canonical(*issued.cert) +
-         Canonical(*issued.signature) + ")";
+  Ref<CrlSequence> sequence;
+  Check(CrlSequence::Create(sequence.Out(), &list, issued.cert.get(), issued.signature.get(),
+                            nullptr),
+        "building a revocation list");
+  return sequence;
 }
 
 // The stored list that the new one takes the place of, when it counts. One that does not revokes
@@ -136,14 +112,11 @@ Ref<Crl> MakeSuccessor(const Options& options, SExpression* tag) {
 }
 
 // Puts the list into this machine's store, or says that it would.
-void Import(const std::string& bytes, const Options& options, const std::string& items) {
-  const Buffer buffer = WrapBytes(bytes);
-  const Ref<CrlSequence> list(new CrlSequence(nullptr));
-  Check(list->Import(buffer.get()), "storing the list");
-  if (options.flags.dryRun) return Note("would store " + CrlText(*list));
-  const std::string reason = StoreCrl(*list, LoadAcls().get(), "the list");
+void Import(CrlSequence& list, const Options& options, const std::string& items) {
+  if (options.flags.dryRun) return Note("would store " + CrlText(list));
+  const std::string reason = StoreCrl(list, LoadAcls().get(), "the list");
   if (!reason.empty()) throw Trouble("the list was not stored: " + reason, "not-stored");
-  Note("stored " + CrlText(*list) + items);
+  Note("stored " + CrlText(list) + items);
   Result()["stored"] = true;
 }
 
@@ -159,7 +132,7 @@ ExitCode Run(const Options& options) {
   if (!options.output.empty()) RefuseExisting(options.output, flags.force);
   const auto key = OpenSigner(options.signer);
   const Ref<Crl> list = MakeSuccessor(options, tag.get());
-  const std::string bytes = SignList(*list, tag.get(), *key, options);
+  const Ref<CrlSequence> signedList = SignList(*list, tag.get(), *key, options);
   const auto readBack = [](const std::string& temporary) {
     Check(CheckIssuerWord(*ReadCrl(temporary)), "checking the new list");
   };
@@ -168,10 +141,9 @@ ExitCode Run(const Options& options) {
   }
   const std::string items = "; revoked certificates: " + std::to_string(options.certs.size()) +
                             ", keys: " + std::to_string(options.keys.size());
-  if (options.import) Import(bytes, options, items);
-  if (!options.output.empty() &&
-      WriteFile(options.output, bytes, {0666, flags.force, readBack, flags.dryRun})) {
-    Note("wrote " + Escape(options.output) + items);
+  if (options.import) Import(*signedList, options, items);
+  if (!options.output.empty()) {
+    WriteFile(options.output, Canonical(*signedList), {flags, readBack, items});
   }
   Result()["tag"] = TagText(tag.get());
   Result()["issuer"] = Fingerprint(*key->Public());

@@ -33,7 +33,7 @@ Sheet DescribeChain(const std::vector<ChainLink>& links);
 Sheet DescribeCrl(const ZvVesk2::Crl& list);
 Sheet DescribeCrl(CrlSequence& list);
 
-// A manifest, `code` being what CheckBlock says of it.
+// A manifest, `code` being what its signatures and its digest are worth.
 Sheet DescribeManifest(const SignatureBlock& block, int code);
 
 // Adds the row and the member "signature" for a checked signature's code.

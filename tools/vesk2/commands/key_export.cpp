@@ -64,10 +64,7 @@ ExitCode Run(const Options& options) {
   if (standard && options.format == "canonical" && isatty(STDOUT_FILENO) == 1) {
     throw Trouble("the canonical form is not for a terminal: --output FILE", "usage");
   }
-  if (WriteFile(options.output, text, {0666, options.flags.force, {}, options.flags.dryRun}) &&
-      !standard) {
-    Note("wrote " + Escape(options.output));
-  }
+  WriteFile(options.output, text, {options.flags});
   return kYes;
 }
 

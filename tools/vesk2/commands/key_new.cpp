@@ -36,12 +36,11 @@ void MakeKey(const std::string& name, const Options& options, const Secret* pass
   const Ref<PublicKey> publicKey = key.Public();
   const std::string privatePath = name + ".pem";
   const std::string publicPath = name + ".pub";
-  WriteFile(privatePath, key.Pem(passphrase)->text(), {0600, options.flags.force});
-  Note("wrote " + Escape(privatePath) +
-       (passphrase != nullptr ? ", under a passphrase"
-                              : ", not protected by a passphrase: keep it private"));
-  WriteFile(publicPath, Canonical(*publicKey), {0666, options.flags.force});
-  Note("wrote " + Escape(publicPath));
+  const std::string said = passphrase != nullptr
+                               ? ", under a passphrase"
+                               : ", not protected by a passphrase: keep it private";
+  WriteFile(privatePath, key.Pem(passphrase)->text(), {options.flags, {}, said, 0600});
+  WriteFile(publicPath, Canonical(*publicKey), {options.flags});
   const std::string fingerprint = Fingerprint(*publicKey);
   Say(fingerprint + "  " + Escape(name));
   Result()["keys"].push_back({{"name", Escape(name)},
@@ -60,8 +59,7 @@ ExitCode Run(const Options& options) {
   for (const std::string& name : names) {
     for (const char* extension : {".pem", ".pub"}) {
       if (!options.flags.dryRun) RefuseExisting(name + extension, options.flags.force);
-      if (options.flags.dryRun)
-        WriteFile(name + extension, "", {0666, options.flags.force, {}, true});
+      if (options.flags.dryRun) WriteFile(name + extension, "", {options.flags});
     }
   }
   if (options.flags.dryRun) return kYes;

@@ -43,13 +43,15 @@ ExitCode Answer(const Manifest& manifest, int code) {
 }
 
 ExitCode Run(const Options& options) {
-  for (const std::string& path : {options.from, options.to}) {
-    const int code = CheckManifest(path);
-    if (code != 0) return No(code, Escape(path) + ": " + CodeWords(code));
+  Manifest manifests[] = {Manifest(nullptr), Manifest(nullptr)};
+  Buffer bodies[2];
+  const std::string* const paths[] = {&options.from, &options.to};
+  for (size_t i = 0; i < 2; ++i) {
+    const int code = ReadSigned(*paths[i], manifests[i], bodies[i]);
+    if (code != 0) return No(code, Escape(*paths[i]) + ": " + CodeWords(code));
   }
-  Manifest manifest(nullptr);
-  Check(manifest.Initialize("", InputPath(options.from).c_str(), "none"), Escape(options.from));
-  const int code = manifest.CompareManifest(InputPath(options.to).c_str());
+  Manifest& manifest = manifests[0];
+  const int code = manifest.Compare(bodies[0].get(), bodies[1].get());
   const bool compared = manifest.GetInvalid() != nullptr || manifest.GetMissing() != nullptr ||
                         manifest.GetExtra() != nullptr;
   if (code != 0 && !compared) Check(code, Escape(options.from) + ", " + Escape(options.to));

@@ -44,13 +44,10 @@ void AddEntries(Sheet& sheet, BodyDirectory& directory) {
 }
 
 ExitCode Run(const Options& options) {
-  SignatureBlock block;
-  const Buffer buffer = OpenBuffer(options.file);
-  int code = ReadSignatureBlock(buffer.get(), block);
-  if (code == 0 && buffer->Remaining() != 0) code = VESK2_ERR_PARSE_FILE;
-  if (code != 0) Malformed(options.file, buffer->Position(), "manifest", code);
-  Sheet sheet = DescribeManifest(block, CheckBlock(block));
-  sheet.Add("size", buffer->Position(), std::to_string(buffer->Position()) + " bytes");
+  const SignatureBlock block = ReadSignatureBlock(options.file);
+  if (block.listing == nullptr) Malformed(options.file, block.position, "manifest", block.code);
+  Sheet sheet = DescribeManifest(block, block.code);
+  sheet.Add("size", block.position, std::to_string(block.position) + " bytes");
   if (options.entries) {
     sheet.StartList("entries");
     AddEntries(sheet, *block.listing);

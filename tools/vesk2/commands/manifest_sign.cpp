@@ -1,7 +1,4 @@
 // manifest_sign.cpp: vesk2 manifest sign.
-//
-// A manifest is one line of canonical text; the signer certificate's subject is the SHA-256 of its
-// version, type and time elements and the body.
 #include <filesystem>
 
 #include "tools/vesk2/commands/command.h"
@@ -22,8 +19,10 @@
 namespace vesk2_command {
 namespace {
 
-using ZvVesk2::Cert;
 using ZvVesk2::Hash;
+using ZvVesk2::ManifestWriter;
+
+constexpr const char* kWriting = "writing the manifest";
 
 struct Options {
   std::string directory;
@@ -37,73 +36,30 @@ struct Options {
   bool allowEmpty = false;
   std::string grant;
   std::string output;
-  bool force = false;
-  bool dryRun = false;
   bool strict = false;
+  WriteFlags flags;
 };
 
-// The signed elements that stand before the signature block, and the one inside it.
-struct Head {
-  std::string version;
-  std::string type = "(" + Atom("type") + Atom("plain") + ")";
-  std::string time;
-};
-
-Head MakeHead(const Options& options) {
-  Head head;
-  head.version = "(" + Atom("version") + Atom("1") + Atom("libvesk2 " + LibraryVersion()) + ")";
-  const Ref<TimeStamp> time = ParseTime(options.at, false);
-  head.time = "(" + Atom("time-of-signing") + Canonical(*time) + ")";
-  return head;
-}
-
-Ref<Hash> Digest(const Head& head, const std::string& body) {
-  Ref<Hash> hash(new Hash(nullptr));
-  Check(hash->Init(ZVCLM_HASH_SHA256), "hashing");
-  for (const std::string* text : {&head.version, &head.type, &head.time, &body}) {
-    const auto* bytes = reinterpret_cast<const unsigned char*>(text->data());
-    Check(hash->Update(bytes, static_cast<unsigned>(text->size())), "hashing");
-  }
-  Check(hash->Finalize(), "hashing");
-  return hash;
-}
-
-std::string Pair(const SignedCert& each) {
-  return Canonical(*each.cert) + Canonical(*each.signature);
-}
-
-// The certificates behind a manifest's first, which is for its content.
-std::string ChainOf(const std::string& manifest, PublicKey& signer) {
-  const std::vector<SignedCert> certs = ReadCerts(manifest);
-  RequireCert(certs, 2, manifest);
-  if (!certs[1].cert->GetSubject()->IsEqual(&signer)) {
-    throw Trouble(Escape(manifest) + ": signed by " + Fingerprint(*certs[1].cert->GetSubject()) +
-                  ", not by the signing key " + Fingerprint(signer));
-  }
-  std::string text;
-  for (size_t i = 1; i < certs.size(); ++i) text += Pair(certs[i]);
-  return text;
-}
-
-// The certificates that speak for the signer: those of the --cert file, or else one that the signer
-// issues to itself, which is worth what the ACL store grants its key.
-std::string SignersCerts(const Options& options, const SigningKey& key) {
+// The certificates that speak for the signer: those of the --cert file, a chain or a manifest whose
+// first is for its content, or else one that the signer issues to itself, which is worth what the
+// ACL store grants its key.
+std::vector<SignedCert> SignersCerts(const Options& options, const SigningKey& key) {
   const Ref<PublicKey> signer = key.Public();
+  std::vector<SignedCert> certs;
   if (options.cert.empty()) {
-    return Pair(IssueCert(key, {signer.get(), true}, options.signer.algorithm));
+    certs.push_back(IssueCert(key, {signer.get(), true}, options.signer.algorithm));
+    return certs;
   }
-  if (OpenBuffer(options.cert)->LooksAt("(8:manifest")) return ChainOf(options.cert, *signer);
-  const CertChain chain = ReadCertChain(options.cert);
-  RequireCertFor(chain, options.cert, *signer);
-  std::string text;
-  auto item = chain->Begin();
-  item.Next();  // the keyword
-  for (; item; item.Next()) {
-    const bool wanted = dynamic_cast<Cert*>(item.Value()) != nullptr ||
-                        dynamic_cast<ZvVesk2::Signature*>(item.Value()) != nullptr;
-    if (wanted) text += Canonical(*item.Value());
-  }
-  return text;
+  const bool isManifest = OpenBuffer(options.cert)->LooksAt("(8:manifest");
+  if (!isManifest) RequireCertFor(ReadCertChain(options.cert), options.cert, *signer);
+  certs = ReadCerts(options.cert);
+  if (!isManifest) return certs;
+  RequireCert(certs, 2, options.cert);
+  certs.erase(certs.begin());
+  ZvVesk2::Subject& subject = *certs[0].cert->GetSubject();
+  if (subject.IsEqual(signer.get())) return certs;
+  throw Trouble(Escape(options.cert) + ": signed by " + Fingerprint(*certs[0].cert->GetSubject()) +
+                ", not by the signing key " + Fingerprint(*signer));
 }
 
 // Warns of what nobody will believe: certificates that do not lead to the signer, or not to what is
@@ -132,12 +88,12 @@ std::set<std::string> Ignored(const Options& options) {
 }
 
 // Lists the tree, with everything that is to be said of it before it is signed.
-Listing ListOrExplain(const Options& options) {
+Listing ListOrExplain(const Options& options, ManifestWriter& writer) {
   const std::set<std::string> ignored = Ignored(options);
   const std::string output = options.output == kStandard ? "" : options.output;
   const ProgressLine progress("hashing", options.directory);
-  Listing listing =
-      ListTree(options.directory, {ignored, options.allowLinks, output, progress.Callbacks()});
+  Listing listing = ListTree(options.directory,
+                             {ignored, options.allowLinks, output, progress.Callbacks()}, writer);
   for (const std::string& problem : listing.problems) Note(problem);
   if (!listing.problems.empty()) {
     throw Trouble(std::to_string(listing.problems.size()) +
@@ -157,17 +113,15 @@ Listing ListOrExplain(const Options& options) {
   return listing;
 }
 
-// The lists that the manifest carries. One that is not as its issuer signed it helps nobody.
-std::string CarriedLists(const Options& options) {
-  std::string text;
+// Has the manifest carry the lists. One that is not as its issuer signed it helps nobody.
+void AddLists(const Options& options, ManifestWriter& writer) {
   for (const std::string& path : options.crls) {
     const Ref<CrlSequence> list = ReadCrl(path);
     if (const int code = CheckIssuerWord(*list); code != 0) {
       throw FileTrouble(path, Reason(code), ReasonWord(code));
     }
-    text += Canonical(*list);
+    Check(writer.AddList(list.get()), kWriting);
   }
-  return text;
 }
 
 // A manifest that lies below the root of its own tree would be an unlisted entry of it.
@@ -205,25 +159,30 @@ std::string Totals(const Listing& listing) {
 
 // All that goes into the manifest beside the tree; read before the tree, which may take long.
 struct Parts {
-  Head head;
   Ref<SExpression> tag;
-  std::string signers;
-  std::string lists;
+  std::vector<SignedCert> signers;
 };
 
-Parts Prepare(const Options& options, const SigningKey& key) {
+Parts Prepare(const Options& options, const SigningKey& key, ManifestWriter& writer) {
   if (!options.grant.empty()) RequirePlainBounds(ParseTag(options.grant).get());
-  return {MakeHead(options), options.tag.empty() ? Ref<SExpression>() : ParseTag(options.tag),
-          SignersCerts(options, key), CarriedLists(options)};
+  const std::string creator = "libvesk2 " + LibraryVersion();
+  Check(writer.SetHead(creator.c_str(), ParseTime(options.at, false).get()), kWriting);
+  Parts parts{options.tag.empty() ? Ref<SExpression>() : ParseTag(options.tag),
+              SignersCerts(options, key)};
+  AddLists(options, writer);
+  return parts;
 }
 
-std::string MakeManifest(const Parts& parts, const Listing& listing, const SigningKey& key,
+std::string MakeManifest(ManifestWriter& writer, const Parts& parts, const SigningKey& key,
                          const std::string& algorithm) {
-  const Head& head = parts.head;
-  const Ref<Hash> digest = Digest(head, listing.body);
+  Ref<Hash> digest;
+  Check(writer.SignedDigest(digest.Out(), ZVCLM_HASH_SHA256), kWriting);
   const SignedCert signer = IssueCert(key, {digest.get(), false, parts.tag.get()}, algorithm);
-  return "(8:manifest" + head.version + head.type + "(15:signature-block" + head.time +
-         Pair(signer) + parts.signers + ")(3:crl" + parts.lists + ")" + listing.body + ")";
+  Check(writer.AddCertificate(signer.cert.get(), signer.signature.get()), kWriting);
+  for (const SignedCert& each : parts.signers) {
+    Check(writer.AddCertificate(each.cert.get(), each.signature.get()), kWriting);
+  }
+  return Written([&](FILE* stream) { return writer.Write(stream); });
 }
 
 // The machine trusts the signing key for a tag from now on, as with acl grant.
@@ -231,29 +190,29 @@ void WriteGrant(const Options& options, const SigningKey& key) {
   const Ref<ZvVesk2::AclEntry> entry =
       MakeEntry({Ref<ZvVesk2::Subject>(key.Public().Release()), true, ParseTag(options.grant)});
   const std::string name = std::filesystem::path(options.signer.keys[0]).stem().string();
-  GrantEntry(*entry, {FreeEntryName(*entry, name), false, options.dryRun});
+  GrantEntry(*entry, {FreeEntryName(*entry, name), {false, options.flags.dryRun}});
 }
 
 ExitCode Run(const Options& options) {
-  RefuseExisting(options.output, options.force);
+  RefuseExisting(options.output, options.flags.force);
   RequireDirectory(options.output);
   RefuseInside(options.output, options.directory);
   const std::unique_ptr<SigningKey> signing = OpenSigner(options.signer);
   const SigningKey& key = *signing;
-  const Parts parts = Prepare(options, key);
+  ManifestWriter writer(nullptr);
+  const Parts parts = Prepare(options, key, writer);
   CheckAuthority(options, key, parts.tag.get());
-  const Listing listing = ListOrExplain(options);
-  if (options.dryRun) ShowListing(listing);
+  const Listing listing = ListOrExplain(options, writer);
+  if (options.flags.dryRun) ShowListing(listing);
 
-  const std::string manifest = MakeManifest(parts, listing, key, options.signer.algorithm);
+  const std::string manifest = MakeManifest(writer, parts, key, options.signer.algorithm);
   // What cannot be verified is not handed out.
   const auto check = [&](const std::string& unnamed) {
     CheckSigned(unnamed, options.directory, Ignored(options));
   };
   const std::string signer = Fingerprint(*key.Public());
-  if (WriteFile(options.output, manifest, {0666, options.force, check, options.dryRun})) {
-    Note("wrote " + Escape(options.output) + ": " + Totals(listing) + ", signed by " + signer);
-  } else {
+  const std::string said = ": " + Totals(listing) + ", signed by " + signer;
+  if (!WriteFile(options.output, manifest, {options.flags, check, said})) {
     Say(Totals(listing) + ", to be signed by " + signer);
   }
   if (!parts.tag) Note("note: signed without --tag: good for all that its signer was granted");
@@ -286,8 +245,7 @@ Action DefineManifestSign(CLI::App& app) {
                  "Trust the signing key for this tag on this machine, as acl grant --propagate");
   app.add_option("-o,--output", options->output, "The manifest file")->required();
   AddStrictFlag(app, options->strict);
-  app.add_flag("-f,--force", options->force, "Replace an existing file");
-  app.add_flag("-n,--dry-run", options->dryRun, "Show what would be signed; write nothing");
+  AddWriteFlags(app, options->flags, "Show what would be signed; write nothing");
   return [options] { return Run(*options); };
 }
 

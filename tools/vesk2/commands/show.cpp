@@ -5,6 +5,7 @@
 
 #include "tools/vesk2/commands/command.h"
 #include "tools/vesk2/commands/describe.h"
+#include "tools/vesk2/files/descriptor.h"
 #include "tools/vesk2/files/files.h"
 #include "tools/vesk2/keys/keys.h"
 #include "tools/vesk2/objects/expression.h"
@@ -28,7 +29,7 @@ struct Options {
   bool canonical = false;
   bool advanced = false;
   std::string output = kStandard;
-  WriteOptions write;
+  WriteFlags flags;
 };
 
 // What is shown, in canonical form, and how far it has been read.
@@ -102,10 +103,20 @@ Sheet ShowChain(Source& source) {
 }
 
 Sheet ShowManifest(Source& source) {
-  SignatureBlock block;
-  const int code = ReadSignatureBlock(source.bytes.get(), block);
-  if (code != 0) Refuse(source, "manifest", code);
-  return DescribeManifest(block, CheckBlock(block));
+  const std::string_view rest = Rest(*source.bytes);
+  const auto read = [](std::string_view text) {
+    const Descriptor file(MemoryFile(text));
+    return ReadSignatureBlock(file.Path());
+  };
+  SignatureBlock block = read(rest);
+  // Other objects may follow: what stops the listing is then the end of this one.
+  const size_t end = block.position;
+  if (block.listing == nullptr && end + 1 < rest.size() && rest[end] == ')') {
+    block = read(rest.substr(0, end + 1));
+  }
+  source.bytes->Skip(block.position);
+  if (block.listing == nullptr) Refuse(source, "manifest", block.code);
+  return DescribeManifest(block, block.code);
 }
 
 Sheet ShowTag(Source& source) {
@@ -236,7 +247,7 @@ void Write(const Options& options, Source& source) {
   if (standard && options.canonical && isatty(STDOUT_FILENO) == 1) {
     throw Trouble("canonical bytes are not for a terminal: --output FILE takes them");
   }
-  WriteFile(options.output, text, options.write);
+  WriteFile(options.output, text, {options.flags});
 }
 
 ExitCode Run(const Options& options) {
@@ -265,8 +276,7 @@ Action DefineShow(CLI::App& app) {
   canonical->excludes(advanced);
   app.add_option("-o,--output", options->output, "Where --canonical and --advanced write")
       ->capture_default_str();
-  app.add_flag("-f,--force", options->write.force, "Replace an existing file");
-  app.add_flag("-n,--dry-run", options->write.dryRun, "Say what would be written");
+  AddWriteFlags(app, options->flags);
   return [options] { return Run(*options); };
 }
 

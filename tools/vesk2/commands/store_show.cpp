@@ -8,7 +8,7 @@
 #include "tools/vesk2/commands/describe.h"
 #include "tools/vesk2/files/stores.h"
 #include "tools/vesk2/objects/acl_file.h"
-#include "tools/vesk2/stores/crl_stored.h"
+#include "tools/vesk2/stores/crl_store.h"
 
 namespace vesk2_command {
 namespace {

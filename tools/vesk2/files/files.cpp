@@ -14,6 +14,7 @@
 #include <filesystem>
 #include <optional>
 
+#include "tools/vesk2/files/descriptor.h"
 #include "tools/vesk2/say/interrupt.h"
 #include "tools/vesk2/say/report.h"
 
@@ -25,24 +26,6 @@ namespace {
 [[noreturn]] void Fail(const std::string& path, int error) {
   throw FileTrouble(path, std::strerror(error), "io");
 }
-
-class Descriptor {
- public:
-  explicit Descriptor(int number = -1) : number_(number) {}
-  ~Descriptor() { Take(-1); }
-  Descriptor(const Descriptor&) = delete;
-  Descriptor& operator=(const Descriptor&) = delete;
-  void Take(int number) {
-    if (number_ >= 0) close(number_);
-    number_ = number;
-  }
-  int get() const { return number_; }
-
- private:
-  int number_;
-};
-
-std::string PathOf(const Descriptor& file) { return "/proc/self/fd/" + std::to_string(file.get()); }
 
 void WriteAll(int file, std::string_view bytes, const std::string& path) {
   while (!bytes.empty()) {
@@ -76,14 +59,6 @@ const std::string& StandardInput() {
   return text;
 }
 
-// A file in memory that is gone when the process ends.
-int MemoryFile(std::string_view bytes) {
-  const int file = memfd_create("vesk2", MFD_CLOEXEC);
-  if (file < 0) Fail("a file in memory", errno);
-  WriteAll(file, bytes, "a file in memory");
-  return file;
-}
-
 std::filesystem::path Directory(const std::string& path) {
   std::filesystem::path directory = std::filesystem::path(path).parent_path();
   return directory.empty() ? "." : directory;
@@ -97,7 +72,7 @@ class NewFile {
   NewFile(const std::string& target, mode_t mode) : target_(target), directory_(Directory(target)) {
     file_.Take(open(directory_.c_str(), O_TMPFILE | O_RDWR | O_CLOEXEC, mode));
     const bool supported = file_.get() >= 0 || (errno != EOPNOTSUPP && errno != EISDIR);
-    if (!supported || (file_.get() >= 0 && access(PathOf(file_).c_str(), F_OK) != 0)) {
+    if (!supported || (file_.get() >= 0 && access(file_.Path().c_str(), F_OK) != 0)) {
       OpenNamed(mode);
     }
     if (file_.get() < 0) Fail(target_, errno);
@@ -106,7 +81,7 @@ class NewFile {
   NewFile(const NewFile&) = delete;
   NewFile& operator=(const NewFile&) = delete;
 
-  std::string Path() const { return name_.empty() ? PathOf(file_) : name_; }
+  std::string Path() const { return name_.empty() ? file_.Path() : name_; }
 
   void Write(std::string_view bytes) {
     WriteAll(file_.get(), bytes, target_);
@@ -128,7 +103,7 @@ class NewFile {
 
  private:
   int Link(const std::string& name) {
-    return linkat(AT_FDCWD, PathOf(file_).c_str(), AT_FDCWD, name.c_str(), AT_SYMLINK_FOLLOW);
+    return linkat(AT_FDCWD, file_.Path().c_str(), AT_FDCWD, name.c_str(), AT_SYMLINK_FOLLOW);
   }
 
   // From now on the file may have a temporary name, which an interruption removes. The clock makes
@@ -186,7 +161,7 @@ class Umask {
 void CheckInMemory(std::string_view bytes, const WriteOptions& options) {
   if (!options.check) return;
   const Descriptor file(MemoryFile(bytes));
-  options.check(PathOf(file));
+  options.check(file.Path());
 }
 
 void WriteStandardOutput(std::string_view bytes, const WriteOptions& options) {
@@ -194,17 +169,17 @@ void WriteStandardOutput(std::string_view bytes, const WriteOptions& options) {
     throw Trouble("--json and --output -: both would write to standard output", "usage");
   }
   CheckInMemory(bytes, options);
-  if (options.dryRun) return;
+  if (options.flags.dryRun) return;
   std::fflush(stdout);
   WriteAll(STDOUT_FILENO, bytes, "standard output");
 }
 
 void WriteNamed(const std::string& path, std::string_view bytes, const WriteOptions& options) {
-  RefuseExisting(path, options.force);
+  RefuseExisting(path, options.flags.force);
   std::error_code error;
   const std::filesystem::path directory = Directory(path);
   if (!options.inStore) RequireDirectory(path);
-  if (options.dryRun) return CheckInMemory(bytes, options);
+  if (options.flags.dryRun) return CheckInMemory(bytes, options);
   const Umask mask(options.inStore);
   if (options.inStore && !std::filesystem::create_directories(directory, error) && error) {
     Fail(directory.string(), error.value());
@@ -212,10 +187,18 @@ void WriteNamed(const std::string& path, std::string_view bytes, const WriteOpti
   NewFile file(path, options.mode);
   file.Write(bytes);
   if (options.check) options.check(file.Path());
-  file.Keep(options.force);
+  file.Keep(options.flags.force);
 }
 
 }  // namespace
+
+int MemoryFile(std::string_view bytes) {
+  const int file = memfd_create("vesk2", MFD_CLOEXEC);
+  if (file < 0) Fail("a file in memory", errno);
+  WriteAll(file, bytes, "a file in memory");
+  (void)lseek(file, 0, SEEK_SET);
+  return file;
+}
 
 Trouble FileTrouble(const std::string& path, const std::string& text, const std::string& reason) {
   Trouble trouble(Escape(path) + ": " + text, reason);
@@ -249,7 +232,7 @@ std::string ReadFile(const std::string& path, size_t limit) {
 std::string InputPath(const std::string& path) {
   if (path != kStandard) return path;
   static const Descriptor file(MemoryFile(StandardInput()));
-  return PathOf(file);
+  return file.Path();
 }
 
 void RefuseExisting(const std::string& path, bool force) {
@@ -271,14 +254,18 @@ void RequireDirectory(const std::string& path) {
 
 bool WriteFile(const std::string& path, std::string_view bytes, const WriteOptions& options) {
   path == kStandard ? WriteStandardOutput(bytes, options) : WriteNamed(path, bytes, options);
-  Result()[options.dryRun ? "would_write" : "written"].push_back(Escape(path));
-  if (options.dryRun) Note("would write " + Escape(path));
-  return !options.dryRun;
+  Result()[options.flags.dryRun ? "would_write" : "written"].push_back(Escape(path));
+  if (options.flags.dryRun) {
+    Note("would write " + Escape(path));
+  } else if (path != kStandard || !options.said.empty()) {
+    Note("wrote " + Escape(path) + options.said);
+  }
+  return !options.flags.dryRun;
 }
 
-void AddWriteFlags(CLI::App& app, WriteFlags& flags) {
+void AddWriteFlags(CLI::App& app, WriteFlags& flags, const std::string& dryRun) {
   app.add_flag("-f,--force", flags.force, "Replace what is there");
-  app.add_flag("-n,--dry-run", flags.dryRun, "Say what would be written, and write nothing");
+  app.add_flag("-n,--dry-run", flags.dryRun, dryRun);
 }
 
 }  // namespace vesk2_command

@@ -36,28 +36,30 @@ void RefuseExisting(const std::string& path, bool force);
 // Trouble unless there is a directory for a file at `path`: asked before work that takes long.
 void RequireDirectory(const std::string& path);
 
+// --force and --dry-run, of a command that writes.
+struct WriteFlags {
+  bool force = false;   // replace what is there
+  bool dryRun = false;  // check only, and note what would be written
+};
+void AddWriteFlags(CLI::App& app, WriteFlags& flags,
+                   const std::string& dryRun = "Say what would be written, and write nothing");
+
 struct WriteOptions {
-  mode_t mode = 0666;  // less the umask
-  bool force = false;  // replace what is there
+  WriteFlags flags = {};
   // Called with a path of the finished file before it has its name; throws to refuse it.
   std::function<void(const std::string&)> check = nullptr;
-  bool dryRun = false;  // check only, and note what would be written
+  std::string said = {};  // what the note "wrote PATH" goes on with
+  mode_t mode = 0666;     // less the umask
   // A file of the global store: its directory is made, and all can read both whatever the umask. An
   // entry that only root can read trusts, and revokes, for nobody else.
   bool inStore = false;
 };
 
 // WriteFile writes a file that has no name until it is finished and checked: what stands at `path`
-// is the old file or the whole new one, whatever happens. Returns false for a dry run, which writes
-// nothing. The path goes into "written" of the answer, or into "would_write". Throws Trouble.
+// is the old file or the whole new one, whatever happens. It notes that, but for standard output of
+// which there is nothing else to say. Returns false for a dry run, which writes nothing. The path
+// goes into "written" of the answer, or into "would_write". Throws Trouble.
 bool WriteFile(const std::string& path, std::string_view bytes, const WriteOptions& options);
-
-// --force and --dry-run, of a command that writes.
-struct WriteFlags {
-  bool force = false;
-  bool dryRun = false;
-};
-void AddWriteFlags(CLI::App& app, WriteFlags& flags);
 
 }  // namespace vesk2_command
 

@@ -3,7 +3,6 @@
 
 #include <fcntl.h>
 #include <spawn.h>
-#include <sys/mman.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -13,7 +12,7 @@
 #include <cstring>
 #include <vector>
 
-#include "tools/vesk2/files/files.h"
+#include "tools/vesk2/files/descriptor.h"
 #include "tools/vesk2/say/report.h"
 
 namespace vesk2_command {
@@ -22,33 +21,8 @@ namespace {
 // The longest signature is of a modulus of 16384 bits, half of this.
 constexpr size_t kMaxSignature = 4096;
 
-class Descriptor {
- public:
-  explicit Descriptor(int number) : number_(number) {}
-  ~Descriptor() { Close(); }
-  Descriptor(const Descriptor&) = delete;
-  Descriptor& operator=(const Descriptor&) = delete;
-  int get() const { return number_; }
-  void Close() {
-    if (number_ >= 0) close(number_);
-    number_ = -1;
-  }
-
- private:
-  int number_;
-};
-
 [[noreturn]] void Fail(const std::string& text) {
   throw Trouble("--sign-with: " + text, "sign-with");
-}
-
-// The digest in a file of its own: unlike a pipe it never blocks nor signals the writer, and the
-// program may open /dev/stdin.
-int MemoryFile(std::string_view bytes) {
-  const int file = memfd_create("digest", MFD_CLOEXEC);
-  const auto size = static_cast<ssize_t>(bytes.size());
-  if (file < 0 || pwrite(file, bytes.data(), bytes.size(), 0) != size) Fail(std::strerror(errno));
-  return file;
 }
 
 // This process's environment, with what the program is to know instead of what was inherited.
@@ -108,13 +82,14 @@ int Wait(pid_t child) {
 
 std::string RunProgram(const std::string& command, std::vector<std::string> environment,
                        std::string_view digest) {
+  // Unlike a pipe, a file never blocks nor signals the writer, and the program may open /dev/stdin.
   const Descriptor input(MemoryFile(digest));
   int ends[2] = {-1, -1};
   if (pipe2(ends, O_CLOEXEC) != 0) Fail(std::strerror(errno));
   const Descriptor reading(ends[0]);
   Descriptor writing(ends[1]);
   const pid_t child = Start(command, std::move(environment), input.get(), writing.get());
-  writing.Close();
+  writing.Take(-1);
   std::string value = Collect(reading.get());
   if (value.size() > kMaxSignature) kill(child, SIGTERM);
   const int status = Wait(child);

@@ -49,6 +49,8 @@ std::string Number(const EVP_PKEY* key, const char* name) {
   return bytes;
 }
 
+std::string Atom(const std::string& bytes) { return std::to_string(bytes.size()) + ":" + bytes; }
+
 // The canonical public key, without display hints. The order of DSA's numbers is the format's.
 std::string CanonicalKey(const EVP_PKEY* key) {
   struct Field {
@@ -234,13 +236,8 @@ Ref<Signature> SigningKey::Sign(SExpression& object, const std::string& algorith
   Ref<PublicKey> signer = Public();
   const bool dsa = signer->GetType() != ZVCLM_KEY_RSA;
   const std::string name = dsa ? "dsa-sha1" : algorithm;
-  Ref<Hash> hash(new Hash(nullptr));
-  Check(hash->Init(dsa ? ZVCLM_HASH_SHA1 : ZVCLM_HASH_SHA256), "hashing");
-  Check(hash->Update(&object), "hashing");
-  Check(hash->Finalize(), "hashing");
-  const ByteString& digest = *hash->GetDigest();
-  std::string value =
-      SignDigest({reinterpret_cast<const char*>(digest.GetData()), digest.GetLength()}, name);
+  Ref<Hash> hash = HashOf(object, dsa ? ZVCLM_HASH_SHA1 : ZVCLM_HASH_SHA256);
+  std::string value = SignDigest(BytesOf(*hash->GetDigest()), name);
 
   Ref<Signature> signature;
   Check(Signature::Create(signature.Out(), hash.get(), signer.get(), name.c_str(),

@@ -1,16 +1,30 @@
-// acl_file.cpp: reading ACL entries one by one.
+// acl_file.cpp: reading and building ACL entries.
 #include "tools/vesk2/objects/acl_file.h"
 
 #include "tools/vesk2/files/files.h"
 #include "tools/vesk2/say/report.h"
 
-#include <vesk2/hash.h>
 #include <vesk2/verify.h>
 
 namespace vesk2_command {
 
 using ZvVesk2::AclEntry;
 using ZvVesk2::Hash;
+
+Ref<AclEntry> BuildEntry(EntryText text) {
+  Ref<ByteString> comment = MakeText(text.comment);
+  Ref<AclEntry> entry;
+  Check(AclEntry::Create(entry.Out(), text.subject.get(), text.propagate, text.tag.get(),
+                         text.period.notBefore.get(), text.period.notAfter.get(), 0, comment.get()),
+        "building an ACL entry");
+  // The entry holds the references now.
+  (void)text.subject.Release();
+  (void)text.tag.Release();
+  (void)text.period.notBefore.Release();
+  (void)text.period.notAfter.Release();
+  (void)comment.Release();
+  return entry;
+}
 
 Ref<AclEntry> ReadEntry(const std::string& path) {
   const Buffer buffer = OpenBuffer(path);
@@ -21,16 +35,9 @@ Ref<AclEntry> ReadEntry(const std::string& path) {
 }
 
 void CheckEntry(AclEntry& entry, const std::string& path) {
-  Ref<SExpression> acl;
-  Check(SExpression::Create(acl.Out(), "acl", nullptr), "checking an entry");
-  auto shared = Ref<AclEntry>::Share(&entry);
-  Check(acl->Insert(shared.get()), "checking an entry");
-  (void)shared.Release();
-  Ref<SExpression> chain;
-  Check(SExpression::Create(chain.Out(), "sequence", nullptr), "checking an entry");
-  const Buffer text = WrapBytes("(4:hash6:sha256" + Atom(std::string(32, '\0')) + ")");
-  Ref<Hash> anybody(new Hash(nullptr));
-  Check(anybody->Import(text.get()), "checking an entry");
+  const Ref<SExpression> acl = ListOf({&entry}, "acl");
+  const Ref<SExpression> chain = ListOf({}, "sequence");
+  const Ref<Hash> anybody = MakeHash(ZVCLM_HASH_SHA256, std::string(32, '\0'));
   Ref<SExpression> tag;
   Ref<SExpression> notBefore;
   Ref<SExpression> notAfter;

@@ -1,14 +1,25 @@
-// acl_file.h: the files of this machine's ACL store.
+// acl_file.h: ACL entries, and the files that hold them.
 #ifndef VESK2_TOOLS_ACL_FILE_H
 #define VESK2_TOOLS_ACL_FILE_H
 
 #include <string>
 
 #include "tools/vesk2/objects/objects.h"
+#include "tools/vesk2/objects/times.h"
 
 #include <vesk2/acl_entry.h>
 
 namespace vesk2_command {
+
+// What an entry that trusts `subject` for a tag says.
+struct EntryText {
+  Ref<ZvVesk2::Subject> subject;
+  bool propagate = false;
+  Ref<SExpression> tag;
+  Period period = {};
+  std::string comment = {};
+};
+Ref<ZvVesk2::AclEntry> BuildEntry(EntryText text);
 
 // ReadEntry reads an entry as the store's reader does, which does not look past its end. Trouble
 // names the byte.

@@ -9,16 +9,6 @@ using ZvVesk2::Cert;
 using ZvVesk2::CertSequence;
 using ZvVesk2::Signature;
 
-namespace {
-
-void AppendItem(CertSequence& sequence, DExpression* item) {
-  auto shared = Ref<DExpression>::Share(item);
-  Check(sequence.Insert(shared.get()), "building a certificate sequence");
-  (void)shared.Release();
-}
-
-}  // namespace
-
 CertChain ReadCertChain(const std::string& path) {
   const Buffer buffer = OpenBuffer(path);
   CertChain chain;
@@ -58,28 +48,23 @@ void Append(CertSequence& sequence, const SignedCert& issued, const std::string&
   const int code = owner.empty() ? SExpression::Create(item.Out(), "comment", nullptr)
                                  : SExpression::Create(item.Out(), "owner", owner.c_str(), nullptr);
   Check(code, "--owner");
-  AppendItem(sequence, issued.cert.get());
-  AppendItem(sequence, issued.signature.get());
-  AppendItem(sequence, item.get());
+  Append(sequence, *issued.cert);
+  Append(sequence, *issued.signature);
+  Append(sequence, *item);
 }
 
 void AppendChain(CertSequence& sequence, const CertSequence& chain) {
   auto item = chain.Begin();
-  for (item.Next(); item; item.Next()) AppendItem(sequence, item.Value());
+  for (item.Next(); item; item.Next()) Append(sequence, *item.Value());
 }
 
 void WriteSequence(CertSequence& sequence, const std::string& path, const WriteFlags& flags) {
   const auto readBack = [](const std::string& temporary) { ReadCertChain(temporary); };
-  const bool wrote =
-      WriteFile(path, Canonical(sequence), {0666, flags.force, readBack, flags.dryRun});
-  if (wrote && path != kStandard) Note("wrote " + Escape(path));
+  WriteFile(path, Canonical(sequence), {flags, readBack});
 }
 
 void RequireCertFor(const CertChain& chain, const std::string& path, PublicKey& key) {
-  auto item = chain->Begin();
-  if (item) item.Next();  // the keyword
-  auto* cert = item ? dynamic_cast<Cert*>(item.Value()) : nullptr;
-  if (cert == nullptr) throw Trouble(Escape(path) + ": holds no certificate");
+  const Cert* const cert = ChainLinks(chain, path)[0].cert;
   if (!cert->GetSubject()->IsEqual(&key)) {
     throw Trouble(Escape(path) + ": its first certificate is for " +
                   Fingerprint(*cert->GetSubject()) + ", not for the signing key " +

@@ -1,16 +1,14 @@
 // crl_file.cpp: revocation lists in files.
 #include "tools/vesk2/objects/crl_file.h"
 
+#include "tools/vesk2/objects/acl_file.h"
 #include "tools/vesk2/objects/texts.h"
 #include "tools/vesk2/say/report.h"
-
-#include <vesk2/acl_entry.h>
 
 namespace vesk2_command {
 
 using ZvVesk2::AclEntry;
 using ZvVesk2::Cert;
-using ZvVesk2::Principal;
 
 bool IsRevocationTag(const SExpression* tag) {
   const auto* last = tag != nullptr ? dynamic_cast<SExpression*>(tag->Last()) : nullptr;
@@ -39,18 +37,9 @@ int CheckIssuerWord(CrlSequence& list) {
   const Cert& cert = *list.GetCert();
   if (cert.GetTag() == nullptr) return VESK2_ERR_AUTH_TAG_MISSING;
   // A trust root made for the occasion: the issuer, for this tag.
-  Ref<SExpression> entries;
-  Check(SExpression::Create(entries.Out(), "acl", nullptr), "checking a list");
-  auto issuer = Ref<Principal>::Share(cert.GetIssuer());
-  auto tag = Ref<SExpression>::Share(cert.GetTag());
-  Ref<AclEntry> entry;
-  Check(AclEntry::Create(entry.Out(), issuer.get(), false, tag.get(), nullptr, nullptr, 0, nullptr),
-        "checking a list");
-  (void)issuer.Release();
-  (void)tag.Release();
-  Check(entries->Insert(entry.get()), "checking a list");
-  (void)entry.Release();
-  return list.VerifySelf(entries.get());
+  const Ref<AclEntry> entry = BuildEntry({Ref<ZvVesk2::Subject>::Share(cert.GetIssuer()), false,
+                                          Ref<SExpression>::Share(cert.GetTag())});
+  return list.VerifySelf(ListOf({entry.get()}, "acl").get());
 }
 
 std::string WhyNotVouched(CrlSequence& list, int code) {

@@ -7,14 +7,13 @@
 #include "tools/vesk2/say/progress.h"
 #include "tools/vesk2/say/report.h"
 
-#include <vesk2/hash.h>
+#include <vesk2/evidence.h>
 
 namespace vesk2_command {
 
-using ZvVesk2::BodyDirectory;
 using ZvVesk2::Cert;
 using ZvVesk2::CrlSequence;
-using ZvVesk2::Hash;
+using ZvVesk2::Evidence;
 using ZvVesk2::Manifest;
 using ZvVesk2::Signature;
 
@@ -51,112 +50,63 @@ void CheckSigned(const std::string& path, const std::string& directory,
 
 namespace {
 
+// An item of a list that the library read; null where it read none.
 template <typename T>
-int ReadInto(Ref<T>& out, ZvBuffer* buffer) {
-  Ref<T> object(new T(nullptr));
-  const int code = object->Import(buffer);
-  if (code == 0) out = std::move(object);
-  return code;
+Ref<T> ItemOf(const SExpression* list, size_t index) {
+  if (list == nullptr) return {};
+  auto item = list->Begin();
+  for (; item && index > 0; --index) item.Next();
+  return item ? Ref<T>::Share(dynamic_cast<T*>(item.Value())) : Ref<T>();
 }
 
-// A literal and the value behind it.
-template <typename T>
-int ReadAfter(const char* literal, Ref<T>& out, ZvBuffer* buffer) {
-  const int code = buffer->Expect(literal);
-  return code != 0 ? code : ReadInto(out, buffer);
-}
-
-int ReadHead(ZvBuffer* buffer, SignatureBlock& block) {
-  int code = ReadAfter("(8:manifest(7:version", block.version, buffer);
-  if (code == 0) code = ReadInto(block.creator, buffer);
-  if (code == 0) code = ReadAfter(")(4:type", block.type, buffer);
-  if (code == 0)
-    code = ReadAfter(")(15:signature-block(15:time-of-signing", block.signedAt, buffer);
-  return code == 0 ? buffer->Expect(")") : code;
-}
-
-int ReadCerts(ZvBuffer* buffer, SignatureBlock& block) {
-  while (buffer->Peek() == '(') {
-    SignedCert each;
-    int code = ReadInto(each.cert, buffer);
-    if (code == 0) code = ReadInto(each.signature, buffer);
-    if (code != 0) return code;
-    block.certs.push_back(std::move(each));
+void AddParts(SignatureBlock& block, const Evidence& evidence) {
+  const Manifest& manifest = *block.owner;
+  block.version = ItemOf<ByteString>(manifest.GetVersion(), 1);
+  block.creator = ItemOf<ByteString>(manifest.GetVersion(), 2);
+  block.type = ItemOf<ByteString>(manifest.GetType(), 1);
+  block.signedAt = Ref<TimeStamp>::Share(evidence.GetSigningTime());
+  for (size_t i = 0; i < evidence.CountCerts(); ++i) {
+    block.certs.push_back(
+        {Ref<Cert>::Share(evidence.GetCert(i)), Ref<Signature>::Share(evidence.GetSignature(i))});
   }
-  // The first speaks for the content, the second for its issuer.
-  return block.certs.size() > 1 ? buffer->Expect(")") : VESK2_ERR_PARSE_FILE;
-}
-
-int ReadCrls(ZvBuffer* buffer, SignatureBlock& block) {
-  const int start = buffer->Expect("(3:crl");
-  if (start != 0) return start;
-  while (buffer->Peek() == '(') {
-    Ref<CrlSequence> crl;
-    const int code = ReadInto(crl, buffer);
-    if (code != 0) return code;
-    block.crls.push_back(std::move(crl));
+  const SExpression* const lists = evidence.GetCarriedLists();
+  if (lists == nullptr) return;
+  for (auto it = lists->Begin(); it; it.Next()) {
+    block.crls.push_back(Ref<CrlSequence>::Share(static_cast<CrlSequence*>(it.Value())));
   }
-  return 0;
-}
-
-// Whether the signer certificate is for what the file holds: the elements before the certificates,
-// and the text behind the lists up to the final ")".
-bool IsContentSigned(const SignatureBlock& block, std::string_view body) {
-  if (block.certs.empty() || body.empty()) return false;
-  auto* named = dynamic_cast<ZvVesk2::Hash*>(block.certs[0].cert->GetSubject());
-  const Ref<ZvVesk2::Hash> digest(new ZvVesk2::Hash(nullptr));
-  if (named == nullptr || digest->Init(named->GetAlgorithm()) != 0) return false;
-  const std::string head = "(" + Atom("version") + Canonical(*block.version) +
-                           Canonical(*block.creator) + ")(" + Atom("type") +
-                           Canonical(*block.type) + ")(" + Atom("time-of-signing") +
-                           Canonical(*block.signedAt) + ")";
-  body.remove_suffix(1);
-  for (const std::string_view text : {std::string_view(head), body}) {
-    const auto* bytes = reinterpret_cast<const unsigned char*>(text.data());
-    if (digest->Update(bytes, static_cast<unsigned>(text.size())) != 0) return false;
-  }
-  return digest->Finalize() == 0 && digest->IsEqual(named);
-}
-
-int ReadBody(ZvBuffer* buffer, SignatureBlock& block) {
-  block.listing = std::make_unique<BodyDirectory>(nullptr);
-  int code = buffer->Expect(")");
-  const auto* body = reinterpret_cast<const char*>(buffer->Data());
-  block.contentSigned = IsContentSigned(block, {body, buffer->Remaining()});
-  if (code == 0) code = block.listing->ParseBody(buffer, nullptr);
-  if (code == 0) code = buffer->Expect(")");
-  if (code != 0) block.damage = "byte " + std::to_string(buffer->Position()) + ": " + Reason(code);
-  return code;
 }
 
 }  // namespace
 
-int ReadSignatureBlock(ZvBuffer* buffer, SignatureBlock& block) {
-  for (const auto part : {ReadHead, ReadCerts, ReadCrls, ReadBody}) {
-    const int code = part(buffer, block);
-    if (code != 0) return code;
-  }
-  return 0;
-}
-
 SignatureBlock ReadSignatureBlock(const std::string& path) {
   SignatureBlock block;
-  (void)ReadSignatureBlock(OpenBuffer(path).get(), block);
+  block.owner = std::make_unique<Manifest>(nullptr);
+  Manifest& manifest = *block.owner;
+  Evidence evidence(nullptr);
+  Check(manifest.Initialize("", InputPath(path).c_str(), "none"), Escape(path));
+  manifest.SetEvidence(&evidence);
+  block.code = manifest.ReadManifest(false, 0, 0, nullptr);
+  manifest.SetEvidence(nullptr);
+  if (block.code == VESK2_ERR_OPEN_MANIFEST_FILE || block.code == VESK2_ERR_MEM_ALLOC) {
+    ThrowUnreadable(path, manifest, block.code);
+  }
+  AddParts(block, evidence);
+  if (block.code == 0 || IsRefusal(block.code)) block.listing = manifest.GetListing();
+  block.position = manifest.GetReadPosition();
+  if (block.listing != nullptr) {
+    block.position = evidence.GetListingPosition() + 1;
+  } else if (evidence.GetListingCode() != 0) {
+    block.code = evidence.GetListingCode();
+    block.position = evidence.GetListingPosition();
+  }
   return block;
 }
 
-int CheckBlock(const SignatureBlock& block) {
-  if (!block.certs[0].cert->GetSubject()->IsHash()) return VESK2_ERR_NOT_OBJECT_CERT;
-  for (const SignedCert& each : block.certs) {
-    if (const int code = each.signature->Verify(each.cert.get())) return code;
-  }
-  return block.contentSigned ? 0 : VESK2_ERR_HASH_MATCH;
-}
-
-int CheckManifest(const std::string& path) {
-  Manifest manifest(nullptr);
+int ReadSigned(const std::string& path, Manifest& manifest, Buffer& body) {
   Check(manifest.Initialize("", InputPath(path).c_str(), "none"), Escape(path));
-  const int code = manifest.ReadManifest(false, 0, 0, nullptr);
+  ZvBuffer* read = nullptr;
+  const int code = manifest.ReadManifest(false, 0, 0, &read);
+  body.reset(read);
   if (code != 0 && !IsRefusal(code)) ThrowUnreadable(path, manifest, code);
   return code;
 }

@@ -25,28 +25,27 @@ void IgnoreEntries(ZvVesk2::Manifest& manifest, const std::set<std::string>& nam
 void CheckSigned(const std::string& path, const std::string& directory,
                  const std::set<std::string>& ignored);
 
-// The parts of a manifest file that authority comes from. Nothing of it has been checked.
+// What a manifest file says, as the library read it: proved but for the authority of its signer, or
+// refused. What could not be read is missing.
 struct SignatureBlock {
+  int code = 0;  // 0 when its signatures and its digest hold, else the refusal
   Ref<ByteString> version;
   Ref<ByteString> creator;  // what made the file, in its own words
   Ref<ByteString> type;
   Ref<TimeStamp> signedAt;
   std::vector<SignedCert> certs;  // the signer certificate first
   std::vector<Ref<ZvVesk2::CrlSequence>> crls;
-  std::unique_ptr<ZvVesk2::BodyDirectory> listing;  // its root has no name
-  bool contentSigned = false;  // the digest that the signer certificate names is the file's
-  std::string damage;  // where the listing stops making sense, and why; empty for a whole one
-};
-// ReadSignatureBlock reads as far as it can; what could not be read is missing. The buffer form
-// returns the code of the reader that stopped, and leaves the buffer at the place.
-SignatureBlock ReadSignatureBlock(const std::string& path);
-int ReadSignatureBlock(ZvBuffer* buffer, SignatureBlock& block);
-// What the signatures and the signed digest of a block are worth: 0, or the code of the refusal.
-int CheckBlock(const SignatureBlock& block);
+  ZvVesk2::BodyDirectory* listing = nullptr;  // its root has no name; null: not a whole manifest
+  size_t position = 0;  // the byte behind the manifest, or where it stops making sense
 
-// CheckManifest returns 0 when the signatures and the signed digest of a manifest file hold,
+  std::unique_ptr<ZvVesk2::Manifest> owner;  // of the listing
+};
+// ReadSignatureBlock reads a manifest; Trouble when the file cannot be opened.
+SignatureBlock ReadSignatureBlock(const std::string& path);
+
+// ReadSigned reads a manifest and its body, and returns 0 when its signatures and its digest hold,
 // whoever its signer is, and else the code of the refusal. Trouble for what is no manifest.
-int CheckManifest(const std::string& path);
+int ReadSigned(const std::string& path, ZvVesk2::Manifest& manifest, Buffer& body);
 
 // Whether a code of the library is a no: the question was understood, and the answer is not yes.
 bool IsRefusal(int code);

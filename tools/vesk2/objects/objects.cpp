@@ -12,6 +12,9 @@
 #include <vesk2/wording.h>
 
 namespace vesk2_command {
+
+using ZvVesk2::Hash;
+
 namespace {
 
 bool HasEmptyWord(const SExpression& list) {
@@ -62,21 +65,53 @@ char* NewText(const std::string& text) {
   return copy;
 }
 
-std::string Atom(std::string_view bytes) {
-  return std::to_string(bytes.size()).append(":").append(bytes);
+void Append(SExpression& list, DExpression& item) {
+  auto shared = Ref<DExpression>::Share(&item);
+  Check(list.Insert(shared.get()), "building a list");
+  (void)shared.Release();
 }
 
-std::string Canonical(DExpression& expression) {
+Ref<SExpression> ListOf(const std::vector<DExpression*>& items, const char* keyword) {
+  Ref<SExpression> list(new SExpression(nullptr));
+  if (keyword != nullptr) Check(list->Insert(keyword), "building a list");
+  for (DExpression* item : items) Append(*list, *item);
+  return list;
+}
+
+std::string Written(const std::function<int(FILE*)>& write) {
   char* data = nullptr;
   size_t size = 0;
   FILE* stream = open_memstream(&data, &size);
   if (stream == nullptr) throw std::bad_alloc();
-  const int code = expression.PrintCanonical(stream);
+  const int code = write(stream);
   const bool closed = std::fclose(stream) == 0;
   const std::unique_ptr<char, decltype(&std::free)> owner(data, &std::free);
   Check(code, "writing an object");
   if (!closed) throw std::bad_alloc();
   return std::string(data, size);
+}
+
+std::string Canonical(DExpression& expression) {
+  return Written([&](FILE* stream) { return expression.PrintCanonical(stream); });
+}
+
+Ref<Hash> MakeHash(ZvclmHashID id, std::string_view digest) {
+  Ref<Hash> hash(new Hash(nullptr));
+  Check(hash->Init(id), "building a hash");
+  auto* const copy = new unsigned char[digest.size()];
+  std::memcpy(copy, digest.data(), digest.size());
+  const Ref<ByteString> bytes(
+      new ByteString(copy, static_cast<unsigned>(digest.size()), ByteString::BsNone, nullptr));
+  Append(*hash, *bytes);
+  return hash;
+}
+
+Ref<Hash> HashOf(DExpression& object, ZvclmHashID id, bool ignoreHints) {
+  unsigned char* digest = nullptr;
+  unsigned int length = 0;
+  Check(object.ComputeHash(digest, length, id, ignoreHints), "hashing");
+  const std::unique_ptr<unsigned char[]> owner(digest);
+  return MakeHash(id, {reinterpret_cast<char*>(digest), length});
 }
 
 std::string Fingerprint(DExpression& expression) {

@@ -5,10 +5,14 @@
 #ifndef VESK2_TOOLS_OBJECTS_H
 #define VESK2_TOOLS_OBJECTS_H
 
+#include <cstdio>
+#include <functional>
 #include <memory>
 #include <string>
 #include <string_view>
+#include <vector>
 
+#include <vesk2/hash.h>
 #include <vesk2/public_key.h>
 #include <vesk2/ref.h>
 
@@ -49,10 +53,18 @@ inline std::string_view BytesOf(const ByteString& word) {
 // A new string from new[], for the setters that adopt one.
 char* NewText(const std::string& text);
 
-// One atom of the canonical encoding.
-std::string Atom(std::string_view bytes);
+// Append shares an item with a list; ListOf makes a list of such, behind `keyword` when there is
+// one.
+void Append(SExpression& list, DExpression& item);
+Ref<SExpression> ListOf(const std::vector<DExpression*>& items, const char* keyword = nullptr);
+
+// What a writer of the library writes.
+std::string Written(const std::function<int(FILE*)>& write);
 // The canonical encoding with display hints, as a file holds it.
 std::string Canonical(DExpression& expression);
+// A hash that is known, and that of a canonical encoding.
+Ref<ZvVesk2::Hash> MakeHash(ZvclmHashID id, std::string_view digest);
+Ref<ZvVesk2::Hash> HashOf(DExpression& object, ZvclmHashID id, bool ignoreHints = false);
 // "sha256:" and the digest of the canonical form without hints: the identity of a key.
 std::string Fingerprint(DExpression& expression);
 // The advanced text of a list, escaped, with all of words that hold a 0 byte; what follows the

@@ -37,20 +37,9 @@ Form FormOf(const DExpression& expression) {
   return word->IsEqual("range") ? kRange : kList;
 }
 
-Ref<SExpression> ListOf(const std::vector<DExpression*>& elements) {
-  Ref<SExpression> list(new SExpression(nullptr));
-  for (DExpression* element : elements) {
-    auto shared = Ref<DExpression>::Share(element);
-    Check(list->Insert(shared.get()), "comparing tags");
-    (void)shared.Release();
-  }
-  return list;
-}
-
 // The library's answer about two elements, each as a tag of its own.
 bool Within(DExpression& asked, DExpression& granted) {
-  const Ref<ByteString> keyword = MakeText("tag");
-  return ListOf({keyword.get(), &asked})->IsSubset(ListOf({keyword.get(), &granted}).get());
+  return ListOf({&asked}, "tag")->IsSubset(ListOf({&granted}, "tag").get());
 }
 
 std::vector<DExpression*> MembersOf(const DExpression& set) {

@@ -1,17 +1,22 @@
-// crl_store.cpp: offering revocation lists to the store.
+// crl_store.cpp: stored revocation lists, and offering lists to the store.
 #include "tools/vesk2/stores/crl_store.h"
+
+#include <sys/stat.h>
 
 #include <algorithm>
 #include <cctype>
+#include <cstring>
 #include <filesystem>
 
+#include "tools/vesk2/files/descriptor.h"
 #include "tools/vesk2/files/files.h"
 #include "tools/vesk2/files/stores.h"
 #include "tools/vesk2/objects/acl_file.h"
 #include "tools/vesk2/objects/texts.h"
 #include "tools/vesk2/say/report.h"
-#include "tools/vesk2/stores/crl_stored.h"
 #include "tools/vesk2/stores/grant.h"
+
+#include <vesk2/context.h>
 
 namespace vesk2_command {
 
@@ -43,7 +48,91 @@ std::string SourceName(const std::string& keyPath, SExpression* tag) {
   return name.substr(0, kLongest);
 }
 
+// Why the entries do not vouch for a list, with the code's name; empty when they do.
+std::string WhyUnproved(CrlSequence& list, SExpression* acls) {
+  const int code = list.VerifySelf(acls);
+  if (code == VESK2_ERR_MEM_ALLOC) throw std::bad_alloc();
+  return code == 0 ? "" : WhyNotVouched(list, code) + " (" + CodeName(code) + ")";
+}
+
 }  // namespace
+
+std::string ListPath(SExpression* tag) {
+  char* path = nullptr;
+  const int code = tag != nullptr ? CrlSequence::StorePath(path, tag) : 0;
+  if (code == VESK2_ERR_MEM_ALLOC) throw std::bad_alloc();
+  const Text owner(path);
+  return path != nullptr ? path : "";
+}
+
+std::string ListDirectory() {
+  return std::string(ZvVesk2::VeskConf::GetGlobalDirectory()) + "/cert";
+}
+
+Sources::Sources(SExpression* acls) {
+  if (acls == nullptr) return;
+  for (auto it = acls->Begin(); it; it.Next()) {
+    auto* entry = dynamic_cast<AclEntry*>(it.Value());
+    if (entry == nullptr || !IsRevocationTag(entry->GetTag())) continue;
+    last_[Fingerprint(*entry->GetTag())] = Ref<AclEntry>::Share(entry);
+  }
+}
+
+Ref<SExpression> Sources::AclsFor(SExpression* tag) const {
+  const auto entry = tag != nullptr ? last_.find(Fingerprint(*tag)) : last_.end();
+  return entry != last_.end() ? ListOf({entry->second.get()}, "acl") : ListOf({}, "acl");
+}
+
+std::map<std::string, CrlSequence*> ListsBySource(const SExpression* lists) {
+  std::map<std::string, CrlSequence*> found;
+  if (lists == nullptr) return found;
+  for (auto it = lists->Begin(); it; it.Next()) {
+    auto* list = dynamic_cast<CrlSequence*>(it.Value());
+    SExpression* tag = list != nullptr ? list->GetCert()->GetTag() : nullptr;
+    if (tag != nullptr) found[Canonical(*tag)] = list;
+  }
+  return found;
+}
+
+std::string WhyListUnusable(CrlSequence& list, const std::string& path, SExpression* acls) {
+  SExpression* const tag = list.GetCert()->GetTag();
+  if (std::filesystem::path(path).filename() != std::filesystem::path(ListPath(tag)).filename()) {
+    return "the list of another source, " + TagText(tag);
+  }
+  return WhyUnproved(list, acls);
+}
+
+StoredList FindStored(SExpression* tag, SExpression* acls) {
+  StoredList stored;
+  const std::string path = ListPath(tag);
+  if (path.empty()) return stored;
+  struct stat status = {};
+  if (stat(path.c_str(), &status) != 0) {
+    stored.unread = !IsNothing(errno);
+    if (stored.unread) stored.problem = Escape(path) + ": " + std::strerror(errno);
+    return stored;
+  }
+  try {
+    stored.list = ReadCrl(path);
+  } catch (const Trouble& trouble) {
+    stored.problem = trouble.what();
+    stored.unread = trouble.reason == "io";
+    return stored;
+  }
+  std::string why;
+  // Texts of different tags can read the same, and then name one file.
+  SExpression* const own = stored.list->GetCert()->GetTag();
+  if (own == nullptr || !own->IsEqual(tag)) {
+    why = "the list of another source, " + TagText(own);
+    stored.list.Reset();
+  } else if (acls != nullptr) {
+    why = WhyListUnusable(*stored.list, path, acls);
+  }
+  if (!why.empty()) stored.problem = Escape(path) + ": " + why;
+  return stored;
+}
+
+// ---- Offering lists ----
 
 bool NamesFile(SExpression* tag) {
   const std::string text = TagText(tag);
@@ -59,9 +148,7 @@ std::string WhyRefused(CrlSequence& list, SExpression* acls) {
     return "its tag is too long to name a file of the store (" + CodeName(VESK2_ERR_INVALID_PARAM) +
            ")";
   }
-  const int code = list.VerifySelf(acls);
-  if (code == VESK2_ERR_MEM_ALLOC) throw Trouble(Reason(code), ReasonWord(code));
-  return code == 0 ? "" : WhyNotVouched(list, code) + " (" + CodeName(code) + ")";
+  return WhyUnproved(list, acls);
 }
 
 std::string StoreCrl(CrlSequence& list, SExpression* acls, const std::string& path) {
@@ -96,7 +183,7 @@ void TrustSource(PublicKey& issuer, SExpression* tag, const std::string& keyPath
   }
   const Ref<AclEntry> entry =
       MakeEntry({Ref<ZvVesk2::Subject>::Share(&issuer), false, Ref<SExpression>::Share(tag)});
-  GrantEntry(*entry, {FreeEntryName(*entry, SourceName(keyPath, tag)), false, dryRun});
+  GrantEntry(*entry, {FreeEntryName(*entry, SourceName(keyPath, tag)), {false, dryRun}});
 }
 
 }  // namespace vesk2_command

@@ -17,15 +17,7 @@ namespace {
 using ZvVesk2::AclEntry;
 
 // The library would drop directories from a name, and make the store even for a dry run.
-std::string EntryPath(const std::string& name) {
-  if (name.find('/') != std::string::npos) {
-    throw Trouble("--name " + Escape(name) + ": a name, not a path", "usage");
-  }
-  if (name.empty() || name == "." || name == "..") {
-    throw Trouble("--name " + Escape(name) + ": cannot name an entry", "usage");
-  }
-  return AclDirectory() + "/" + name + (name.ends_with(".acl") ? "" : ".acl");
-}
+std::string PathOf(const std::string& name) { return EntryPath(name, "--name " + Escape(name)); }
 
 // A name that was given as a file's.
 std::string NameWithout(const std::string& name) {
@@ -47,26 +39,23 @@ void ReadBack(const std::string& temporary) {
 
 }  // namespace
 
+std::string EntryPath(const std::string& name, const std::string& what) {
+  if (name.find('/') != std::string::npos) throw Trouble(what + ": a name, not a path", "usage");
+  if (name.empty() || name == "." || name == "..") {
+    throw Trouble(what + ": cannot name an entry", "usage");
+  }
+  return AclDirectory() + "/" + name + (name.ends_with(".acl") ? "" : ".acl");
+}
+
 Ref<AclEntry> MakeEntry(EntryText text) {
   RequirePlainBounds(text.tag.get());
-  Ref<ByteString> comment = MakeText(text.comment);
-  Ref<AclEntry> entry;
-  Check(AclEntry::Create(entry.Out(), text.subject.get(), text.propagate, text.tag.get(),
-                         text.period.notBefore.get(), text.period.notAfter.get(), 0, comment.get()),
-        "building an ACL entry");
-  // The entry holds the references now.
-  (void)text.subject.Release();
-  (void)text.tag.Release();
-  (void)text.period.notBefore.Release();
-  (void)text.period.notAfter.Release();
-  (void)comment.Release();
-  return entry;
+  return BuildEntry(std::move(text));
 }
 
 std::string FreeEntryName(AclEntry& entry, const std::string& name) {
   const std::string bytes = Canonical(entry);
   const auto isFree = [&](const std::string& each) {
-    const std::string path = EntryPath(each);
+    const std::string path = PathOf(each);
     std::error_code error;
     return !std::filesystem::exists(std::filesystem::symlink_status(path, error)) ||
            IsAlready(path, bytes);
@@ -77,20 +66,19 @@ std::string FreeEntryName(AclEntry& entry, const std::string& name) {
 }
 
 void GrantEntry(AclEntry& entry, const EntryPlace& place) {
-  const std::string path = EntryPath(place.name);
+  const std::string path = PathOf(place.name);
   const std::string bytes = Canonical(entry);
   if (IsAlready(path, bytes)) return Note(Escape(path) + " says so already");
   RefuseTaken(entry, place);
-  const WriteOptions options{0666, place.force, ReadBack, place.dryRun, true};
-  if (WriteFile(path, bytes, options)) Note("wrote " + Escape(path));
+  WriteFile(path, bytes, {.flags = place.flags, .check = ReadBack, .inStore = true});
 }
 
 void RefuseTaken(AclEntry& entry, const EntryPlace& place) {
-  const std::string path = EntryPath(place.name);
+  const std::string path = PathOf(place.name);
   std::error_code error;
   const bool taken = std::filesystem::exists(std::filesystem::symlink_status(path, error));
   if (!taken || IsAlready(path, Canonical(entry))) return;
-  if (place.force) return RefuseExisting(path, true);
+  if (place.flags.force) return RefuseExisting(path, true);
   // The entry that is there is trusted, and somebody meant it: the way out must not destroy it.
   throw FileTrouble(path,
                     "another entry has this name; beside it, --name " +

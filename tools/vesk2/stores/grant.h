@@ -5,28 +5,21 @@
 
 #include <string>
 
-#include "tools/vesk2/objects/objects.h"
-#include "tools/vesk2/objects/times.h"
-
-#include <vesk2/acl_entry.h>
+#include "tools/vesk2/files/files.h"
+#include "tools/vesk2/objects/acl_file.h"
 
 namespace vesk2_command {
 
-// MakeEntry builds the entry that trusts `subject` for a tag. Trouble for a tag with a bound that
-// is none.
-struct EntryText {
-  Ref<ZvVesk2::Subject> subject;
-  bool propagate = false;
-  Ref<SExpression> tag;
-  Period period = {};
-  std::string comment = {};
-};
+// MakeEntry is BuildEntry, with Trouble for a tag with a bound that is none.
 Ref<ZvVesk2::AclEntry> MakeEntry(EntryText text);
+
+// EntryPath returns the path of the entry NAME.acl. Trouble, which begins with `what`, for what is
+// no name.
+std::string EntryPath(const std::string& name, const std::string& what);
 
 struct EntryPlace {
   std::string name;  // of the entry: NAME.acl
-  bool force = false;
-  bool dryRun = false;
+  WriteFlags flags = {};
 };
 // FreeEntryName returns `name`, or `name`-2 and so on when another entry is there: one that none
 // but an equal entry has.

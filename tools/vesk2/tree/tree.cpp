@@ -23,6 +23,7 @@ namespace {
 
 using ZvVesk2::BodyDirectory;
 using ZvVesk2::BodyObject;
+using ZvVesk2::ManifestWriter;
 
 std::string RealPath(const std::string& path) {
   const std::unique_ptr<char, decltype(&std::free)> real(realpath(path.c_str(), nullptr),
@@ -62,16 +63,13 @@ bool ReadNames(const std::string& directory, std::vector<std::string>& names) {
   return errno == 0;
 }
 
-std::string RandomToken() {
-  unsigned char token[4];
-  if (RAND_bytes(token, sizeof token) != 1) throw Trouble("no random bytes");
-  return {reinterpret_cast<char*>(token), sizeof token};
-}
-
 class Lister {
  public:
-  Lister(const std::string& root, const ListingOptions& options)
-      : options_(options), realRoot_(RealDirectory(root)), realOutput_(RealPath(options.output)) {}
+  Lister(const std::string& root, const ListingOptions& options, ManifestWriter& writer)
+      : options_(options),
+        writer_(writer),
+        realRoot_(RealDirectory(root)),
+        realOutput_(RealPath(options.output)) {}
 
   // Appends the entries of a directory. `relative` is its path below the root, empty for the root.
   void List(const std::string& path, const std::string& relative, unsigned depth) {
@@ -82,7 +80,6 @@ class Lister {
     }
     const Identity identity(status.st_dev, status.st_ino);
     if (!open_.insert(identity).second) return Problem(path, "a link to a directory around it");
-    if (depth > ZvVesk2::Limits::kMaxDepth) return Problem(path, "nested too deeply");
     std::erase_if(names, [&](const std::string& name) { return IsIgnored(Join(relative, name)); });
     RemarkOnNames(relative, names, listing_.remarks);
     for (const std::string& name : names) {
@@ -118,10 +115,11 @@ class Lister {
       listing_.remarks["a link; what it leads to is signed, not the link"].push_back(relative);
     }
     if (S_ISDIR(status.st_mode)) {
+      if (depth == ZvVesk2::Limits::kMaxDepth) return Problem(path, "nested too deeply");
       listing_.entries.push_back({relative + "/", 0, ""});
-      listing_.body += "(3:dir" + Atom(name) + Atom("");
+      Check(writer_.OpenDirectory(name.c_str()), Escape(path));
       List(path, relative, depth + 1);
-      listing_.body += ")";
+      Check(writer_.CloseDirectory(), Escape(path));
     } else if (!S_ISREG(status.st_mode)) {
       Problem(path, "neither a file nor a directory");
     } else if (realOutput_.empty() || RealPath(path) != realOutput_) {
@@ -137,15 +135,15 @@ class Lister {
     if (code == VESK2_ERR_FILE_OPEN) return Problem(path, WhyUnreadable(path));
     if (code == VESK2_ERR_READ_FILE) return Problem(path, "unreadable, or changed while read");
     if (code != 0) return Problem(path, Reason(code));
-    const std::string_view bytes(reinterpret_cast<char*>(digest), length);
-    listing_.body += "(4:file" + Atom(name) + Atom("") + Atom(bytes) + ")";
+    Check(writer_.AddFile(name.c_str(), digest), Escape(path));
     ++listing_.files;
     listing_.bytes += entry.bytes;
-    entry.digest = Hex(bytes);
+    entry.digest = Hex({reinterpret_cast<char*>(digest), length});
     listing_.entries.push_back(std::move(entry));
   }
 
   const ListingOptions& options_;
+  ManifestWriter& writer_;
   std::string realRoot_;
   std::string realOutput_;   // empty unless the output exists already
   std::set<Identity> open_;  // the directories that are being listed
@@ -221,12 +219,15 @@ std::string PlainRelative(std::string name) {
   return name;
 }
 
-Listing ListTree(const std::string& directory, const ListingOptions& options) {
-  Lister lister(directory, options);
+Listing ListTree(const std::string& directory, const ListingOptions& options,
+                 ManifestWriter& writer) {
+  unsigned char token[4];
+  if (RAND_bytes(token, sizeof token) != 1) throw Trouble("no random bytes");
+  Lister lister(directory, options, writer);
+  Check(writer.BeginBody(token), "listing the tree");
   lister.List(directory, "", 1);
-  Listing listing = lister.Take();
-  listing.body = "(4:body(12:random-token" + Atom(RandomToken()) + ")" + listing.body + ")";
-  return listing;
+  Check(writer.EndBody(), "listing the tree");
+  return lister.Take();
 }
 
 TreeNotes InspectTree(BodyDirectory& root, const std::set<std::string>& ignored) {

@@ -13,6 +13,7 @@
 #include "tools/vesk2/tree/portable.h"
 
 #include <vesk2/manifest_body.h>
+#include <vesk2/manifest_writer.h>
 
 namespace vesk2_command {
 
@@ -37,7 +38,6 @@ struct ListedEntry {
 };
 
 struct Listing {
-  std::string body;  // the canonical body of a manifest
   std::vector<ListedEntry> entries;
   uint64_t files = 0;
   uint64_t bytes = 0;
@@ -46,10 +46,12 @@ struct Listing {
   std::set<std::string> ignored;      // what was left out
 };
 
-// ListTree reads and hashes the whole tree, in byte order of the names, and follows links. Entries
-// that could not be verified later are problems: special files, links that lead nowhere or out of
-// the tree, directories that hold themselves, files that cannot be read, paths that are too long.
-Listing ListTree(const std::string& directory, const ListingOptions& options);
+// ListTree reads and hashes the whole tree, in byte order of the names, follows links, and writes
+// the body of a manifest. Entries that could not be verified later are problems, and the body is
+// then of no use: special files, links that lead nowhere or out of the tree, directories that hold
+// themselves, files that cannot be read, paths that are too long.
+Listing ListTree(const std::string& directory, const ListingOptions& options,
+                 ZvVesk2::ManifestWriter& writer);
 
 // An ignore name as the library compares it.
 std::string PlainRelative(std::string name);

@@ -6,6 +6,7 @@
 #include "tools/vesk2/objects/crl_file.h"
 #include "tools/vesk2/say/report.h"
 #include "tools/vesk2/stores/crl_compare.h"
+#include "tools/vesk2/stores/crl_store.h"
 
 namespace vesk2_command {
 namespace {
@@ -30,23 +31,12 @@ bool IsWanted(CrlSequence& carried, CrlSequence& stored, bool yes) {
   return false;
 }
 
-std::map<std::string, CrlSequence*> BySource(const SExpression* lists) {
-  std::map<std::string, CrlSequence*> found;
-  if (lists == nullptr) return found;
-  for (auto it = lists->Begin(); it; it.Next()) {
-    auto* list = dynamic_cast<CrlSequence*>(it.Value());
-    SExpression* tag = list != nullptr ? list->GetCert()->GetTag() : nullptr;
-    if (tag != nullptr) found[Canonical(*tag)] = list;
-  }
-  return found;
-}
-
 }  // namespace
 
 void KeepLists(const ZvVesk2::Evidence& proved, bool yes, const std::set<std::string>& broken) {
   const SExpression* carried = proved.GetCarriedLists();
   if (carried == nullptr || proved.GetEntries() == nullptr) return;
-  std::map<std::string, CrlSequence*> stored = BySource(proved.GetStoredLists());
+  std::map<std::string, CrlSequence*> stored = ListsBySource(proved.GetStoredLists());
   const Ref<TimeStamp> now = ParseTime("now", false);
   for (auto it = carried->Begin(); it; it.Next()) {
     auto* list = dynamic_cast<CrlSequence*>(it.Value());

@@ -4,6 +4,7 @@
 #include <algorithm>
 
 #include "tools/vesk2/keys/key_source.h"
+#include "tools/vesk2/objects/acl_file.h"
 #include "tools/vesk2/objects/request.h"
 #include "tools/vesk2/objects/texts.h"
 #include "tools/vesk2/say/report.h"
@@ -32,33 +33,17 @@ bool IsWithin(SExpression& asked, SExpression* granted) {
                      [&](const Request::Member& each) { return each.tag->IsSubset(granted); });
 }
 
-template <typename Item>
-Ref<SExpression> ListOf(const char* head, const Ref<Item>& item) {
-  Ref<SExpression> list;
-  Check(SExpression::Create(list.Out(), head, nullptr), "building a list");
-  auto shared = Ref<Item>::Share(item.get());
-  Check(list->Insert(shared.get()), "building a list");
-  (void)shared.Release();
-  return list;
-}
-
 // Whether an entry for a certificate's issuer grants its subject anything at all.
 bool GrantsAnything(SExpression* tag, const SignedCert& signedCert) {
-  const Cert& cert = *signedCert.cert;
-  auto issuer = Ref<ZvVesk2::Principal>::Share(cert.GetIssuer());
-  auto shared = Ref<SExpression>::Share(tag);
-  Ref<AclEntry> entry;
-  Check(
-      AclEntry::Create(entry.Out(), issuer.get(), true, shared.get(), nullptr, nullptr, 0, nullptr),
-      "checking a grant");
-  (void)issuer.Release();
-  (void)shared.Release();
+  Cert& cert = *signedCert.cert;
+  const Ref<AclEntry> entry = BuildEntry(
+      {Ref<ZvVesk2::Subject>::Share(cert.GetIssuer()), true, Ref<SExpression>::Share(tag)});
   Ref<SExpression> granted;
   Ref<SExpression> notBefore;
   Ref<SExpression> notAfter;
-  const int code = ZvVesk2::Verify::ReductB(
-      nullptr, ListOf("acl", entry).get(), ListOf("sequence", signedCert.cert).get(),
-      cert.GetSubject(), granted.Out(), notBefore.Out(), notAfter.Out());
+  const int code = ZvVesk2::Verify::ReductB(nullptr, ListOf({entry.get()}, "acl").get(),
+                                            ListOf({&cert}, "sequence").get(), cert.GetSubject(),
+                                            granted.Out(), notBefore.Out(), notAfter.Out());
   return code != 0 || granted;
 }
 

@@ -10,11 +10,12 @@
 #include <filesystem>
 #include <map>
 
+#include "tools/vesk2/files/descriptor.h"
 #include "tools/vesk2/files/files.h"
 #include "tools/vesk2/files/stores.h"
 #include "tools/vesk2/objects/crl_file.h"
 #include "tools/vesk2/say/report.h"
-#include "tools/vesk2/stores/crl_stored.h"
+#include "tools/vesk2/stores/crl_store.h"
 
 namespace vesk2_command {
 namespace {
@@ -25,16 +26,13 @@ using ZvVesk2::AclEntry;
 std::string WhyNotRead(const std::string& path) {
   struct stat status = {};
   if (stat(path.c_str(), &status) != 0) {
-    return errno == ENOENT || errno == ENOTDIR ? "" : std::strerror(errno);
+    return IsNothing(errno) ? "" : std::strerror(errno);
   }
   if (!S_ISREG(status.st_mode)) return "";
-  const int file = open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK | O_NOCTTY);
-  if (file < 0) return std::strerror(errno);
+  const Descriptor file(open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK | O_NOCTTY));
   char byte = 0;
-  const bool read = ::read(file, &byte, 1) >= 0;
-  const std::string reason = read ? "" : std::strerror(errno);
-  close(file);
-  return reason;
+  const bool read = file.get() >= 0 && ::read(file.get(), &byte, 1) >= 0;
+  return read ? "" : std::strerror(errno);
 }
 
 void Report(const std::string& path, const std::string& text, const std::string& reason,
@@ -84,7 +82,7 @@ std::string WhyBroken(CrlSequence* list, const std::string& path, SExpression* e
     return code == 0 ? "" : "the stored list is not vouched for: " + WhyNotVouched(*list, code);
   }
   struct stat status = {};
-  if (lstat(path.c_str(), &status) != 0 && (errno == ENOENT || errno == ENOTDIR)) return "";
+  if (lstat(path.c_str(), &status) != 0 && (IsNothing(errno))) return "";
   const std::string why = WhyNotRead(path);
   return why.empty() ? "not the revocation list of its source" : why;
 }
@@ -101,14 +99,8 @@ void AddStoreCheckOptions(CLI::App& app, StoreCheck& check) {
 std::set<std::string> CheckStores(const Question& question, const StoreCheck& check) {
   const Evidence evidence = GatherEvidence(question);
   CheckAllEntries(question, evidence, check.ignoreEntries);
-  std::map<std::string, CrlSequence*> stored;
-  if (const SExpression* lists = question.proved->GetStoredLists()) {
-    for (auto it = lists->Begin(); it; it.Next()) {
-      auto* list = dynamic_cast<CrlSequence*>(it.Value());
-      SExpression* tag = list != nullptr ? list->GetCert()->GetTag() : nullptr;
-      if (tag != nullptr) stored[Canonical(*tag)] = list;
-    }
-  }
+  const std::map<std::string, CrlSequence*> stored =
+      ListsBySource(question.proved->GetStoredLists());
   const Ref<TimeStamp> now = ParseTime("now", false);
   std::set<std::string> broken;
   for (const EntryEvidence& each : evidence.entries) {
