@@ -127,12 +127,10 @@ class Answer {
     }
     const bool judged = JudgedTree(manifest_, code_);
     if (!judged && !IsRefusal(code_)) ThrowTrouble();
-    const std::set<std::string> broken = CheckStores(question_, options_.stores);
+    broken_ = CheckStores(question_, options_.stores);
     if (IsAboutToday(options_)) today_.emplace(proved_);
     const int refused = JudgeMembers(judged ? 0 : code_);
-    const ExitCode verdict = refused != 0 ? Refuse(refused) : AnswerTree();
-    if (!options_.noStoreUpdate) KeepLists(proved_, verdict == kYes, broken);
-    return verdict;
+    return refused != 0 ? Refuse(refused) : AnswerTree();
   }
 
  private:
@@ -165,7 +163,13 @@ class Answer {
     return code != 0 ? code : proved_.GetContentCode();
   }
 
+  // Before the verdict is told: trouble with the store must not follow a yes.
+  void Keep(bool yes) const {
+    if (!options_.noStoreUpdate) KeepLists(proved_, yes, broken_);
+  }
+
   ExitCode Refuse(int code) {
+    Keep(false);
     int explained = code;
     if (today_) {
       question_.proved = &today_->evidence();
@@ -180,11 +184,13 @@ class Answer {
   ExitCode AnswerTree() {
     const std::string signedAt = StampText(*proved_.GetSigningTime());
     if (today_ && IsSignedInFuture(proved_)) {
+      Keep(false);
       return No("signed-in-future", "the manifest says it was signed at " + signedAt +
                                         ", which is yet to come (--at tells when to judge it)");
     }
     const std::vector<Finding> findings = FindInTree(manifest_, AboutTree(options_));
     const std::string summary = Summary(findings);
+    Keep(code_ == 0 && summary.empty());
     TellFindings(findings, AboutTree(options_), manifest_);
     if (code_ != 0 || !summary.empty()) return RefuseTree(findings, summary);
     const bool aboutSigning = today_ || options_.at == kSigning;
@@ -218,6 +224,7 @@ class Answer {
   ZvVesk2::Evidence proved_{nullptr};
   Manifest manifest_;
   std::optional<Today> today_;
+  std::set<std::string> broken_;  // sources whose stored list does not count
   int code_ = 0;
   bool byToday_ = false;  // refused by what is known now, not by what was at the time of signing
 };
