@@ -6,16 +6,25 @@
 #       what it prints, on both streams
 #
 # in blocks indented by four. A line that begins with # is a remark; a command that ends with \ goes
-# on in the next line. Fingerprints and times of this run stand for the document's. NEW becomes the
-# document as it should be.
+# on in the next line. The block after <!-- file NAME --> is the text of a file. Fingerprints and times of this
+# run stand for the document's. NEW becomes the document as it should be.
+#
+# The library is found as if the command's build were installed.
 set -u
 document=$(realpath "$2") new=$(realpath -m "${3:-/dev/null}")
+build=$(realpath "$(dirname "$1")/..") bindings=$(realpath "$(dirname "$0")/../../bindings/python")
 work=$(mktemp -d) || exit 1
 trap 'rm -rf "$work"' EXIT
 mkdir "$work/run" "$work/bin" && ln -s "$(realpath "$1")" "$work/bin/vesk2" && cd "$work/run" || exit 1
 unset VESK2_HOME VESK2_GLOBAL
 export LC_ALL=C PATH=$work/bin:$PATH XDG_DATA_HOME=$work/data
-failures=0 command='' ran=0
+if [[ -e $build/cmake_install.cmake ]]; then
+  DESTDIR=$work/installed cmake --install "$build" >"$work/printed" 2>&1 || { cat "$work/printed"; exit 1; }
+  PKG_CONFIG_PATH=$(dirname "$(find "$work/installed" -name vesk2.pc)")
+  LD_LIBRARY_PATH=${PKG_CONFIG_PATH%/pkgconfig}
+  export PKG_CONFIG_PATH LD_LIBRARY_PATH PYTHONPATH=$bindings PYTHONDONTWRITEBYTECODE=1
+fi
+failures=0 command='' ran=0 file=''
 
 masked() {
   sed -E 's/(sha256:|KEY-OF-|grant-)[0-9a-f]{8,64}/FINGERPRINT/g
@@ -39,6 +48,17 @@ judge() {
 goes_on=no
 while IFS= read -r line; do
   text=${line#    }
+  case $line in
+    '<!-- file '*) file=${line#<!-- file } file=${file% -->} && : >"$file" ;;
+    '    $ '*) file='' ;;
+    '    '* | '') [ -z "$file" ] || printf '%s\n' "$text" >>"$file" ;;
+    *) file='' ;;
+  esac
+  if [ -n "$file" ]; then
+    judge
+    printf '%s\n' "$line" >>"$work/new"
+    continue
+  fi
   case $line in
     '    '*)
       if [ $goes_on = yes ]; then
