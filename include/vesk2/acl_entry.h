@@ -110,8 +110,6 @@ class VESK2_API AclEntry : public SExpression {
   struct Parts;
   // Writes the list of an empty object and sets the fields.
   [[nodiscard]] VESK2_LOCAL int Build(Parts&& parts);
-  // The file form of Import, of a path that a directory may have `listed` as a regular file.
-  [[nodiscard]] VESK2_LOCAL int ImportFile(const char* name, bool listed);
   // Appends every entry of a directory that can be read. The result is that of the last file
   // handled: a bad last file is reported although the others were loaded.
   [[nodiscard]] VESK2_LOCAL static int LoadDirectory(SExpression* list, const char* directory);

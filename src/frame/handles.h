@@ -20,15 +20,16 @@ using BufferOwner = std::unique_ptr<ZvBuffer, BufferFree>;
 
 // WrapFile reads a file into `out`. Returns `failure` when it cannot be read, but
 // VESK2_ERR_MEM_ALLOC and VESK2_ERR_READ_FILE (held by another process) as they are: taken for a
-// missing file, a revocation list would count for nothing. `listed`: a ZvDir says that it is a
-// regular file.
-[[nodiscard]] inline int WrapFile(BufferOwner& out, const char* path, int failure,
-                                  bool listed = false) {
+// missing file, a revocation list would count for nothing.
+[[nodiscard]] inline int WrapFile(BufferOwner& out, const ZVsysutil::ZvPlace& place, int failure) {
   ZvBuffer* read = nullptr;
-  const int code = ZVsysutil::zv_buffer_read_file(&read, path, listed);
+  const int code = ZVsysutil::zv_buffer_read_file(&read, place);
   out.reset(read);
   if (code == 0 || IsNoAbsence(code)) return code;
   return failure;
+}
+[[nodiscard]] inline int WrapFile(BufferOwner& out, const char* path, int failure) {
+  return WrapFile(out, ZVsysutil::ZvPlace{ZVsysutil::kZvNoDirectory, path}, failure);
 }
 
 struct HashFree {

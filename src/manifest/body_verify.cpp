@@ -74,7 +74,8 @@ class DiskCheck {
 int DiskCheck::StatusOf(uint32_t& status, int& reason, const BodyFile& file, const char* path) {
   unsigned char digest[kFileDigestSize];
   bool held = false;
-  const int code = DigestFile(path, digest, held, context_, callbacks_);
+  FileDigester digester(context_, callbacks_);
+  const int code = digester.Digest({{ZVsysutil::kZvNoDirectory, path}, path}, digest, held);
   VESK2_REQUIRE(code != VESK2_ERR_USER_INTERRUPT, code);
   VESK2_REQUIRE(!LacksMemory(code), VESK2_ERR_MEM_ALLOC);
   const bool same = code == 0 && file.Equal(digest, static_cast<int>(kFileDigestSize));

@@ -3,12 +3,10 @@
 #include "src/objects/hash_file.h"
 
 #include <algorithm>
-#include <memory>
+#include <cstring>
 #include <utility>
 
 #include "src/frame/check.h"
-#include "src/frame/handles.h"
-#include "src/platform/file.h"
 
 namespace ZvVesk2 {
 namespace {
@@ -21,17 +19,20 @@ using ZVsysutil::ZvFile;
 constexpr size_t kReadSize = 4;
 constexpr size_t kBufferSize = 1024;
 
-// What a loop that nobody watches tells: the calls of it cost nothing.
+// What a loop that nobody watches tells.
 struct Unwatched {
-  [[nodiscard]] int Read(size_t) { return 0; }
-  [[nodiscard]] int End() { return 0; }
+  size_t Untroubled() const { return SIZE_MAX; }
+  int Read(size_t) { return 0; }
+  int End() { return 0; }
 };
 
 // Tells the callbacks about every kTold bytes.
 class Watched {
  public:
   explicit Watched(const Vesk2FileCallbacks& callbacks) : callbacks_(callbacks) {}
-  [[nodiscard]] int Read(size_t count) {
+  // The bytes that can be read before the next call back.
+  size_t Untroubled() const { return kTold - untold_; }
+  int Read(size_t count) {
     untold_ += count;
     return untold_ >= kTold ? End() : 0;
   }
@@ -48,50 +49,75 @@ class Watched {
   size_t untold_ = 0;
 };
 
-template <typename Watch>
-[[nodiscard]] int FeedFile(ZVCLMHashContextData* hash, ZvFile* file, uint32_t handle, Watch watch) {
-  const std::unique_ptr<unsigned char[]> buffer(TryNewArray<unsigned char>(kBufferSize));
-  VESK2_REQUIRE(buffer, VESK2_ERR_MEM_ALLOC);
-  unsigned char* const bytes = buffer.get();
-  ZVsysutil::ZvReader reader(file);
-  ZVCLMHashFeed feed(hash);
-  while (const size_t count = zv_read(reader, bytes, kReadSize)) {
-    VESK2_TRY(zvclm_HashUpdate(feed, bytes, count, handle));
-    VESK2_TRY(watch.Read(count));
+// As many calls of kReadSize bytes as both sides have at hand, one after the other; the compiler
+// sees what they come to.
+void ReadAndFeed(unsigned char* __restrict to, const unsigned char* __restrict from, size_t calls) {
+  for (size_t i = 0; i < calls; ++i) {
+    unsigned char read[kReadSize];
+    std::memcpy(read, from + i * kReadSize, kReadSize);
+    std::memcpy(to + i * kReadSize, read, kReadSize);
   }
-  return watch.End();
-}
-
-[[nodiscard]] int DigestOpened(ZvFile* file, unsigned char* digest, uint32_t handle,
-                               const Vesk2FileCallbacks* callbacks) {
-  ZVCLMHashContextData* started = nullptr;
-  VESK2_TRY(zvclm_HashAlloc(&started, ZVCLM_HASH_SHA256, handle));
-  const HashOwner hash(started, HashFree{handle});
-  VESK2_TRY(callbacks == nullptr ? FeedFile(hash.get(), file, handle, Unwatched())
-                                 : FeedFile(hash.get(), file, handle, Watched(*callbacks)));
-  // A torn file must not pass for a whole one: neither the prefix before a read error nor a mixture
-  // of two versions.
-  VESK2_TRY(ZVsysutil::zv_read_error(file));
-  VESK2_TRY(ZVsysutil::zv_check_unchanged(file));
-  return zvclm_HashFinal(hash.get(), digest, handle);
 }
 
 }  // namespace
 
-int DigestFile(const char* path, unsigned char (&digest)[kFileDigestSize], bool& held,
-               Vesk2ContextStruct* context, const Vesk2FileCallbacks* callbacks) {
-  const uint32_t handle = context != nullptr ? context->cryptoHandle : 0;
-  ZVsysutil::ZvFileOwner file;
-  const int opened = ZVsysutil::zv_open(file, path, ZVsysutil::ZV_READ);
+template <typename Watch>
+int FileDigester::Feed(Watch watch) {
+  unsigned char* const bytes = buffer_.get();
+  ZVsysutil::ZvReader reader(file_.get());
+  ZVCLMHashFeed feed(hash_.get());
+  for (;;) {
+    const size_t calls = std::min({reader.Ready(), feed.Room(), watch.Untroubled()}) / kReadSize;
+    ReadAndFeed(feed.Next(), reader.Next(), calls);
+    reader.Skip(calls * kReadSize);
+    feed.Filled(calls * kReadSize);
+    VESK2_TRY(watch.Read(calls * kReadSize));
+    // The call for which one side needs more.
+    const size_t count = zv_read(reader, bytes, kReadSize);
+    if (count == 0) return watch.End();
+    VESK2_TRY(zvclm_HashUpdate(feed, bytes, count, handle_));
+    VESK2_TRY(watch.Read(count));
+  }
+}
+
+int FileDigester::MakeReady() {
+  if (file_ == nullptr) file_ = ZVsysutil::zv_reader();
+  if (buffer_ == nullptr) buffer_.reset(TryNewArray<unsigned char>(kBufferSize));
+  VESK2_REQUIRE(file_ != nullptr && buffer_ != nullptr, VESK2_ERR_MEM_ALLOC);
+  if (hash_ != nullptr) return zvclm_HashRestart(hash_.get(), handle_);
+  ZVCLMHashContextData* started = nullptr;
+  VESK2_TRY(zvclm_HashAlloc(&started, ZVCLM_HASH_SHA256, handle_));
+  hash_.reset(started);
+  return 0;
+}
+
+int FileDigester::DigestOpened(unsigned char* digest, const Vesk2FileCallbacks* callbacks) {
+  VESK2_TRY(callbacks == nullptr ? Feed(Unwatched()) : Feed(Watched(*callbacks)));
+  // A torn file must not pass for a whole one: neither the prefix before a read error nor a mixture
+  // of two versions.
+  VESK2_TRY(ZVsysutil::zv_read_error(file_.get()));
+  VESK2_TRY(ZVsysutil::zv_check_unchanged(file_.get()));
+  return zvclm_HashFinal(hash_.get(), digest, handle_);
+}
+
+int FileDigester::Digest(const FileToDigest& file, unsigned char (&digest)[kFileDigestSize],
+                         bool& held) {
+  held = false;
+  VESK2_TRY(MakeReady());
+  const int opened = ZVsysutil::zv_reopen(file_.get(), file.place);
   held = opened == VESK2_ERR_READ_FILE;
   VESK2_TRY(opened);
-  if (callbacks == nullptr) return DigestOpened(file.get(), digest, handle, nullptr);
-  const auto bytes = static_cast<uint64_t>(file->opened.st_size);
-  const bool wanted =
-      callbacks->fileStart == nullptr || callbacks->fileStart(callbacks->user, path, bytes) == 0;
-  const int code =
-      wanted ? DigestOpened(file.get(), digest, handle, callbacks) : VESK2_ERR_USER_INTERRUPT;
-  if (callbacks->fileEnd != nullptr) callbacks->fileEnd(callbacks->user, path, code);
+  int code = 0;
+  if (callbacks_ == nullptr) {
+    code = DigestOpened(digest, nullptr);
+  } else {
+    const auto bytes = static_cast<uint64_t>(file_->opened.st_size);
+    const bool wanted = callbacks_->fileStart == nullptr ||
+                        callbacks_->fileStart(callbacks_->user, file.path, bytes) == 0;
+    code = wanted ? DigestOpened(digest, callbacks_) : VESK2_ERR_USER_INTERRUPT;
+    if (callbacks_->fileEnd != nullptr) callbacks_->fileEnd(callbacks_->user, file.path, code);
+  }
+  ZVsysutil::zv_shut(file_.get());
   return code;
 }
 
@@ -107,7 +133,8 @@ int Hash::HashFile(const char* path, unsigned char* digest, unsigned int* digest
   VESK2_REQUIRE(*digestLength == 0 || *digestLength >= kFileDigestSize, VESK2_ERR_BUFFER_OVERFLOW);
   unsigned char made[kFileDigestSize];
   bool held = false;
-  const int code = DigestFile(path, made, held, context, callbacks);
+  FileDigester digester(context, callbacks);
+  const int code = digester.Digest({{ZVsysutil::kZvNoDirectory, path}, path}, made, held);
   if (code == 0) std::copy_n(made, kFileDigestSize, digest);
   *digestLength = code == 0 ? kFileDigestSize : 0;
   return code;

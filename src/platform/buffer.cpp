@@ -62,19 +62,18 @@ ZvBuffer* zv_buffer_adopt(unsigned char* data, size_t size) {
 }
 
 // The bytes are read, not mapped: a file that shrinks under a map kills the process that reads it.
-int zv_buffer_read_file(ZvBuffer** out, const char* path, bool listed) {
+int zv_buffer_read_file(ZvBuffer** out, const ZvPlace& place) {
   *out = nullptr;
   size_t size = 0;
   std::unique_ptr<unsigned char[]> bytes;
-  const uint64_t limit = ZvVesk2::Limits::kMaxFile;
-  if (const int code = zv_read_whole(bytes, &size, path, limit, listed)) return code;
+  if (const int code = zv_read_whole(bytes, &size, place, ZvVesk2::Limits::kMaxFile)) return code;
   *out = zv_buffer_adopt(bytes.release(), size);
   return *out != nullptr ? 0 : VESK2_ERR_MEM_ALLOC;
 }
 
 ZvBuffer* zv_buffer_wrap_file(const char* path) {
   ZvBuffer* buffer = nullptr;
-  return zv_buffer_read_file(&buffer, path, false) == 0 ? buffer : nullptr;
+  return zv_buffer_read_file(&buffer, {kZvNoDirectory, path}) == 0 ? buffer : nullptr;
 }
 
 void zv_buffer_free(ZvBuffer* buffer) { delete buffer; }

@@ -1,9 +1,11 @@
-// ZvDir: the names of one directory, all read and sorted when it is opened.
+// ZvListing: the entries of one directory as the disk has them. ZvDir: the names of one directory,
+// all read and sorted when it is opened.
 #include <dirent.h>
+#include <fcntl.h>
+#include <unistd.h>
 #include <algorithm>
 #include <cerrno>
 #include <cstring>
-#include <memory>
 #include <new>
 #include <string_view>
 
@@ -13,18 +15,57 @@
 namespace ZVsysutil {
 namespace {
 
-struct DirCloser {
-  void operator()(DIR* dir) const { closedir(dir); }
-};
+ZvKind KindOf(unsigned char type) {
+  if (type == DT_REG) return ZvKind::kFile;
+  if (type == DT_DIR) return ZvKind::kDirectory;
+  return type == DT_UNKNOWN || type == DT_LNK ? ZvKind::kUnknown : ZvKind::kOther;
+}
+
+bool IsDots(std::string_view name) { return name == "." || name == ".."; }
 
 // "*" and what follows it: a suffix. Anything else is a name.
 bool Matches(std::string_view pattern, std::string_view name) {
-  if (name == "." || name == "..") return false;
   if (!pattern.starts_with('*')) return name == pattern;
   return name.ends_with(pattern.substr(1));
 }
 
 }  // namespace
+
+int ZvListing::Open(const ZvPlace& place) {
+  Close();
+  if (place.name == nullptr) return VESK2_ERR_FIND_DIR;
+  constexpr int kFlags = O_RDONLY | O_DIRECTORY | O_NONBLOCK | O_CLOEXEC;
+  int opened;
+  do {
+    opened = openat(place.directory, place.name, kFlags);
+  } while (opened < 0 && errno == EINTR);
+  if (opened < 0) return zv_error_code(errno, VESK2_ERR_FIND_DIR);
+  stream_ = fdopendir(opened);
+  if (stream_ == nullptr) {
+    const int code = zv_error_code(errno, VESK2_ERR_FIND_DIR);
+    close(opened);
+    return code;
+  }
+  descriptor_ = opened;
+  return 0;
+}
+
+int ZvListing::Next(const char** name, ZvKind* kind) {
+  const dirent* entry;
+  do {
+    errno = 0;
+    entry = readdir(static_cast<DIR*>(stream_));
+  } while (entry != nullptr && IsDots(entry->d_name));
+  *name = entry != nullptr ? entry->d_name : nullptr;
+  if (entry != nullptr) *kind = KindOf(entry->d_type);
+  return entry == nullptr && errno != 0 ? zv_error_code(errno, VESK2_ERR_FIND_DIR) : 0;
+}
+
+void ZvListing::Close() {
+  if (stream_ != nullptr) closedir(static_cast<DIR*>(stream_));
+  stream_ = nullptr;
+  descriptor_ = -1;
+}
 
 int ZvDir::open(const char* directory, const char* pattern) {
   close();
@@ -35,19 +76,18 @@ int ZvDir::open(const char* directory, const char* pattern) {
 
 int ZvDir::Load(const char* directory, const char* pattern) {
   if (directory == nullptr || pattern == nullptr) return VESK2_ERR_FIND_DIR;
-  const std::unique_ptr<DIR, DirCloser> dir(opendir(directory));
-  if (dir == nullptr) return zv_error_code(errno, VESK2_ERR_FIND_DIR);
+  if (const int code = listing_.Open({kZvNoDirectory, directory})) return code;
   directory_ = zv_fstrdup(directory);
   if (directory_ == nullptr) return VESK2_ERR_MEM_ALLOC;
-  errno = 0;
-  while (const dirent* entry = readdir(dir.get())) {
-    if (Matches(pattern, entry->d_name)) {
-      if (const int code = Add(entry->d_name, entry->d_type == DT_REG)) return code;
-    }
-    errno = 0;
+  for (;;) {
+    const char* name = nullptr;
+    ZvKind kind = ZvKind::kUnknown;
+    // A list cut short would hide files.
+    if (const int code = listing_.Next(&name, &kind)) return code;
+    if (name == nullptr) break;
+    if (!Matches(pattern, name)) continue;
+    if (const int code = Add(name, kind == ZvKind::kFile)) return code;
   }
-  // A list cut short would hide files.
-  if (errno != 0) return zv_error_code(errno, VESK2_ERR_FIND_DIR);
   zv_sort(entries_, count_, sizeof(Entry), [](const void* a, const void* b) {
     return std::strcmp(static_cast<const Entry*>(a)->name, static_cast<const Entry*>(b)->name);
   });
@@ -82,6 +122,7 @@ const char* ZvDir::read(bool fullPath) {
 }
 
 void ZvDir::close() {
+  listing_.Close();
   for (size_t i = 0; i < count_; ++i) delete[] entries_[i].name;
   delete[] entries_;
   delete[] directory_;

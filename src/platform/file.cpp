@@ -42,16 +42,17 @@ class Descriptor {
 
 // 0 for a regular file. Opening a device can do something by itself, so what is none is not even
 // opened.
-[[nodiscard]] int RequireRegular(const char* path) {
+int RequireRegular(const ZvPlace& place) {
   struct stat about {};
-  if (path == nullptr) return VESK2_ERR_FILE_OPEN;
-  if (stat(path, &about) != 0) return OpenError();
+  if (place.name == nullptr) return VESK2_ERR_FILE_OPEN;
+  if (fstatat(place.directory, place.name, &about, 0) != 0) return OpenError();
   return S_ISREG(about.st_mode) ? 0 : VESK2_ERR_FILE_OPEN;
 }
 
-[[nodiscard]] int OpenNow(Descriptor& out, const char* path, int flags) {
+int OpenNow(Descriptor& out, const ZvPlace& place, int flags) {
+  constexpr int kAlways = O_NONBLOCK | O_CLOEXEC | O_NOCTTY;
   do {
-    out.Reset(open(path, flags | O_NONBLOCK | O_CLOEXEC | O_NOCTTY, kFileMode));
+    out.Reset(openat(place.directory, place.name, flags | kAlways, kFileMode));
   } while (out.get() < 0 && errno == EINTR);
   if (out.get() >= 0) return 0;
   return errno == EAGAIN ? VESK2_ERR_READ_FILE : OpenError();
@@ -59,42 +60,39 @@ class Descriptor {
 
 // Opens a file, waiting for one that is held. Every attempt is made without blocking, and only
 // after a look that it is still a regular file: a FIFO or a device can take its place meanwhile.
-[[nodiscard]] int OpenOrWait(Descriptor& out, const char* path, int flags) {
-  int code = OpenNow(out, path, flags);
+int OpenOrWait(Descriptor& out, const ZvPlace& place, int flags) {
+  int code = OpenNow(out, place, flags);
   if (code != VESK2_ERR_READ_FILE) return code;
   ZvCall call;
   uint32_t pause = kFirstPause;
   while (code == VESK2_ERR_READ_FILE) {
     const bool again = call.Pause(pause);
-    if (const int gone = RequireRegular(path)) return gone;
+    if (const int gone = RequireRegular(place)) return gone;
     if (!again) break;
     pause = std::min(2 * pause, kLongestPause);
-    code = OpenNow(out, path, flags);
+    code = OpenNow(out, place, flags);
   }
   return code;
 }
 
 // O_NONBLOCK keeps the open itself from waiting on a FIFO or a device, or for the holder of a
 // lease. What was opened is judged by its descriptor, so nobody can swap it in between.
-[[nodiscard]] int OpenRegular(Descriptor& out, const char* path, int flags, struct stat* opened) {
-  if (path == nullptr) return VESK2_ERR_FILE_OPEN;
-  if (const int code = OpenOrWait(out, path, flags)) return code;
+int OpenRegular(Descriptor& out, const ZvPlace& place, int flags, struct stat* opened) {
+  if (place.name == nullptr) return VESK2_ERR_FILE_OPEN;
+  if (const int code = OpenOrWait(out, place, flags)) return code;
   if (fstat(out.get(), opened) != 0) return OpenError();
   return S_ISREG(opened->st_mode) ? 0 : VESK2_ERR_FILE_OPEN;
 }
 
-[[nodiscard]] int OpenForReading(ZvFileOwner& out, const char* path) {
-  if (const int code = RequireRegular(path)) return code;
-  ZvFileOwner file(new (std::nothrow) ZvFile);
-  if (file == nullptr) return VESK2_ERR_MEM_ALLOC;
-  file->block = new (std::nothrow) unsigned char[kReadBlock];
-  if (file->block == nullptr) return VESK2_ERR_MEM_ALLOC;
-  Descriptor fd;
-  if (const int code = OpenRegular(fd, path, O_RDONLY, &file->opened)) return code;
-  file->fd = fd.release();
-  file->next = file->end = file->block;
-  out = std::move(file);
-  return 0;
+// Opens a file to read that is not listed, or is no longer what it was listed as.
+int OpenAfterLook(Descriptor& out, const ZvPlace& place, struct stat* opened) {
+  if (const int code = RequireRegular(place)) return code;
+  return OpenRegular(out, place, O_RDONLY, opened);
+}
+
+// What was listed as a file is no link; one that took its place could lead to a device.
+int OpenListed(Descriptor& out, const ZvPlace& place, struct stat* opened) {
+  return OpenRegular(out, place, O_RDONLY | O_NOFOLLOW, opened);
 }
 
 // Makes a file one that all can read, and tells whether it is. Another's file may be one already.
@@ -108,7 +106,8 @@ bool Share(int fd, mode_t mode) {
   if (file == nullptr) return VESK2_ERR_MEM_ALLOC;
   Descriptor fd;
   const int flags = O_WRONLY | O_CREAT | O_TRUNC | (mode == ZV_WRITE ? 0 : O_NOFOLLOW);
-  if (const int code = OpenRegular(fd, path, flags, &file->opened)) return code;
+  const ZvPlace place = {kZvNoDirectory, path};
+  if (const int code = OpenRegular(fd, place, flags, &file->opened)) return code;
   if (mode == ZV_WRITE_SHARED && !Share(fd.get(), file->opened.st_mode)) return VESK2_ERR_FILE_OPEN;
   file->stream = fdopen(fd.get(), "w");
   if (file->stream == nullptr) return OpenError();
@@ -135,10 +134,16 @@ size_t ReadOnce(ZvFile* file, unsigned char* out, size_t length) {
   } else if (file->taken > static_cast<uint64_t>(file->opened.st_size)) {
     file->failure = VESK2_ERR_READ_FILE;
   }
+  // A read that came short and brought all that the file held met its end. Whether the file grew
+  // since is the question of zv_check_unchanged.
+  file->ended = count > 0 && static_cast<size_t>(count) < length &&
+                file->taken == static_cast<uint64_t>(file->opened.st_size);
   return file->failure != 0 ? 0 : static_cast<size_t>(count);
 }
 
 }  // namespace
+
+const int kZvNoDirectory = AT_FDCWD;
 
 int zv_error_code(int error, int otherwise) {
   const bool ranOut = error == ENOMEM || error == EMFILE || error == ENFILE;
@@ -147,14 +152,45 @@ int zv_error_code(int error, int otherwise) {
 
 int zv_open(ZvFileOwner& out, const char* path, int mode) {
   out.reset();
-  return mode == ZV_READ ? OpenForReading(out, path) : OpenForWriting(out, path, mode);
+  if (mode != ZV_READ) return OpenForWriting(out, path, mode);
+  ZvFileOwner file = zv_reader();
+  if (file == nullptr) return VESK2_ERR_MEM_ALLOC;
+  const int code = zv_reopen(file.get(), {kZvNoDirectory, path});
+  if (code == 0) out = std::move(file);
+  return code;
+}
+
+ZvFileOwner zv_reader() {
+  ZvFileOwner file(new (std::nothrow) ZvFile);
+  if (file != nullptr) file->block = new (std::nothrow) unsigned char[kReadBlock];
+  if (file != nullptr && file->block == nullptr) file.reset();
+  return file;
+}
+
+int zv_reopen(ZvFile* file, const ZvPlace& place) {
+  zv_shut(file);
+  Descriptor fd;
+  int code = VESK2_ERR_FILE_OPEN;
+  if (place.listed) code = OpenListed(fd, place, &file->opened);
+  if (code == VESK2_ERR_FILE_OPEN) code = OpenAfterLook(fd, place, &file->opened);
+  if (code != 0) return code;
+  file->fd = fd.release();
+  file->next = file->end = file->block;
+  file->taken = 0;
+  file->ended = false;
+  file->failure = 0;
+  return 0;
+}
+
+void zv_shut(ZvFile* file) {
+  if (file->fd >= 0) close(std::exchange(file->fd, -1));
 }
 
 int zv_close(ZvFile* file) {
   if (file == nullptr) return 0;
   const std::unique_ptr<ZvFile> owner(file);
   delete[] file->block;
-  if (file->fd >= 0) close(file->fd);
+  zv_shut(file);
   if (file->stream == nullptr) return 0;
   const bool lost = ferror(file->stream) != 0;
   return fclose(file->stream) != 0 || lost ? VESK2_ERR_WRITE_FILE : 0;
@@ -171,7 +207,7 @@ size_t zv_read_slow(ZvFile* file, unsigned char* out, size_t length) {
       copied += count;
       continue;
     }
-    if (file->failure != 0 || file->block == nullptr) break;
+    if (file->failure != 0 || file->ended || file->block == nullptr) break;
     const bool whole = length - copied >= kReadBlock;  // as much as a block needs no block
     const size_t count = whole ? ReadOnce(file, out + copied, length - copied)
                                : ReadOnce(file, file->block, kReadBlock);
@@ -186,15 +222,13 @@ size_t zv_read_slow(ZvFile* file, unsigned char* out, size_t length) {
   return copied;
 }
 
-int zv_read_whole(std::unique_ptr<unsigned char[]>& out, size_t* size, const char* path,
-                  uint64_t limit, bool listed) {
-  if (!listed)
-    if (const int code = RequireRegular(path)) return code;
+int zv_read_whole(std::unique_ptr<unsigned char[]>& out, size_t* size, const ZvPlace& place,
+                  uint64_t limit) {
   struct stat opened {};
-  // What was listed as a file is no link; one that took its place could lead to a device.
   Descriptor fd;
-  if (const int code = OpenRegular(fd, path, O_RDONLY | (listed ? O_NOFOLLOW : 0), &opened))
-    return code;
+  const int code =
+      place.listed ? OpenListed(fd, place, &opened) : OpenAfterLook(fd, place, &opened);
+  if (code != 0) return code;
   const auto held = static_cast<uint64_t>(opened.st_size);
   if (held > limit) return VESK2_ERR_FILE_OPEN;
   // One byte more than it held is asked for, so that the read that gets it all meets the end.
@@ -227,9 +261,10 @@ size_t zv_write(FILE* stream, const void* data, size_t length) {
   return length > 0 ? fwrite(data, 1, length, stream) : 0;
 }
 
-int zv_stat(const char* path, struct stat* out) {
-  if (path == nullptr) return VESK2_ERR_STAT_FILE;
-  return stat(path, out) == 0 ? 0 : zv_error_code(errno, VESK2_ERR_STAT_FILE);
+int zv_stat(const ZvPlace& place, struct stat* out) {
+  if (place.name == nullptr) return VESK2_ERR_STAT_FILE;
+  const bool told = fstatat(place.directory, place.name, out, 0) == 0;
+  return told ? 0 : zv_error_code(errno, VESK2_ERR_STAT_FILE);
 }
 
 int zv_mkdir(const char* path, mode_t mode) {

@@ -19,6 +19,16 @@
 
 namespace ZVsysutil {
 
+// Where a file stands: a name that is looked up in a directory held open, or a path. `listed`: that
+// directory just said that it is a regular file and no link, which spares the question before it is
+// opened.
+struct ZvPlace {
+  int directory;  // a descriptor, or kZvNoDirectory
+  const char* name;
+  bool listed = false;
+};
+extern const int kZvNoDirectory;  // names are paths then
+
 // A file opened by zv_open. Readers copy out of `block`; writers go through the stream.
 struct ZvFile {
   const unsigned char* next = nullptr;  // unread bytes of `block`
@@ -26,6 +36,7 @@ struct ZvFile {
   unsigned char* block = nullptr;
   int fd = -1;
   uint64_t taken = 0;      // bytes read from the file so far
+  bool ended = false;      // they are all that it held
   int failure = 0;         // the code of a read error that happened
   FILE* stream = nullptr;  // writing only
   struct stat opened {};   // reading only: the file as it was when it was opened
@@ -58,6 +69,12 @@ using ZvFileOwner = std::unique_ptr<ZvFile, ZvFileCloser>;
 // VESK2_ERR_READ_FILE (see above); VESK2_ERR_FILE_OPEN for a null path, for anything but a regular
 // file, and for all else that fails. `out` is null after a failure.
 [[nodiscard]] int zv_open(ZvFileOwner& out, const char* path, int mode);
+// zv_reader makes a file to read with that is not open yet; null without memory. zv_reopen opens it
+// at a place, in the stead of what it was at before, with the codes of zv_open; zv_shut closes it.
+// Many files are read with one block so.
+[[nodiscard]] ZvFileOwner zv_reader();
+[[nodiscard]] int zv_reopen(ZvFile* file, const ZvPlace& place);
+void zv_shut(ZvFile* file);
 // The stream behind a file opened for writing, for PrintCanonical.
 inline FILE* zv_stream(ZvFile* file) { return file->stream; }
 
@@ -85,6 +102,11 @@ class ZvReader {
   ZvReader(const ZvReader&) = delete;
   ZvReader& operator=(const ZvReader&) = delete;
 
+  // The bytes that are at hand, and passing over them.
+  const unsigned char* Next() const { return next_; }
+  size_t Ready() const { return static_cast<size_t>(end_ - next_); }
+  void Skip(size_t length) { next_ += length; }
+
   size_t Read(unsigned char* out, size_t length) {
     if (static_cast<size_t>(end_ - next_) >= length) [[likely]] {
       std::memcpy(out, next_, length);
@@ -110,16 +132,15 @@ inline size_t zv_read(ZvReader& reader, unsigned char* out, size_t length) {
 
 // zv_read_whole reads a regular file of at most `limit` bytes, without the block of the readers
 // above. Codes of zv_open; VESK2_ERR_FILE_OPEN also for a read error, and for a file that yields
-// other than the *size bytes that it held when it was opened. `listed`: the directory just said
-// that it is a regular file, which spares the question before it is opened.
+// other than the *size bytes that it held when it was opened.
 [[nodiscard]] int zv_read_whole(std::unique_ptr<unsigned char[]>& out, size_t* size,
-                                const char* path, uint64_t limit, bool listed);
+                                const ZvPlace& place, uint64_t limit);
 // zv_buffer_adopt makes a buffer of an array from new[], which is deleted on failure. Null for
 // null, and without memory.
 ZvBuffer* zv_buffer_adopt(unsigned char* data, size_t size);
 // zv_buffer_read_file is zv_buffer_wrap_file with the codes of zv_read_whole; *out is null after a
 // failure.
-[[nodiscard]] int zv_buffer_read_file(ZvBuffer** out, const char* path, bool listed);
+[[nodiscard]] int zv_buffer_read_file(ZvBuffer** out, const ZvPlace& place);
 
 // The code of a read error that happened, else 0: VESK2_ERR_READ_FILE, VESK2_ERR_MEM_ALLOC.
 [[nodiscard]] inline int zv_read_error(const ZvFile* file) { return file->failure; }
@@ -131,10 +152,38 @@ ZvBuffer* zv_buffer_adopt(unsigned char* data, size_t size);
 size_t zv_write(FILE* stream, const void* data, size_t length);
 
 // zv_stat fills *out, following links. 0, VESK2_ERR_STAT_FILE, VESK2_ERR_MEM_ALLOC.
-[[nodiscard]] int zv_stat(const char* path, struct stat* out);
+[[nodiscard]] int zv_stat(const ZvPlace& place, struct stat* out);
+[[nodiscard]] inline int zv_stat(const char* path, struct stat* out) {
+  return zv_stat(ZvPlace{kZvNoDirectory, path}, out);
+}
 // zv_mkdir makes one directory, of mode `mode` whatever the umask. 0 when it is there already, else
 // VESK2_ERR_CREATE_DIR.
 [[nodiscard]] int zv_mkdir(const char* path, mode_t mode);
+
+// What a directory itself says of an entry. Of links and on some disks it says nothing.
+enum class ZvKind : unsigned char { kUnknown, kFile, kDirectory, kOther };
+
+// ZvListing goes through the entries of one directory, in the order of the disk, without "." and
+// "..". The directory stays open until the listing is closed: files are opened from it by name.
+class ZvListing {
+ public:
+  ZvListing() = default;
+  ~ZvListing() { Close(); }
+  ZvListing(const ZvListing&) = delete;
+  ZvListing& operator=(const ZvListing&) = delete;
+
+  // 0; VESK2_ERR_FIND_DIR for a null, absent or unreadable directory; VESK2_ERR_MEM_ALLOC.
+  [[nodiscard]] int Open(const ZvPlace& place);
+  // Next gives a name, borrowed until the next call, or null at the end. 0; VESK2_ERR_FIND_DIR for
+  // a directory that stopped being readable half-way; VESK2_ERR_MEM_ALLOC.
+  [[nodiscard]] int Next(const char** name, ZvKind* kind);
+  int Descriptor() const { return descriptor_; }
+  void Close();
+
+ private:
+  void* stream_ = nullptr;  // a DIR
+  int descriptor_ = -1;
+};
 
 // ZvDir reads the names of a directory that match a pattern ("*" or "*.ext"), sorted bytewise,
 // never "." or "..". The order decides which store file is found first, so it must not depend on
@@ -152,9 +201,11 @@ class ZvDir {
   // The next name (or "directory/name" with fullPath), borrowed until the next call; null at the
   // end or when memory runs out (see failed()).
   const char* read(bool fullPath);
-  // Whether the name that was read last is a regular file, and no link to one, as far as the
-  // directory itself knows.
-  bool isRegular() const { return cursor_ > 0 && entries_[cursor_ - 1].regular; }
+  // Where the file of the name that was read last is to be opened.
+  ZvPlace place() const {
+    const Entry& entry = entries_[cursor_ - 1];
+    return {listing_.Descriptor(), entry.name, entry.regular};
+  }
   void close();
   // Whether the last null of read() was for lack of memory.
   bool failed() const { return failed_; }
@@ -167,6 +218,7 @@ class ZvDir {
   [[nodiscard]] int Load(const char* directory, const char* pattern);
   [[nodiscard]] int Add(const char* name, bool regular);
 
+  ZvListing listing_;
   char* directory_ = nullptr;
   Entry* entries_ = nullptr;
   size_t count_ = 0;

@@ -73,6 +73,15 @@ int zvclm_HashAlloc(ZVCLMHashContextData** context, ZvclmHashID id, uint32_t /*h
   return 0;
 }
 
+int zvclm_HashRestart(ZVCLMHashContextData* context, uint32_t /*handle*/) {
+  if (context == nullptr) return ZVCLM_ERR_NULL_PARAM;
+  const ErrorMark mark;
+  if (EVP_DigestInit_ex2(context->digest, nullptr, nullptr) != 1) return ZVCLM_ERR_NO_MEM;
+  context->next = context->block;
+  context->end = context->block + ZVCLMHashContextData::kBlock;
+  return 0;
+}
+
 int zvclm_HashInfo(ZvclmHashID id, ZVCLMHashInfo* info) {
   if (info == nullptr) return ZVCLM_ERR_NULL_PARAM;
   if (info->size != sizeof(ZVCLMHashInfo)) return ZVCLM_ERR_KEY_TYPE;

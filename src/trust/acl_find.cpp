@@ -21,7 +21,8 @@ class EntryScan {
   [[nodiscard]] bool Next() {
     while (scan_.Next()) {
       entry_.Reset(TryNew<AclEntry>(context_));
-      if (scan_.Took(entry_ ? entry_->Import(scan_.Path()) : VESK2_ERR_MEM_ALLOC)) return true;
+      const int read = entry_ ? scan_.Read(*entry_, VESK2_ERR_FILE_OPEN) : VESK2_ERR_MEM_ALLOC;
+      if (scan_.Took(read)) return true;
     }
     return false;
   }

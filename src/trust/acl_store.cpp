@@ -8,9 +8,7 @@
 
 namespace ZvVesk2 {
 
-int AclEntry::Import(const char* name) { return ImportFile(name, false); }
-
-int AclEntry::ImportFile(const char* name, bool listed) {
+int AclEntry::Import(const char* name) {
   VESK2_REQUIRE(name != nullptr && First() == nullptr, VESK2_ERR_INVALID_PARAM);
   if (std::strchr(name, '/') != nullptr) {
     SetStorageType(StoragePath);
@@ -22,7 +20,7 @@ int AclEntry::ImportFile(const char* name, bool listed) {
     VESK2_TRY(SetFilePath(path.get()));
   }
   BufferOwner buffer;
-  VESK2_TRY(WrapFile(buffer, GetFileName(), VESK2_ERR_FILE_OPEN, listed));
+  VESK2_TRY(WrapFile(buffer, GetFileName(), VESK2_ERR_FILE_OPEN));
   return Import(buffer.get());
 }
 
@@ -32,7 +30,9 @@ int AclEntry::LoadDirectory(SExpression* list, const char* directory) {
   while (scan.Next()) {
     Ref<AclEntry> entry(TryNew<AclEntry>(list->GetContext()));
     VESK2_REQUIRE(entry, VESK2_ERR_MEM_ALLOC);
-    if (!scan.Took(entry->ImportFile(scan.Path(), scan.IsListed()))) continue;
+    if (!scan.Took(scan.Read(*entry, VESK2_ERR_FILE_OPEN))) continue;
+    entry->SetStorageType(StoragePath);
+    VESK2_TRY(entry->SetFilePath(scan.Path()));
     VESK2_TRY(Append(list, std::move(entry)));
   }
   return scan.Result(scan.Last());

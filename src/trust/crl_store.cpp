@@ -65,7 +65,8 @@ int CrlSequence::ImportDir(SExpression*& list, const char* dir, StorageType type
   while (scan.Next()) {
     Ref<CrlSequence> sequence(TryNew<CrlSequence>(ctx));
     VESK2_REQUIRE(sequence, VESK2_ERR_MEM_ALLOC);
-    if (!scan.Took(sequence->Import(scan.Path()))) continue;
+    VESK2_TRY(sequence->SetFilePath(scan.Path()));
+    if (!scan.Took(scan.Read(*sequence, VESK2_ERR_FILE_NOT_FOUND))) continue;
     sequence->SetStorageType(type);
     VESK2_TRY(Append(loaded.get(), std::move(sequence)));
   }
@@ -103,7 +104,9 @@ int CrlSequence::Find(CrlSequence*& out, SExpression* tag) {
     candidate.Reset(TryNew<CrlSequence>(tag->GetContext()));
     VESK2_REQUIRE(candidate, VESK2_ERR_MEM_ALLOC);
     status = VESK2_ERR_ACL_ENTRY_NOT_FOUND;
-    if (!scan.Took(candidate->Import(scan.Path()))) continue;
+    candidate->SetStorageType(StoragePath);
+    VESK2_TRY(candidate->SetFilePath(scan.Path()));
+    if (!scan.Took(scan.Read(*candidate, VESK2_ERR_FILE_NOT_FOUND))) continue;
     if (wanted->IsEqual(candidate->GetCert()->GetTag())) {
       status = 0;
       break;

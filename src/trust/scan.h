@@ -6,7 +6,8 @@
 //   Scan scan;
 //   VESK2_TRY(scan.OpenStore(AclEntry::DirectoryName(true), "*.acl", StorageGlobal));
 //   while (scan.Next()) {
-//     if (!scan.Took(<read scan.Path(), or an object in it>)) continue;
+//     if (!scan.Took(scan.Read(<an empty object>, <the code of a file that cannot be read>)))
+//     continue;
 //     ...
 //   }
 //   return scan.Result(<what it means that there is no more>);
@@ -14,6 +15,7 @@
 #define VESK2_SRC_TRUST_SCAN_H
 
 #include "src/frame/check.h"
+#include "src/frame/handles.h"
 #include "src/platform/file.h"
 #include "src/platform/wait.h"
 #include "src/sexpr/storage.h"
@@ -45,10 +47,16 @@ class Scan {
     return code == 0;
   }
 
-  // The file's path, borrowed until the next call of Next, and whether the directory says that it
-  // is a regular file.
+  // Read has an object imported from the file, which is opened from the directory: nobody can put
+  // another directory in its place between two files. `failure` as in WrapFile.
+  template <typename Object>
+  [[nodiscard]] int Read(Object& object, int failure) const {
+    BufferOwner buffer;
+    VESK2_TRY(WrapFile(buffer, files_.place(), failure));
+    return object.Import(buffer.get());
+  }
+  // The file's path, borrowed until the next call of Next.
   const char* Path() const { return path_; }
-  bool IsListed() const { return files_.isRegular(); }
   // The code of the file read last.
   [[nodiscard]] int Last() const { return last_; }
   // What a scan that came to its end answers: `atEnd`, unless it was ended before.

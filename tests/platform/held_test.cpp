@@ -27,7 +27,8 @@ Codes TryAll(const std::string& path) {
   codes.opened = zv_open(file, path.c_str(), ZV_READ);
   std::unique_ptr<unsigned char[]> bytes;
   size_t size = 0;
-  codes.read = zv_read_whole(bytes, &size, path.c_str(), ZvVesk2::Limits::kMaxFile, true);
+  const ZvPlace place = {kZvNoDirectory, path.c_str(), true};
+  codes.read = zv_read_whole(bytes, &size, place, ZvVesk2::Limits::kMaxFile);
   ZvDir dir;
   codes.listed = dir.open(path.substr(0, path.rfind('/')).c_str(), "*");
   ZvBuffer* const buffer = zv_buffer_wrap_file(path.c_str());
