@@ -5,9 +5,11 @@
 #include <sys/stat.h>
 #include <unistd.h>
 #include <vesk2.h>
+#include <vesk2/manifest.h>
 
 #include <map>
 #include <memory>
+#include <thread>
 #include <utility>
 
 #include "tests/support/test_manifest.h"
@@ -80,13 +82,26 @@ Tree::Tree(size_t count, size_t size)
                                                         vesk2test::Tag("(install)")));
 }
 
+namespace {
+
+// As many threads as it is told, the caller's included.
+void RunOnThreads(void* user, void (*task)(void*), void* work) {
+  std::vector<std::thread> threads(*static_cast<unsigned*>(user) - 1);
+  for (std::thread& thread : threads) thread = std::thread(task, work);
+  task(work);
+  for (std::thread& thread : threads) thread.join();
+}
+
+}  // namespace
+
 bool Tree::Verify(unsigned jobs) const {
-  (void)jobs;
   Vesk2GlobalDirectory(place.Path().c_str());
   Manifest* made = nullptr;
   if (CreateManifestContext(&made, root.c_str(), manifest.c_str(), "(install)") != 0) return false;
   const std::unique_ptr<Manifest, void (*)(Manifest*)> owner(made, DeleteManifestContext);
   FailOnExtraEntries(made);
+  const ZvVesk2::Vesk2TaskRunner runner = {&jobs, RunOnThreads};
+  made->SetTaskRunner(jobs > 1 ? &runner : nullptr);
   return VerifyManifest(made, 0, 0) == 0;
 }
 

@@ -1,5 +1,5 @@
 // Verifying trees of many files.
-#include <algorithm>
+#include <thread>
 
 #include "bench/bench.h"
 #include "bench/tree.h"
@@ -72,6 +72,13 @@ Outcome Growth(const Effort& effort) {
       });
 }
 
+Outcome TwoJobs(const Effort& effort) {
+  if (std::thread::hardware_concurrency() < 2) return Failed("one processor only");
+  const Tree& tree = ManyFiles(effort, 4096);
+  return ClockRatio(
+      effort, [&] { return tree.Verify(2); }, [&] { return tree.Verify(); });
+}
+
 Outcome MemoryOfEntry(const Effort& effort) {
   const Tree& tree = TheTree(effort.Of(1'000'000, 100'000), kSmall);
   const double bytes = PeakMemory([&] { return tree.Verify(); });
@@ -99,6 +106,7 @@ Figures TreeFigures() {
       {"F4b", "the same, command", "count", 5.2, CallsOfFileByCommand},
       {"F5", "time of a file, 1,000,000 over 10,000", "ratio", 1.10, Growth},
       {"F6a", "memory of an entry at 1,000,000, library", "bytes", 250, MemoryOfEntry},
+      {"F7", "two jobs, on the clock", "one job", 0.60, TwoJobs},
   };
 }
 

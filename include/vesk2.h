@@ -184,7 +184,7 @@ typedef struct Vesk2ContextStruct {
 typedef struct FileItem {
   char* name;   /* the name, platform form; owned */
   char* name2;  /* null in every record that the library makes */
-  char* nameA;  /* the name, ASCII form; owned */
+  char* nameA;  /* the name, ASCII form; owned, and may be the same array as `name` */
   char* name2A; /* null in every record that the library makes */
   struct FileItem* next;
   uint32_t size;       /* 28 in every record that the library makes: a format mark, not a sizeof */

@@ -25,6 +25,14 @@ class BodyDirectory;
 class Evidence;
 class Findings;
 
+// Vesk2TaskRunner lends threads to a verification, which starts none itself. `run` calls task(work)
+// on each thread that it lends, on all at the same time, and returns when all these calls have
+// returned; it must not let an exception out. Where it lends none, the verification does all alone.
+struct Vesk2TaskRunner {
+  void* user = nullptr;
+  void (*run)(void* user, void (*task)(void* work), void* work) = nullptr;
+};
+
 struct FileItemDeleter {
   void operator()(FileItem* chain) const { FileItemDelete(chain); }
 };
@@ -73,6 +81,10 @@ class VESK2_API Manifest {
   // Replaces the ignored entries by copies, in reverse order. VESK2_ERR_MEM_ALLOC leaves none.
   [[nodiscard]] int SetIgnoredEntries(const FileItem* list);
   [[nodiscard]] int SetFileCallbacks(const Vesk2FileCallbacks* callbacks);
+  // SetTaskRunner has the files of the directory hashed by the threads of `runner` too; null takes
+  // it back. Codes, lists and their order are the same. File callbacks are then called on all these
+  // threads, for several files at a time.
+  void SetTaskRunner(const Vesk2TaskRunner* runner);
   void SetStoreUpdate(bool value);
   // SetEvidence has ReadManifest and VerifyManifest keep what they read and found in `borrowed`,
   // which must outlive them; null takes it back. They then read on after a refusal, for the
@@ -120,6 +132,10 @@ class VESK2_API Manifest {
   VESK2_LOCAL void ClearRead();
   VESK2_LOCAL void ClearResults();
   [[nodiscard]] VESK2_LOCAL int BuildIgnoreList(const char* base, PointerArray<char>& list) const;
+  // The two halves of Verify: reading a body, and comparing it.
+  [[nodiscard]] VESK2_LOCAL int ParseListing(std::unique_ptr<BodyDirectory>& out, ZvBuffer* body,
+                                             const char* directory);
+  [[nodiscard]] VESK2_LOCAL int CheckListing(std::unique_ptr<BodyDirectory> root);
   // Moves the records of a comparison to the front of the four lists.
   [[nodiscard]] VESK2_LOCAL int Publish(Findings& findings);
   VESK2_LOCAL FileItemList& ListOf(uint32_t status);
@@ -144,6 +160,7 @@ class VESK2_API Manifest {
   bool storeUpdate = true;
   bool lostSetting = false;  // there was no memory to keep it
   Vesk2FileCallbacks fileCallbacks{};
+  Vesk2TaskRunner taskRunner;
   Evidence* evidence = nullptr;
   std::unique_ptr<BodyDirectory> listing;
 };

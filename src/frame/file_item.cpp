@@ -1,4 +1,4 @@
-// Records of file names. Each holds its name in both string forms, because callers of the ASCII
+// Records of file names. Each gives its name in both string forms, because callers of the ASCII
 // functions and of the others read the same lists.
 #include <vesk2/file_item.h>
 
@@ -21,13 +21,9 @@ FileItem* FileItemCreate(char* name, char* nameA) {
   item->size = kRecordMark;
   item->name = name;
   item->nameA = nameA;
-  if (name != nullptr && nameA == nullptr) {
-    item->nameA = ZVsysutil::zv_ftoa(name);
-    if (item->nameA == nullptr) return nullptr;
-  } else if (nameA != nullptr && name == nullptr) {
-    item->name = ZVsysutil::zv_atof(nameA);
-    if (item->name == nullptr) return nullptr;
-  }
+  // Both forms are the same bytes here, so one array serves for both: a tree has many names.
+  if (nameA == nullptr) item->nameA = name;
+  if (name == nullptr) item->name = nameA;
   return item.release();
 }
 

@@ -112,7 +112,7 @@ int Manifest::Compare(ZvBuffer* body1, ZvBuffer* body2) {
   VESK2_TRY(reference.ParseBody(body1, &ignoreList));
   VESK2_TRY(other.ParseBody(body2, &ignoreList));
 
-  Findings findings(context);
+  Findings findings;
   StatusSet statuses;
   VESK2_TRY(BodyComparison(findings).Directories(reference, other, statuses));
   VESK2_TRY(Publish(findings));

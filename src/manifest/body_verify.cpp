@@ -3,8 +3,7 @@
 // A listed file counts by its contents alone: links are followed, and what is no regular file is
 // never opened and counts as missing. Nothing is descended into that is not listed. The result
 // speaks of the moment of reading; nothing keeps the tree from changing afterwards.
-#include <sys/stat.h>
-
+#include <cstring>
 #include <memory>
 #include <utility>
 
@@ -12,102 +11,145 @@
 #include <vesk2/manifest_body.h>
 
 #include "src/frame/check.h"
+#include "src/manifest/body_disk.h"
 #include "src/manifest/findings.h"
 #include "src/manifest/ignore.h"
 #include "src/objects/hash_file.h"
-#include "src/platform/file.h"
+#include "src/platform/lock.h"
 #include "src/platform/text.h"
 #include "src/platform/wait.h"
 
 namespace ZvVesk2 {
 namespace {
 
-using ZVsysutil::zv_filenamecmp;
-using ZVsysutil::zv_fstrdup;
 using ZVsysutil::zv_join_path;
-using ZVsysutil::ZvDir;
+using ZVsysutil::ZvLocked;
 
-// The two kinds of directory entries, each in ascending order of names, each with its own merges.
-struct Listing {
-  Listing(PointerArray<BodyObject>& listedEntries, const PointerArray<char>& ignored)
-      : listed(listedEntries), ignore(ignored) {
-    listed.reset();
-  }
-  bool Lists(const char* name) {
-    const BodyObject* entry = listed.get(0);
-    while (entry != nullptr && zv_filenamecmp(name, entry->GetName()) > 0) entry = listed.get(1);
-    return entry != nullptr && zv_filenamecmp(name, entry->GetName()) == 0;
-  }
+// Hashes the listed files. Any number of threads take part in it.
+class FileHashing {
+ public:
+  FileHashing(BodyDirectory& root, const Manifest& manifest, const Vesk2TaskRunner* runner,
+              ZVsysutil::ZvCall& call)
+      : walk_(root, runner != nullptr ? 1 : UINT32_MAX), manifest_(manifest), call_(call) {}
 
-  PointerArray<BodyObject>& listed;
-  IgnoreWalk ignore;
+  // Hashes all; the calling thread goes on when the runner's are done, or alone.
+  int Run(const Vesk2TaskRunner* runner) {
+    if (runner != nullptr) runner->run(runner->user, TakePart, this);
+    TakePart(this);
+    return trouble_;
+  }
+  DiskWalk& Walk() { return walk_; }
+
+ private:
+  static void TakePart(void* self) { static_cast<FileHashing*>(self)->TakePart(); }
+  void TakePart();
+  bool Exchange(FileChunk& chunk, int code);
+  int Hash(const FileChunk& chunk, FileDigester& digester);
+  int HashOne(int& state, const FileChunk& chunk, const BodyFile& file, FileDigester& digester);
+
+  ZVsysutil::ZvLock lock_;  // of the walk and the trouble
+  DiskWalk walk_;
+  int trouble_ = 0;
+  const Manifest& manifest_;
+  ZVsysutil::ZvCall& call_;
 };
 
-class DiskCheck {
- public:
-  DiskCheck(Vesk2ContextStruct* context, Findings& findings, const Vesk2FileCallbacks* callbacks)
-      : context_(context), findings_(findings), callbacks_(callbacks) {}
+void FileHashing::TakePart() {
+  const ZVsysutil::ZvCall call(call_);
+  FileDigester digester(manifest_.GetContext(), manifest_.GetFileCallbacks());
+  FileChunk chunk;
+  int code = 0;
+  while (Exchange(chunk, code)) code = Hash(chunk, digester);
+}
 
-  // Checks one directory, the root at depth 0, and collects the statuses found in it. Trouble is
-  // returned; what was found is no trouble.
-  [[nodiscard]] int Directory(BodyDirectory& directory, unsigned depth, StatusSet& statuses) {
-    VESK2_TRY(Files(directory, statuses));
-    VESK2_TRY(Subdirectories(directory, depth, statuses));
-    // The root is not searched: it may hold more than the manifest lists, the manifest itself for
-    // one.
-    if (depth == 0) return 0;
-    return Unlisted(directory, statuses);
+// Gives a chunk back, with what came of it, for another; false when there is no more to do.
+bool FileHashing::Exchange(FileChunk& chunk, int code) {
+  const ZvLocked locked(lock_);
+  walk_.Done(chunk);
+  chunk = {};
+  if (trouble_ == 0) trouble_ = code;
+  if (trouble_ == 0) trouble_ = walk_.Next(chunk);
+  return trouble_ == 0 && chunk.found != nullptr;
+}
+
+int FileHashing::Hash(const FileChunk& chunk, FileDigester& digester) {
+  for (uint32_t i = chunk.first; i < chunk.end; ++i) {
+    int& state = chunk.found->files[i];
+    const BodyObject* const file = chunk.found->directory->GetFiles().at(i);
+    if (state == kIgnored) continue;
+    VESK2_TRY(HashOne(state, chunk, static_cast<const BodyFile&>(*file), digester));
+  }
+  return 0;
+}
+
+int FileHashing::HashOne(int& state, const FileChunk& chunk, const BodyFile& file,
+                         FileDigester& digester) {
+  const char* const directory = chunk.found->directory->GetName();
+  std::unique_ptr<char[]> path;  // of which only some have need
+  if (chunk.open == nullptr || manifest_.GetFileCallbacks() != nullptr) {
+    path.reset(zv_join_path(directory, file.GetName()));
+    VESK2_REQUIRE(path, VESK2_ERR_MEM_ALLOC);
+  }
+  FileToDigest wanted = {{ZVsysutil::kZvNoDirectory, path.get()}, path.get()};
+  if (chunk.open != nullptr) {
+    wanted.place = {chunk.open->listing.Descriptor(), file.GetName(), state == kSeenRegular};
+    if (chunk.open->prefix + std::strlen(file.GetName()) > kLongestPath)
+      wanted.place.name = nullptr;
+  }
+  unsigned char digest[kFileDigestSize];
+  bool held = false;
+  const int code = digester.Digest(wanted, digest, held);
+  VESK2_REQUIRE(code != VESK2_ERR_USER_INTERRUPT, code);
+  VESK2_REQUIRE(!LacksMemory(code), VESK2_ERR_MEM_ALLOC);
+  state = held ? static_cast<int>(kHeldByOther) : code;
+  if (code == 0 && !file.Equal(digest, static_cast<int>(kFileDigestSize))) state = kDiffers;
+  return 0;
+}
+
+// Records what was found, in the order of a recursion through the listed directories.
+class FindingTree {
+ public:
+  FindingTree(DiskWalk& walk, Findings& findings) : walk_(walk), findings_(findings) {}
+
+  // Collects the statuses found in one directory.
+  int Directory(StatusSet& statuses) {
+    const std::unique_ptr<DirectoryFound> found = walk_.TakeFound();
+    VESK2_TRY(Files(*found, statuses));
+    VESK2_TRY(Subdirectories(*found->directory, statuses));
+    return Unlisted(*found, statuses);
   }
 
  private:
-  [[nodiscard]] int Files(BodyDirectory& directory, StatusSet& statuses);
-  [[nodiscard]] int Subdirectories(BodyDirectory& directory, unsigned depth, StatusSet& statuses);
-  [[nodiscard]] int Unlisted(BodyDirectory& directory, StatusSet& statuses);
-  [[nodiscard]] int ReadEntries(ZvDir& disk, PointerArray<BodyObject>& entries);
-  [[nodiscard]] int StatusOf(uint32_t& status, int& reason, const BodyFile& file, const char* path);
+  int Files(const DirectoryFound& found, StatusSet& statuses);
+  int Subdirectories(BodyDirectory& directory, StatusSet& statuses);
+  int Unlisted(DirectoryFound& found, StatusSet& statuses);
 
-  Vesk2ContextStruct* context_;
+  DiskWalk& walk_;
   Findings& findings_;
-  const Vesk2FileCallbacks* callbacks_;
 };
 
-int DiskCheck::StatusOf(uint32_t& status, int& reason, const BodyFile& file, const char* path) {
-  unsigned char digest[kFileDigestSize];
-  bool held = false;
-  FileDigester digester(context_, callbacks_);
-  const int code = digester.Digest({{ZVsysutil::kZvNoDirectory, path}, path}, digest, held);
-  VESK2_REQUIRE(code != VESK2_ERR_USER_INTERRUPT, code);
-  VESK2_REQUIRE(!LacksMemory(code), VESK2_ERR_MEM_ALLOC);
-  const bool same = code == 0 && file.Equal(digest, static_cast<int>(kFileDigestSize));
-  status = same ? BodyObject::Valid : BodyObject::Invalid;
-  if (code == VESK2_ERR_FILE_OPEN) status = BodyObject::Missing;
-  reason = held ? VESK2_ERR_FILE_OPEN : code;
-  return 0;
-}
-
-int DiskCheck::Files(BodyDirectory& directory, StatusSet& statuses) {
-  IgnoreWalk ignore(directory.GetIgnored());
-  PointerArray<BodyObject>& files = directory.GetFiles();
-  for (BodyObject* entry = files.begin(); entry != nullptr; entry = files.next()) {
-    if (ignore.Ignores(entry->GetName())) continue;
-    std::unique_ptr<char[]> path(zv_join_path(directory.GetName(), entry->GetName()));
-    VESK2_REQUIRE(path, VESK2_ERR_MEM_ALLOC);
-    uint32_t status = BodyObject::Invalid;
-    int reason = 0;
-    VESK2_TRY(StatusOf(status, reason, static_cast<const BodyFile&>(*entry), path.get()));
-    VESK2_TRY(findings_.AddFile(directory, entry->GetName(), status, statuses, reason));
+int FindingTree::Files(const DirectoryFound& found, StatusSet& statuses) {
+  const PointerArray<BodyObject>& files = found.directory->GetFiles();
+  for (uint32_t i = 0; i < files.GetCount(); ++i) {
+    const int state = found.files[i];
+    if (state == kIgnored) continue;
+    uint32_t status = state == kSame ? BodyObject::Valid : BodyObject::Invalid;
+    if (state == VESK2_ERR_FILE_OPEN) status = BodyObject::Missing;
+    const int reason = state == kHeldByOther ? static_cast<int>(VESK2_ERR_FILE_OPEN) : state;
+    VESK2_TRY(findings_.AddFile(*found.directory, files.at(i)->GetName(), status, statuses,
+                                state == kDiffers ? 0 : reason));
   }
   return 0;
 }
 
-int DiskCheck::Subdirectories(BodyDirectory& directory, unsigned depth, StatusSet& statuses) {
+int FindingTree::Subdirectories(BodyDirectory& directory, StatusSet& statuses) {
   IgnoreWalk ignore(directory.GetIgnored());
   PointerArray<BodyObject>& subdirectories = directory.GetSubdirectories();
   for (BodyObject* entry = subdirectories.begin(); entry != nullptr;
        entry = subdirectories.next()) {
     if (ignore.Ignores(entry->GetName())) continue;
     StatusSet inside;
-    VESK2_TRY(Directory(static_cast<BodyDirectory&>(*entry), depth + 1, inside));
+    VESK2_TRY(Directory(inside));
     // A directory that only holds too much is itself recorded as too much; any other finding, a
     // missing file too, makes it invalid.
     uint32_t status = BodyObject::Invalid;
@@ -118,48 +160,23 @@ int DiskCheck::Subdirectories(BodyDirectory& directory, unsigned depth, StatusSe
   return 0;
 }
 
-// Reads a directory into records, a file under its bare name and a directory under its path, the
-// way in which a body names them.
-int DiskCheck::ReadEntries(ZvDir& disk, PointerArray<BodyObject>& entries) {
-  while (const char* const path = disk.read(true)) {
-    struct stat about {};
-    const int code = ZVsysutil::zv_stat(path, &about);
-    VESK2_REQUIRE(code != VESK2_ERR_MEM_ALLOC, code);
-    const bool isDirectory = code == 0 && S_ISDIR(about.st_mode);
-    std::unique_ptr<BodyObject> entry(TryNew<BodyObject>(context_));
-    VESK2_REQUIRE(entry, VESK2_ERR_MEM_ALLOC);
-    entry->SetIsDirectory(isDirectory);
-    entry->SetName(zv_fstrdup(isDirectory ? path : BareName(path)));
-    VESK2_REQUIRE(entry->GetName() != nullptr && entries.push(entry.get()), VESK2_ERR_MEM_ALLOC);
-    static_cast<void>(entry.release());
+int FindingTree::Unlisted(DirectoryFound& found, StatusSet& statuses) {
+  // The parent records it once more: callers see such a directory twice.
+  if (found.reason != 0) {
+    statuses.reason = found.reason;
+    return findings_.AddDirectory(found.directory->GetName(), BodyObject::Invalid, statuses,
+                                  found.reason);
   }
-  VESK2_REQUIRE(!disk.failed(), VESK2_ERR_MEM_ALLOC);
-  entries.sort(BodyObject::Cmp);
-  return 0;
-}
-
-int DiskCheck::Unlisted(BodyDirectory& directory, StatusSet& statuses) {
-  PointerArray<BodyObject> entries;
-  {
-    ZvDir disk;
-    const int code = disk.open(directory.GetName(), "*");
-    VESK2_REQUIRE(code != VESK2_ERR_MEM_ALLOC, code);
-    // The parent records it once more: such a directory stands twice in the list.
-    if (code != 0) {
-      statuses.reason = code;
-      return findings_.AddDirectory(directory.GetName(), BodyObject::Invalid, statuses, code);
-    }
-    VESK2_TRY(ReadEntries(disk, entries));
-  }
-  Listing files(directory.GetFiles(), directory.GetIgnored());
-  Listing subdirectories(directory.GetSubdirectories(), directory.GetIgnored());
-  for (const BodyObject* entry = entries.begin(); entry != nullptr; entry = entries.next()) {
+  // Each kind comes in ascending order of names, so each has a walk of its own.
+  IgnoreWalk ignoredFiles(found.directory->GetIgnored());
+  IgnoreWalk ignoredDirectories(found.directory->GetIgnored());
+  for (const BodyObject* entry = found.unlisted.begin(); entry != nullptr;
+       entry = found.unlisted.next()) {
     const char* const name = entry->GetName();
-    Listing& kind = entry->GetIsDirectory() ? subdirectories : files;
-    if (kind.ignore.Ignores(name) || kind.Lists(name)) continue;
-    VESK2_TRY(entry->GetIsDirectory()
-                  ? findings_.AddDirectory(name, BodyObject::Extra, statuses)
-                  : findings_.AddFile(directory, name, BodyObject::Extra, statuses));
+    const bool isDirectory = entry->GetIsDirectory();
+    if ((isDirectory ? ignoredDirectories : ignoredFiles).Ignores(name)) continue;
+    VESK2_TRY(isDirectory ? findings_.AddDirectory(name, BodyObject::Extra, statuses)
+                          : findings_.AddFile(*found.directory, name, BodyObject::Extra, statuses));
   }
   return 0;
 }
@@ -167,21 +184,34 @@ int DiskCheck::Unlisted(BodyDirectory& directory, StatusSet& statuses) {
 }  // namespace
 
 int Manifest::Verify(ZvBuffer* body, const char* directoryPath) {
+  std::unique_ptr<BodyDirectory> root;
+  VESK2_TRY(ParseListing(root, body, directoryPath));
+  return CheckListing(std::move(root));
+}
+
+int Manifest::ParseListing(std::unique_ptr<BodyDirectory>& out, ZvBuffer* body,
+                           const char* directoryPath) {
   VESK2_REQUIRE(body != nullptr && directoryPath != nullptr, VESK2_ERR_PARAM_NULL);
-  const ZVsysutil::ZvCall call;
   PointerArray<char> ignoreList;
   VESK2_TRY(BuildIgnoreList(directoryPath, ignoreList));
-  std::unique_ptr<BodyDirectory> parsed(TryNew<BodyDirectory>(context));
-  VESK2_REQUIRE(parsed, VESK2_ERR_MEM_ALLOC);
-  BodyDirectory& root = *parsed;
-  root.SetName(zv_fstrdup(directoryPath));
-  VESK2_REQUIRE(root.GetName() != nullptr, VESK2_ERR_MEM_ALLOC);
-  VESK2_TRY(root.ParseBody(body, &ignoreList));
+  std::unique_ptr<BodyDirectory> root(TryNew<BodyDirectory>(context));
+  VESK2_REQUIRE(root, VESK2_ERR_MEM_ALLOC);
+  root->SetName(ZVsysutil::zv_fstrdup(directoryPath));
+  VESK2_REQUIRE(root->GetName() != nullptr, VESK2_ERR_MEM_ALLOC);
+  VESK2_TRY(root->ParseBody(body, &ignoreList));
+  out = std::move(root);
+  return 0;
+}
 
-  Findings findings(context);
+int Manifest::CheckListing(std::unique_ptr<BodyDirectory> root) {
+  ZVsysutil::ZvCall call;
+  Findings findings;
   StatusSet statuses;
-  const int checked = DiskCheck(context, findings, GetFileCallbacks()).Directory(root, 0, statuses);
-  if (evidence != nullptr) listing = std::move(parsed);
+  const Vesk2TaskRunner* const runner = taskRunner.run != nullptr ? &taskRunner : nullptr;
+  FileHashing hashing(*root, *this, runner, call);
+  int checked = hashing.Run(runner);
+  if (checked == 0) checked = FindingTree(hashing.Walk(), findings).Directory(statuses);
+  if (evidence != nullptr) listing = std::move(root);
   VESK2_TRY(checked);
   VESK2_TRY(Publish(findings));
   return statuses.Code();

@@ -1,9 +1,10 @@
-// What a comparison found: one record an entry, and the code that a set of findings amounts to.
+// What a comparison found, and the code that a set of findings amounts to.
 #ifndef VESK2_SRC_MANIFEST_FINDINGS_H
 #define VESK2_SRC_MANIFEST_FINDINGS_H
 
 #include <memory>
 
+#include <vesk2/manifest.h>
 #include <vesk2/manifest_body.h>
 
 namespace ZvVesk2 {
@@ -22,18 +23,11 @@ class StatusSet {
   uint32_t statuses_ = 0;
 };
 
-// One found entry.
-class Finding : public BodyObject {
- public:
-  explicit Finding(Vesk2ContextStruct* ctx) : BodyObject(ctx) {}
-  ~Finding() override;
-  // See Manifest::GetReason.
-  int reason = 0;
-};
-
+// Findings are made as the records that callers get: each list in the reverse order of its
+// findings, which callers walk as it is.
 class Findings {
  public:
-  explicit Findings(Vesk2ContextStruct* context) : context_(context) {}
+  Findings() = default;
 
   // Each records an entry and adds its status to `statuses`, the directory's. `reason`: see
   // Manifest::GetReason. 0 or VESK2_ERR_MEM_ALLOC.
@@ -42,15 +36,21 @@ class Findings {
   [[nodiscard]] int AddDirectory(const char* path, uint32_t status, StatusSet& statuses,
                                  int reason = 0);
 
-  uint32_t Count() const { return records_.GetCount(); }
-  Finding& At(uint32_t index) { return static_cast<Finding&>(*records_.at(index)); }
-
  private:
+  friend class Manifest;
+  struct List {
+    FileItemList items;
+    FileItem* last = nullptr;
+  };
   [[nodiscard]] int Add(std::unique_ptr<char[]> name, bool isDirectory, uint32_t status,
                         StatusSet& statuses, int reason);
+  [[nodiscard]] int AddReason(const FileItem* item, int reason);
+  List& ListOf(uint32_t status);
 
-  Vesk2ContextStruct* context_;
-  PointerArray<BodyObject> records_;  // each a Finding
+  List valid_, invalid_, missing_, extra_;
+  std::unique_ptr<Manifest::Reason[]> reasons_;
+  uint32_t reasonCount_ = 0;
+  uint32_t reasonRoom_ = 0;
 };
 
 }  // namespace ZvVesk2

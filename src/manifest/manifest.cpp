@@ -126,8 +126,11 @@ int Manifest::VerifyManifest(long notBefore, long notAfter) {
   VESK2_TRY(ReadBody(*this, true, notBefore, notAfter, body));
   // From here on the position tells how far the body made sense; it lies before the final ")".
   const size_t bodyStart = readPosition - 1 - body->Remaining();
-  const int code = Verify(body.get(), directory.get());
+  std::unique_ptr<BodyDirectory> root;
+  int code = ParseListing(root, body.get(), directory.get());
   readPosition = bodyStart + body->Position();
+  body.reset();  // as large as the listing itself
+  if (code == 0) code = CheckListing(std::move(root));
   if (code == VESK2_ERR_EXTRA_FILES && !failOnExtraEntries) return 0;
   return code;
 }
@@ -149,6 +152,9 @@ int Manifest::CompareManifest(const char* otherManifestPath) {
 
 void Manifest::SetFailOnExtraEntries(bool value) { failOnExtraEntries = value; }
 void Manifest::SetStoreUpdate(bool value) { storeUpdate = value; }
+void Manifest::SetTaskRunner(const Vesk2TaskRunner* runner) {
+  taskRunner = runner != nullptr ? *runner : Vesk2TaskRunner{};
+}
 void Manifest::SetEvidence(Evidence* borrowed) { evidence = borrowed; }
 Vesk2ContextStruct* Manifest::GetContext() const { return context; }
 const char* Manifest::GetDirectory() const { return directory.get(); }

@@ -27,16 +27,28 @@ void Sleep(uint32_t milliseconds) {
 
 }  // namespace
 
-ZvCall::ZvCall() : shared_(outermost != nullptr ? outermost : this) { outermost = shared_; }
+ZvCall::ZvCall() : outer_(outermost), shared_(outer_ != nullptr ? outer_ : this) {
+  outermost = shared_;
+}
+
+ZvCall::ZvCall(ZvCall& begun)
+    : outer_(outermost), begun_(begun.shared_), shared_(outer_ == begun_ ? outer_ : this) {
+  if (shared_ == this) waited_ = begun_->waited_.load();
+  outermost = shared_;
+}
 
 ZvCall::~ZvCall() {
-  if (shared_ == this) outermost = nullptr;
+  outermost = outer_;
+  if (shared_ != this || begun_ == nullptr) return;
+  uint32_t known = begun_->waited_;
+  while (known < waited_ && !begun_->waited_.compare_exchange_weak(known, waited_)) {
+  }
 }
 
 bool ZvCall::Pause(uint32_t milliseconds) {
-  uint32_t& waited = shared_->waited_;
+  std::atomic<uint32_t>& waited = shared_->waited_;
   const uint32_t most = allowance;
-  const uint32_t pause = std::min(milliseconds, most - std::min(most, waited));
+  const uint32_t pause = std::min(milliseconds, most - std::min<uint32_t>(most, waited));
   if (pause == 0) return false;
   Sleep(pause);
   waited += pause;

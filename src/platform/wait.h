@@ -7,6 +7,7 @@
 #ifndef VESK2_SRC_PLATFORM_WAIT_H
 #define VESK2_SRC_PLATFORM_WAIT_H
 
+#include <atomic>
 #include <cstdint>
 
 namespace ZVsysutil {
@@ -16,6 +17,9 @@ namespace ZVsysutil {
 class ZvCall {
  public:
   ZvCall();
+  // The same inside an operation that `begun` marks, on a thread that works for it: it may wait as
+  // long as was left when it came, since threads that wait at the same time keep nobody longer.
+  explicit ZvCall(ZvCall& begun);
   ~ZvCall();
   ZvCall(const ZvCall&) = delete;
   ZvCall& operator=(const ZvCall&) = delete;
@@ -27,8 +31,10 @@ class ZvCall {
   uint32_t Waited() const { return shared_->waited_; }
 
  private:
-  ZvCall* shared_;  // the outermost
-  uint32_t waited_ = 0;
+  ZvCall* const outer_;            // of this thread, before
+  ZvCall* const begun_ = nullptr;  // the outermost of the thread that is worked for
+  ZvCall* shared_;                 // the outermost
+  std::atomic<uint32_t> waited_ = 0;
 };
 
 // Sets the allowance of every call, for tests that cannot wait; 0 is as long as ever.

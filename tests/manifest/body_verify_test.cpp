@@ -1,5 +1,6 @@
 // Bodies against real trees and against each other: every row gives the exact lists.
 #include <gtest/gtest.h>
+#include <sys/resource.h>
 #include <sys/stat.h>
 
 #include <algorithm>
@@ -7,6 +8,7 @@
 #include <fstream>
 #include <sstream>
 #include <string>
+#include <thread>
 #include <vector>
 
 #include <vesk2/manifest.h>
@@ -80,6 +82,18 @@ constexpr struct {
     {"-s", "s", 0, "V:b a I: M: X:"},
 };
 
+// Lends threads; none where `count` is 0.
+struct Threads {
+  unsigned count;
+  ZvVesk2::Vesk2TaskRunner Runner() {
+    return {this, [](void* self, void (*task)(void*), void* work) {
+              std::vector<std::thread> threads(static_cast<Threads*>(self)->count);
+              for (std::thread& thread : threads) thread = std::thread(task, work);
+              for (std::thread& thread : threads) thread.join();
+            }};
+  }
+};
+
 TEST(BodyVerify, FindsWhatDiffers) {
   for (const auto& row : kDiskCases) {
     TempDir dir;
@@ -87,10 +101,13 @@ TEST(BodyVerify, FindsWhatDiffers) {
     const std::string body = BodyOf(dir.Path());
     std::istringstream changes(row.changes);
     for (std::string word; changes >> word;) Change(dir, word[0], word.substr(1));
-    // A separator at the end must not switch the ignored names off.
+    // A separator at the end must not switch the ignored names off, nor do threads count.
     for (const std::string end : {"", "/", "//"}) {
       Manifest manifest(nullptr);
       Ignore(manifest, row.ignored);
+      Threads threads{static_cast<unsigned>(end.size()) * 3};
+      const ZvVesk2::Vesk2TaskRunner runner = threads.Runner();
+      manifest.SetTaskRunner(end == "/" ? nullptr : &runner);
       const std::string root = dir.Path() + end;
       EXPECT_EQ(manifest.Verify(Wrap(body).get(), root.c_str()), row.code) << row.changes;
       EXPECT_EQ(Findings(manifest, end.empty() ? root + "/" : root), row.findings) << row.changes;
@@ -150,6 +167,61 @@ TEST(BodyVerify, TellsWhatWasNotCompared) {
   }
   EXPECT_TRUE(Findings(manifest, dir.Path() + "/").ends_with(" M:s/f b s/f b X:"));
   EXPECT_EQ(manifest.GetReason(nullptr), 0);
+}
+
+// A deep tree of many files gives the same on one thread and on many, with few descriptors.
+TEST(BodyVerify, NeedsFewDescriptorsAndHasOneOrder) {
+  constexpr int kLevels = 200;
+  TempDir dir;
+  std::string path, inside;
+  for (int level = 1; level <= kLevels; ++level) {
+    path += "d/";
+    for (const char* name : {"a", "b", "c"}) dir.Write(path + name, name);
+    if (level % 7 == 0) dir.Write(path + "more", "");
+  }
+  for (int level = kLevels; level > 0; --level) {
+    inside = DirEntry("d", FileEntry("c", "c") + FileEntry("a", level % 5 == 0 ? "A" : "a") +
+                               FileEntry("b", "b") + FileEntry("gone", "") + inside);
+  }
+  std::vector<std::string> findings;
+  for (unsigned count : {0u, 1u, 4u}) {
+    Manifest manifest(nullptr);
+    Threads threads{count};
+    const ZvVesk2::Vesk2TaskRunner runner = threads.Runner();
+    manifest.SetTaskRunner(count > 0 ? &runner : nullptr);
+    rlimit limit{};
+    getrlimit(RLIMIT_NOFILE, &limit);
+    rlimit few = limit;
+    few.rlim_cur = 100;
+    ASSERT_EQ(setrlimit(RLIMIT_NOFILE, &few), 0);
+    EXPECT_EQ(manifest.Verify(Wrap(Body(inside)).get(), dir.Path().c_str()), kDiffers);
+    setrlimit(RLIMIT_NOFILE, &limit);
+    findings.push_back(Findings(manifest, dir.Path() + "/"));
+  }
+  EXPECT_TRUE(findings[0].starts_with("V:" + path + "c " + path + "b "));
+  EXPECT_NE(findings[0].find(" I:d/ d/d/ "), std::string::npos);
+  EXPECT_NE(findings[0].find(" X:d/d/d/d/d/d/d/more "), std::string::npos);
+  EXPECT_EQ(findings[1], findings[0]);
+  EXPECT_EQ(findings[2], findings[0]);
+}
+
+// Whichever thread waits, all of them wait as long as one would.
+TEST(BodyVerify, WaitsOnceOnAllThreads) {
+  TempDir dir;
+  std::vector<std::string> paths;
+  std::string entries;
+  for (int i = 0; i < 20; ++i) {
+    paths.push_back(dir.Write(std::to_string(i), "x"));
+    entries += FileEntry(std::to_string(i), "x");
+  }
+  const HeldFiles held(paths);
+  Manifest manifest(nullptr);
+  Threads threads{3};
+  const ZvVesk2::Vesk2TaskRunner runner = threads.Runner();
+  manifest.SetTaskRunner(&runner);
+  ZVsysutil::ZvCall call;
+  EXPECT_EQ(manifest.Verify(Wrap(Body(entries)).get(), dir.Path().c_str()), kDiffers);
+  EXPECT_EQ(call.Waited(), HeldFiles::kWait);
 }
 
 // Paths that are too long to be opened are findings like others, and the search goes on.

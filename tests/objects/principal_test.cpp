@@ -6,6 +6,7 @@
 #include <memory>
 #include <tuple>
 
+#include "src/objects/hash_file.h"
 #include "tests/support/temp_dir.h"
 #include "tests/support/test_key.h"
 #include "tests/support/test_read.h"
@@ -102,6 +103,32 @@ TEST(HashTest, HashesFiles) {
   for (auto [path, length, code, after] : cases) {
     EXPECT_EQ(Hash::HashFile(path, digest, &length, nullptr), code);
     EXPECT_EQ(length, after);
+  }
+}
+
+// Whatever became of one file, the next one's digest is its own.
+TEST(HashTest, DigestsOneFileAfterTheOther) {
+  const TempDir dir;
+  int calls = 0;
+  const Vesk2FileCallbacks callbacks = {
+      sizeof callbacks, &calls, nullptr,
+      [](void* user, uint64_t) { return ++*static_cast<int*>(user) == 3 ? 1 : 0; }, nullptr};
+  FileDigester digester(nullptr, &callbacks);
+  const std::tuple<const char*, size_t, int> cases[] = {
+      {"large", 300'000, VESK2_ERR_USER_INTERRUPT},
+      {"small", 5, 0},
+      {"none", 0, 0},
+      {"missing", 0, VESK2_ERR_FILE_OPEN},
+      {"odd", 65537, 0}};
+  for (const auto& [name, size, code] : cases) {
+    const std::string bytes(size, *name);
+    if (code != VESK2_ERR_FILE_OPEN) dir.Write(name, bytes);
+    const std::string path = dir.File(name);
+    unsigned char digest[32];
+    bool held = false;
+    const ZVsysutil::ZvPlace place = {ZVsysutil::kZvNoDirectory, path.c_str(), true};
+    EXPECT_EQ(digester.Digest({place, path.c_str()}, digest, held), code) << name;
+    EXPECT_TRUE(code != 0 || std::string(digest, digest + 32) == Digest(bytes)) << name;
   }
 }
 

@@ -38,12 +38,24 @@ TEST(FileTest, OpensRegularFilesOnly) {
   fs::create_symlink("file", dir.File("link"));
   fs::create_symlink("nowhere", dir.File("dangling"));
   fs::create_symlink("/dev/zero", dir.File("endless"));
+  ZvListing inside;
+  ASSERT_EQ(inside.Open({kZvNoDirectory, dir.Path().c_str()}), 0);
+  const ZvFileOwner again = zv_reader();
   for (const std::string name :
        {"absent", "file", "directory", "fifo", "busy", "socket", "link", "dangling", "endless"}) {
     const std::string path = dir.File(name);
     const bool readable = name == "file" || name == "link";  // contents may lie behind a link
     EXPECT_TRUE((Open(path) != nullptr) == readable && (WrapFile(path) != nullptr) == readable)
         << name;
+    // A directory may have called a file what is none any more.
+    for (const bool listed : {false, true}) {
+      const ZvPlace place = {inside.Descriptor(), name.c_str(), listed};
+      EXPECT_EQ(zv_reopen(again.get(), place), readable ? 0 : VESK2_ERR_FILE_OPEN) << name;
+      std::unique_ptr<unsigned char[]> bytes;
+      size_t size = 0;
+      EXPECT_EQ(zv_read_whole(bytes, &size, place, 3) == 0, listed ? name == "file" : readable)
+          << name;
+    }
     const bool writable = name == "absent" || name == "file";
     for (const int mode : {ZV_WRITE_STORE, ZV_WRITE_SHARED}) {
       EXPECT_EQ(Open(path, mode) != nullptr, writable) << name;
