@@ -25,10 +25,45 @@ constexpr unsigned kTokenLength = 4;
 constexpr unsigned kDigestLength = 32;
 constexpr char kSeparator = '/';
 
-std::string_view Text(const ByteString& string) {
-  if (string.GetLength() == 0) return {};
-  return {reinterpret_cast<const char*>(string.GetData()), string.GetLength()};
+std::string_view Text(const unsigned char* bytes, size_t length) {
+  if (length == 0) return {};
+  return {reinterpret_cast<const char*>(bytes), length};
 }
+
+// A byte string that is read where it stands if it has no hint, as nearly all have none: a listing
+// has three for each file. All others, and all that is wrong, are an object's to read.
+class ReadString {
+ public:
+  int Import(ZvBuffer* buffer, Vesk2ContextStruct* ctx) {
+    if (ReadInPlace(*buffer)) return 0;
+    VESK2_TRY(ImportNew(read_, buffer, ctx));
+    text_ = ZvVesk2::Text(read_->GetData(), read_->GetLength());
+    return 0;
+  }
+  // Lives as long as this and the buffer.
+  std::string_view Text() const { return text_; }
+
+ private:
+  // "<digits>:<bytes>"
+  bool ReadInPlace(ZvBuffer& buffer) {
+    const unsigned char* const bytes = buffer.Data();
+    const size_t left = buffer.Remaining();
+    size_t digits = 0;
+    size_t length = 0;
+    for (; digits < left && digits < Limits::kMaxLengthDigits; ++digits) {
+      if (bytes[digits] < '0' || bytes[digits] > '9') break;
+      length = length * 10 + (bytes[digits] - '0');
+    }
+    if (digits == left || bytes[digits] != ':' || length > Limits::kMaxByteString) return false;
+    if (length > left - digits - 1) return false;
+    text_ = ZvVesk2::Text(bytes + digits + 1, length);
+    buffer.Skip(digits + 1 + length);
+    return true;
+  }
+
+  std::string_view text_;
+  Ref<ByteString> read_;
+};
 
 bool IsBareName(std::string_view name) {
   return !name.empty() && name != "." && name != ".." &&
@@ -87,28 +122,30 @@ int BodyDirectory::ParseEntry(ZvBuffer* buffer, PointerArray<char>* ignoreList, 
 // Reads an entry's name and the byte string after it, whose meaning is the signer's. `length` is
 // that of the directory's path within the body, and becomes the entry's.
 int BodyDirectory::ParseName(ZvBuffer* buffer, std::unique_ptr<char[]>& bare, size_t& length) {
-  Ref<ByteString> text;
-  VESK2_TRY(ImportNew(text, buffer, GetContext()));
-  VESK2_REQUIRE(IsBareName(Text(*text)), VESK2_ERR_PARSE_FILE);
+  ReadString string;
+  VESK2_TRY(string.Import(buffer, GetContext()));
+  const std::string_view text = string.Text();
+  VESK2_REQUIRE(IsBareName(text), VESK2_ERR_PARSE_FILE);
   // Counted from the body's root: where the tree lies has no say in what is well-formed.
-  length += (length > 0 ? 1 : 0) + text->GetLength();
+  length += (length > 0 ? 1 : 0) + text.size();
   VESK2_REQUIRE(length <= Limits::kMaxBodyPath, VESK2_ERR_PARSE_FILE);
-  bare.reset(text->ToString());
+  bare.reset(TryNewArray<char>(text.size() + 1));
   VESK2_REQUIRE(bare, VESK2_ERR_MEM_ALLOC);
-  Ref<ByteString> ignoredString;
-  return ImportNew(ignoredString, buffer, GetContext());
+  bare[text.copy(bare.get(), text.size())] = '\0';
+  ReadString ignoredString;
+  return ignoredString.Import(buffer, GetContext());
 }
 
 int BodyDirectory::ParseFile(ZvBuffer* buffer, size_t length) {
   std::unique_ptr<char[]> bare;
   VESK2_TRY(ParseName(buffer, bare, length));
-  Ref<ByteString> digest;
-  VESK2_TRY(ImportNew(digest, buffer, GetContext()));
+  ReadString digest;
+  VESK2_TRY(digest.Import(buffer, GetContext()));
   std::unique_ptr<BodyFile> file(TryNew<BodyFile>(GetContext()));
   VESK2_REQUIRE(file, VESK2_ERR_MEM_ALLOC);
   file->SetName(bare.release());
-  VESK2_REQUIRE(digest->GetLength() == kDigestLength, VESK2_ERR_UNKNOWN_HASH_ID);
-  file->SetHash(digest->GetData());
+  VESK2_REQUIRE(digest.Text().size() == kDigestLength, VESK2_ERR_UNKNOWN_HASH_ID);
+  file->SetHash(reinterpret_cast<const unsigned char*>(digest.Text().data()));
   VESK2_TRY(buffer->Expect(")"));
   VESK2_REQUIRE(files.push(file.get()), VESK2_ERR_MEM_ALLOC);
   static_cast<void>(file.release());
