@@ -88,7 +88,12 @@ class Directories(Scene):
         result = vesk2.verify(self.work / "app", "app.manifest", tag=TAG)
         names = {os.fsencode(path.relative_to(self.work)) for path in result.valid}
         self.assertEqual(names, {b"app/calc", b"app/lib/pi", b"app/lib/deep/e", b"app/lib/\xff\n", b"app/lib", b"app/lib/deep", b"app/empty"})
-        assert result.signed_at is not None
+        why = result.explanation
+        assert result.signed_at is not None and why is not None and why.holds_until is not None
+        self.assertRegex(result.signer or "", "^sha256:[0-9a-f]{64}$")
+        self.assertEqual((why.complete, why.reasons, why.listed), (True, (), 4))
+        self.assertEqual((why.entry, why.holds_until.year, why.ended_by), ("vendor.acl", 2090, "certificate"))
+        self.assertEqual(why.end_certificate, why.certificates[0])
         self.assertLess(abs(result.signed_at - NOW), timedelta(minutes=10))
 
     def test_what_may_be_there(self) -> None:
@@ -108,9 +113,10 @@ class Directories(Scene):
     def test_authority(self) -> None:
         future = datetime(2095, 1, 1, tzinfo=timezone.utc)
         self.assertTrue(vesk2.verify("app", "app.manifest", tag=TAG, at=NOW))
-        for options in ({"tag": "(install (app mail))"}, {"tag": TAG, "at": future}):
+        for options, kind in (({"tag": "(install (app mail))"}, "tag"), ({"tag": TAG, "at": future}, "period")):
             result = vesk2.verify("app", "app.manifest", **options)  # type: ignore[arg-type]
             self.assertEqual((result.ok, result.reason), (False, "not-authorized"))
+            self.assertEqual((result.message, result.reasons[0].kind), ("nothing is granted", kind))
         shutil.move("store/acl", "acl")
         self.assertFalse(vesk2.verify("app", "app.manifest", tag=TAG))
         self.assertTrue(vesk2.verify("app", "app.manifest", tag=TAG, trust_also="acl"))
@@ -154,7 +160,9 @@ class Chains(Scene):
 
     def test_revocation(self) -> None:
         with vesk2.Chain("watched.cert") as chain:
-            self.assertEqual(chain.verify(TAG, at=NOW).reason, "crl-not-found")
+            answer = chain.verify(TAG, at=NOW)
+            self.assertEqual(answer.reason, "crl-not-found")
+            self.assertEqual([(why.kind, why.certificate, why.source) for why in answer.reasons], [("undetermined", 1, LISTS)])
             vesk2.import_lists("lists")
             self.assertTrue(chain.verify(TAG, at=NOW))
             run("crl", "issue", "--key", "revoker.pem", "--tag", LISTS, "--not-after", "2091",
@@ -197,7 +205,7 @@ class Trouble(Scene):
             with self.subTest(reason), self.assertRaises(vesk2.Error) as caught:
                 call()
             self.assertEqual((caught.exception.code, caught.exception.reason), (code, reason))
-            self.assertIn(f"{reason} ({code})", str(caught.exception))
+            self.assertIn(f"({reason}, {code})", str(caught.exception))
 
     def test_rubbish_is_refused(self) -> None:
         for text in (b"", b"(8:manifest", b"\0" * 100):

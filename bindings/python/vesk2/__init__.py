@@ -4,14 +4,17 @@
 
     result = vesk2.verify("app", "app.manifest", tag="(install (app calc))")
     if not result:
-        print(result.reason, *result.changed, *result.missing, *result.unlisted)
+        print(result.message, *result.changed, *result.missing, *result.unlisted)
+        for reason in result.reasons:  # why nothing was granted
+            print(reason.kind, reason.text)
 
 The answer comes from files on this machine, through libvesk2.so.1. A refusal is a result; what could not be
-decided is an exception, and must be treated as a refusal. Names of files and texts from objects were chosen
-by whoever wrote them: use repr() before they reach a terminal.
+decided is an exception, and must be treated as a refusal. Names of files and texts of certificates were
+chosen by whoever wrote them: use repr() before they reach a terminal.
 """
 
-from ._chain import Answer, Certificate, Chain, RevocationList, find_certificates, import_lists
+from ._answer import Answer, Explanation, Reason
+from ._chain import Certificate, Chain, RevocationList, find_certificates, import_lists
 from ._errors import Error
 from ._library import lib as _lib
 from ._library import set_stores
@@ -24,7 +27,9 @@ __all__ = [
     "Certificate",
     "Chain",
     "Error",
+    "Explanation",
     "Manifest",
+    "Reason",
     "Result",
     "RevocationList",
     "find_certificates",

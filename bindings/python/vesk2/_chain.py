@@ -11,28 +11,9 @@ from pathlib import Path
 from types import TracebackType
 from typing import Any, Optional, Type
 
-from ._errors import UNDECIDED, check, fail, reason_of
+from ._answer import Answer, ask
+from ._errors import UNDECIDED, check, fail
 from ._library import CertInfo, CrlInfo, StrPath, items, lib, moment, seconds, text, words
-
-
-@dataclass(frozen=True)
-class Answer:
-    """What a verification answered. True in a condition when the answer is yes."""
-
-    code: int
-    """0 for yes, else the library's number."""
-
-    @property
-    def ok(self) -> bool:
-        return self.code == 0
-
-    @property
-    def reason(self) -> str:
-        """The answer as a word that stays the same: `ok`, `not-authorized`, `cert-revoked`, ..."""
-        return reason_of(self.code)
-
-    def __bool__(self) -> bool:
-        return self.ok
 
 
 @dataclass(frozen=True)
@@ -126,10 +107,11 @@ class Chain(_Record):
             not_before = not_after = at
         if not_before is None and not_after is None:
             raise TypeError("a moment or a period must be asked about")
-        code = lib.Vesk2CertVerify(self._open(), text(tag), seconds(not_before), seconds(not_after))
+        question = (self._open(), text(tag), seconds(not_before), seconds(not_after))
+        code, why = ask(lambda out: int(lib.Vesk2CertVerifyExplained(*question, byref(out))))
         if code in UNDECIDED:
             fail(code, "cannot verify")
-        return Answer(code)
+        return Answer(code, why)
 
 
 def find_certificates(directory: Optional[StrPath] = None) -> tuple[str, ...]:
@@ -179,7 +161,7 @@ class RevocationList(_Record):
         code = lib.Vesk2CrlVerify(self._open(), asked, seconds(not_before), seconds(not_after))
         if code in UNDECIDED:
             fail(code, "cannot verify")
-        return Answer(code)
+        return Answer(code, None)
 
 
 def import_lists(directory: StrPath) -> None:

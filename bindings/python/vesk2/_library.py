@@ -70,13 +70,52 @@ class CrlInfo(ctypes.Structure):
     ]
 
 
+class ReasonRecord(ctypes.Structure):
+    pass
+
+
+ReasonRecord._fields_ = [
+    ("kind", c_char_p),
+    ("text", c_char_p),
+    ("certificate", c_uint32),
+    ("otherCertificate", c_uint32),
+    ("entry", c_char_p),
+    ("source", c_char_p),
+    ("next", POINTER(ReasonRecord)),
+]
+
+
+class ExplanationRecord(ctypes.Structure):
+    _fields_ = [
+        ("size", c_uint32),
+        ("code", c_int32),
+        ("isComplete", c_int32),
+        ("reasons", POINTER(ReasonRecord)),
+        ("signer", c_char_p),
+        ("signedAt", c_long),
+        ("listed", c_uint64),
+        ("valid", c_uint64),
+        ("changed", c_uint64),
+        ("missing", c_uint64),
+        ("extra", c_uint64),
+        ("entry", c_char_p),
+        ("certificates", POINTER(c_uint32)),
+        ("certificateCount", c_uint32),
+        ("holdsUntil", c_long),
+        ("endedBy", c_char_p),
+        ("endCertificate", c_uint32),
+    ]
+
+
 _FILES = POINTER(FileItem)
+_EXPLANATION = POINTER(ExplanationRecord)
 _FUNCTIONS: list[tuple[str, Any, list[Any]]] = [
     ("Vesk2HomeDirectory", None, [c_char_p]),
     ("Vesk2GlobalDirectory", None, [c_char_p]),
     ("Vesk2VersionNumber", c_int, []),
     ("Vesk2VersionExtra", c_char_p, []),
-    ("Vesk2ErrorMessage", c_char_p, [c_int]),
+    ("Vesk2ErrorName", c_char_p, [c_int]),
+    ("Vesk2ErrorWords", c_char_p, [c_int]),
     ("FreeFileItemList", c_uint32, [_FILES]),
     ("CreateManifestContext", c_int, [POINTER(c_void_p), c_char_p, c_char_p, c_char_p]),
     ("DeleteManifestContext", None, [c_void_p]),
@@ -85,16 +124,16 @@ _FUNCTIONS: list[tuple[str, Any, list[Any]]] = [
     ("SetIgnoredEntries", None, [c_void_p, _FILES]),
     ("SetFileCallbacks", c_int, [c_void_p, POINTER(FileCallbacks)]),
     ("SetStoreUpdate", None, [c_void_p, c_int]),
-    ("VerifyManifest", c_int, [c_void_p, c_long, c_long]),
+    ("VerifyManifestExplained", c_int, [c_void_p, c_long, c_long, POINTER(_EXPLANATION)]),
+    ("Vesk2FreeExplanation", None, [_EXPLANATION]),
     ("CompareManifest", c_int, [c_void_p, c_char_p]),
-    ("GetTimeOfSigning", c_long, [c_void_p]),
     ("GetValidEntries", _FILES, [c_void_p]),
     ("GetInvalidEntries", _FILES, [c_void_p]),
     ("GetMissingEntries", _FILES, [c_void_p]),
     ("GetExtraEntries", _FILES, [c_void_p]),
     ("Vesk2CertRead", c_int, [POINTER(POINTER(CertInfo)), c_char_p]),
     ("Vesk2CertFree", c_int, [POINTER(CertInfo)]),
-    ("Vesk2CertVerify", c_int, [POINTER(CertInfo), c_char_p, c_long, c_long]),
+    ("Vesk2CertVerifyExplained", c_int, [POINTER(CertInfo), c_char_p, c_long, c_long, POINTER(_EXPLANATION)]),
     ("CertFind", _FILES, [c_char_p]),
     ("Vesk2ImportCrls", c_int, [c_char_p]),
     ("Vesk2CrlRead", c_int, [POINTER(POINTER(CrlInfo)), c_char_p, c_void_p]),

@@ -5,25 +5,24 @@ from __future__ import annotations
 import ctypes
 import os
 from ctypes import byref, c_void_p
-from dataclasses import dataclass
+from dataclasses import dataclass, replace
 from datetime import datetime
 from pathlib import Path
 from types import TracebackType
 from typing import Any, Callable, Iterable, Optional, Type
 
 from . import _library
-from ._errors import CANNOT_OPEN, UNDECIDED, check, fail, reason_of
-from ._library import StrPath, lib, moment, paths, seconds, text
+from ._answer import Answer, Explanation, ask
+from ._errors import CANNOT_OPEN, UNDECIDED, check, fail
+from ._library import StrPath, lib, paths, seconds, text
 
 _EXTRA_FILES = 74
 
 
 @dataclass(frozen=True)
-class Result:
-    """What a verification answered. True in a condition when the answer is yes."""
+class Result(Answer):
+    """What was answered about a directory. True in a condition when the answer is yes."""
 
-    code: int
-    """0 for yes, else the library's number."""
     valid: tuple[Path, ...]
     """The entries that are as signed."""
     changed: tuple[Path, ...]
@@ -31,20 +30,16 @@ class Result:
     missing: tuple[Path, ...]
     unlisted: tuple[Path, ...]
     """What is there and was not signed."""
-    signed_at: Optional[datetime]
-    """When, by the signer's word; None when the manifest was not read so far."""
 
     @property
-    def ok(self) -> bool:
-        return self.code == 0
+    def signer(self) -> Optional[str]:
+        """The fingerprint of the key that signed; None unless its signature holds."""
+        return self.explanation.signer if self.explanation is not None else None
 
     @property
-    def reason(self) -> str:
-        """The answer as a word that stays the same: `ok`, `hash-mismatch`, `not-authorized`, ..."""
-        return reason_of(self.code)
-
-    def __bool__(self) -> bool:
-        return self.ok
+    def signed_at(self) -> Optional[datetime]:
+        """When, by the signer's word; None when the manifest was not read so far."""
+        return self.explanation.signed_at if self.explanation is not None else None
 
 
 class Manifest:
@@ -147,17 +142,18 @@ class Manifest:
         Raises Error when nothing was decided, FileNotFoundError or another OSError when the manifest
         cannot be opened, and what a listener raised.
         """
-        code = lib.VerifyManifest(self._open(), seconds(not_before), seconds(not_after))
-        return self._answer(code, "cannot verify", self._file)
+        handle, period = self._open(), (seconds(not_before), seconds(not_after))
+        code, why = ask(lambda out: int(lib.VerifyManifestExplained(handle, *period, byref(out))))
+        return self._answer(code, why, "cannot verify", self._file)
 
     def compare(self, other: StrPath) -> Result:
         """Compares with what another manifest lists, by names relative to both. Signatures are proved, authority is
         not.
         """
         code = lib.CompareManifest(self._open(), text(other))
-        return self._answer(code, "cannot compare with", other)
+        return self._answer(code, None, "cannot compare with", other)
 
-    def _answer(self, code: int, doing: str, file: StrPath) -> Result:
+    def _answer(self, code: int, why: Optional[Explanation], doing: str, file: StrPath) -> Result:
         raised, self._raised = self._raised, None
         if raised is not None:
             raise raised
@@ -173,7 +169,7 @@ class Manifest:
         # A set: a directory that cannot be read is recorded twice.
         changed, missing, unlisted = (tuple(sorted(set(entries) - parents)) for entries in found)
         valid = paths(lib.GetValidEntries(handle))
-        return Result(code, valid, changed, missing, unlisted, moment(lib.GetTimeOfSigning(handle)))
+        return Result(code, why, valid, changed, missing, unlisted)
 
 
 def _unlisted_at_top(
@@ -227,5 +223,4 @@ def verify(
     unlisted = _unlisted_at_top(directory, manifest, ignored, result)
     if not unlisted:
         return result
-    unlisted = sorted([*unlisted, *result.unlisted])
-    return Result(_EXTRA_FILES, result.valid, result.changed, result.missing, tuple(unlisted), result.signed_at)
+    return replace(result, code=_EXTRA_FILES, unlisted=tuple(sorted([*unlisted, *result.unlisted])))
