@@ -439,8 +439,8 @@ VESK2_VERDICT int VerifyManifest(Manifest* manifest, time_t notBefore, time_t no
  * of a no and of a file that cannot be read alike. After a refusal the rest of the manifest is read
  * for it; the answer stays the same. *out is null when memory ran out: the answer stands. Keeps
  * nothing of its own. VESK2_ERR_PARAM_NULL for a null `out`. */
-VESK2_API int VerifyManifestExplained(Manifest* manifest, time_t notBefore, time_t notAfter,
-                                      Vesk2ExplanationStruct** out);
+VESK2_VERDICT int VerifyManifestExplained(Manifest* manifest, time_t notBefore, time_t notAfter,
+                                          Vesk2ExplanationStruct** out);
 
 /* CompareManifest compares this manifest's body (the reference) with that of another manifest.
  * Signatures and digests of both are proved, authority is not. Results as in VerifyManifest. */
@@ -500,13 +500,15 @@ VESK2_VERDICT int Vesk2CertVerifyFileA(const char* path, const char* tagText, ti
 /* The same, telling why: *out receives the explanation of a yes or a no. It is null when the
  * question could not be asked (the codes of the readers and of the tag's parser), and when memory
  * ran out: the answer stands. VESK2_ERR_PARAM_NULL for a null `out`, too. */
-VESK2_API int Vesk2CertVerifyExplained(Vesk2CertInfoStruct* chain, const char* tagText,
-                                       time_t notBefore, time_t notAfter,
-                                       Vesk2ExplanationStruct** out);
-VESK2_API int Vesk2CertVerifyFileExplained(const char* path, const char* tagText, time_t notBefore,
-                                           time_t notAfter, Vesk2ExplanationStruct** out);
-VESK2_API int Vesk2CertVerifyFileExplainedA(const char* path, const char* tagText, time_t notBefore,
-                                            time_t notAfter, Vesk2ExplanationStruct** out);
+VESK2_VERDICT int Vesk2CertVerifyExplained(Vesk2CertInfoStruct* chain, const char* tagText,
+                                           time_t notBefore, time_t notAfter,
+                                           Vesk2ExplanationStruct** out);
+VESK2_VERDICT int Vesk2CertVerifyFileExplained(const char* path, const char* tagText,
+                                               time_t notBefore, time_t notAfter,
+                                               Vesk2ExplanationStruct** out);
+VESK2_VERDICT int Vesk2CertVerifyFileExplainedA(const char* path, const char* tagText,
+                                                time_t notBefore, time_t notAfter,
+                                                Vesk2ExplanationStruct** out);
 
 /* Vesk2FreeExplanation frees an explanation with all that belongs to it; null is allowed. */
 VESK2_API void Vesk2FreeExplanation(Vesk2ExplanationStruct* explanation);

@@ -65,7 +65,7 @@ bool ListsDirectory(BodyDirectory& directory, size_t prefix, const char* name) {
 
 // The kind of an entry of which the directory said nothing, behind links. What nobody can look at
 // is no directory.
-int Ask(ZvKind& kind, const ZvPlace& place) {
+[[nodiscard]] int Ask(ZvKind& kind, const ZvPlace& place) {
   struct stat about {};
   const int code = ZVsysutil::zv_stat(place, &about);
   VESK2_REQUIRE(code != VESK2_ERR_MEM_ALLOC, code);
@@ -75,7 +75,7 @@ int Ask(ZvKind& kind, const ZvPlace& place) {
 
 // Keeps an entry that is not listed: a file under its bare name and a directory under its path, the
 // way in which a body names them.
-int KeepUnlisted(DirectoryFound& found, const char* name, bool isDirectory) {
+[[nodiscard]] int KeepUnlisted(DirectoryFound& found, const char* name, bool isDirectory) {
   std::unique_ptr<BodyObject> entry(TryNew<BodyObject>(found.directory->GetContext()));
   VESK2_REQUIRE(entry, VESK2_ERR_MEM_ALLOC);
   entry->SetIsDirectory(isDirectory);
@@ -87,7 +87,7 @@ int KeepUnlisted(DirectoryFound& found, const char* name, bool isDirectory) {
   return 0;
 }
 
-int MakeFound(std::unique_ptr<DirectoryFound>& out, BodyDirectory& directory) {
+[[nodiscard]] int MakeFound(std::unique_ptr<DirectoryFound>& out, BodyDirectory& directory) {
   std::unique_ptr<DirectoryFound> found(TryNew<DirectoryFound>());
   VESK2_REQUIRE(found, VESK2_ERR_MEM_ALLOC);
   const PointerArray<BodyObject>& files = directory.GetFiles();
@@ -103,7 +103,7 @@ int MakeFound(std::unique_ptr<DirectoryFound>& out, BodyDirectory& directory) {
 }
 
 // Goes through the entries of a directory; keeps those that are not listed if it is `searched`.
-int List(DirectoryFound& found, OpenDirectory& open, bool searched) {
+[[nodiscard]] int List(DirectoryFound& found, OpenDirectory& open, bool searched) {
   for (;;) {
     const char* name = nullptr;
     ZvKind kind = ZvKind::kUnknown;

@@ -34,7 +34,7 @@ std::string_view Text(const unsigned char* bytes, size_t length) {
 // has three for each file. All others, and all that is wrong, are an object's to read.
 class ReadString {
  public:
-  int Import(ZvBuffer* buffer, Vesk2ContextStruct* ctx) {
+  [[nodiscard]] int Import(ZvBuffer* buffer, Vesk2ContextStruct* ctx) {
     if (ReadInPlace(*buffer)) return 0;
     VESK2_TRY(ImportNew(read_, buffer, ctx));
     text_ = ZvVesk2::Text(read_->GetData(), read_->GetLength());

@@ -33,7 +33,7 @@ class FileHashing {
       : walk_(root, runner != nullptr ? 1 : UINT32_MAX), manifest_(manifest), call_(call) {}
 
   // Hashes all; the calling thread goes on when the runner's are done, or alone.
-  int Run(const Vesk2TaskRunner* runner) {
+  [[nodiscard]] int Run(const Vesk2TaskRunner* runner) {
     if (runner != nullptr) runner->run(runner->user, TakePart, this);
     TakePart(this);
     return trouble_;
@@ -44,8 +44,9 @@ class FileHashing {
   static void TakePart(void* self) { static_cast<FileHashing*>(self)->TakePart(); }
   void TakePart();
   bool Exchange(FileChunk& chunk, int code);
-  int Hash(const FileChunk& chunk, FileDigester& digester);
-  int HashOne(int& state, const FileChunk& chunk, const BodyFile& file, FileDigester& digester);
+  [[nodiscard]] int Hash(const FileChunk& chunk, FileDigester& digester);
+  [[nodiscard]] int HashOne(int& state, const FileChunk& chunk, const BodyFile& file,
+                            FileDigester& digester);
 
   ZVsysutil::ZvLock lock_;  // of the walk and the trouble
   DiskWalk walk_;
@@ -112,7 +113,7 @@ class FindingTree {
   FindingTree(DiskWalk& walk, Findings& findings) : walk_(walk), findings_(findings) {}
 
   // Collects the statuses found in one directory.
-  int Directory(StatusSet& statuses) {
+  [[nodiscard]] int Directory(StatusSet& statuses) {
     const std::unique_ptr<DirectoryFound> found = walk_.TakeFound();
     VESK2_TRY(Files(*found, statuses));
     VESK2_TRY(Subdirectories(*found->directory, statuses));
@@ -120,9 +121,9 @@ class FindingTree {
   }
 
  private:
-  int Files(const DirectoryFound& found, StatusSet& statuses);
-  int Subdirectories(BodyDirectory& directory, StatusSet& statuses);
-  int Unlisted(DirectoryFound& found, StatusSet& statuses);
+  [[nodiscard]] int Files(const DirectoryFound& found, StatusSet& statuses);
+  [[nodiscard]] int Subdirectories(BodyDirectory& directory, StatusSet& statuses);
+  [[nodiscard]] int Unlisted(DirectoryFound& found, StatusSet& statuses);
 
   DiskWalk& walk_;
   Findings& findings_;

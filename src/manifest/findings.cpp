@@ -66,7 +66,7 @@ int Findings::AddReason(const FileItem* item, int reason) {
 
 namespace {
 
-int CompareEntries(const void* a, const void* b) {
+[[nodiscard]] int CompareEntries(const void* a, const void* b) {
   const FileItem* const left = static_cast<const Manifest::Reason*>(a)->entry;
   const FileItem* const right = static_cast<const Manifest::Reason*>(b)->entry;
   if (left == right) return 0;

@@ -22,8 +22,8 @@ constexpr size_t kBufferSize = 1024;
 // What a loop that nobody watches tells.
 struct Unwatched {
   size_t Untroubled() const { return SIZE_MAX; }
-  int Read(size_t) { return 0; }
-  int End() { return 0; }
+  [[nodiscard]] int Read(size_t) { return 0; }
+  [[nodiscard]] int End() { return 0; }
 };
 
 // Tells the callbacks about every kTold bytes.
@@ -32,7 +32,7 @@ class Watched {
   explicit Watched(const Vesk2FileCallbacks& callbacks) : callbacks_(callbacks) {}
   // The bytes that can be read before the next call back.
   size_t Untroubled() const { return kTold - untold_; }
-  int Read(size_t count) {
+  [[nodiscard]] int Read(size_t count) {
     untold_ += count;
     return untold_ >= kTold ? End() : 0;
   }

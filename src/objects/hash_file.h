@@ -37,7 +37,7 @@ class FileDigester {
   [[nodiscard]] int MakeReady();
   [[nodiscard]] int DigestOpened(unsigned char* digest, const Vesk2FileCallbacks* callbacks);
   template <typename Watch>
-  int Feed(Watch watch);
+  [[nodiscard]] int Feed(Watch watch);
 
   uint32_t handle_;
   const Vesk2FileCallbacks* callbacks_;

@@ -48,13 +48,14 @@ extern "C" {
 
 // zvclm_HashAlloc starts a hash in *context, which must be null. 0, ZVCLM_ERR_NULL_PARAM,
 // ZVCLM_ERR_UNKNOWN_HASH for an id that is none of ZvclmHashID's, or ZVCLM_ERR_NO_MEM.
-int zvclm_HashAlloc(ZVCLMHashContextData** context, ZvclmHashID id, uint32_t handle);
+[[nodiscard]] int zvclm_HashAlloc(ZVCLMHashContextData** context, ZvclmHashID id, uint32_t handle);
 // zvclm_HashRestart forgets what a context was fed and starts it again. 0, ZVCLM_ERR_NULL_PARAM or
 // ZVCLM_ERR_NO_MEM.
-int zvclm_HashRestart(ZVCLMHashContextData* context, uint32_t handle);
-int zvclm_HashInfo(ZvclmHashID id, ZVCLMHashInfo* info);
+[[nodiscard]] int zvclm_HashRestart(ZVCLMHashContextData* context, uint32_t handle);
+[[nodiscard]] int zvclm_HashInfo(ZvclmHashID id, ZVCLMHashInfo* info);
 // Writes the digest; the context can then only be started again or freed.
-int zvclm_HashFinal(ZVCLMHashContextData* context, unsigned char* digest, uint32_t handle);
+[[nodiscard]] int zvclm_HashFinal(ZVCLMHashContextData* context, unsigned char* digest,
+                                  uint32_t handle);
 void zvclm_HashFree(ZVCLMHashContextData* context, uint32_t handle);
 [[nodiscard]] int zvclm_HashUpdateSlow(ZVCLMHashContextData* context, const unsigned char* data,
                                        size_t length);
@@ -107,7 +108,7 @@ class ZVCLMHashFeed {
   size_t Room() const { return static_cast<size_t>(end_ - next_); }
   void Filled(size_t length) { next_ += length; }
 
-  int Update(const unsigned char* data, size_t length) {
+  [[nodiscard]] int Update(const unsigned char* data, size_t length) {
     constexpr size_t kWord = 4;
     if (length == kWord && static_cast<size_t>(end_ - next_) >= kWord) [[likely]] {
       std::memcpy(next_, data, kWord);

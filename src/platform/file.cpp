@@ -42,14 +42,14 @@ class Descriptor {
 
 // 0 for a regular file. Opening a device can do something by itself, so what is none is not even
 // opened.
-int RequireRegular(const ZvPlace& place) {
+[[nodiscard]] int RequireRegular(const ZvPlace& place) {
   struct stat about {};
   if (place.name == nullptr) return VESK2_ERR_FILE_OPEN;
   if (fstatat(place.directory, place.name, &about, 0) != 0) return OpenError();
   return S_ISREG(about.st_mode) ? 0 : VESK2_ERR_FILE_OPEN;
 }
 
-int OpenNow(Descriptor& out, const ZvPlace& place, int flags) {
+[[nodiscard]] int OpenNow(Descriptor& out, const ZvPlace& place, int flags) {
   constexpr int kAlways = O_NONBLOCK | O_CLOEXEC | O_NOCTTY;
   do {
     out.Reset(openat(place.directory, place.name, flags | kAlways, kFileMode));
@@ -60,7 +60,7 @@ int OpenNow(Descriptor& out, const ZvPlace& place, int flags) {
 
 // Opens a file, waiting for one that is held. Every attempt is made without blocking, and only
 // after a look that it is still a regular file: a FIFO or a device can take its place meanwhile.
-int OpenOrWait(Descriptor& out, const ZvPlace& place, int flags) {
+[[nodiscard]] int OpenOrWait(Descriptor& out, const ZvPlace& place, int flags) {
   int code = OpenNow(out, place, flags);
   if (code != VESK2_ERR_READ_FILE) return code;
   ZvCall call;
@@ -77,7 +77,8 @@ int OpenOrWait(Descriptor& out, const ZvPlace& place, int flags) {
 
 // O_NONBLOCK keeps the open itself from waiting on a FIFO or a device, or for the holder of a
 // lease. What was opened is judged by its descriptor, so nobody can swap it in between.
-int OpenRegular(Descriptor& out, const ZvPlace& place, int flags, struct stat* opened) {
+[[nodiscard]] int OpenRegular(Descriptor& out, const ZvPlace& place, int flags,
+                              struct stat* opened) {
   if (place.name == nullptr) return VESK2_ERR_FILE_OPEN;
   if (const int code = OpenOrWait(out, place, flags)) return code;
   if (fstat(out.get(), opened) != 0) return OpenError();
@@ -85,13 +86,13 @@ int OpenRegular(Descriptor& out, const ZvPlace& place, int flags, struct stat* o
 }
 
 // Opens a file to read that is not listed, or is no longer what it was listed as.
-int OpenAfterLook(Descriptor& out, const ZvPlace& place, struct stat* opened) {
+[[nodiscard]] int OpenAfterLook(Descriptor& out, const ZvPlace& place, struct stat* opened) {
   if (const int code = RequireRegular(place)) return code;
   return OpenRegular(out, place, O_RDONLY, opened);
 }
 
 // What was listed as a file is no link; one that took its place could lead to a device.
-int OpenListed(Descriptor& out, const ZvPlace& place, struct stat* opened) {
+[[nodiscard]] int OpenListed(Descriptor& out, const ZvPlace& place, struct stat* opened) {
   return OpenRegular(out, place, O_RDONLY | O_NOFOLLOW, opened);
 }
 

@@ -177,7 +177,7 @@ class ZvListing {
   // Next gives a name, borrowed until the next call, or null at the end. 0; VESK2_ERR_FIND_DIR for
   // a directory that stopped being readable half-way; VESK2_ERR_MEM_ALLOC.
   [[nodiscard]] int Next(const char** name, ZvKind* kind);
-  int Descriptor() const { return descriptor_; }
+  [[nodiscard]] int Descriptor() const { return descriptor_; }
   void Close();
 
  private:

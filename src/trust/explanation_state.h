@@ -31,7 +31,7 @@ struct ExplanationState {
   bool IsManifest() const { return evidence.GetKind() == Evidence::SignedManifest; }
   // Runs `ask` on each tag that must be granted until it returns anything but 0.
   template <typename Ask>
-  int EachMember(Ask ask) const;
+  [[nodiscard]] int EachMember(Ask ask) const;
   // The code of the first tag that the evidence does not prove.
   [[nodiscard]] int ProveMembers(Evidence& changed) const;
 
@@ -87,23 +87,24 @@ class ExplanationLosses {
   [[nodiscard]] int Find(int code);
 
  private:
-  int Signatures();
-  int Order();
-  int Content();
-  int Revocations();
-  int Certificates();
-  int Link(size_t index);
-  int Conflicts();
-  int Roots();
-  int Root(AclEntry* entry);
-  int Threshold(AclEntry* entry, ThresholdSubject* threshold);
-  int NoEntryAtAll();
-  int NoStore();
-  int Rest();
-  int Unreadable();
-  int TryReduction(int& code, bool isEntry, DExpression* credential);
-  int Period(const Reason& where, const TimeStamp* notBefore, const TimeStamp* notAfter);
-  int Tag(const Reason& where, SExpression* tag);
+  [[nodiscard]] int Signatures();
+  [[nodiscard]] int Order();
+  [[nodiscard]] int Content();
+  [[nodiscard]] int Revocations();
+  [[nodiscard]] int Certificates();
+  [[nodiscard]] int Link(size_t index);
+  [[nodiscard]] int Conflicts();
+  [[nodiscard]] int Roots();
+  [[nodiscard]] int Root(AclEntry* entry);
+  [[nodiscard]] int Threshold(AclEntry* entry, ThresholdSubject* threshold);
+  [[nodiscard]] int NoEntryAtAll();
+  [[nodiscard]] int NoStore();
+  [[nodiscard]] int Rest();
+  [[nodiscard]] int Unreadable();
+  [[nodiscard]] int TryReduction(int& code, bool isEntry, DExpression* credential);
+  [[nodiscard]] int Period(const Reason& where, const TimeStamp* notBefore,
+                           const TimeStamp* notAfter);
+  [[nodiscard]] int Tag(const Reason& where, SExpression* tag);
 
   // A reason of a kind about a certificate, or an entry, and the text that begins with its name.
   static Reason About(Kind kind, size_t cert) {
@@ -141,10 +142,10 @@ class ExplanationPath {
   [[nodiscard]] int Find();
 
  private:
-  int FindEntry();
-  int GrantAlone(bool& granted, AclEntry* entry);
-  int FindCerts();
-  int CanGo(bool& gone, size_t index, size_t second);
+  [[nodiscard]] int FindEntry();
+  [[nodiscard]] int GrantAlone(bool& granted, AclEntry* entry);
+  [[nodiscard]] int FindCerts();
+  [[nodiscard]] int CanGo(bool& gone, size_t index, size_t second);
   void FindEnd();
   void EndsAt(TimeStamp* end, End kind, size_t cert);
 

@@ -39,8 +39,8 @@ namespace {
   return code;
 }
 
-int VerifyFile(const char* path, const char* tagText, time_t notBefore, time_t notAfter,
-               Vesk2ExplanationStruct** out) {
+[[nodiscard]] int VerifyFile(const char* path, const char* tagText, time_t notBefore,
+                             time_t notAfter, Vesk2ExplanationStruct** out) {
   VESK2_REQUIRE(path != nullptr, VESK2_ERR_PARAM_NULL);
   const ZVsysutil::ZvCall call;
   Ref<CertSequence> sequence;

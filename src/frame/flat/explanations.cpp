@@ -25,12 +25,12 @@ uint32_t Number(size_t index) {
 }
 
 // A text that was made; null means that there was no memory for it.
-int Take(char*& out, char* made) {
+[[nodiscard]] int Take(char*& out, char* made) {
   out = made;
   return made != nullptr ? 0 : VESK2_ERR_MEM_ALLOC;
 }
 
-int FillReason(Vesk2ReasonStruct& record, const Explanation::Reason& reason) {
+[[nodiscard]] int FillReason(Vesk2ReasonStruct& record, const Explanation::Reason& reason) {
   record.kind = Explanation::Word(reason.kind);
   record.certificate = Number(reason.cert);
   record.otherCertificate = Number(reason.otherCert);
@@ -39,7 +39,7 @@ int FillReason(Vesk2ReasonStruct& record, const Explanation::Reason& reason) {
   return reason.source != nullptr ? Take(record.source, Wording::OfTag(reason.source)) : 0;
 }
 
-int AddReasons(Vesk2ExplanationStruct& record, const Explanation& explanation) {
+[[nodiscard]] int AddReasons(Vesk2ExplanationStruct& record, const Explanation& explanation) {
   Vesk2ReasonStruct** tail = &record.reasons;
   for (size_t i = 0; i < explanation.CountReasons(); ++i) {
     *tail = TryNew<Vesk2ReasonStruct>();
@@ -50,7 +50,7 @@ int AddReasons(Vesk2ExplanationStruct& record, const Explanation& explanation) {
   return 0;
 }
 
-int AddPath(Vesk2ExplanationStruct& record, const Explanation& explanation) {
+[[nodiscard]] int AddPath(Vesk2ExplanationStruct& record, const Explanation& explanation) {
   if (explanation.GetEntry() == nullptr) return 0;
   VESK2_TRY(Take(record.entry, Wording::OfEntry(explanation.GetEntry())));
   const size_t count = explanation.CountPath();
@@ -66,14 +66,14 @@ int AddPath(Vesk2ExplanationStruct& record, const Explanation& explanation) {
   return 0;
 }
 
-int AddSigner(Vesk2ExplanationStruct& record, const Evidence& evidence) {
+[[nodiscard]] int AddSigner(Vesk2ExplanationStruct& record, const Evidence& evidence) {
   if (evidence.GetKind() != Evidence::SignedManifest) return 0;
   if (evidence.GetSigningTime() != nullptr) record.signedAt = evidence.GetSigningTime()->ToTime();
   if (evidence.CountCerts() == 0 || evidence.GetSignatureCode(0) != 0) return 0;
   return Take(record.signer, Wording::Fingerprint(evidence.GetCert(0)->GetIssuer()));
 }
 
-int Fill(Vesk2ExplanationStruct& record, const Answer& answer) {
+[[nodiscard]] int Fill(Vesk2ExplanationStruct& record, const Answer& answer) {
   record.size = sizeof record;
   record.code = answer.code;
   Explanation explanation(answer.evidence.GetContext());
