@@ -53,8 +53,8 @@ int ManifestReader::Read(ZvBuffer** body) {
 }
 
 void ManifestReader::Publish() {
-  manifest_.version = Ref<SExpression>::Share(version_.get());
-  manifest_.type = Ref<SExpression>::Share(type_.get());
+  manifest_.version = Ref<SExpression>::Share(head_.version.get());
+  manifest_.type = Ref<SExpression>::Share(head_.type.get());
   manifest_.signingTime = Ref<TimeStamp>::Share(signingTime_.get());
 }
 
