@@ -563,7 +563,9 @@ std::vector<Case> FlatCases() {
                 Vesk2CertVerifyFileExplained(W().File("chain"), "install (app mail)", 0, 0, &why);
             const bool fits = why == nullptr || why->code == code;
             Vesk2FreeExplanation(why);
-            return Outcome{code == VESK2_ERR_PACKAGE_NOT_GRANTED ? 0 : code, fits && code != 0};
+            Outcome outcome = Outcome::Of(code, VESK2_ERR_NOT_AUTHORIZED);
+            outcome.outputsFit &= fits;
+            return outcome;
           },
           true),
       Plain(

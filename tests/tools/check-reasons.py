@@ -11,7 +11,7 @@ page = (root / "docs/json.md").read_text()
 rows = re.findall(r"X\((-?\d+), (\w+)", (root / "include/vesk2.h").read_text())
 numbers = {name: number for number, name in rows}
 missing = []
-for source in sorted((root / "tools/vesk2").rglob("*.cpp")):
+for source in [*sorted((root / "tools/vesk2").rglob("*.cpp")), root / "src/frame/errors.cpp"]:
     text = source.read_text()
     for name in set(re.findall(r"\b(?:VESK2|SPKI)_ERR_\w+", text)) & set(numbers):
         word = name.removeprefix("VESK2_ERR_").lower().replace("_", "-")
