@@ -223,8 +223,8 @@ int DiskWalk::Search(DirectoryFound& found) {
   int code = VESK2_ERR_FIND_DIR;
   if (std::strlen(path) <= kLongestPath) code = open->listing.Open(PlaceOf(top_->open, path));
   const bool opened = code == 0;
-  // The root may hold more than the manifest lists (the manifest itself, for one): callers rely on
-  // its not being searched.
+  // The root is not searched: it may hold more than the manifest lists, the manifest itself for
+  // one.
   const bool searched = top_->above != nullptr;
   open->prefix = PrefixOf(*found.directory);
   if (opened) code = List(found, *open, searched);

@@ -14,8 +14,8 @@ namespace {
 using ZVsysutil::zv_read;
 using ZVsysutil::ZvFile;
 
-// The file is read this many bytes a call, into a larger buffer; callers rely on the calls being
-// this small, and the layer below makes them cheap.
+// The file is read this many bytes a call, into a larger buffer; the layer below makes such small
+// calls cheap.
 constexpr size_t kReadSize = 4;
 constexpr size_t kBufferSize = 1024;
 
