@@ -22,6 +22,7 @@
 //   BodyObject               an entry of that list: BodyFile, BodyDirectory     manifest_body.h
 //   ManifestWriter           makes one, up to the signatures                    manifest_writer.h
 //   Evidence                 what a verification read and found                 evidence.h
+//   Explanation              why its answer is what it is                       explanation.h
 //
 // and beside them Ref, which owns a reference (ref.h), ZvBuffer, from which everything is read, and
 // crypto keys (platform.h), PointerArray (pointer_array.h), the two reductions (verify.h), the
@@ -35,8 +36,8 @@
 // What a program may rely on are the functions, static or not, and the virtual slots of these
 // classes. What an object holds and how it is laid out is nobody's to know: values are made with
 // new, which asks the library, and freed with Free. Of what may lie in a program's own memory
-// (Manifest, ManifestWriter, Evidence, the body classes, PointerArray, Ref, Iterator) the size
-// stays as well. No class is to be derived from.
+// (Manifest, ManifestWriter, Evidence, Explanation, the body classes, PointerArray, Ref, Iterator)
+// the size stays as well. No class is to be derived from.
 #ifndef VESK2_HPP
 #define VESK2_HPP
 

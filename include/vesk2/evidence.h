@@ -124,7 +124,7 @@ class VESK2_API Evidence {
   // Size is about how many bytes one Judge works on, GetWork what the last reduction cost (see
   // Verify::WorkDone): what a further question about the same may cost.
   size_t Size() const;
-  uint64_t GetWork() const { return work; }
+  uint64_t GetWork() const;
 
  private:
   struct Link;

@@ -164,6 +164,7 @@ TimeStamp* Evidence::GetSigningTime() const { return signingTime.get(); }
 int Evidence::GetContentCode() const { return contentCode; }
 int Evidence::GetListingCode() const { return listingCode; }
 size_t Evidence::GetListingPosition() const { return listingPosition; }
+uint64_t Evidence::GetWork() const { return work; }
 bool Evidence::AskedAboutSigning() const { return kind == SignedManifest && !first && !last; }
 
 }  // namespace ZvVesk2
