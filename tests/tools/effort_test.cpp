@@ -11,7 +11,7 @@ namespace {
 Ref<ZvVesk2::Cert> LongCert() {
   const std::string hash = "(4:hash6:sha25632:" + std::string(32, 'h') + ")";
   const Buffer buffer = WrapBytes("(4:cert(6:issuer" + hash + ")(7:subject" + hash + ")(7:comment" +
-                                  Atom(std::string(8000, 'c')) + "))");
+                                  "8000:" + std::string(8000, 'c') + "))");
   Ref<ZvVesk2::Cert> cert(new ZvVesk2::Cert(nullptr));
   EXPECT_EQ(cert->Import(buffer.get()), 0);
   return cert;
