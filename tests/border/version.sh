@@ -10,4 +10,5 @@ names() {
 version=$2 faults=0
 names '## ' CHANGELOG.md
 names '__version__ = "' bindings/python/vesk2/__init__.py
+names 'vesk2 \(' debian/changelog
 exit $faults
