@@ -191,13 +191,13 @@ class Answer {
     const std::vector<Finding> findings = FindInTree(manifest_, AboutTree(options_));
     const std::string summary = Summary(findings);
     Keep(code_ == 0 && summary.empty());
-    TellFindings(findings, AboutTree(options_), manifest_);
     if (code_ != 0 || !summary.empty()) return RefuseTree(findings, summary);
     const bool aboutSigning = today_ || options_.at == kSigning;
     const ExitCode verdict = Yes(std::to_string(CountFiles(manifest_.GetValid())) + " files of " +
                                  Escape(options_.directory) + " are as signed at " + signedAt +
                                  " by " + Fingerprint(*proved_.GetCert(0)->GetIssuer()) +
                                  (aboutSigning ? EndedSince(proved_) : ""));
+    TellFindings(findings, AboutTree(options_), manifest_);
     if (options_.explain || GetStyle().json) TellGrant();
     return verdict;
   }
@@ -213,6 +213,7 @@ class Answer {
     int code = code_;
     if (code == 0 && Found(findings, kUnlisted)) code = VESK2_ERR_EXTRA_FILES;
     const ExitCode verdict = code != 0 ? No(code, summary) : No("link-leaves-tree", summary);
+    TellFindings(findings, AboutTree(options_), manifest_);
     if (GetStyle().json) TellGrant();
     if (code != 0) ExplainTree(question_);
     return verdict;
