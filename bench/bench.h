@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The figures of this system, each beside a yardstick that was measured in the same run: the
 // smallest honest program that does the same work (bench/floor/), or what people use today.
 //

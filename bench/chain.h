@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Chains of certificates, and stores that trust their root.
 #ifndef VESK2_BENCH_CHAIN_H
 #define VESK2_BENCH_CHAIN_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Verifying chains of certificates.
 #include <openssl/core_names.h>
 #include <openssl/evp.h>

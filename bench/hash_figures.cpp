@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Hashing files.
 #include <vesk2/hash.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Measures the figures and prints one table of them.
 #include <cstdio>
 #include <exception>

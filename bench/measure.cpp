@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Measuring: times by turns, system calls and memory in a process of its own.
 #include <sys/ptrace.h>
 #include <sys/resource.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Other programs, and directories for inputs.
 #include <fcntl.h>
 #include <sys/wait.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Looking through stores of many entries.
 #include <sys/stat.h>
 #include <vesk2.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Making and verifying trees.
 #include "bench/tree.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A signed tree of many files, on disk.
 #ifndef VESK2_BENCH_TREE_H
 #define VESK2_BENCH_TREE_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Verifying trees of many files.
 #include <thread>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Each input runs in a process of its own: its seconds are the processor time of that process (and
 // of the command, where one runs) from the finished text on, its memory the most that it held.
 #include "bench/worst.h"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // How long the worst inputs hold the machine, and how much of it.
 #ifndef VESK2_BENCH_WORST_H
 #define VESK2_BENCH_WORST_H

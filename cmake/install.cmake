@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 # What a packager and a program that links the library find below the prefix, wherever that is moved to.
 include(CMakePackageConfigHelpers)
 

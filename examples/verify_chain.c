@@ -1,3 +1,4 @@
+/* SPDX-License-Identifier: Apache-2.0 */
 /* verify_chain: reads a certificate sequence, shows what each certificate says, and asks whether
  * the chain grants an authorization now, on this machine. A C program that uses vesk2.h alone.
  *

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // verify_tree: asks whether a directory is exactly what its signed manifest says, by a signer who
 // may say so on this machine, and names what differs. A C++ program over the exported classes.
 //

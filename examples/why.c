@@ -1,3 +1,4 @@
+/* SPDX-License-Identifier: Apache-2.0 */
 /* why: asks about a chain of certificates now, or about a signed directory, and tells why the
  * answer is what it is and until when it holds. A C program that uses vesk2.h alone.
  *

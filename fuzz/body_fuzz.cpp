@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The manifest body: parsed, and compared with itself, every entry must come out valid.
 #include "fuzz/fuzz_support.h"
 

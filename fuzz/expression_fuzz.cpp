@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The four readers of expressions. What the buffer reader accepts must print to a text that reads
 // back to itself; what the others accept must be writable.
 #include "fuzz/fuzz_support.h"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What the fuzz targets share: a buffer over the input, the printed form of an expression, and a
 // check that stays on in every build.
 #ifndef VESK2_FUZZ_SUPPORT_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A whole manifest file, read with the chain's verification against empty stores: never accepted,
 // never a crash.
 #include <sys/mman.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The readers of typed objects. An accepted object must print to a text that reads back to itself.
 #include "fuzz/fuzz_support.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The reduction engine: an ACL, a sequence and a request, one after the other in the input.
 // Whatever they hold, the answer comes in bounded time; a granted tag lies within itself and a tag
 // is within "(*)".

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Runs a fuzz target over the files given, so that every test run replays the corpora without
 // libFuzzer.
 #include <cstdint>

@@ -1,3 +1,4 @@
+/* SPDX-License-Identifier: Apache-2.0 */
 /* vesk2.h: the flat interface of libvesk2.
  *
  * libvesk2 answers, offline, whether signed objects are to be trusted: is this directory exactly

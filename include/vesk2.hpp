@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // vesk2.hpp: everything that libvesk2 exports, the flat functions and the classes of ZvVesk2.
 //
 // The classes, each under the one that it derives from:

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Hashes and signatures.
 #include <openssl/core_names.h>
 #include <openssl/evp.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Files and directories.
 #include <dirent.h>
 #include <fcntl.h>

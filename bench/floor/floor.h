@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The smallest honest programs that do the work of the figures: the same bytes read by the same
 // kinds of system calls, the same hashes and signature checks by libcrypto, and nothing else. They
 // take no care of hostile input.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // acl_entry.h: AclEntry, a trust root: it grants a tag to a subject by being in the store of this
 // machine.
 //

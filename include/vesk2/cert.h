@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // cert.h: Cert, an authorization certificate: an issuer grants a subject what a tag describes.
 //
 //   (cert [(version 1)] (issuer <principal>) (subject <subject>) [(propagate)] [<tag>]

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // cert_sequence.h: CertSequence, the chain that a requester presents:
 //
 //   (sequence <certificate> <signature> <expression> <certificate> <signature> <expression> ...)

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // context.h: the store roots, the version and the texts of error codes, for callers of the classes.
 #ifndef VESK2_CONTEXT_H
 #define VESK2_CONTEXT_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // crl.h: Crl, a revocation list, and CrlSequence, the form in which one travels and is stored: the
 // list, a certificate whose subject is the list's hash, and the issuer's signature over that
 // certificate.

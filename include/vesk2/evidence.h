@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // evidence.h: Evidence, what a verification of a manifest or of a chain read and what it found, and
 // what the answer would be if some of it were different.
 //

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // explanation.h: Explanation, why an answer about authority is what it is: of a no the reasons, the
 // first place where authority was lost first; of a yes the certificates and the entry that it rests
 // on, until when it holds and what ends it.

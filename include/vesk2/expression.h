@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // expression.h: the value model. Every object of the library is an S-expression: a byte string
 // (ByteString) or a list (SExpression), both counted DExpressions.
 //

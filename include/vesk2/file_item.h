@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // file_item.h: making and deleting FileItem records (vesk2.h).
 #ifndef VESK2_FILE_ITEM_H
 #define VESK2_FILE_ITEM_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // hash.h: Hash, the principal (hash <algorithm> <digest>) that names a key or any object by its
 // digest, and the computation of such digests. Algorithms: sha1, sha256, rmd160.
 #ifndef VESK2_HASH_H

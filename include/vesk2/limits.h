@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // limits.h: every bound that the library puts on its input, each with the attack that it stops.
 //
 // All limits are on by default and none can be switched off: the bytes that they guard against come

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // manifest.h: Manifest, a signed file that lists a directory tree:
 //
 //   (manifest (version "1" <text>) (type "plain")

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // manifest_body.h: the body of a manifest, a directory tree with the SHA-256 of every file:
 //
 //   (body (random-token <4 bytes>) <entry>...)

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // manifest_writer.h: ManifestWriter, which makes a manifest up to the signatures: the library holds
 // no private key. Whoever holds one asks for the digest, issues a certificate for it, and hands the
 // certificates in.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // platform.h: what a caller of the exported classes needs of the layer beneath them: the buffer
 // that every Import reads from, and crypto key objects for PublicKey::SetRSA and SetDSA.
 //

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // pointer_array.h: PointerArray<T>, a growable array of owned pointers with a cursor.
 #ifndef VESK2_POINTER_ARRAY_H
 #define VESK2_POINTER_ARRAY_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // public_key.h: PublicKey, the principal that is an RSA or DSA key.
 //
 //   (public-key (rsa (e <e>) (n <n>)))

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // ref.h: Ref<T>, the owner of one reference to a counted value.
 #ifndef VESK2_REF_H
 #define VESK2_REF_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // signature.h: Signature, (signature <hash> <principal> (<algorithm> <value>)): what was signed, by
 // whom, and the signature itself.
 #ifndef VESK2_SIGNATURE_H

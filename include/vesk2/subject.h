@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // subject.h: who authority is granted to. A Subject is a principal or a k-of-n threshold; a
 // Principal (a key, or the hash of one) can also sign.
 #ifndef VESK2_SUBJECT_H

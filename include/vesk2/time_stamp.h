@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // time_stamp.h: TimeStamp, a moment as the text "YYYY-MM-DD_hh:mm:ss" in UTC, 19 characters. Stamps
 // are compared as text.
 #ifndef VESK2_TIME_STAMP_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // verify.h: the two reductions, which decide what a chain of credentials grants.
 //
 // Results are library codes or, negative, the engine's SPKI_ERR_* codes (texts: V2SpkiError). One

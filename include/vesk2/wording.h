@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // wording.h: what people are told about objects: texts that are safe for a terminal, whoever wrote
 // the object. This library's own explanations use them too.
 //

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What a reduction may spend, and the price of all that it does: this page is the cost model.
 //
 // Certificates that an attacker signs for keys of his own multiply tuples, names and tags without

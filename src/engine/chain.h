@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Reading chains: what stands at an element, null or -1 when it is something else.
 #ifndef VESK2_SRC_ENGINE_CHAIN_H
 #define VESK2_SRC_ENGINE_CHAIN_H

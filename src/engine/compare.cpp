@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Order of byte strings, and equality of atoms.
 //
 // The order sees a 0 byte as the end: a string with an embedded 0 equals its beginning. Stored

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Digests over the platform's hashes, with its results folded into the engine's codes.
 #include "src/engine/digest.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A running hash that canonical text is fed to piece by piece: principals and names are known by
 // the digests of their canonical forms.
 #ifndef VESK2_SRC_ENGINE_DIGEST_H

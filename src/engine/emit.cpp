@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The result: one entry for each grant of the ACL that reaches the requester, newest first.
 //
 //   (acl (entry (subject <key>) [(propagate)] (tag ...)

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Credentials:
 //
 //   (entry <field>...)     a grant of the ACL itself, without an issuer

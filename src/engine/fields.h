@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The fields of one credential, read into a tuple.
 #ifndef VESK2_SRC_ENGINE_FIELDS_H
 #define VESK2_SRC_ENGINE_FIELDS_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Insertion of tuples: the stack, and what happens to a tuple whose subject is a principal.
 //
 // A grant from I to S is combined with what I received (someone grants to I, I grants to S) once it

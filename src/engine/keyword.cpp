@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Keywords and their numbers. The table prints every number that tags and credentials have ever
 // used; the recogniser knows fewer words, and all others stay ordinary strings.
 #include <array>

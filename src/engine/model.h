@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The engine's own expression model: reference-counted nodes parsed from canonical bytes, keywords
 // known by number, and the pools that nodes are taken from and returned to.
 //

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Names: (issuer (name K N)) defines what N means below K, (subject (name K N N2...)) uses it.
 // Definitions and uses wait for each other under the digest of K and N, whichever comes first.
 #include "src/engine/budget.h"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // References to engine records that are held for a scope. `release()` of one moves the reference
 // into a slot.
 #ifndef VESK2_SRC_ENGINE_OWNED_H

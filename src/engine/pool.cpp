@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The pool: blocks of the caller's allocator on a ring, and the state's start and stop.
 #include "src/engine/pool.h"
 

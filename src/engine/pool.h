@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Where the engine's memory comes from: one pool for each engine, made in a record that the
 // caller's allocator gives. Destroying the pool frees whatever is still allocated from it, so no
 // path through the engine can leak.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The principal table:
 //
 //   (public-key ...)              known by the SHA-256 and the SHA-1 digest of its canonical form

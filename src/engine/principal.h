@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Principals: who issues and who receives grants. A key and its hashes are one principal, found by
 // the SHA-256 digest of the key's canonical form, by its SHA-1 digest, or by a hash that no known
 // key has.

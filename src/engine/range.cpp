@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Ranges: whether a string lies in one, and how they relate to prefixes and to each other.
 #include "src/engine/budget.h"
 #include "src/engine/chain.h"

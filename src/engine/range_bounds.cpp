@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The bounds that two ranges, or a range and a prefix, leave: the tightest of both, each with the
 // input that it came from.
 #include <algorithm>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A new (* range ordering (operator value)...) from the bounds that are left.
 #include "src/engine/tag_forms.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Atoms and elements: made, counted, stored, and returned to their free lists.
 #include <cstring>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The reduction: keys are registered, credentials become tuples one after the other, and what the
 // ACL has come to grant is written out.
 #include "src/engine/reduce.h"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Tuple reduction: ACL entries and certificates become 5-tuples (issuer, subject, propagate, tag,
 // validity), which are combined until it is known which grants of the ACL reach the requester.
 #ifndef VESK2_SRC_ENGINE_REDUCE_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // One reduction under way, and the insertions that it consists of.
 //
 // Inserting a tuple may make others, which are inserted before it is done with: as in a recursion,

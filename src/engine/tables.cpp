@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Lists of tuples and tables by digest.
 #include "src/engine/tables.h"
 

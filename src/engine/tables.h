@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Where tuples and principals are found again: lists of tuples, and tables by digest.
 #ifndef VESK2_SRC_ENGINE_TABLES_H
 #define VESK2_SRC_ENGINE_TABLES_H

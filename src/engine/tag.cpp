@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The relation of two tags, element by element and list by list.
 #include "src/engine/tag.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Tag algebra: how two authorization tags relate, and the tag that allows what both allow.
 //
 // "(*)" allows everything, (* set ...) what a member allows, (* prefix ...) and (* range ...)

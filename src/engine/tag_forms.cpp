@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The star forms, seen from outside and inside, and the elements that results are made of.
 #include "src/engine/tag_forms.h"
 

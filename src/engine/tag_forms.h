@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What the parts of the tag algebra share: looking into the star forms, and making elements.
 //
 //   (*)   (* set member...)   (* prefix string)   (* range ordering (operator value)...)

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Intersection of lists and elements.
 #include "src/engine/chain.h"
 #include "src/engine/tag_forms.h"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Intersection of a set with anything: what each member has in common with it.
 #include <utility>
 

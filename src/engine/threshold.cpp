@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Expansion and collection of k-of-n subjects:
 //
 //   (k-of-n k n S1 ... Sn), k and n big-endian numbers of 1 to 3 bytes, 0 < k <= n

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // k-of-n subjects: a grant that k of n subjects must pass on to the same principal.
 #ifndef VESK2_SRC_ENGINE_THRESHOLD_H
 #define VESK2_SRC_ENGINE_THRESHOLD_H

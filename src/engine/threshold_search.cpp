@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The choice of k members. Positions are taken in increasing order and every choice is cut off as
 // soon as its tags or periods have nothing in common; what is left may still be exponential, so it
 // is bounded, and a search that is too long is an error of its own.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Tuples: made, counted, filed and combined.
 #include "src/engine/tuple.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // 5-tuples: what one credential, or a chain of them, grants. (issuer, subject, propagate, tag,
 // validity), with the names and thresholds that are still in between.
 #ifndef VESK2_SRC_ENGINE_TUPLE_H

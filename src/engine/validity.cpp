@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Narrowing of periods:
 //
 //   constraint = (not-before d) / (not-after d) / (valid *(d / constraint))

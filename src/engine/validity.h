@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Periods of validity. Dates are compared as byte strings: "####-##-##_##:##:##" orders by time,
 // anything else as it happens to.
 #ifndef VESK2_SRC_ENGINE_VALIDITY_H

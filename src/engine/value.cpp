@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Values by digest. A derived tag may hold the same part many times over, each nesting doubling it,
 // so what is walked through is charged piece by piece: written out, such a tag has no end.
 #include "src/engine/value.h"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Digests that stand for values: what a key and a name are known by, and what makes two tuples
 // equal.
 #ifndef VESK2_SRC_ENGINE_VALUE_H

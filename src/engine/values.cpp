@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Values of the five orderings: which texts are numbers, times and dates, and how they order.
 //
 //   time = hh [ ":" mm [ ":" ss ] ]

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The canonical writer:
 //
 //   list = "(" 1*( atom / list ) ")"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The canonical form of a chain, given out in pieces. Principals are identified by its digest and
 // results leave the engine in it, so there is one writer for both.
 #ifndef VESK2_SRC_ENGINE_WRITE_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Propagation of error codes. Every operation of the library returns an int code, 0 for success;
 // these two helpers and a plain `return code` are the only ways a failure travels.
 #ifndef VESK2_SRC_FRAME_CHECK_H

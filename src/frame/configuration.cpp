@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The two store roots. They are process-wide because every object of a process lives in the same
 // stores.
 #include <vesk2/context.h>

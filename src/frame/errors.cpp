@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Version and error texts. The tables in vesk2.h hold number, name and text of every code; this
 // file only looks things up in them.
 #include <vesk2/context.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Records of file names. Each gives its name in both string forms, because callers of the ASCII
 // functions and of the others read the same lists.
 #include <vesk2/file_item.h>

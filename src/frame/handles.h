@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Owners of platform handles, so that no error path releases one by hand.
 #ifndef VESK2_SRC_FRAME_HANDLES_H
 #define VESK2_SRC_FRAME_HANDLES_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The objects of a manifest body: what a file and a directory of the tree carry, and their order.
 #include <algorithm>
 #include <cstring>

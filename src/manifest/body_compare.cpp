@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The comparison of two bodies, without the disk.
 #include <vesk2/manifest.h>
 #include <vesk2/manifest_body.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // See body_disk.h.
 #include "src/manifest/body_disk.h"
 

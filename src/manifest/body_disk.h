@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The walk through a listed tree on disk: what the directories say of their entries, and the listed
 // files that are to be hashed, a few at a time.
 //

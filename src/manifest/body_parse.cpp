@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The reader of manifest bodies:
 //
 //   (4:body(12:random-token<4 bytes>)<entry>...)

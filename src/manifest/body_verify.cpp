@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The comparison of a body with a directory on disk.
 //
 // A listed file counts by its contents alone: links are followed, and what is no regular file is

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Recording findings, and handing them to the manifest's four lists.
 #include "src/manifest/findings.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What a comparison found, and the code that a set of findings amounts to.
 #ifndef VESK2_SRC_MANIFEST_FINDINGS_H
 #define VESK2_SRC_MANIFEST_FINDINGS_H

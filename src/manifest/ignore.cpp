@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Matching of ignored names.
 #include "src/manifest/ignore.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The test of names against the list of names that a directory ignores: a forward merge, so each
 // sequence of names that is asked in ascending order needs a walk of its own.
 #ifndef VESK2_SRC_MANIFEST_IGNORE_H

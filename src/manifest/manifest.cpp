@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The manifest object: its settings, and the order of work of the two verifications.
 #include <vesk2/manifest.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The reader of manifest files:
 //
 //   (8:manifest(7:version1:1<text>)(4:type5:plain)

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // ManifestReader: one reading of one manifest file. It works on its own references and touches the
 // manifest's version, type and signing time only when everything held: what callers read from those
 // is always what was proved. Only who asks for the evidence of a manifest whose authority is not to

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The writer of manifest files; manifest_reader.cpp and body_parse.cpp hold the form that they
 // have.
 #include <vesk2/manifest_writer.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // PointerArray: the growable arrays of a manifest body. Callers see a capacity that grows by a
 // fixed step; memory that did would be copied once for every 32 files of a directory.
 #include <vesk2/pointer_array.h>

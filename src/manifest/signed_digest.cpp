@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // See signed_digest.h.
 #include "src/manifest/signed_digest.h"
 

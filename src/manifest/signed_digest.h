@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The digest that a manifest's signer signs, for its reader and its writer.
 #ifndef VESK2_SRC_MANIFEST_SIGNED_DIGEST_H
 #define VESK2_SRC_MANIFEST_SIGNED_DIGEST_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What every reader and builder of a typed object does: read a part into a new value, and hand it
 // to a list. References travel as Ref, so that a part that was not appended is freed on every path.
 #ifndef VESK2_SRC_OBJECTS_BUILD_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Cert: reading an authorization certificate and building one from parts.
 #include <vesk2/cert.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Hash::DumpFingerprint: the line that people compare by eye.
 #include <vesk2/hash.h>
 

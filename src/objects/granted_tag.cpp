@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // See granted_tag.h.
 #include "src/objects/granted_tag.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The reduction's answer is canonical text that looks like a list of ACL entries. It is read here,
 // below both who makes it (engine/interface) and who offers the reader to callers (AclEntry).
 #ifndef VESK2_SRC_OBJECTS_GRANTED_TAG_H

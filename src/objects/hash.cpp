@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Hash: a digest as a principal, and the running computation of one.
 #include <vesk2/hash.h>
 

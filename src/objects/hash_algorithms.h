@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The three hash algorithms, as identifier, name in expressions and digest length. Everything that
 // is not in this table is refused.
 #ifndef VESK2_SRC_OBJECTS_HASH_ALGORITHMS_H

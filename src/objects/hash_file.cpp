@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Hash::HashFile: the SHA-256 of a file, the loop that most of a manifest's verification time goes
 // through.
 #include "src/objects/hash_file.h"

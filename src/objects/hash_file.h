@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The digest of a file as the comparison of a tree asks for it.
 #ifndef VESK2_SRC_OBJECTS_HASH_FILE_H
 #define VESK2_SRC_OBJECTS_HASH_FILE_H

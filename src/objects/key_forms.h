@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The two kinds of key, as tables: which numbers a key has, how they are called and ordered in
 // expressions, and where the crypto layer's records hold them.
 #ifndef VESK2_SRC_OBJECTS_KEY_FORMS_H

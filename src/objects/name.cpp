@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Name: a subject that programs build and that is never read from text. (Its canonical form begins
 // like a hash, and the readers take it for one.)
 #include <vesk2/subject.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // PublicKey: a key as an expression and as a key object of the crypto layer; reading and building
 // it.
 #include <vesk2/public_key.h>

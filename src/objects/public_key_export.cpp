@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // PublicKey: the key in the encodings of other programs.
 #include <memory>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // PublicKey: checking signatures over expressions and over the raw blocks of the mobile format.
 #include <cstring>
 #include <memory>

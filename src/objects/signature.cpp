@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Signature: what was signed, by whom, and the signature bytes.
 #include <vesk2/cert.h>
 #include <vesk2/signature.h>

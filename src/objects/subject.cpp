@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Subject and Principal: the choice of a class by the first two characters of the text.
 #include <vesk2/subject.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // ThresholdSubject: any k of n keys.
 #include <vesk2/public_key.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // TimeStamp: the fixed-width text of a moment, which sorts as text.
 #include <vesk2/time_stamp.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Big integers: unsigned, big-endian, written without leading zeros. Zero is one 0 byte, because an
 // empty byte string could not be read back everywhere.
 #include <climits>

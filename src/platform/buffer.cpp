@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // ZvBuffer: the one bounded cursor that every reader of canonical text is built on. Nothing else
 // moves a read position.
 #include <algorithm>

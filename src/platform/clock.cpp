@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Calendar arithmetic on the proleptic Gregorian calendar, by <chrono>: the process's time zone and
 // the C library's global state never enter a date that decides a verdict.
 #include "src/platform/clock.h"

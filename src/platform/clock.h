@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Calendar time in UTC, never the process's time zone.
 #ifndef VESK2_SRC_PLATFORM_CLOCK_H
 #define VESK2_SRC_PLATFORM_CLOCK_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Hashes, keys and signature checks over libcrypto's EVP interfaces: the functions of the crypto
 // layer that callers of the library do not need. The others are in vesk2/platform.h.
 //

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // ZvListing: the entries of one directory as the disk has them. ZvDir: the names of one directory,
 // all read and sorted when it is opened.
 #include <dirent.h>

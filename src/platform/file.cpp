@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Opening, reading, writing and testing files.
 #include "src/platform/file.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Files and directories over POSIX. Only regular files are opened for reading: a FIFO, socket or
 // device in a tree that is being judged must neither block nor feed us without end.
 //

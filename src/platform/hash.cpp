@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Hashes: a block in front of libcrypto, so that many small updates cost about as much as a few
 // large ones.
 #include <openssl/evp.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Key records and keys. Both kinds go the same road: a record is a row of numbers behind two marks.
 #include "src/platform/key.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What a key and a number are inside, for the files that define, export and use them.
 #ifndef VESK2_SRC_PLATFORM_KEY_H
 #define VESK2_SRC_PLATFORM_KEY_H

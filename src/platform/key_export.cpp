@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Keys in two formats that other programs read: DER SubjectPublicKeyInfo, and the binary SSH blob
 //   string "ssh-rsa", mpint e, mpint n
 //   string "ssh-dss", mpint p, mpint q, mpint g, mpint y

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A lock among the threads of a caller; the library itself has none.
 #ifndef VESK2_SRC_PLATFORM_LOCK_H
 #define VESK2_SRC_PLATFORM_LOCK_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Owners of libcrypto's objects, and what the files over libcrypto share.
 #ifndef VESK2_SRC_PLATFORM_OPENSSL_H
 #define VESK2_SRC_PLATFORM_OPENSSL_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // See replace.h.
 #include "src/platform/replace.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Writing a file whole or not at all: its bytes go to a temporary file beside it, which takes its
 // place when they are on the disk.
 //

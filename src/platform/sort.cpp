@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A stable sort: names that compare equal keep the order in which they were found, whatever the C
 // library's own sort does with them.
 #include <cstring>

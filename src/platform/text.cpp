@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Copies, conversions, joins and number scanning over 0-terminated bytes. Nothing here throws or
 // aborts: text that cannot be copied for lack of memory is null.
 #include "src/platform/text.h"

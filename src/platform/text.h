@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Text, paths and sorting of the platform layer. On Linux the file-name string is a byte string, so
 // the conversions copy; they are kept because callers hold and free both forms separately.
 //

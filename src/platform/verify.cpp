@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Signature checks. The answer is "not valid" until libcrypto says otherwise, in one place.
 //
 // libcrypto answers a bad signature and a lack of memory alike, with "no". Taken for "not valid",

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // See wait.h.
 #include "src/platform/wait.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Waiting for files that other processes hold.
 //
 // A process can hold a lease on a file (file servers do); opening it without blocking fails until

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Steps shared by the readers of the advanced form. The text ends with a 0 byte, which no step
 // passes.
 #ifndef VESK2_SRC_SEXPR_ADVANCED_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // ByteString, an atom: bytes with a display hint, and the rule by which its array is reused.
 #include <vesk2/expression.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The advanced form of a byte string: a bare run of bytes without white space or parentheses. What
 // is written is the bytes as they are, so it need not read back.
 #include <vesk2/expression.h>

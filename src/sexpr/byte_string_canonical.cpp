@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The canonical form of a byte string:
 //
 //   <length in decimal> ":" <bytes>                 in memory and in lengths

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Character classes of the encodings. They are those of the C locale whatever locale the host has
 // set: what a stored text means must not depend on it.
 #ifndef VESK2_SRC_SEXPR_CHARS_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What byte strings and lists have in common: counting, equality, digests, and the literal match of
 // the memory readers.
 #include <vesk2/expression.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // SExpression as a list: nodes, and who owns the elements. A list takes over the reference of what
 // is inserted and hands it back with what is removed.
 #include <vesk2/expression.h>

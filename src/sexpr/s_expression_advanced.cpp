@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Lists in advanced form, the text that people type and read:
 //
 //   "(" <token> { <white space> ( <token> | <list> ) } <white space> ")"

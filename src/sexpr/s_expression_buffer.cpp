@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Lists read from a buffer or a file:
 //
 //   "(" { <byte string, hint allowed> | <list> } ")"

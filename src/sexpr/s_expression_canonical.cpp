@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Lists in canonical form, "(" elements ")", written, measured and hashed.
 #include <vesk2/expression.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Lists read from canonical bytes in memory:
 //
 //   "(" <byte string> { <white space> ( <byte string> | <list> ) } <white space> ")"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Equality of values for callers that must tell "different" from "could not be compared".
 #ifndef VESK2_SRC_SEXPR_SAME_H
 #define VESK2_SRC_SEXPR_SAME_H

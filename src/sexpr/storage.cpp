@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Objects as files: where an object of a class lies, and writing it there.
 //
 //   <root>/<directory>/<base name><extension>    in a store

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Where objects are stored, for the library's own use: unlike SExpression::CalcDir and CalcPath,
 // these tell why there is no such place, and make no directory. A look at a store leaves it as it
 // is.

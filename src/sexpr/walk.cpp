@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Depth-first steps with an explicit stack of Limits::kMaxDepth frames.
 #include "src/sexpr/walk.h"
 

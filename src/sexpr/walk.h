@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The one walk over a list and all lists within it. Every operation on a whole expression (hashing,
 // measuring, writing, comparing) is a loop over its steps, so none of them recurses: readers bound
 // how deeply lists nest, but a caller can insert list into list without end.

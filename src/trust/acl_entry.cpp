@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // AclEntry: building one entry, and reading it from canonical text.
 #include <vesk2/acl_entry.h>
 

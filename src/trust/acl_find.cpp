@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The questions that are put to the ACL store. All of them walk its files in the same way, hold one
 // entry at a time, and let the first accepted one decide; they differ in what they accept.
 #include <vesk2/acl_entry.h>

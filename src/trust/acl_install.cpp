@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Installing trust roots: copying into the store what it lacks.
 #include <vesk2/acl_entry.h>
 

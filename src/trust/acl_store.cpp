@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Loading entries from files: one, or every one of the store.
 #include <vesk2/acl_entry.h>
 

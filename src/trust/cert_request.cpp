@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // CertRequest: a certificate sequence in a ".req" file, outside every store.
 #include <vesk2/cert_sequence.h>
 

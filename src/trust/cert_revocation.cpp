@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What a certificate asks of the trust store: whether it was revoked; and a trust root seen as a
 // certificate.
 #include <vesk2/cert.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // CertSequence: reading a chain of certificates, whole, triple by triple, or only its first triple.
 #include <vesk2/cert_sequence.h>
 

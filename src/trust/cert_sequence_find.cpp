@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // CertSequence: looking for a stored chain by what its first certificate grants.
 #include <vesk2/cert_sequence.h>
 

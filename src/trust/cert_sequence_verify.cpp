@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // CertSequence: whether a chain proves that a subject holds a tag. The first failure is the answer.
 //
 // Each stage works on an Evidence, which judges; the stages load into it what they need, afresh.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // CertSequence: what a chain grants when the certificates that fail are left out of it.
 #include <vesk2/acl_entry.h>
 #include <vesk2/cert_sequence.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // See chain.h.
 #include "src/trust/chain.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What the two ways of verifying a sequence share: walking its triples, asking the stores about its
 // certificates, and copying them for the reduction.
 #ifndef VESK2_SRC_TRUST_CHAIN_H

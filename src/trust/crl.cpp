@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Crl: reading one revocation list and writing its fields back as a list.
 #include <vesk2/crl.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Making revocation lists: the unsigned list, and the sequence once somebody has signed for it.
 #include <vesk2/crl.h>
 

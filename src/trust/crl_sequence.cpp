@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // CrlSequence: reading one, and proving it against the trust roots.
 #include <vesk2/crl.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Asking revocation lists whether an object was revoked.
 #include <vesk2/crl.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Loading revocation lists: those of the sources that the trust roots name from the store, and
 // those of a directory.
 #include <vesk2/crl.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // See crl_update.h.
 #include "src/trust/crl_update.h"
 

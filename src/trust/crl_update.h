@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The CRL store: one file for each source of revocation lists that the trust roots name, holding
 // the newest list that verified.
 #ifndef VESK2_SRC_TRUST_CRL_UPDATE_H

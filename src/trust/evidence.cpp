@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Evidence: what a verification read, and changes to it. Judging it: evidence_judge.cpp.
 #include <vesk2/evidence.h>
 

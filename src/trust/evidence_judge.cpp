@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Evidence: what the certificates, entries and lists that were read come to.
 #include <vesk2/evidence.h>
 

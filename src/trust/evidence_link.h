@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // One certificate of an Evidence, with what was found about it.
 #ifndef VESK2_SRC_TRUST_EVIDENCE_LINK_H
 #define VESK2_SRC_TRUST_EVIDENCE_LINK_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Explanation: the question, what it may cost, and what was found. Reasons: explanation_losses.cpp;
 // the way of a yes: explanation_path.cpp.
 #include <vesk2/explanation.h>

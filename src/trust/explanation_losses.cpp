@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Explanation: where authority was lost on its way from the entries to the end of a chain. Each
 // step puts one question to every certificate or entry; the code tells which can have led to it.
 #include <vesk2/limits.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Explanation: by which way authority came. One entry is enough for most answers, and most of a
 // chain is needed: the entry is found by letting each grant alone, and the certificates by leaving
 // out each of them. The library's own rules judge what is left.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What an Explanation holds: the question, what may still be spent, and what was found.
 #ifndef VESK2_SRC_TRUST_EXPLANATION_STATE_H
 #define VESK2_SRC_TRUST_EXPLANATION_STATE_H

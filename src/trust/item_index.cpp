@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // See item_index.h.
 #include "src/trust/item_index.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // ItemIndex: the items of revocation lists, found by what they name. A list of many items is then
 // asked about many objects without being walked for each.
 #ifndef VESK2_SRC_TRUST_ITEM_INDEX_H

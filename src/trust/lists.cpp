@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // See lists.h.
 #include "src/trust/lists.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Steps that several files of this folder take, beside those of the objects.
 #ifndef VESK2_SRC_TRUST_LISTS_H
 #define VESK2_SRC_TRUST_LISTS_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // See principals.h.
 #include "src/trust/principals.h"
 

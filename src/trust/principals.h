@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Principals: the keys along a chain, found by what names them. Whoever writes a chain chooses how
 // many there are, and a large installation how many entries are asked about.
 #ifndef VESK2_SRC_TRUST_PRINCIPALS_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // RevocationLists: what the revocation lists of one call say, kept for all its questions. Each list
 // is proved at most once, and only items of proved lists are looked at: whoever writes a manifest
 // chooses how many certificates it has, and how many lists, true ones or not.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Scan: the files of a directory whose names match a pattern, one at a time, in byte order of the
 // names. Every search of a store goes by the same rule: a file that cannot be read is passed over,
 // but not one that was not read for want of memory or because another process holds it. It may be

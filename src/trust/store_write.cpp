@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // See store_write.h.
 #include "src/trust/store_write.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Writing files of the global store: whole or not at all, and readable by all. A list that is lost
 // half-way through its replacement, or that only its writer can read, would bring every key back
 // that it revoked.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // TagIndex: values found by the tag that they are about, each tag hashed once. Comparing every tag
 // with every other would cost the product of two numbers, either of which a stranger can choose.
 #ifndef VESK2_SRC_TRUST_TAG_INDEX_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // See text_writer.h.
 #include "src/trust/text_writer.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // TextWriter: a text for people that grows, without exceptions. A failure is kept, and told when
 // the text is taken: sentences are written without a test after each word.
 #ifndef VESK2_SRC_TRUST_TEXT_WRITER_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // See wording.h.
 #include <vesk2/wording.h>
 

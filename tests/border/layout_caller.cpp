@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A program over the exported classes that looks at all that they show. See other_layout.py.
 #include <vesk2.hpp>
 

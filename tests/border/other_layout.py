@@ -1,4 +1,5 @@
 #!/usr/bin/env python3
+# SPDX-License-Identifier: Apache-2.0
 """Compiles tests/border/layout_caller.cpp with headers in which every private member lies elsewhere, and runs it.
 
     other_layout.py SOURCE COMPILER LIBRARY

@@ -1,4 +1,5 @@
 #!/usr/bin/env python3
+# SPDX-License-Identifier: Apache-2.0
 """Plants includes and calls that scripts/check-arrows must refuse, one at a time, in a copy of the tree.
 
     plant_arrows.py SOURCE COMPILER

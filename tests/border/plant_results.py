@@ -1,4 +1,5 @@
 #!/usr/bin/env python3
+# SPDX-License-Identifier: Apache-2.0
 """Plants declarations that scripts/check-results must refuse, and some that it must not.
 
     plant_results.py SOURCE

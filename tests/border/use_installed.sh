@@ -1,4 +1,5 @@
 #!/bin/sh
+# SPDX-License-Identifier: Apache-2.0
 # use_installed.sh BUILD SOURCE: installs a build, moves what was installed somewhere else, and uses it there
 # as a packager, a C and a C++ programmer would.
 set -eu

@@ -1,4 +1,5 @@
 #!/bin/sh
+# SPDX-License-Identifier: Apache-2.0
 # version.sh SOURCE VERSION: finds what names another version than CMakeLists.txt, or none.
 set -eu
 cd "$1"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // An engine over a counting, failing allocator, with tags written as text: "(ftp (* prefix ab))", a
 // display hint as "[hint]word", any other bytes as Raw(bytes). At the end every record must be back
 // on its free list and every block back with the allocator.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Reductions for which the memory does not suffice.
 #include "tests/engine/reduce_fixture.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The engine's state, its records, keywords and orders.
 #include <cstring>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The canonical parser and writer.
 #include "tests/engine/engine_fixture.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Reductions written as text: keys are (public-key NAME), credentials lists of words. What comes
 // out is compared as text.
 #ifndef VESK2_TESTS_ENGINE_REDUCE_FIXTURE_H

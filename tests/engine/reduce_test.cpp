@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Chains of grants: what reaches the requester, with which tag, for how long and in which order;
 // and names, which certificates say what they stand for.
 #include "tests/engine/reduce_fixture.h"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // k-of-n subjects: nothing is granted before k positions agree on the same principal.
 #include "tests/engine/reduce_fixture.h"
 

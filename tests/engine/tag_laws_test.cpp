@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Laws of the algebra over random tags: what an intersection allows, both tags allow; and, without
 // sets (which are judged more strictly than their members), what both allow, it allows. An oracle
 // that takes only the parser from the engine says what a tag allows.

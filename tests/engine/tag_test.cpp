@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Tags: how they relate and what two of them leave; ranges, their values and members.
 #include <sstream>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Code texts, the store roots, and records of file names.
 #include <vesk2/context.h>
 #include <vesk2/file_item.h>

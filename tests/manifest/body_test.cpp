@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Arrays, ignored names and the reader of bodies.
 #include <gtest/gtest.h>
 

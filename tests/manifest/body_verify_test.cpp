@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Bodies against real trees and against each other: every row gives the exact lists.
 #include <gtest/gtest.h>
 #include <sys/resource.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Verifications of manifests while another process holds a file, or descriptors are short: what
 // could not be read never makes a yes, and a held file of the tree is told as such.
 #include <gtest/gtest.h>

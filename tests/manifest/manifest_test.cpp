@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Whole manifests: what is read, what is proved, and which refusal each defect meets.
 #include <gtest/gtest.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What the writer of manifests writes is what an independent writer writes, and what the reader
 // reads.
 #include <gtest/gtest.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The findings of a manifest as one line of text, and names to ignore from one, for tables of
 // cases.
 #ifndef VESK2_TESTS_MANIFEST_RESULT_TEXT_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Cert: the elements that it reads, in their order, and the certificates that it builds. Subjects:
 // the choice of a class, and k-of-n.
 #include <vesk2/cert.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The two principals, Hash and PublicKey: read, made, kept in files and written for others.
 #include <openssl/x509.h>
 #include <vesk2/hash.h>

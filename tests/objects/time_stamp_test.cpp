@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // TimeStamp: parsing, periods, conversion and comparison, also of stamps that nobody checked.
 #include <vesk2/time_stamp.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Signatures: what is accepted, and with which code what was tampered with is refused.
 #include <vesk2/cert.h>
 #include <vesk2/public_key.h>

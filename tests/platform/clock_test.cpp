@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Calendar time against the C library's, and both directions against each other.
 #include "src/platform/clock.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Files, directories and buffers: what may be opened, what is read, and what a failure leaves.
 #include "src/platform/file.h"
 

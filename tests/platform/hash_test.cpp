@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Running hashes against libcrypto over whole inputs.
 #include <gtest/gtest.h>
 #include <openssl/err.h>

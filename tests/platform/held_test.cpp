@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Files that other processes hold, and resources that ran out: neither reads as absent.
 #include <gtest/gtest.h>
 

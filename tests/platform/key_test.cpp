@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Keys and signature checks. Signatures and the reading of exports are left to other programs;
 // every way to be wrong must be an answer of "not valid", never an error or a crash.
 #include <gtest/gtest.h>

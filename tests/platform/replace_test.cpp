@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Files written whole or not at all, and what dead writers leave behind.
 #include "src/platform/replace.h"
 

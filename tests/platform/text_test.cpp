@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Paths, names, numbers and order.
 #include "src/platform/text.h"
 

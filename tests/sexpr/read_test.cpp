@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The readers: from memory, from buffers, and of the advanced text that people type. Many rows pin
 // what a stricter reader would refuse: stored texts rely on it.
 #include <vesk2/context.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Where objects are stored, and writing them there.
 #include <vesk2/context.h>
 #include <vesk2/expression.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Byte strings and lists in memory: what Set takes, who owns what, equality, and what is written.
 #include <vesk2/expression.h>
 #include <vesk2/ref.h>

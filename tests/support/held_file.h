@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What keeps files from being opened for a time: another process that holds leases on them, and a
 // process that has no descriptors left.
 #ifndef VESK2_TESTS_SUPPORT_HELD_FILE_H

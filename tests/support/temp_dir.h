@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // TempDir: a directory for one test, removed with everything in it.
 #ifndef VESK2_TESTS_SUPPORT_TEMP_DIR_H
 #define VESK2_TESTS_SUPPORT_TEMP_DIR_H

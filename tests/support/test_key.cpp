@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Keys and signatures for tests. Failures throw: a test without its key has nothing to say.
 #include "tests/support/test_key.h"
 

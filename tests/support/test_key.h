@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Keys and signatures for tests, made by libcrypto alone.
 #ifndef VESK2_TESTS_SUPPORT_TEST_KEY_H
 #define VESK2_TESTS_SUPPORT_TEST_KEY_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Inputs that ask for much work.
 #include "tests/support/test_load.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Inputs that ask for as much work as files of their size can: for tests that count it, and for
 // benchmarks that take the time.
 #ifndef VESK2_TESTS_SUPPORT_TEST_LOAD_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Manifest text for tests: string work over the other writers.
 #include "tests/support/test_manifest.h"
 

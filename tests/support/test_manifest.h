@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Manifest text for tests, written without the library: bodies from entries or from a directory,
 // and whole signed files.
 #ifndef VESK2_TESTS_SUPPORT_TEST_MANIFEST_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Between text and the library's objects: buffers to import from, and what an object writes.
 // Inline, since the programs that link the support files do not all link the classes.
 #ifndef VESK2_TESTS_SUPPORT_TEST_OBJECT_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Typed objects read from text, and what must hold of damaged text.
 #ifndef VESK2_TESTS_SUPPORT_TEST_READ_H
 #define VESK2_TESTS_SUPPORT_TEST_READ_H

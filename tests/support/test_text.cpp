@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Canonical text for tests: plain string work, and digests by libcrypto.
 #include "tests/support/test_text.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Canonical text for tests, written independently of the library: what a reader accepts is compared
 // with text that the library's own writers had no hand in.
 #ifndef VESK2_TESTS_SUPPORT_TEST_TEXT_H

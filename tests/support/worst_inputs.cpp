@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "tests/support/worst_inputs.h"
 
 #include <algorithm>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The worst inputs known: text that a stranger may write so that the reductions have as much to do,
 // or to hold, as its length allows. The tests count the work of each; scripts/bench --worst takes
 // the time.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The n-th allocation of every public operation fails, for n = 0, 1, 2 ... until none is reached:
 // it alone, and it with all that follow; libcrypto's allocations too. Each run must leave its
 // outputs null and leak nothing (the asan preset looks). It answers what it answers with all the

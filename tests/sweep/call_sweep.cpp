@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Every allocation of the process and every open, read, readdir and stat fails in turn, once and
 // from then on, while the library or the command answers about a machine of scenes.h: whatever
 // fails, what is refused otherwise is not granted. Each point is a process of its own, so that a

@@ -1,3 +1,4 @@
+/* SPDX-License-Identifier: Apache-2.0 */
 // See failing_calls.h. Nothing here allocates while calls fail.
 #define _GNU_SOURCE
 #include "tests/sweep/failing_calls.h"

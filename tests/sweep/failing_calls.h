@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Calls of the C library that fail on demand, whoever makes them: the program, the library,
 // libcrypto or the C++ runtime. A shared library that stands before the C library, because a
 // program was linked with it, or by LD_PRELOAD. It counts the calls of one kind and fails the n-th.

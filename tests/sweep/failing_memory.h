@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Allocation that fails on demand, by replacing the program's operator new and libcrypto's
 // allocator. The library asks with std::nothrow, and only such requests fail; test code, whose
 // requests throw, runs as ever.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // See scenes.h. Files are written without the library; the stores of a scene are below its
 // directory:
 //   global/acl, global/cert, home/cert, extra

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Small machines, each with one question, for the sweeps: what the library and the command answer
 // when nothing fails, and how they are asked.
 #ifndef VESK2_TESTS_SWEEP_SCENES_H

@@ -1,4 +1,5 @@
 #!/bin/sh
+# SPDX-License-Identifier: Apache-2.0
 # by-hand.sh: writes a certificate (hand.cert: vendor to leaf, for (install)) and a revocation list
 # that revokes it (hand.crl) byte by byte, signed by the openssl command. Nothing of this system is
 # used: what the command writes and reads must be the same format.

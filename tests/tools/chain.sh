@@ -1,4 +1,5 @@
 #!/bin/sh
+# SPDX-License-Identifier: Apache-2.0
 # chain.sh: what the sessions about chains start from: a vendor that the store trusts for (install),
 # three certificates from it to the leaf, the second under revocation, and a fresh list.
 set -e

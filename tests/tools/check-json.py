@@ -1,4 +1,5 @@
 #!/usr/bin/python3
+# SPDX-License-Identifier: Apache-2.0
 """check-json.py SCHEMA STATUS FILE [EXPRESSION...]: the answers for machines in a file, a line each.
 
 Every answer must match the schema and hold no control byte; the last must agree with the exit

@@ -1,4 +1,5 @@
 #!/usr/bin/python3
+# SPDX-License-Identifier: Apache-2.0
 """check-reasons.py ROOT: that docs/json.md lists every reason: the library's codes of which the
 command's sources speak, with their numbers, and the words that these give to Trouble and No. Prints
 those that are missing."""

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What a list lets go of another one: too little said here un-revokes in silence.
 #include "tools/vesk2/stores/crl_compare.h"
 

@@ -1,4 +1,5 @@
 #!/bin/sh
+# SPDX-License-Identifier: Apache-2.0
 # damage.sh cut|flip: damages tree.manifest at every 53rd byte and prints each place where the
 # answer is not a refusal with its reason.
 verify() {

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // An explanation ends by itself, however long what it explains is made.
 #include "tools/vesk2/explain/effort.h"
 

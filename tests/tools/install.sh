@@ -1,4 +1,5 @@
 #!/bin/sh
+# SPDX-License-Identifier: Apache-2.0
 # install.sh BUILD CHECK...: installs a build, as one that has no static library, and checks that
 # the command finds its library, built and installed, and none of those that lie around it.
 set -eu

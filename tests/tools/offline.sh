@@ -1,4 +1,5 @@
 #!/bin/sh
+# SPDX-License-Identifier: Apache-2.0
 # offline.sh COMMAND SESSION...: runs the sessions with every system call of the command that could
 # reach the network or change a file on record. No command may open a socket, and verifications may
 # change nothing but the machine's revocation lists, and not even those with --no-store-update.

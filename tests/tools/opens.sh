@@ -1,4 +1,5 @@
 #!/bin/sh
+# SPDX-License-Identifier: Apache-2.0
 # opens.sh COMMAND: counts how often a verification opens what it judges. What it prints must be
 # what it proved, so the manifest, the chain and the stores are never opened once more to explain.
 set -eu

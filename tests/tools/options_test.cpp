@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // An option with an empty value is not one that was left out, whichever option it is.
 #include "tools/vesk2/commands/options.h"
 

@@ -1,4 +1,5 @@
 #!/bin/sh
+# SPDX-License-Identifier: Apache-2.0
 # prepare.sh: what most sessions start from: a vendor that the store trusts for (install), a signer
 # that it certified for (install (app calc)), and a signed tree.
 set -e

@@ -1,4 +1,5 @@
 #!/bin/sh
+# SPDX-License-Identifier: Apache-2.0
 # race.sh TREE GOOD BAD: verifies a tree against a manifest that is replaced all the time, by one
 # whose signer is authorized and one whose signer is not. Each yes must name the first.
 set -u

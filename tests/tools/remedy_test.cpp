@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // For thousands of random refusals: the explanation agrees with the library's answer, and the
 // change that it names turns it.
 #include <gtest/gtest.h>

@@ -1,4 +1,5 @@
 #!/bin/bash
+# SPDX-License-Identifier: Apache-2.0
 # run-document.sh COMMAND DOCUMENT [NEW]: runs the commands that a document shows, one after the other in a
 # fresh directory with fresh stores, and compares what they print with what it shows:
 #

@@ -1,4 +1,5 @@
 #!/bin/sh
+# SPDX-License-Identifier: Apache-2.0
 # run-remedy.sh SHELL: has SHELL run the command lines of the first remedy that standard input, the
 # notes of a refusal, names: as they are printed, but for the files of the private keys.
 sed -n '/^would pass: /,$p' | sed -n '1d; /^  vesk2/!q; p' >lines

@@ -1,4 +1,5 @@
 #!/bin/sh
+# SPDX-License-Identifier: Apache-2.0
 # run-session.sh COMMAND SESSION: runs a session with the vesk2 command, in a fresh directory with
 # fresh stores, and compares what it prints and answers.
 #

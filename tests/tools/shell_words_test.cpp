@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What is printed as a command line is read back by a shell word by word, and runs nothing else.
 #include "tools/vesk2/say/shell_words.h"
 

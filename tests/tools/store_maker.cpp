@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // store_maker.cpp: random small stores, written without the library.
 #include "tests/tools/store_maker.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // store_maker.h: random small stores with one chain or manifest each, most of them refused.
 #ifndef VESK2_TESTS_TOOLS_STORE_MAKER_H
 #define VESK2_TESTS_TOOLS_STORE_MAKER_H

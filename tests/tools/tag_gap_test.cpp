@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The place where one tag reaches beyond another is really one: whatever two random tags look like,
 // the library refuses the two parts that are named as it refuses the whole.
 #include "tools/vesk2/objects/tag_gap.h"

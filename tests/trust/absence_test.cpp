@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What was not read is not absent: files that another process holds, and descriptors that ran out,
 // end every search with a code of their own. With a list that reads as absent goes what it revokes.
 #include <vesk2/cert_sequence.h>

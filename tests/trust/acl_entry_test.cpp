@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // AclEntry: as text, in the files of the store, and asked for.
 #include <sys/stat.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #include <vesk2/cert_sequence.h>
 
 #include "tests/trust/trust_test.h"

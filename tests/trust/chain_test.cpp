@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Chains, leaf first. The ACL store trusts key 0; key 4 issues the revocation lists.
 #include <vesk2/cert_sequence.h>
 #include <vesk2/evidence.h>

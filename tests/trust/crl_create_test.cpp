@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Lists that are built are the ones that are read.
 #include "tests/trust/trust_test.h"
 

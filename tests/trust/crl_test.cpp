@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Revocation lists: read, verified, asked whether something was revoked, and kept in the store.
 #include <sys/resource.h>
 #include <sys/stat.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Why a chain was refused, and what a yes rests on. The ACL store trusts key 0 for (ftp); key 4
 // issues the revocation lists.
 #include <vesk2/cert_sequence.h>

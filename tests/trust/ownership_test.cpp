@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Who owns what a call is given, by the three words of the headers: it shares, it takes over (after
 // success only), or it adopts (whatever it answers). The sanitizers see what is freed twice or
 // never.

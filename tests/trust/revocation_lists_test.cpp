@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What the lists of one call say, against an oracle that asks them one by one; and how much work a
 // stranger's certificates and lists make.
 #include <random>

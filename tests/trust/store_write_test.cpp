@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What several writers, and a writer who keeps files to himself, leave in the stores for others.
 #include <fcntl.h>
 #include <pthread.h>  // for unshare

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What the tests of the trust store share: stores in a temporary directory, and revocation lists.
 #ifndef VESK2_TESTS_TRUST_TRUST_TEST_H
 #define VESK2_TESTS_TRUST_TRUST_TEST_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // main.cpp: the process around a command line.
 #include <fcntl.h>
 #include <unistd.h>

@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 """The module against the built library, with keys, manifests and lists that the built command makes.
 
     PATH=build/release/bin:$PATH LD_LIBRARY_PATH=build/release/lib PYTHONPATH=bindings/python \\

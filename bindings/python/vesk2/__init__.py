@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 """Is this directory exactly what its signed manifest says, and was its signer authorized to say so?
 
     import vesk2

@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 """What every verification answers, and why."""
 
 from __future__ import annotations

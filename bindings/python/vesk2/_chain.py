@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 """Chains of certificates, and the revocation lists that take them back."""
 
 from __future__ import annotations

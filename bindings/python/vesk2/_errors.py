@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 """Codes as words, and the exception that carries them."""
 
 from __future__ import annotations

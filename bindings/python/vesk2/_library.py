@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 """vesk2.h as ctypes sees it: records, functions, the conversions between both worlds."""
 
 from __future__ import annotations

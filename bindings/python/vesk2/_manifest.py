@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 """Manifests: is a directory exactly what its signed manifest says, by a signer who may say so?"""
 
 from __future__ import annotations

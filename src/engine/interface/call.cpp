@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Start and end of an engine call, and the way of objects into the engine.
 #include <new>
 

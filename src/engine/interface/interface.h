@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The only door between the object model and the reduction engine. What goes in is an object's
 // canonical bytes, without display hints; what comes out are canonical bytes again.
 #ifndef VESK2_SRC_ENGINE_INTERFACE_INTERFACE_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Whether one tag lies within another: whether intersecting the two leaves the first unchanged.
 #include <vesk2/expression.h>
 

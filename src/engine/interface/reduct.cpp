@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The two reductions over objects. The engine's result is
 //
 //   (acl (entry (subject <key>) [(propagate)] (tag ...) [(valid ...)])...)

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The way out of the engine. Measuring and writing are two walks of the one canonical writer, so
 // they cannot disagree.
 #include <cstring>

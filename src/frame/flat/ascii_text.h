@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // AsciiText: the file-name form of an ASCII argument, for the time of one call. On Linux both forms
 // are bytes, but callers of the A functions must not come to depend on that.
 #ifndef VESK2_SRC_FRAME_FLAT_ASCII_TEXT_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Flat functions: reading a certificate sequence into a chain of records, and freeing it.
 #include <vesk2/cert_sequence.h>
 #include <vesk2/public_key.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Flat functions: verifying certificate sequences, and listing those of a directory.
 #include <vesk2/cert_sequence.h>
 #include <vesk2/manifest.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Flat functions: the context, and memory that was handed out.
 #include <vesk2.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Flat functions: why an answer is what it is, as records.
 #include "src/frame/flat/explanations.h"
 

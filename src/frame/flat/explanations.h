@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The records of explanations.
 #ifndef VESK2_SRC_FRAME_FLAT_EXPLANATIONS_H
 #define VESK2_SRC_FRAME_FLAT_EXPLANATIONS_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Flat functions: manifest contexts and the records of their results. A manifest context is a
 // Manifest; the getters and setters trust its pointer, the way callers have always used them.
 #include <vesk2/file_item.h>

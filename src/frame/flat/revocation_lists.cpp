@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Flat functions: revocation lists, read, found in the store, verified and imported into it.
 #include <vesk2/acl_entry.h>
 #include <vesk2/crl.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What the records of certificates and of revocation lists share: the text of a tag.
 #ifndef VESK2_SRC_FRAME_FLAT_TAG_TEXT_H
 #define VESK2_SRC_FRAME_FLAT_TAG_TEXT_H

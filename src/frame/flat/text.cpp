@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Flat functions: conversion between the two forms of text, and escaping.
 #include <vesk2/wording.h>
 

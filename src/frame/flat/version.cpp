@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Flat functions: the version and the texts of codes.
 #include <vesk2/context.h>
 

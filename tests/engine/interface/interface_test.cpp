@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The engine seen from the objects: tags within tags, which code a request gets, and what a chain
 // is said to grant.
 #include <gtest/gtest.h>

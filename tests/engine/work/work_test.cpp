@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The engine, compiled once more so that it counts what it does: the blocks of its code that it
 // enters, and the bytes that it gives to the C library and to the hashes. Whatever the input is,
 // that must be paid for in the budget's units; a loop that forgets to charge shows here and not as

@@ -1,3 +1,4 @@
+/* SPDX-License-Identifier: Apache-2.0 */
 /* A C program that knows nothing but vesk2.h and the shared library: what it uses must have C
  * linkage and be exported. */
 #include <vesk2.h>

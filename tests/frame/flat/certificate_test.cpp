@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Certificate sequences through the flat functions: records, verification and listing.
 #include <openssl/x509.h>
 #include <vesk2/cert_sequence.h>

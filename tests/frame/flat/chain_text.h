@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A chain of three certificates for the tests of the flat functions: key 0 to key 1, key 1 to key 2
 // and key 2 to key 3, the last first, each for "(install)" from kPast to kFuture.
 #ifndef VESK2_TESTS_FRAME_FLAT_CHAIN_TEXT_H

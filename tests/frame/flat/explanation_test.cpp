@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Explanations through the flat functions: their records, and what they hand out when there is
 // nothing to explain.
 #include <vesk2/manifest.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The flat functions: their null rules, and what they hand out and keep. (The C program beside this
 // file covers those that need no objects.)
 #include <gtest/gtest.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Revocation lists through the flat functions, and the roads from a list to a refused chain.
 #include "tests/frame/flat/chain_text.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // acl_grant.cpp: vesk2 acl grant.
 #include <filesystem>
 #include <set>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // acl_install.cpp: vesk2 acl install.
 #include <filesystem>
 #include <set>

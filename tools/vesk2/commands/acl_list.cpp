@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // acl_list.cpp: vesk2 acl list.
 #include <filesystem>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // acl_remove.cpp: vesk2 acl remove.
 #include <fcntl.h>
 #include <unistd.h>

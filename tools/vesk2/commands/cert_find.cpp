@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // cert_find.cpp: vesk2 cert find.
 #include "tools/vesk2/commands/command.h"
 #include "tools/vesk2/keys/issue.h"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // cert_issue.cpp: vesk2 cert issue.
 #include <algorithm>
 #include <set>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // cert_reissue.cpp: vesk2 cert renew and vesk2 cert cosign: a certificate of a chain or manifest is
 // issued again, in its own place or beside it where several keys must agree.
 //

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // cert_request.cpp: vesk2 cert request: a key asks to be certified. The request is a certificate
 // that the key issues to itself, which shows that whoever asks has the key.
 #include "tools/vesk2/commands/command.h"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // cert_verify.cpp: vesk2 cert verify.
 #include "tools/vesk2/commands/command.h"
 #include "tools/vesk2/explain/effort.h"

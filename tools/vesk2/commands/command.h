@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // command.h: the shape of a subcommand. commands.cpp holds the table of them; each lives in a file
 // of its own and is one function that declares its options and returns what to do with them. What
 // every subcommand takes (--json, --quiet, the store roots, ...) is declared and used by run.cpp.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // commands.cpp: the table of subcommands.
 #include "tools/vesk2/commands/command.h"
 

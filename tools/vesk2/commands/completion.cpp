@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // completion.cpp: vesk2 completion: scripts that complete the command's words in a shell, written
 // from the table of subcommands and what each of them declares.
 #include <map>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // crl_import.cpp: vesk2 crl import.
 #include <algorithm>
 #include <filesystem>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // crl_issue.cpp: vesk2 crl issue.
 #include "tools/vesk2/commands/command.h"
 #include "tools/vesk2/files/files.h"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // crl_show.cpp: vesk2 crl show.
 #include "tools/vesk2/commands/command.h"
 #include "tools/vesk2/commands/describe.h"

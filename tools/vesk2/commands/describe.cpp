@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // describe.cpp: what each kind of object says.
 #include "tools/vesk2/commands/describe.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // describe.h: what each kind of object says, as a sheet: what `show` and the `show` of every noun
 // print, and their members for machines.
 //

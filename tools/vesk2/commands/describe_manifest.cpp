@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // describe_manifest.cpp: what a manifest says, but for its single entries.
 #include "tools/vesk2/commands/describe.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // key_export.cpp: vesk2 key export.
 #include <openssl/evp.h>
 #include <unistd.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // key_new.cpp: vesk2 key new.
 #include <set>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // manifest_compare.cpp: vesk2 manifest compare.
 #include "tools/vesk2/commands/command.h"
 #include "tools/vesk2/files/files.h"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // manifest_show.cpp: vesk2 manifest show.
 #include "tools/vesk2/commands/command.h"
 #include "tools/vesk2/commands/describe.h"

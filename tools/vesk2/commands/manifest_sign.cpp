@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // manifest_sign.cpp: vesk2 manifest sign.
 #include <filesystem>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // manifest_verify.cpp: vesk2 manifest verify.
 #include "tools/vesk2/commands/command.h"
 #include "tools/vesk2/explain/effort.h"

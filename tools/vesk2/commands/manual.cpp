@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // manual.cpp: vesk2 manual: the manual pages, written from the table of subcommands and what each
 // of them declares. docs/man/ holds what this writes.
 #include <sstream>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // options.cpp: what every subcommand takes, and the options told in words.
 #include "tools/vesk2/commands/options.h"
 

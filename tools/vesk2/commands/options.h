@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // options.h: what every subcommand takes, and the options of a subcommand as the help, the manual
 // pages and the shells' completion tell them.
 #ifndef VESK2_TOOLS_OPTIONS_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // run.cpp: one command line: from the table to a parser, from the parser to an action, and the one
 // place that turns failures into exit codes.
 #include <unistd.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // show.cpp: vesk2 show: any object of the system, or any S-expression.
 #include <unistd.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // store_show.cpp: vesk2 store show.
 #include <sys/stat.h>
 

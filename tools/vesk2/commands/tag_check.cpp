@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // tag_check.cpp: vesk2 tag check.
 #include "tools/vesk2/commands/command.h"
 #include "tools/vesk2/objects/tag_gap.h"

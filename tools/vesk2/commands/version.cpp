@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // version.cpp: vesk2 version.
 #include "tools/vesk2/commands/command.h"
 #include "tools/vesk2/say/report.h"

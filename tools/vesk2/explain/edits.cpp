@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // edits.cpp: single changes that may mend a refusal.
 #include "tools/vesk2/explain/edits.h"
 

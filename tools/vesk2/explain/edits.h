@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // edits.h: single changes that may mend a refusal: each as an object for a hypothesis, and as the
 // command lines that make it.
 #ifndef VESK2_TOOLS_EDITS_H

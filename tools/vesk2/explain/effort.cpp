@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // effort.cpp: counting what an explanation costs.
 #include "tools/vesk2/explain/effort.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // effort.h: what an explanation may cost. Whoever wrote what is judged can make each question about
 // it expensive, and an explanation asks hundreds: it stops at a small multiple of the answer's
 // cost.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // evidence.cpp: what an answer rests on.
 #include "tools/vesk2/explain/evidence.h"
 

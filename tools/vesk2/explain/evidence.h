@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // evidence.h: what an answer about authority rests on, as the verification kept it: the
 // certificates, the ACL entries and the revocation lists. Nothing is read again.
 #ifndef VESK2_TOOLS_EVIDENCE_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // explain.cpp: the explanation of an answer, as lines and as JSON.
 #include "tools/vesk2/explain/explain.h"
 

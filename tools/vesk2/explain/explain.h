@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // explain.h: why an answer about authority is what it is, and what would make a refusal a yes: for
 // people as notes, for machines in Result().
 //

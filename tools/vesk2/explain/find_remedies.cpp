@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // find_remedies.cpp: searching for the smallest change that turns a refusal.
 #include "tools/vesk2/explain/find_remedies.h"
 

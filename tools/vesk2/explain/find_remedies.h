@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // find_remedies.h: the smallest changes that would make a refusal a yes and keep the policy that
 // refused.
 //

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // fresh_list.cpp: the change that ends "nothing is known": a current revocation list.
 #include <algorithm>
 #include <cctype>

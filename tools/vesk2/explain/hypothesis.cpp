@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // hypothesis.cpp: asking the library about a world that differs in a few objects.
 #include "tools/vesk2/explain/hypothesis.h"
 

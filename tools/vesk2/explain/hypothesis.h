@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // hypothesis.h: what the answer about authority would be if something were different.
 //
 // The library judges a changed copy of what it proved, by the rules of its verifications.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // mend_period.cpp: periods that reach what was asked.
 #include "tools/vesk2/explain/mend_period.h"
 

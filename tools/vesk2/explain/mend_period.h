@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // mend_period.h: the period that a renewed certificate or a replaced entry would need.
 #ifndef VESK2_TOOLS_MEND_PERIOD_H
 #define VESK2_TOOLS_MEND_PERIOD_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // policy.cpp: what no advice may undo.
 #include "tools/vesk2/explain/policy.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // policy.h: what no advice may undo. A change can turn a refusal and still be one that nobody who
 // decided about the store and its lists would make.
 #ifndef VESK2_TOOLS_POLICY_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // remedy.h: a change that would make a refusal a yes, in words and as command lines.
 #ifndef VESK2_TOOLS_REMEDY_H
 #define VESK2_TOOLS_REMEDY_H

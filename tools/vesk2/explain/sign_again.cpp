@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // sign_again.cpp: a manifest signed anew.
 #include "tools/vesk2/explain/sign_again.h"
 

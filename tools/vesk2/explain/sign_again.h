@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // sign_again.h: a manifest signed anew by its signer, with the certificates that speak for it.
 #ifndef VESK2_TOOLS_SIGN_AGAIN_H
 #define VESK2_TOOLS_SIGN_AGAIN_H

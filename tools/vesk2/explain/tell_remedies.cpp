@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // tell_remedies.cpp: remedies, in words and as command lines.
 #include "tools/vesk2/explain/tell_remedies.h"
 

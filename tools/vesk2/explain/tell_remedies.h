@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // tell_remedies.h: remedies as lines for people and as "remedies" of the result.
 #ifndef VESK2_TOOLS_TELL_REMEDIES_H
 #define VESK2_TOOLS_TELL_REMEDIES_H

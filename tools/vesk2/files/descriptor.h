@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // descriptor.h: open files that are closed with their owner, and paths where nothing is.
 #ifndef VESK2_TOOLS_DESCRIPTOR_H
 #define VESK2_TOOLS_DESCRIPTOR_H

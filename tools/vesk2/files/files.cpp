@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // files.cpp: file contents in and out.
 #include "tools/vesk2/files/files.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // files.h: reading small files whole, and writing files whole or not at all.
 #ifndef VESK2_TOOLS_FILES_H
 #define VESK2_TOOLS_FILES_H

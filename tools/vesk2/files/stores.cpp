@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // stores.cpp: the store roots.
 #include "tools/vesk2/files/stores.h"
 

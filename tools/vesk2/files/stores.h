@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // stores.h: where the stores are: what the flags say, else VESK2_HOME and VESK2_GLOBAL, else
 // $XDG_DATA_HOME/vesk2 (~/.local/share/vesk2) and /etc/vesk2.
 #ifndef VESK2_TOOLS_STORES_H

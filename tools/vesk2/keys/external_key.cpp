@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // external_key.cpp: signing by another program.
 #include "tools/vesk2/keys/external_key.h"
 

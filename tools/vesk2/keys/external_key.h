@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // external_key.h: keys that a program has in its keeping: a hardware token, an agent, another
 // machine. It is handed the digest and gives the signature back.
 #ifndef VESK2_TOOLS_EXTERNAL_KEY_H

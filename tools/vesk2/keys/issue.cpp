@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // issue.cpp: making certificates.
 #include "tools/vesk2/keys/issue.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // issue.h: making certificates: what `cert issue`, `cert request`, `crl issue` and `manifest sign`
 // share.
 #ifndef VESK2_TOOLS_ISSUE_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // key_source.cpp: public keys named by where they stand.
 #include "tools/vesk2/keys/key_source.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // key_source.h: public keys named by where they stand: the issuer or subject of a certificate in a
 // chain, a manifest or a revocation list, so that nobody has to extract a key to trust it.
 #ifndef VESK2_TOOLS_KEY_SOURCE_H

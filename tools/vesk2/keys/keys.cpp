@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // keys.cpp: key files and signing over libcrypto's EVP interfaces.
 #include "tools/vesk2/keys/keys.h"
 

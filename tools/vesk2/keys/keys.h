@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // keys.h: key files, and what signs. The library never sees a private key: PEM files (PKCS#8,
 // optionally under a passphrase) are read, written and used here, over libcrypto.
 #ifndef VESK2_TOOLS_KEYS_H

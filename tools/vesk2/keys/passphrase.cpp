@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // passphrase.cpp: passphrases from files, descriptors and the terminal.
 #include "tools/vesk2/keys/passphrase.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // passphrase.h: passphrases of private keys: from the first line of a file or of an open
 // descriptor, else from the terminal.
 // Never from an argument or the environment, which other users of the machine can read.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // acl_file.cpp: reading and building ACL entries.
 #include "tools/vesk2/objects/acl_file.h"
 

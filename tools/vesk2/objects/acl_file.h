@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // acl_file.h: ACL entries, and the files that hold them.
 #ifndef VESK2_TOOLS_ACL_FILE_H
 #define VESK2_TOOLS_ACL_FILE_H

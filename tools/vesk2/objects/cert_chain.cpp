@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // cert_chain.cpp: certificate sequence files.
 #include "tools/vesk2/objects/cert_chain.h"
 

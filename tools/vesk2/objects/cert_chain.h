@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // cert_chain.h: certificate sequence files.
 #ifndef VESK2_TOOLS_CERT_CHAIN_H
 #define VESK2_TOOLS_CERT_CHAIN_H

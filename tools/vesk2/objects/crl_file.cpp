@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // crl_file.cpp: revocation lists in files.
 #include "tools/vesk2/objects/crl_file.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // crl_file.h: revocation lists in files, and the tags that name where they come from.
 #ifndef VESK2_TOOLS_CRL_FILE_H
 #define VESK2_TOOLS_CRL_FILE_H

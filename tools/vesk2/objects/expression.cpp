@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // expression.cpp: S-expressions as trees. The library's readers bound how deep lists nest, and with
 // it every recursion here.
 #include "tools/vesk2/objects/expression.h"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // expression.h: any S-expression, whatever it stands for, as a tree for people and for machines.
 #ifndef VESK2_TOOLS_EXPRESSION_H
 #define VESK2_TOOLS_EXPRESSION_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // grant_terms.cpp: renewing what a certificate says.
 #include "tools/vesk2/objects/grant_terms.h"
 

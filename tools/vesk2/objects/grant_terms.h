@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // grant_terms.h: what a certificate says, and what one that replaces it says differently.
 #ifndef VESK2_TOOLS_GRANT_TERMS_H
 #define VESK2_TOOLS_GRANT_TERMS_H

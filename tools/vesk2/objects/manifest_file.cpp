@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // manifest_file.cpp: reading manifest files.
 #include "tools/vesk2/objects/manifest_file.h"
 

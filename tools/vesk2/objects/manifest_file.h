@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // manifest_file.h: manifest files as the command sees them: reading one back without judging its
 // authority, and taking it apart to show it.
 #ifndef VESK2_TOOLS_MANIFEST_FILE_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // objects.cpp: reading, building and printing the library's objects.
 #include "tools/vesk2/objects/objects.h"
 

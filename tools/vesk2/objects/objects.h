@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // objects.h: the library's objects as the command handles them: read from files with an error line
 // that names file and byte, built from arguments, turned into text.
 //

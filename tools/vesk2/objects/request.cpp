@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // request.cpp: taking requested sets apart.
 #include "tools/vesk2/objects/request.h"
 

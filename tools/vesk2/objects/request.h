@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // request.h: what is asked for, and the single requests that it stands for.
 //
 // The library compares sets strictly: (* set a b) as a request is refused although a and b are

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // shapes.cpp: objects for machines.
 #include "tools/vesk2/objects/shapes.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // shapes.h: what machines are told of an object, one shape for each kind wherever it is told. Every
 // member is always there, null where the object says nothing; no tag is no limit.
 #ifndef VESK2_TOOLS_SHAPES_H

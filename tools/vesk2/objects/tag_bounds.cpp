@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // tag_bounds.cpp: finding the bounds that are none.
 #include "tools/vesk2/objects/tag_bounds.h"
 

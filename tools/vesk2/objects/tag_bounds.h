@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // tag_bounds.h: the bounds of ranges in a tag that is about to be issued.
 #ifndef VESK2_TOOLS_TAG_BOUNDS_H
 #define VESK2_TOOLS_TAG_BOUNDS_H

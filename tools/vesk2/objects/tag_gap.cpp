@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // tag_gap.cpp: where one tag reaches beyond another.
 #include "tools/vesk2/objects/tag_gap.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // tag_gap.h: where one tag reaches beyond another. The library says whether it does; this looks for
 // the place, asking the library about ever smaller parts, and puts it into words.
 #ifndef VESK2_TOOLS_TAG_GAP_H

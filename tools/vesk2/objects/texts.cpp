@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // texts.cpp: subjects, periods and revocation sources in words.
 #include "tools/vesk2/objects/texts.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // texts.h: subjects, periods and revocation sources in words.
 #ifndef VESK2_TOOLS_TEXTS_H
 #define VESK2_TOOLS_TEXTS_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // times.cpp: moments and periods from the command line.
 #include "tools/vesk2/objects/times.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // times.h: moments and periods from the command line.
 #ifndef VESK2_TOOLS_TIMES_H
 #define VESK2_TOOLS_TIMES_H

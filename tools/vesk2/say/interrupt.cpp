@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // interrupt.cpp: the signal handler. It does nothing that POSIX does not allow in one.
 #include "tools/vesk2/say/interrupt.h"
 

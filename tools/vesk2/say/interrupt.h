@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // interrupt.h: what is tidied up when SIGINT, SIGTERM or SIGHUP ends the command: an unfinished
 // file is removed and what is drawn erased, and then the signal ends the process as it would have
 // without us, so that a shell sees what happened.

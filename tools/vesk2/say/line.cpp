@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // line.cpp: drawing over a line of the terminal.
 #include "tools/vesk2/say/line.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // line.h: the one line on standard error that is drawn over again and again, and is gone before
 // anything else is written.
 #ifndef VESK2_TOOLS_LINE_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // progress.cpp: the progress line.
 #include "tools/vesk2/say/progress.h"
 

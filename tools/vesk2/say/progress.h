@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // progress.h: how far the reading of a tree has come, in a line on the terminal.
 #ifndef VESK2_TOOLS_PROGRESS_H
 #define VESK2_TOOLS_PROGRESS_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // report.cpp: escaping, the output for people and for machines, and the words for codes.
 #include "tools/vesk2/say/report.h"
 

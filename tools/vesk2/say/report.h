@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // report.h: what the command says.
 //
 // For people, the verdict goes to standard output and everything else to standard error, and no

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // sheet.cpp: laying out what is said of an object.
 #include "tools/vesk2/say/sheet.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // sheet.h: what is said of one object, collected once for both readers: rows for people, members
 // for machines. The two cannot tell different stories.
 #ifndef VESK2_TOOLS_SHEET_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // shell_words.cpp: quoting for shells.
 #include "tools/vesk2/say/shell_words.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // shell_words.h: command lines that are printed to be pasted into a shell, or run by a program.
 //
 // A name or a tag may have been chosen by a stranger so that the shell would run a part of it.

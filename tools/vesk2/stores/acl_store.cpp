@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // acl_store.cpp: loading the ACL store.
 #include "tools/vesk2/stores/acl_store.h"
 

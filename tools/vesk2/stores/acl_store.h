@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // acl_store.h: the entries of this machine's ACL store, and why there are none.
 #ifndef VESK2_TOOLS_ACL_STORE_H
 #define VESK2_TOOLS_ACL_STORE_H

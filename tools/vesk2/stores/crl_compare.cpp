@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // crl_compare.cpp: comparing revocation lists, and letting go what one revokes.
 #include "tools/vesk2/stores/crl_compare.h"
 

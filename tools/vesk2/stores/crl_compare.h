@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // crl_compare.h: what one revocation list revokes and another one lets go. A list that takes the
 // place of another must not bring anything back unnoticed: what goes is said, and was named.
 #ifndef VESK2_TOOLS_CRL_COMPARE_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // crl_store.cpp: stored revocation lists, and offering lists to the store.
 #include "tools/vesk2/stores/crl_store.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // crl_store.h: revocation lists and this machine's store: who is believed, which list it holds for
 // a source, or why what lies there does not count, and what is kept. The library passes over a list
 // that it cannot use: people must hear of it.

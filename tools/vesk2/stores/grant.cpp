@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // grant.cpp: entries of the ACL store.
 #include "tools/vesk2/stores/grant.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // grant.h: writing entries of this machine's ACL store: what `acl grant` and `manifest sign
 // --grant` share.
 #ifndef VESK2_TOOLS_GRANT_H

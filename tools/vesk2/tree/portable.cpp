@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // portable.cpp: what keeps a name from travelling: other systems refuse characters that ours takes,
 // fold case, or cut blanks; archives and transports do so on the way.
 #include "tools/vesk2/tree/portable.h"

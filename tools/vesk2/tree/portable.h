@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // portable.h: names of files that another machine may not have under the same name.
 #ifndef VESK2_TOOLS_PORTABLE_H
 #define VESK2_TOOLS_PORTABLE_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // tree.cpp: listing a tree, and its links.
 #include "tools/vesk2/tree/tree.h"
 

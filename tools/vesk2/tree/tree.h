@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // tree.h: a directory tree on disk: listing it for a manifest, and looking for links that lead out
 // of it.
 #ifndef VESK2_TOOLS_TREE_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // tree_findings.cpp: what a verification found in a tree.
 #include "tools/vesk2/tree/tree_findings.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // tree_findings.h: how a tree differs from what was signed.
 #ifndef VESK2_TOOLS_TREE_FINDINGS_H
 #define VESK2_TOOLS_TREE_FINDINGS_H

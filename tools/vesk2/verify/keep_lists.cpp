@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // keep_lists.cpp: whether a carried revocation list takes the place of the stored one.
 #include "tools/vesk2/verify/keep_lists.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // keep_lists.h: keeping the revocation lists that a manifest carried.
 #ifndef VESK2_TOOLS_KEEP_LISTS_H
 #define VESK2_TOOLS_KEEP_LISTS_H

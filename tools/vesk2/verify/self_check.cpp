@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // self_check.cpp: looking at one's own work.
 #include "tools/vesk2/verify/self_check.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // self_check.h: what a command that signs or grants says of its own work before it writes it: what
 // it makes can be well formed, and be refused by everybody.
 #ifndef VESK2_TOOLS_SELF_CHECK_H

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // store_check.cpp: looking for files of the stores that could not be read.
 #include "tools/vesk2/verify/store_check.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // store_check.h: files of the stores that a verification had to pass over.
 //
 // The library answers from what it can read. An entry or a list that is there and cannot be read

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // today.cpp: judging a manifest by what is revoked now.
 #include "tools/vesk2/verify/today.h"
 

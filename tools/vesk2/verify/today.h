@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // today.h: a manifest's authority with what is known about revocation now.
 //
 // The signer writes the time of signing. A key that was lost can write any, so a certificate that
