@@ -9,6 +9,7 @@
 #include "tools/vesk2/say/progress.h"
 #include "tools/vesk2/say/report.h"
 #include "tools/vesk2/stores/acl_store.h"
+#include "tools/vesk2/tree/threads.h"
 #include "tools/vesk2/tree/tree.h"
 #include "tools/vesk2/tree/tree_findings.h"
 #include "tools/vesk2/verify/keep_lists.h"
@@ -36,6 +37,7 @@ struct Options {
   std::vector<std::string> ignored;
   bool explain = false;
   bool all = false;
+  unsigned jobs = 0;
   StoreCheck stores;
 };
 
@@ -76,10 +78,13 @@ bool JudgedTree(const Manifest& manifest, int code) {
 
 int VerifyFiles(Manifest& manifest, const Options& options, const Period& period) {
   const ProgressLine progress("verifying", options.directory);
+  const LentThreads threads(options.jobs, options.manifest);
   Check(manifest.SetFileCallbacks(progress.Callbacks()), "preparing");
+  manifest.SetTaskRunner(threads.Runner());
   const int code = manifest.VerifyManifest(period.notBefore ? period.notBefore->ToTime() : 0,
                                            period.notAfter ? period.notAfter->ToTime() : 0);
   Check(manifest.SetFileCallbacks(nullptr), "preparing");
+  manifest.SetTaskRunner(nullptr);
   return code;
 }
 
@@ -255,6 +260,7 @@ Action DefineManifestVerify(CLI::App& app) {
       ->allow_extra_args(false);
   AddStoreCheckOptions(app, options->stores);
   app.add_flag("--explain", options->explain, "Tell why also when the answer is yes");
+  LentThreads::AddOption(app, options->jobs);
   app.add_flag("--all", options->all, "Tell every finding, on a terminal too");
   return [options] {
     StartResult();

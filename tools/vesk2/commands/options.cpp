@@ -20,7 +20,7 @@ constexpr struct {
     {"DIR", " acl-dir global home "},
     {"FILE", " cert chain crl items-of key output passphrase-file request revoke-key subject "},
     {"FILE[:N]", " issuer-of revoke-cert subject-of "},
-    {"N", " bits passphrase-fd threshold "},
+    {"N", " bits jobs passphrase-fd threshold "},
     {"NAME", " name names "},
     {"PATH", " ignore "},
     {"TAG", " asked grant granted revocation tag "},

@@ -68,6 +68,7 @@ ProgressLine::Sums ProgressLine::LookThrough(const std::string& directory) {
 }
 
 int ProgressLine::Add(uint64_t files, uint64_t bytes) {
+  const std::lock_guard<std::mutex> locked(mutex_);
   done_ = {done_.files + files, done_.bytes + bytes};
   const Clock::time_point now = Clock::now();
   if (now < next_) return 0;

@@ -5,6 +5,7 @@
 
 #include <chrono>
 #include <cstdint>
+#include <mutex>
 #include <string>
 
 #include <vesk2.h>
@@ -22,7 +23,7 @@ class ProgressLine {
   ProgressLine& operator=(const ProgressLine&) = delete;
 
   // For Manifest::SetFileCallbacks and Hash::HashFile; null when there is no line to draw. They
-  // live as long as this object.
+  // live as long as this object, and any thread may call them.
   const Vesk2FileCallbacks* Callbacks() const { return wanted_ ? &callbacks_ : nullptr; }
 
  private:
@@ -39,6 +40,7 @@ class ProgressLine {
   const bool wanted_;
   const Vesk2FileCallbacks callbacks_;
   const Sums expected_;
+  std::mutex mutex_;  // of what follows
   Sums done_;
   const Clock::time_point start_;
   Clock::time_point next_;  // when to draw again
