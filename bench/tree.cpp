@@ -107,8 +107,9 @@ bool Tree::Verify(unsigned jobs) const {
 }
 
 std::vector<std::string> Tree::Command() const {
-  return {VESK2_COMMAND, "manifest", "verify",     root,     manifest,    "--tag",
-          "(install)",   "--global", place.Path(), "--home", place.Path()};
+  // On one thread, as what it is compared with.
+  return {VESK2_COMMAND, "manifest", "verify",   root,         manifest, "--tag",     "(install)",
+          "--jobs",      "1",        "--global", place.Path(), "--home", place.Path()};
 }
 
 std::string Tree::SumList() const {
