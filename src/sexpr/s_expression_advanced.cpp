@@ -150,7 +150,7 @@ int SExpression::PrintAdvanced(int (*write)(const char* text, unsigned int lengt
     if (step != Step::Close && !walk.IsFirst()) write(" ", 1, user);
     const int64_t at = int64_t{depth} + walk.Level() - 1;
     if (step == Step::Atom) {
-      walk.Value()->PrintAdvanced(write, user, static_cast<int>(at + 1));
+      static_cast<void>(walk.Value()->PrintAdvanced(write, user, static_cast<int>(at + 1)));
     } else if (at > 0) {
       write(step == Step::Open ? "(" : ")", 1, user);
     }
