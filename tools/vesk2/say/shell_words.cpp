@@ -15,29 +15,22 @@ bool IsPlain(char c) {
   return letter || std::string_view("-_./:=,+@%").find(c) != std::string_view::npos;
 }
 
-// A byte in a format of printf that stands in single quotes, in a substitution in double quotes.
-// An interactive shell looks for "!" before it looks for quotes.
-std::string FormatByte(char c, bool first) {
-  if (c == '%') return "%%";
+// A byte within $'...'. An interactive shell looks for "!" before it looks for quotes, and a shell
+// that does not know $'...' ends the quotes at the first "'": bytes that mean something anywhere
+// are numbers.
+std::string AnsiByte(char c) {
   const bool special = std::string_view("'\"`$\\!").find(c) != std::string_view::npos;
-  if (IsPrintable(c) && !special && !(first && c == '-')) return {c};
+  if (IsPrintable(c) && !special) return {c};
   const unsigned byte = static_cast<unsigned char>(c);
   std::string text = "\\";
   for (const unsigned shift : {6U, 3U, 0U}) text += static_cast<char>('0' + ((byte >> shift) & 7));
   return text;
 }
 
-// A substitution loses the line breaks at its end.
-std::string Substituted(const std::string& word) {
-  const size_t end = word.find_last_not_of('\n') + 1;  // 0 for a word of line breaks
-  std::string text;
-  for (size_t i = 0; i < end; ++i) text += FormatByte(word[i], i == 0);
-  if (end > 0) text = std::string("\"$(printf '").append(text).append("')\"");
-  if (end == word.size()) return text;
-  text += "$'";
-  for (size_t i = end; i < word.size(); ++i) text += "\\n";
-  text += '\'';
-  return text;
+std::string AnsiQuoted(const std::string& word) {
+  std::string text = "$'";
+  for (const char c : word) text += AnsiByte(c);
+  return text += '\'';
 }
 
 // What JSON can hold comes back as it was.
@@ -50,7 +43,7 @@ bool IsUtf8(const std::string& word) {
 std::string ShellWord(const std::string& word) {
   const bool plain = std::all_of(word.begin(), word.end(), IsPlain);
   if (plain && !word.empty() && word[0] != '=') return word;  // zsh looks for a program behind it
-  if (!std::all_of(word.begin(), word.end(), IsPrintable)) return Substituted(word);
+  if (!std::all_of(word.begin(), word.end(), IsPrintable)) return AnsiQuoted(word);
   std::string text = "'";
   for (const char c : word) {
     if (c == '\'') text += "'\\'";

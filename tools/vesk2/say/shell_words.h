@@ -14,8 +14,9 @@
 namespace vesk2_command {
 
 // ShellWord writes a word in printable ASCII so that a shell reads it back, byte by byte: as it is,
-// in single quotes, or as "$(printf '...')" where a byte is neither ASCII nor printable. That holds
-// for every shell of today; only a word that ends in a line break takes bash, ksh or zsh.
+// in single quotes, or as $'...' where a byte is neither ASCII nor printable. Every shell reads the
+// first two; $'...' is for those that people paste into (bash, ksh, zsh): another one takes it for
+// another word, and runs nothing of it either.
 std::string ShellWord(const std::string& word);
 std::string ShellLine(const std::vector<std::string>& words);
 
