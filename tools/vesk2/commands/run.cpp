@@ -51,9 +51,13 @@ class HelpText : public CLI::Formatter {
   }
 };
 
+// The options of a command are defined when its words were met: those of the others take longer
+// than a small verification.
 void DefineCommand(CLI::App& app, const Command& command, Common& common, Choice& choice) {
-  const Action action = DefineOptions(app, command, common);
-  app.callback([&choice, action, name = CommandName(command)] { choice = {name, action}; });
+  app.preparse_callback([&](size_t) {
+    if (!choice.command.empty()) return;
+    choice = {CommandName(command), DefineOptions(app, command, common)};
+  });
 }
 
 void Define(CLI::App& app, Common& common, Choice& choice) {
