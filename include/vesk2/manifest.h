@@ -127,6 +127,10 @@ class VESK2_API Manifest {
   // by the directory; or the one that ReadManifest told (see there), its root without a name. Null
   // when it did not come to that.
   BodyDirectory* GetListing() const;
+  // How many files the listing names that VerifyManifest compares now, those that are ignored not
+  // among them: for callbacks that show how far it has come, on any thread. 0 before the listing is
+  // read.
+  size_t CountListedFiles() const;
 
  private:
   friend class ManifestReader;
@@ -158,6 +162,7 @@ class VESK2_API Manifest {
   Ref<SExpression> type;
   Ref<TimeStamp> signingTime;
   size_t readPosition = 0;
+  size_t listedFiles = 0;
   bool storeUpdate = true;
   bool lostSetting = false;  // there was no memory to keep it
   Vesk2FileCallbacks fileCallbacks{};

@@ -183,6 +183,15 @@ int FindingTree::Unlisted(DirectoryFound& found, StatusSet& statuses) {
   return 0;
 }
 
+size_t CountFiles(BodyDirectory& directory) {
+  size_t files = directory.GetFiles().GetCount();
+  auto& below = directory.GetSubdirectories();
+  for (BodyObject* each = below.begin(); each != nullptr; each = below.next()) {
+    files += CountFiles(static_cast<BodyDirectory&>(*each));
+  }
+  return files;
+}
+
 }  // namespace
 
 int Manifest::Verify(ZvBuffer* body, const char* directoryPath) {
@@ -209,6 +218,7 @@ int Manifest::CheckListing(std::unique_ptr<BodyDirectory> root) {
   ZVsysutil::ZvCall call;
   Findings findings;
   StatusSet statuses;
+  listedFiles = CountFiles(*root);
   const Vesk2TaskRunner* const runner = taskRunner.run != nullptr ? &taskRunner : nullptr;
   FileHashing hashing(*root, *this, runner, call);
   int checked = hashing.Run(runner);

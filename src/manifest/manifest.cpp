@@ -111,6 +111,7 @@ void Manifest::ClearResults() {
   reasons.reset();
   reasonCount = 0;
   listing.reset();
+  listedFiles = 0;
 }
 
 int Manifest::ReadManifest(bool verifyChain, long notBefore, long notAfter, ZvBuffer** body) {
@@ -173,6 +174,7 @@ SExpression* Manifest::GetVersion() const { return version.get(); }
 SExpression* Manifest::GetType() const { return type.get(); }
 TimeStamp* Manifest::GetSigningTime() const { return signingTime.get(); }
 size_t Manifest::GetReadPosition() const { return readPosition; }
+size_t Manifest::CountListedFiles() const { return listedFiles; }
 BodyDirectory* Manifest::GetListing() const { return listing.get(); }
 void Manifest::SetExtraAclDirectory(char* owned) {
   extraAclDirectory.reset(owned);

@@ -88,13 +88,17 @@ std::set<std::string> Ignored(const Options& options) {
   return ignored;
 }
 
+ListingOptions HowToList(const Options& options) {
+  const std::string output = options.output == kStandard ? "" : options.output;
+  return {Ignored(options), options.allowLinks, output};
+}
+
 // Lists the tree, with everything that is to be said of it before it is signed.
 Listing ListOrExplain(const Options& options, ManifestWriter& writer) {
-  const std::set<std::string> ignored = Ignored(options);
-  const std::string output = options.output == kStandard ? "" : options.output;
-  const ProgressLine progress("hashing", options.directory);
-  Listing listing = ListTree(options.directory,
-                             {ignored, options.allowLinks, output, progress.Callbacks()}, writer);
+  const ProgressLine progress("hashing");
+  ListingOptions how = HowToList(options);
+  how.callbacks = progress.Callbacks();
+  Listing listing = ListTree(options.directory, how, writer);
   for (const std::string& problem : listing.problems) Note(problem);
   if (!listing.problems.empty()) {
     throw Trouble(std::to_string(listing.problems.size()) +
@@ -103,7 +107,7 @@ Listing ListOrExplain(const Options& options, ManifestWriter& writer) {
                   "tree-unverifiable");
   }
   NoteRemarks(listing.remarks);
-  for (const std::string& name : ignored) {
+  for (const std::string& name : how.ignored) {
     if (listing.ignored.count(name) == 0) Note("warning: --ignore " + Escape(name) + ": not there");
   }
   if (listing.files == 0 && !options.allowEmpty) {
@@ -147,9 +151,9 @@ void ShowListing(const Listing& listing) {
       entries.push_back({{"path", path}, {"kind", "directory"}});
       continue;
     }
-    Say(entry.digest + "  " + std::to_string(entry.bytes) + "  " + path);
+    Say(entry.digest + "  " + std::to_string(entry.stamp.bytes) + "  " + path);
     entries.push_back(
-        {{"path", path}, {"kind", "file"}, {"bytes", entry.bytes}, {"sha256", entry.digest}});
+        {{"path", path}, {"kind", "file"}, {"bytes", entry.stamp.bytes}, {"sha256", entry.digest}});
   }
   Result()["entries"] = entries;
 }
@@ -186,6 +190,16 @@ std::string MakeManifest(ManifestWriter& writer, const Parts& parts, const Signi
   return Written([&](FILE* stream) { return writer.Write(stream); });
 }
 
+// What cannot be verified is not handed out.
+void CheckWritten(const std::string& unnamed, const Options& options, const Listing& listing) {
+  CheckSigned(unnamed, options.directory);
+  const auto changed = ChangedSince(options.directory, listing, HowToList(options));
+  for (const std::string& path : changed) Note("changed meanwhile: " + Escape(path));
+  if (changed.empty()) return;
+  throw FileTrouble(options.directory, "changed while it was signed; nothing was signed",
+                    "tree-changed");
+}
+
 // The machine trusts the signing key for a tag from now on, as with acl grant.
 void WriteGrant(const Options& options, const SigningKey& key) {
   const Ref<ZvVesk2::AclEntry> entry =
@@ -207,10 +221,7 @@ ExitCode Run(const Options& options) {
   if (options.flags.dryRun) ShowListing(listing);
 
   const std::string manifest = MakeManifest(writer, parts, key, options.signer.algorithm);
-  // What cannot be verified is not handed out.
-  const auto check = [&](const std::string& unnamed) {
-    CheckSigned(unnamed, options.directory, Ignored(options));
-  };
+  const auto check = [&](const std::string& unnamed) { CheckWritten(unnamed, options, listing); };
   const std::string signer = Fingerprint(*key.Public());
   const std::string said = ": " + Totals(listing) + ", signed by " + signer;
   if (!WriteFile(options.output, manifest, {options.flags, check, said})) {

@@ -77,7 +77,7 @@ bool JudgedTree(const Manifest& manifest, int code) {
 }
 
 int VerifyFiles(Manifest& manifest, const Options& options, const Period& period) {
-  const ProgressLine progress("verifying", options.directory);
+  const ProgressLine progress("verifying", [&] { return manifest.CountListedFiles(); });
   const LentThreads threads(options.jobs, options.manifest);
   Check(manifest.SetFileCallbacks(progress.Callbacks()), "preparing");
   manifest.SetTaskRunner(threads.Runner());

@@ -21,10 +21,9 @@ namespace vesk2_command {
 // Has a manifest leave out the entries of these names.
 void IgnoreEntries(ZvVesk2::Manifest& manifest, const std::set<std::string>& names);
 
-// CheckSigned checks that a manifest can be verified, but for the authority of its signer: its
-// form, its signatures, its digest, and that the tree is as it says. Trouble says what is not so.
-void CheckSigned(const std::string& path, const std::string& directory,
-                 const std::set<std::string>& ignored);
+// CheckSigned checks that a manifest can be verified, but for the authority of its signer and the
+// tree: its form, its signatures, its digest, its listing. Trouble says what is not so.
+void CheckSigned(const std::string& path, const std::string& directory);
 
 // What a manifest file says, as the library read it: proved but for the authority of its signer, or
 // refused. What could not be read is missing.

@@ -3,7 +3,7 @@
 #include "tools/vesk2/say/progress.h"
 
 #include <cstdio>
-#include <filesystem>
+#include <utility>
 
 #include "tools/vesk2/say/line.h"
 #include "tools/vesk2/say/report.h"
@@ -33,15 +33,15 @@ std::string Minutes(double seconds) {
 
 }  // namespace
 
-ProgressLine::ProgressLine(const std::string& doing, const std::string& directory)
+ProgressLine::ProgressLine(const std::string& doing, std::function<size_t()> total)
     : doing_(doing),
+      total_(std::move(total)),
       wanted_(GetStyle().progress),
       callbacks_{sizeof callbacks_, this, nullptr,
                  [](void* user, uint64_t bytes) {
                    return static_cast<ProgressLine*>(user)->Add(0, bytes);
                  },
                  [](void* user, const char*, int) { static_cast<ProgressLine*>(user)->Add(1, 0); }},
-      expected_(wanted_ ? LookThrough(directory) : Sums()),
       start_(Clock::now()),
       next_(start_ + kPause) {}
 
@@ -49,27 +49,10 @@ ProgressLine::~ProgressLine() {
   if (wanted_) EraseLine();
 }
 
-// An estimate: links are not followed, and what cannot be read is left out.
-ProgressLine::Sums ProgressLine::LookThrough(const std::string& directory) {
-  namespace fs = std::filesystem;
-  Sums sums;
-  std::error_code error;
-  fs::recursive_directory_iterator each(directory, fs::directory_options::skip_permission_denied,
-                                        error);
-  while (!error && each != fs::recursive_directory_iterator()) {
-    std::error_code ignored;
-    if (each->is_regular_file(ignored)) {
-      const uintmax_t size = each->file_size(ignored);
-      if (!ignored) sums = {sums.files + 1, sums.bytes + size};
-    }
-    each.increment(error);
-  }
-  return sums;
-}
-
 int ProgressLine::Add(uint64_t files, uint64_t bytes) {
   const std::lock_guard<std::mutex> locked(mutex_);
-  done_ = {done_.files + files, done_.bytes + bytes};
+  files_ += files;
+  bytes_ += bytes;
   const Clock::time_point now = Clock::now();
   if (now < next_) return 0;
   next_ = now + kPause;
@@ -78,16 +61,14 @@ int ProgressLine::Add(uint64_t files, uint64_t bytes) {
 }
 
 std::string ProgressLine::Text(double seconds) const {
-  const auto bytes = static_cast<double>(done_.bytes);
-  const double rate = bytes / seconds;
-  std::string text = doing_ + " " + std::to_string(done_.files);
-  const bool known = done_.files <= expected_.files && done_.bytes <= expected_.bytes;
-  if (known) text += "/" + std::to_string(expected_.files);
-  text += " files, " + Bytes(bytes);
-  if (known) text += " of " + Bytes(static_cast<double>(expected_.bytes));
-  text += ", " + Bytes(rate) + "/s";
-  if (!known || rate <= 0) return text;
-  return text + ", " + Minutes(static_cast<double>(expected_.bytes - done_.bytes) / rate) + " left";
+  const size_t total = total_ ? total_() : 0;
+  const auto bytes = static_cast<double>(bytes_);
+  std::string text = doing_ + " " + std::to_string(files_);
+  if (total > 0) text += "/" + std::to_string(total);
+  text += " files, " + Bytes(bytes) + ", " + Bytes(bytes / seconds) + "/s";
+  if (files_ == 0 || files_ > total) return text;
+  const double each = seconds / static_cast<double>(files_);
+  return text + ", " + Minutes(each * static_cast<double>(total - files_)) + " left";
 }
 
 }  // namespace vesk2_command

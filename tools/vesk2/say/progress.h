@@ -5,6 +5,7 @@
 
 #include <chrono>
 #include <cstdint>
+#include <functional>
 #include <mutex>
 #include <string>
 
@@ -12,12 +13,14 @@
 
 namespace vesk2_command {
 
-// ProgressLine shows files, bytes, rate and the time that is left while its callbacks are called,
-// if the style asks for it. The line is gone with the object, and before anything else is said.
+// ProgressLine shows files, bytes and rate while its callbacks are called, if the style asks for
+// it, and how many files there will be and the time that is left where somebody knows. Nobody looks
+// through the tree for that: it would take as long as verifying some trees. The line is gone with
+// the object, and before anything else is said.
 class ProgressLine {
  public:
-  // `directory` is looked through first, for the sums that are to be reached.
-  ProgressLine(const std::string& doing, const std::string& directory);
+  // `total` tells how many files there are when the first was read; 0 when that is not known.
+  explicit ProgressLine(const std::string& doing, std::function<size_t()> total = nullptr);
   ~ProgressLine();
   ProgressLine(const ProgressLine&) = delete;
   ProgressLine& operator=(const ProgressLine&) = delete;
@@ -28,20 +31,16 @@ class ProgressLine {
 
  private:
   using Clock = std::chrono::steady_clock;
-  struct Sums {
-    uint64_t files = 0;
-    uint64_t bytes = 0;
-  };
-  static Sums LookThrough(const std::string& directory);
   int Add(uint64_t files, uint64_t bytes);
   std::string Text(double seconds) const;
 
   const std::string doing_;
+  const std::function<size_t()> total_;
   const bool wanted_;
   const Vesk2FileCallbacks callbacks_;
-  const Sums expected_;
   std::mutex mutex_;  // of what follows
-  Sums done_;
+  uint64_t files_ = 0;
+  uint64_t bytes_ = 0;
   const Clock::time_point start_;
   Clock::time_point next_;  // when to draw again
 };

@@ -36,11 +36,10 @@ const char* RemarkOn(const std::string& name) {
 
 }  // namespace
 
-void RemarkOnNames(const std::string& directory, const std::vector<std::string>& names,
-                   Remarks& remarks) {
+void RemarkOnNames(const std::string& directory, const std::vector<Name>& names, Remarks& remarks) {
   const std::string head = directory.empty() ? "" : directory + "/";
   std::map<std::string, std::string> folded;
-  for (const std::string& name : names) {
+  for (const auto& [name, maybeLink] : names) {
     const std::string path = head + name;
     if (const char* remark = RemarkOn(name)) remarks[remark].push_back(path);
     if (path.size() > kLongPath) remarks["a path so long that it hardly fits"].push_back(path);

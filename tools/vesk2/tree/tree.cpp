@@ -2,7 +2,6 @@
 // tree.cpp: listing a tree, and its links.
 #include "tools/vesk2/tree/tree.h"
 
-#include <dirent.h>
 #include <openssl/rand.h>
 #include <sys/stat.h>
 
@@ -11,11 +10,14 @@
 #include <climits>
 #include <cstdlib>
 #include <cstring>
+#include <ctime>
 #include <memory>
+#include <optional>
 
 #include "tools/vesk2/files/files.h"
 #include "tools/vesk2/objects/objects.h"
 #include "tools/vesk2/say/report.h"
+#include "tools/vesk2/tree/names.h"
 
 #include <vesk2/hash.h>
 
@@ -32,10 +34,6 @@ std::string RealPath(const std::string& path) {
   return real ? real.get() : "";
 }
 
-std::string Join(const std::string& directory, const std::string& name) {
-  return directory.empty() || directory.ends_with('/') ? directory + name : directory + "/" + name;
-}
-
 bool IsLink(const std::string& path) {
   struct stat status = {};
   if (lstat(path.c_str(), &status) == 0) return S_ISLNK(status.st_mode);
@@ -46,45 +44,30 @@ bool IsLink(const std::string& path) {
   throw FileTrouble(path, std::strerror(errno), "io");
 }
 
-struct CloseDirectory {
-  void operator()(DIR* stream) const { closedir(stream); }
-};
-
-// The names in a directory, in byte order; false with errno set when it cannot be read.
-bool ReadNames(const std::string& directory, std::vector<std::string>& names) {
-  const std::unique_ptr<DIR, CloseDirectory> stream(opendir(directory.c_str()));
-  if (!stream) return false;
-  errno = 0;
-  while (const dirent* entry = readdir(stream.get())) {
-    const std::string name = entry->d_name;
-    if (name != "." && name != "..") names.push_back(name);
-    errno = 0;
-  }
-  std::sort(names.begin(), names.end());
-  return errno == 0;
-}
-
 class Lister {
  public:
   Lister(const std::string& root, const ListingOptions& options, ManifestWriter& writer)
-      : options_(options),
-        writer_(writer),
-        realRoot_(RealDirectory(root)),
-        realOutput_(RealPath(options.output)) {}
+      : options_(options), writer_(writer), realRoot_(RealDirectory(root)) {
+    struct stat status = {};
+    if (!options.output.empty() && stat(options.output.c_str(), &status) == 0) {
+      output_.emplace(status.st_dev, status.st_ino);
+    }
+    listing_.begun = std::time(nullptr);
+  }
 
   // Appends the entries of a directory. `relative` is its path below the root, empty for the root.
   void List(const std::string& path, const std::string& relative, unsigned depth) {
     struct stat status = {};
-    std::vector<std::string> names;
+    std::vector<Name> names;
     if (stat(path.c_str(), &status) != 0 || !ReadNames(path, names)) {
       return Problem(path, std::strerror(errno));
     }
     const Identity identity(status.st_dev, status.st_ino);
     if (!open_.insert(identity).second) return Problem(path, "a link to a directory around it");
-    std::erase_if(names, [&](const std::string& name) { return IsIgnored(Join(relative, name)); });
+    std::erase_if(names, [&](const Name& name) { return IsIgnored(Join(relative, name.text)); });
     RemarkOnNames(relative, names, listing_.remarks);
-    for (const std::string& name : names) {
-      Entry(Join(path, name), name, Join(relative, name), depth);
+    for (const Name& name : names) {
+      Entry(Join(path, name.text), name, Join(relative, name.text), depth);
     }
     open_.erase(identity);
   }
@@ -104,27 +87,28 @@ class Lister {
     listing_.problems.push_back(Escape(path) + ": " + reason);
   }
 
-  void Entry(const std::string& path, const std::string& name, const std::string& relative,
+  void Entry(const std::string& path, const Name& name, const std::string& relative,
              unsigned depth) {
     struct stat status = {};
     if (path.size() > ZvVesk2::Limits::kMaxBodyPath) return Problem(path, "path too long");
-    if (!options_.allowLinks && LeavesTree(path, realRoot_)) {
+    if (name.maybeLink && !options_.allowLinks && LeavesTree(path, realRoot_)) {
       return Problem(path, "a link that leads out of the tree (--allow-links follows it)");
     }
     if (stat(path.c_str(), &status) != 0) return Problem(path, std::strerror(errno));
-    if (IsLink(path)) {
+    if (name.maybeLink && IsLink(path)) {
       listing_.remarks["a link; what it leads to is signed, not the link"].push_back(relative);
     }
     if (S_ISDIR(status.st_mode)) {
       if (depth == ZvVesk2::Limits::kMaxDepth) return Problem(path, "nested too deeply");
-      listing_.entries.push_back({relative + "/", 0, ""});
-      Check(writer_.OpenDirectory(name.c_str()), Escape(path));
+      listing_.entries.push_back({relative + "/", "", FileStamp(status)});
+      Check(writer_.OpenDirectory(name.text.c_str()), Escape(path));
       List(path, relative, depth + 1);
       Check(writer_.CloseDirectory(), Escape(path));
     } else if (!S_ISREG(status.st_mode)) {
       Problem(path, "neither a file nor a directory");
-    } else if (realOutput_.empty() || RealPath(path) != realOutput_) {
-      File(path, name, {relative, static_cast<uint64_t>(status.st_size), ""});
+    } else if (!output_ || *output_ != Identity(status.st_dev, status.st_ino) ||
+               RealPath(path) != RealPath(options_.output)) {
+      File(path, name.text, {relative, "", FileStamp(status)});
     }
   }
 
@@ -138,7 +122,7 @@ class Lister {
     if (code != 0) return Problem(path, Reason(code));
     Check(writer_.AddFile(name.c_str(), digest), Escape(path));
     ++listing_.files;
-    listing_.bytes += entry.bytes;
+    listing_.bytes += static_cast<uint64_t>(entry.stamp.bytes);
     entry.digest = Hex({reinterpret_cast<char*>(digest), length});
     listing_.entries.push_back(std::move(entry));
   }
@@ -146,8 +130,8 @@ class Lister {
   const ListingOptions& options_;
   ManifestWriter& writer_;
   std::string realRoot_;
-  std::string realOutput_;   // empty unless the output exists already
-  std::set<Identity> open_;  // the directories that are being listed
+  std::optional<Identity> output_;  // nothing unless the output exists already
+  std::set<Identity> open_;         // the directories that are being listed
   Listing listing_;
 };
 
@@ -197,6 +181,13 @@ std::set<std::string> ListedInRoot(BodyDirectory& root) {
 
 }  // namespace
 
+FileStamp::FileStamp(const struct stat& status)
+    : device(status.st_dev),
+      inode(status.st_ino),
+      bytes(status.st_size),
+      changed(status.st_ctim.tv_sec),
+      changedPart(status.st_ctim.tv_nsec) {}
+
 std::string RealDirectory(const std::string& directory) {
   struct stat status = {};
   if (stat(directory.c_str(), &status) != 0) {
@@ -235,13 +226,15 @@ TreeNotes InspectTree(BodyDirectory& root, const std::set<std::string>& ignored)
   Inspector inspector(root.GetName(), ignored);
   inspector.Inspect(root, "");
   TreeNotes notes{std::move(inspector.leaving), {}};
-  std::vector<std::string> names;
+  std::vector<Name> names;
   if (!ReadNames(root.GetName(), names)) {
     throw FileTrouble(root.GetName(), std::strerror(errno), "io");
   }
   const std::set<std::string> listed = ListedInRoot(root);
-  for (const std::string& name : names) {
-    if (listed.count(name) == 0 && ignored.count(name) == 0) notes.unlisted.push_back(name);
+  for (const Name& name : names) {
+    if (listed.count(name.text) == 0 && ignored.count(name.text) == 0) {
+      notes.unlisted.push_back(name.text);
+    }
   }
   return notes;
 }

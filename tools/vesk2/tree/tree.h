@@ -4,7 +4,7 @@
 #ifndef VESK2_TOOLS_TREE_H
 #define VESK2_TOOLS_TREE_H
 
-#include <sys/types.h>
+#include <sys/stat.h>
 
 #include <cstdint>
 #include <set>
@@ -32,10 +32,23 @@ struct ListingOptions {
   const Vesk2FileCallbacks* callbacks = nullptr;  // told about the files, or null
 };
 
+// Which file a name leads to, and when it was changed last. Whatever is written to a file moves the
+// second, which nobody but the system sets.
+struct FileStamp {
+  explicit FileStamp(const struct stat& status);
+  bool operator==(const FileStamp&) const = default;
+
+  dev_t device;
+  ino_t inode;
+  off_t bytes;
+  time_t changed;  // seconds, and the nanoseconds behind them
+  long changedPart;
+};
+
 struct ListedEntry {
-  std::string path;  // below the root; that of a directory ends in "/"
-  uint64_t bytes = 0;
+  std::string path;    // below the root; that of a directory ends in "/"
   std::string digest;  // SHA-256 in hexadecimal; empty for a directory
+  FileStamp stamp;     // from before it was read
 };
 
 struct Listing {
@@ -45,6 +58,7 @@ struct Listing {
   std::vector<std::string> problems;  // entries that cannot be signed, with the reason
   Remarks remarks;                    // on entries that can, but perhaps not verified elsewhere
   std::set<std::string> ignored;      // what was left out
+  time_t begun = 0;                   // when the first entry was looked at
 };
 
 // ListTree reads and hashes the whole tree, in byte order of the names, follows links, and writes
@@ -53,6 +67,12 @@ struct Listing {
 // themselves, files that cannot be read, paths that are too long.
 Listing ListTree(const std::string& directory, const ListingOptions& options,
                  ZvVesk2::ManifestWriter& writer);
+
+// ChangedSince returns the paths of what is no longer as ListTree found it: files, and directories
+// below the root that hold other names. A file is hashed again only if it was changed so shortly
+// before the listing that its stamp may not show another change.
+std::vector<std::string> ChangedSince(const std::string& directory, const Listing& listing,
+                                      const ListingOptions& options);
 
 // An ignore name as the library compares it.
 std::string PlainRelative(std::string name);
