@@ -43,6 +43,7 @@ Figures HashFigures();
 Figures TreeFigures();
 Figures StoreFigures();
 Figures ChainFigures();
+Figures CommandFigures();
 
 // ---- Measuring ---------------------------------------------------------------------------------
 

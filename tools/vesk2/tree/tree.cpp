@@ -140,23 +140,35 @@ class Inspector {
   Inspector(const std::string& root, const std::set<std::string>& ignored)
       : ignored_(ignored), realRoot_(RealDirectory(root)) {}
 
+  // The directory says of most of its entries that they are no links: they need no look.
   void Inspect(BodyDirectory& directory, const std::string& relative) {
+    std::vector<Name> names;
+    if (!ReadNames(directory.GetName(), names)) names.clear();
+    const auto mayBeLink = [&](const std::string& name) {
+      const auto found = std::ranges::lower_bound(names, name, {}, &Name::text);
+      return found == names.end() || found->text != name || found->maybeLink;
+    };
     auto& files = directory.GetFiles();
     for (BodyObject* file = files.begin(); file != nullptr; file = files.next()) {
-      Check(Join(directory.GetName(), file->GetName()), Join(relative, file->GetName()));
+      const std::string name = file->GetName();
+      if (mayBeLink(name)) Check(Join(directory.GetName(), name), Join(relative, name));
     }
     auto& subdirectories = directory.GetSubdirectories();
     for (BodyObject* each = subdirectories.begin(); each != nullptr; each = subdirectories.next()) {
       const std::string path = each->GetName();
-      const std::string below = Join(relative, path.substr(path.rfind('/') + 1));
-      if (Check(path, below)) Inspect(static_cast<BodyDirectory&>(*each), below);
+      const std::string name = path.substr(path.rfind('/') + 1);
+      const std::string below = Join(relative, name);
+      if (ignored_.count(below) != 0) continue;
+      // What lies behind a link out of the tree is told by the link.
+      if (mayBeLink(name) && !Check(path, below)) continue;
+      Inspect(static_cast<BodyDirectory&>(*each), below);
     }
   }
 
   std::vector<std::string> leaving;
 
  private:
-  // Whether to go on below the entry: what lies behind a link out of the tree is told by the link.
+  // Whether the entry stays within the tree.
   bool Check(const std::string& path, const std::string& relative) {
     if (ignored_.count(relative) != 0) return false;
     const bool leaves = LeavesTree(path, realRoot_);
