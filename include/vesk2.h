@@ -720,10 +720,10 @@ VESK2_API int Vesk2CertFree(Vesk2CertInfoStruct* chain);
  * about that moment. `chain` is the first record of Vesk2CertRead; it stays the caller's, and
  * may be asked any number of times.
  *
- * 0 is not given. With neither time no test of time is made at all: certificates and entries
- * that have ended pass, and every revocation counts whatever its date. With one time, whatever
- * meets the open period passes: with `notAfter` alone also what ended before it. The command
- * asks about now, or `--at`.
+ * 0 is not given. With neither time the periods of the chain must meet one another and nothing
+ * else is asked about time: certificates and entries that have ended pass, and every revocation
+ * counts whatever its date. With one time, whatever meets the open period passes: with
+ * `notAfter` alone also what ended before it. The command asks about now, or `--at`.
  *   0                              granted
  *   VESK2_ERR_PARAM_NULL           a null chain
  *   VESK2_ERR_INVALID_PARAM        a null tag text

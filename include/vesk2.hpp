@@ -27,12 +27,25 @@
 //
 // and beside them Ref, which owns a reference (ref.h), ZvBuffer, from which everything is read, and
 // crypto keys (platform.h), PointerArray (pointer_array.h), the two reductions (verify.h), the
-// store roots and the texts of codes (context.h), and every limit (limits.h).
+// store roots and the texts of codes (context.h), the texts that people are shown (wording.h), and
+// every limit (limits.h).
 //
 // To read them in order: expression.h (values, who owns them, how they are written), subject.h,
 // hash.h and public_key.h (who), cert.h and signature.h (one grant), cert_sequence.h with
 // acl_entry.h (a chain, and what it must end at), crl.h (what takes it back), manifest.h (what all
 // of it is for), evidence.h (why an answer is what it is).
+//
+// What holds in all of them:
+//   - A function that can fail returns an int, of the codes of vesk2.h: 0 is success, and every
+//     other answer of a verification a refusal. No exception leaves the library.
+//   - What is said to be shared, taken over or adopted is so in the sense of expression.h. Getters
+//     return borrowed pointers, outputs through reference arguments are the caller's, and must be
+//     null before where that is said.
+//   - Objects belong to one thread, and so do those that share a value. Separate objects on
+//     separate threads need no care; keys may be verified with by several at once.
+//   - After a failed Import or Set an object is partly built: free it. It is never taken for
+//     another one, as its fields are set to what its list holds.
+//   - A text that a stranger chose stays one: Wording makes it safe to be shown.
 //
 // What a program may rely on are the functions, static or not, and the virtual slots of these
 // classes. What an object holds and how it is laid out is nobody's to know: values are made with

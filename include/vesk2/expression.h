@@ -176,6 +176,7 @@ class VESK2_API ByteString : public DExpression {
   // Display hints: how the bytes are meant to be shown.
   enum BsType : int32_t { BsNone = 0, BsBin = 1, BsUtf8 = 2, BsNum = 3 };
 
+  // An empty string, for Set or Import.
   explicit ByteString(Vesk2ContextStruct* context);
   // Adopts `data`, an array from new[] of `length` bytes, without copying, of any length; null
   // makes an empty string. `context` may be null.
@@ -185,6 +186,9 @@ class VESK2_API ByteString : public DExpression {
   ~ByteString() override;
 
  public:
+  // See DExpression. A string's canonical form is its length in decimal without leading zeros, ":"
+  // and the bytes, whatever leading zeros it was read with: a string that was read is not always
+  // written as it was, and a signature is over what is written.
   [[nodiscard]] int UpdateHash(ZVCLMHashContextData* hash, bool ignoreHints) override;
   unsigned int CanonicalLength() override;
   unsigned int AdvancedLength() override;
@@ -267,12 +271,14 @@ class VESK2_API ByteString : public DExpression {
 // built, and have fields that point into it.
 class VESK2_API SExpression : public DExpression {
  public:
+  // An empty list, of storage type StorageHome and without a file.
   explicit SExpression(Vesk2ContextStruct* context);
 
  protected:
   ~SExpression() override;
 
  public:
+  // See DExpression. Each walks the list once, without recursion, and stops at Limits::kMaxDepth.
   [[nodiscard]] int UpdateHash(ZVCLMHashContextData* hash, bool ignoreHints) override;
   unsigned int CanonicalLength() override;
   unsigned int AdvancedLength() override;
@@ -286,6 +292,7 @@ class VESK2_API SExpression : public DExpression {
   // The class's directory below a store root and its file extension, static texts; empty when it
   // has none. A list without a directory is kept at a path of its own.
   virtual const char* DirectoryName() const;
+  // With its dot: ".cert". It is appended to names that do not end in it.
   virtual const char* ExtensionName() const;
   // Whether it is a Hash.
   virtual bool IsHash() const;
@@ -321,7 +328,9 @@ class VESK2_API SExpression : public DExpression {
 
   // The first and the last element, borrowed; null for an empty list. Count walks the list.
   DExpression* First() const;
+  // The last element is often the value: of (not-after <stamp>), for one.
   DExpression* Last() const;
+  // Counted by a walk: not for the condition of a loop.
   unsigned int Count() const;
   // Rest is a new list that shares all elements but the first; empty for a list of one or none,
   // null without memory. The caller frees it with Free().
@@ -344,7 +353,9 @@ class VESK2_API SExpression : public DExpression {
     // called.
     explicit Iterator(const Node* node) : node_(node) {}
     explicit operator bool() const { return node_ != nullptr; }
+    // The element, borrowed; IsSExpression tells of which kind it is.
     DExpression* Value() const;
+    // Moves on to the next element, or to the end.
     void Next();
 
    private:
@@ -428,6 +439,7 @@ class VESK2_API SExpression : public DExpression {
   // Wording::OfTag has a text for every tag. The text of a tag with a 0 byte in it ends there for
   // whoever reads a C string. ExportTagW gives the file-name form.
   char* ExportTag(const char* tag);
+  // The same text in the file-name form, which on Linux is the same bytes.
   char* ExportTagW(const char* tag);
 
   // IsSubset tells whether this tag lies within `other` (null: no). A shorter list is wider than a

@@ -25,6 +25,7 @@ namespace ZvVesk2 {
 //   if (code == 0) code = hash->Finalize();
 class VESK2_API Hash : public Principal {
  public:
+  // An object without a digest, for Init, Set or Import.
   explicit Hash(Vesk2ContextStruct* context);
 
  protected:

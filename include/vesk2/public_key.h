@@ -24,12 +24,14 @@ namespace ZvVesk2 {
 // names a key as well, and so does whatever else has that digest.
 class VESK2_API PublicKey : public Principal {
  public:
+  // An object without a key, for Import, SetRSA or SetDSA.
   explicit PublicKey(Vesk2ContextStruct* context);
 
  protected:
   ~PublicKey() override;
 
  public:
+  // "" and ".pub": keys have no store.
   const char* DirectoryName() const override;
   const char* ExtensionName() const override;
 
@@ -84,6 +86,7 @@ class VESK2_API PublicKey : public Principal {
   [[nodiscard]] int VerifyMobile(ByteString* algorithm, unsigned char* signature,
                                  unsigned int signatureLength, unsigned char* data,
                                  unsigned int dataLength) override;
+  // The same without the test of the key's kind: an RSA key answers VESK2_ERR_SIGNATURE.
   [[nodiscard]] int VerifyMobileDSA(ByteString* algorithm, unsigned char* signature,
                                     unsigned int signatureLength, unsigned char* data,
                                     unsigned int dataLength);
@@ -95,12 +98,15 @@ class VESK2_API PublicKey : public Principal {
   // What `out` held is overwritten. VESK2_ERR_MEM_ALLOC and the crypto layer's codes:
   // ZVCLM_ERR_NULL_PARAM for an object without a key, ZVCLM_ERR_NO_MEM.
   [[nodiscard]] int SshExport(unsigned char*& out, unsigned int& length);
+  // The form that `openssl pkey -pubin -inform DER` reads.
   [[nodiscard]] int X509Export(unsigned char*& out, unsigned int& length);
 
   // 1 RSA, 0 DSA, -1 none; the algorithm's name, "rsa" or "dsa", static, or null; the key length in
   // bits, of n or p without leading zeros, 0 for none.
   int32_t GetType() const;
+  // "rsa", "dsa", or null without a key.
   const char* GetAlgorithm() const;
+  // Bits: what people call the size of a key.
   uint32_t GetLength() const;
   // The crypto key object, borrowed as long as the key lives; null until there is a key.
   ZVCLMPublicKeyData* GetKey() const;
@@ -112,6 +118,7 @@ class VESK2_API PublicKey : public Principal {
   template <typename Form>
   [[nodiscard]] VESK2_LOCAL int SetNumbers(ZVCLMPublicKeyData* newKey);
 
+  // Set when the key is read, and not touched afterwards: several threads may look at them.
   int32_t keyType = -1;
   ZVCLMPublicKeyData* key = nullptr;
   const char* algorithmName = nullptr;

@@ -56,11 +56,14 @@ class VESK2_API Signature : public SExpression {
   [[nodiscard]] int Verify(Cert* cert);
   [[nodiscard]] int Verify(SExpression* object);
 
-  // The parts, borrowed from the list; null until imported or created. The algorithm is as it was
-  // written, which may be less than a full name.
+  // The parts, borrowed from the list; null until imported or created. The digest of what was
+  // signed: look at its algorithm where SHA-1 must not count.
   Hash* GetHash() const;
+  // Who signed. A hash names a signer and cannot check the signature.
   Principal* GetPrincipal() const;
+  // The algorithm as it was written, which may be less than a full name: see PublicKey::Verify.
   ByteString* GetAlgorithm() const;
+  // The signature itself.
   ByteString* GetValue() const;
 
  private:

@@ -24,6 +24,7 @@ class Hash;
 // a key's file is a path, and no store keeps any.
 class VESK2_API Subject : public SExpression {
  public:
+  // For the classes below: there is no mere subject.
   explicit Subject(Vesk2ContextStruct* context);
 
  protected:
@@ -49,6 +50,7 @@ class VESK2_API Subject : public SExpression {
 // Principal is a subject that can issue and sign: a PublicKey, or a Hash that stands for one.
 class VESK2_API Principal : public Subject {
  public:
+  // For PublicKey and Hash: there is no mere principal.
   explicit Principal(Vesk2ContextStruct* context);
 
  protected:
@@ -91,6 +93,7 @@ class VESK2_API Principal : public Subject {
 // a hash, which is what readers would take it for, so that none can come from outside.
 class VESK2_API Name : public Subject {
  public:
+  // A name without a text, for Set.
   explicit Name(Vesk2ContextStruct* context);
 
  protected:
@@ -120,6 +123,7 @@ class VESK2_API Name : public Subject {
 // The command does no better, but its advice never makes a threshold smaller.
 class VESK2_API ThresholdSubject : public Subject {
  public:
+  // One of nobody, for Import or Set.
   explicit ThresholdSubject(Vesk2ContextStruct* context);
 
  protected:
@@ -131,6 +135,7 @@ class VESK2_API ThresholdSubject : public Subject {
   // "[num]" does not verify. VESK2_ERR_INVALID_PARAM, VESK2_ERR_PARSE_FILE (also: an empty count,
   // fewer or other members), the codes of PublicKey::Import.
   [[nodiscard]] int Import(ZvBuffer* buffer) override;
+  // Always true.
   bool IsThresholdSubject() const override;
   using Subject::Import;
 
@@ -147,6 +152,8 @@ class VESK2_API ThresholdSubject : public Subject {
 
   // As they were set or read; 0 before that.
   unsigned int GetK() const;
+  // The members that there should be; the list may hold another number when Set was not followed by
+  // as many.
   unsigned int GetN() const;
 
  private:

@@ -15,6 +15,7 @@ namespace ZvVesk2 {
 // Gregorian calendar without leap seconds; the time zone of the process plays no part.
 class VESK2_API TimeStamp : public ByteString {
  public:
+  // A stamp of no moment, for Set or Import.
   explicit TimeStamp(Vesk2ContextStruct* context);
 
  protected:
