@@ -457,9 +457,9 @@ VESK2_API void Vesk2DoNothing(void);
 
 /* Vesk2HomeDirectory and Vesk2GlobalDirectory set the per-user and the machine-wide store root.
  * What lies there:
- *   HOME/cert/*.cert   chains of certificates (CertFind)
- *   GLOBAL/acl/*.acl   what this machine trusts: every such file is a trust root
- *   GLOBAL/cert/*.crl  the newest revocation list of each source
+ *   "*.cert" in HOME/cert   chains of certificates (CertFind)
+ *   "*.acl" in GLOBAL/acl   what this machine trusts: every such file is a trust root
+ *   "*.crl" in GLOBAL/cert  the newest revocation list of each source
  * The text is copied, cut after 4096 bytes (a cut path is never used: no store is found); null
  * sets the empty root, with which no store is found either, and which both are from the start.
  * There is one pair of roots for the process. Set both before the first thread starts, and
