@@ -1,5 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-// AclEntry: building one entry, and reading it from canonical text.
+// AclEntry: building one entry, and reading it from canonical text. Reading fills a Parts and
+// builds the list only when all of it made sense: an entry is trusted by its fields, so these must
+// never say more than the list that is written and reduced.
 #include <vesk2/acl_entry.h>
 
 #include "src/objects/granted_tag.h"
@@ -27,7 +29,8 @@ char* AclEntry::CalcPath(const char* name, StorageType type) {
   return SExpression::CalcPath(DirectoryName(true), ExtensionName(true), name, type);
 }
 
-// What an entry is made of. A reader fills one from text, Create from its arguments.
+// What an entry is made of. A reader fills one from text, Create from its arguments. A reference
+// that is not handed on to the list goes with this, on every path.
 struct AclEntry::Parts {
   bool version = false;
   Ref<Subject> subject;
@@ -44,6 +47,9 @@ namespace {
 
 // [OPENING BYTES ")"], OPENING being for instance "(7:comment"; null when it is not there.
 template <typename Atom>
+// [OPENING BYTES ")"], OPENING being for instance "(7:comment"; null when it is not there. Looked
+// for at its place only: an element out of order is an error, as the next required text is not
+// found, and never passed over. A period that was passed over would be none.
 [[nodiscard]] int ImportOptional(Ref<Atom>& out, const char* opening, ZvBuffer* buffer,
                                  Vesk2ContextStruct* ctx) {
   if (!buffer->Accept(opening)) return 0;
@@ -55,8 +61,10 @@ template <typename Atom>
 
 // ---- Building ----
 
+// The one writer of the list. Fields are set to what the list holds, as each part is appended.
 int AclEntry::Build(Parts&& parts) {
   VESK2_TRY(Insert("entry"));
+  // Always the "1" that was matched: no entry says another version.
   if (parts.version) {
     Ref<SExpression> pair;
     VESK2_TRY(SExpression::Create(pair.Out(), "version", "1", GetContext()));
@@ -78,12 +86,15 @@ int AclEntry::Build(Parts&& parts) {
   if (parts.generation) {
     ByteString* number = nullptr;
     VESK2_TRY(AppendPair(this, "generation", std::move(parts.generation), number));
+    // The reader refused an empty one, and Create writes one byte.
     generation = number->GetData()[0];
   }
   if (!parts.comment) return 0;
   return AppendPair(this, "comment", std::move(parts.comment), comment);
 }
 
+// Everything that can fail is done before the caller's references are taken, so that a caller need
+// not know how far it came.
 int AclEntry::Create(AclEntry*& out, Subject* subject, bool propagate, SExpression* tag,
                      TimeStamp* notBefore, TimeStamp* notAfter, unsigned int generation,
                      ByteString* comment) {
@@ -101,6 +112,7 @@ int AclEntry::Create(AclEntry*& out, Subject* subject, bool propagate, SExpressi
   parts.notBefore = Ref<TimeStamp>::Share(notBefore);
   parts.notAfter = Ref<TimeStamp>::Share(notAfter);
   if (generation != 0) {
+    // More than a byte has no form: readers take the first byte alone.
     const auto lowByte = static_cast<unsigned char>(generation);
     parts.generation.Reset(TryNew<ByteString>(subject->GetContext()));
     VESK2_REQUIRE(parts.generation, VESK2_ERR_MEM_ALLOC);
@@ -131,6 +143,8 @@ int AclEntry::Import(ZvBuffer* buffer) {
   return Build(std::move(parts));
 }
 
+// What an entry cannot do without: for whom, and what. There is no test of the tag: any list is
+// one, and stores hold such entries.
 int AclEntry::ImportGrant(Parts& parts, ZvBuffer* buffer) const {
   VESK2_TRY(buffer->Expect("(5:entry"));
   // Version and subject both begin "(7:".
@@ -140,10 +154,13 @@ int AclEntry::ImportGrant(Parts& parts, ZvBuffer* buffer) const {
   VESK2_TRY(buffer->Expect("subject"));
   VESK2_TRY(Subject::Import(parts.subject.Out(), buffer, GetContext()));
   VESK2_TRY(buffer->Expect(")"));
+  // A place of its own, before the tag, so that no tag can be mistaken for it.
   parts.propagate = buffer->Accept("(9:propagate)");
   return SExpression::Import(parts.tag.Out(), buffer, GetContext());
 }
 
+// The stamps are read as byte strings. The reduction compares them as such, and judges what a wrong
+// one is worth by that alone.
 int AclEntry::ImportRest(Parts& parts, ZvBuffer* buffer) const {
   Vesk2ContextStruct* const ctx = GetContext();
   parts.valid = buffer->Accept("(5:valid");
@@ -153,11 +170,13 @@ int AclEntry::ImportRest(Parts& parts, ZvBuffer* buffer) const {
     VESK2_TRY(buffer->Expect(")"));
   }
   VESK2_TRY(ImportOptional(parts.generation, "(10:generation", buffer, ctx));
+  // Without a byte there would be none to read the number from.
   VESK2_REQUIRE(!parts.generation || parts.generation->GetLength() > 0, VESK2_ERR_PARSE_FILE);
   VESK2_TRY(ImportOptional(parts.comment, "(7:comment", buffer, ctx));
   return buffer->Expect(")");
 }
 
+// Of the reduction's answer, whose reader lies further down: the reduction may not look up here.
 int AclEntry::ParseTagCanonical(SExpression*& out, unsigned char* data, unsigned int length,
                                 Vesk2ContextStruct* ctx) {
   return ReadGrantedTag(out, data, length, ctx);

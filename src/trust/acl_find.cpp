@@ -1,6 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
 // The questions that are put to the ACL store. All of them walk its files in the same way, hold one
-// entry at a time, and let the first accepted one decide; they differ in what they accept.
+// entry at a time, and let the first accepted one decide; they differ in what they accept. None of
+// them decides about a chain: that is the reduction's work, which sees all entries at once. They
+// are for who looks for an entry, and answer as programs have come to expect, the ends of periods
+// included.
+//
+// An answer costs a read and a parse of each file up to the one that decides, and one tag
+// comparison each, with a budget of its own (limits.h).
 #include <vesk2/acl_entry.h>
 #include <vesk2/cert.h>
 
@@ -10,7 +16,9 @@
 namespace ZvVesk2 {
 namespace {
 
-// Hands out the readable entries of the store, one at a time.
+// Hands out the readable entries of the store, one at a time. A file that is malformed is passed
+// over; one that was not read for want of memory, or because another process held it, ends the scan
+// with that code, so that "no such entry" is never said of an entry that is there (see Scan).
 class EntryScan {
  public:
   explicit EntryScan(Vesk2ContextStruct* ctx) : context_(ctx) {}
@@ -37,6 +45,7 @@ class EntryScan {
   Ref<AclEntry> entry_;
 };
 
+// One member of a k-of-n is enough here: who asks is told k, and counts.
 bool IsGrantee(AclEntry* entry, Principal* principal) {
   auto* threshold = dynamic_cast<ThresholdSubject*>(entry->GetSubject());
   return threshold != nullptr ? threshold->HasMember(principal)
@@ -66,12 +75,14 @@ bool HoldsInclusively(const AclEntry* entry, const TimeStamp* from, const TimeSt
   return end == nullptr || !end->IsBefore(now);
 }
 
-// The answer for an accepted entry: both values are successes.
+// The answer for an accepted entry: both values are successes. Callers show an exact match
+// differently from one by a wider entry.
 [[nodiscard]] int Granted(SExpression* tag, AclEntry* entry) {
   return tag->IsEqual(entry->GetTag()) ? VESK2_ERR_AUTH_TAGS_ARE_EQUAL : 0;
 }
 
-// Asks whether each signer is a member too. The answers do not count.
+// Asks whether each signer is a member too. The answers do not count. They never did: programs that
+// hand in signers have always been told of the first member alone, and count for themselves.
 void WalkSigners(ThresholdSubject* threshold, SExpression* signers) {
   for (auto it = signers->Begin(); it; it.Next()) {
     auto* cert = dynamic_cast<Cert*>(it.Value());
@@ -82,6 +93,8 @@ void WalkSigners(ThresholdSubject* threshold, SExpression* signers) {
 
 }  // namespace
 
+// The first entry that passes decides, in byte order of the file names, so that an administrator
+// can tell which one it is. The caller's end is not looked at: see HoldsStrictly.
 int AclEntry::Find(Principal* principal, SExpression* tag, TimeStamp* notBefore, TimeStamp*,
                    unsigned int& k) {
   VESK2_REQUIRE(tag != nullptr, VESK2_ERR_PARAM_NULL);
@@ -91,6 +104,7 @@ int AclEntry::Find(Principal* principal, SExpression* tag, TimeStamp* notBefore,
   Ref<TimeStamp> now;
   VESK2_TRY(MakeNow(now, tag->GetContext()));
 
+  // Which of the two refusals it is: "you are not known here" or "not for this".
   bool principalSeen = false;
   while (scan.Next()) {
     AclEntry* const entry = scan.Entry();
@@ -108,6 +122,8 @@ int AclEntry::Find(Principal* principal, SExpression* tag, TimeStamp* notBefore,
   return scan.Result(principalSeen ? VESK2_ERR_ACL_ENTRY_NOT_FOUND : VESK2_ERR_ACL_KEY_NOT_FOUND);
 }
 
+// Find for one member of a group. The order of the tests is that of Find, and of the two refusals
+// as well.
 int AclEntry::FindThresholdEntry(Principal* principal, SExpression* signers, SExpression* tag,
                                  TimeStamp* notBefore, TimeStamp*, unsigned int& k) {
   VESK2_REQUIRE(principal != nullptr && tag != nullptr, VESK2_ERR_PARAM_NULL);
@@ -133,6 +149,8 @@ int AclEntry::FindThresholdEntry(Principal* principal, SExpression* signers, SEx
   return scan.Result(principalSeen ? VESK2_ERR_ACL_ENTRY_NOT_FOUND : VESK2_ERR_ACL_KEY_NOT_FOUND);
 }
 
+// Equality and not containment: a source of revocation lists is one tag, and a wider entry is no
+// source of it. No time is asked.
 int AclEntry::Find(SExpression* tag) {
   VESK2_REQUIRE(tag != nullptr, VESK2_ERR_PARAM_NULL);
   EntryScan scan(tag->GetContext());
@@ -143,6 +161,8 @@ int AclEntry::Find(SExpression* tag) {
   return scan.Result(VESK2_ERR_ACL_ENTRY_NOT_FOUND);
 }
 
+// Whether anything here would cover the tag, now or at another time: what an editor of entries asks
+// before it adds one.
 int AclEntry::FindSuperSet(SExpression* tag, bool needPropagate) {
   VESK2_REQUIRE(tag != nullptr, VESK2_ERR_INVALID_PARAM);
   EntryScan scan(tag->GetContext());
@@ -157,6 +177,7 @@ int AclEntry::FindSuperSet(SExpression* tag, bool needPropagate) {
 int AclEntry::FindRevocationEntry(SExpression* revocationTag) {
   VESK2_REQUIRE(revocationTag != nullptr, VESK2_ERR_INVALID_PARAM);
   VESK2_REQUIRE(EndsInRevoke(revocationTag), VESK2_ERR_INVALID_REVOCATION_TAG);
+  // Who may grant what lies between the keyword and (revoke ...) may take it back.
   Ref<SExpression> tag;
   VESK2_TRY(MakeTag(tag, revocationTag, true));
   return Find(tag.get());

@@ -1,5 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
-// Installing trust roots: copying into the store what it lacks.
+// Installing trust roots: copying into the store what it lacks. Every "*.acl" file of the directory
+// that is handed in can become a root of trust, so that who calls this trusts its writer with
+// everything. What is in the store already is never changed: an entry is replaced only by removing
+// it first.
 #include <vesk2/acl_entry.h>
 
 #include "src/platform/file.h"
@@ -14,7 +17,9 @@ namespace ZvVesk2 {
 namespace {
 
 // Whether the entry was read from the store: its path is where the store would put it. One that
-// counted as new for want of memory would be installed a second time.
+// counted as new for want of memory would be installed a second time. Asked by path, as loading
+// hands out the store's entries and those of the directory in one list. (The directory may be the
+// store itself, or another road to it.)
 [[nodiscard]] int IsStored(bool& stored, const AclEntry* entry) {
   TextPtr path;
   const int code = FilePath(path, AclEntry::DirectoryName(true), AclEntry::ExtensionName(true),
@@ -24,7 +29,8 @@ namespace {
   return 0;
 }
 
-// Parts the loaded entries into those of the store and the others.
+// Parts the loaded entries into those of the store and the others, both in the order in which they
+// were loaded.
 [[nodiscard]] int Split(SExpression* loaded, SExpression* stored, SExpression* added) {
   for (auto it = loaded->Begin(); it; it.Next()) {
     auto* entry = dynamic_cast<AclEntry*>(it.Value());
@@ -38,6 +44,8 @@ namespace {
 
 // Only whether a tag is there is asked.
 struct Nothing {};
+// Of n entries with m in the store this costs n + m digests; comparing each with each would cost n
+// times m, of which a directory with many files chooses one factor.
 using StoredTags = TagIndex<Nothing>;
 
 [[nodiscard]] int IndexTags(StoredTags& tags, SExpression* entries) {
@@ -51,7 +59,9 @@ using StoredTags = TagIndex<Nothing>;
 }
 
 // Writes the entry into the store under its file's name, unless another trust root has that name,
-// or its tag.
+// or its tag. Only the tag is compared: an entry with a stored tag and another subject stays out,
+// as installers rely on. The name is tested first for a clear answer; what decides is the writing,
+// which never replaces.
 [[nodiscard]] int Install(AclEntry* entry, StoredTags& tags) {
   bool hashed = false;
   TagDigest digest;
@@ -67,6 +77,8 @@ using StoredTags = TagIndex<Nothing>;
   return WriteStored(entry, entry->GetFileName(), false);
 }
 
+// All is loaded before anything is written: when memory or descriptors run out half-way, the store
+// must not hold a part that passes for all.
 [[nodiscard]] int InstallAll(const char* dir, Vesk2ContextStruct* ctx) {
   Ref<SExpression> stored;
   Ref<SExpression> added;
@@ -79,6 +91,7 @@ using StoredTags = TagIndex<Nothing>;
   StoredTags tags;
   VESK2_TRY(IndexTags(tags, stored.get()));
 
+  // What earlier writers left when they were killed.
   ZVsysutil::zv_remove_leftovers(TextPtr(AclEntry::CalcDir(StorageGlobal)).get());
   for (auto it = added->Begin(); it; it.Next()) {
     auto* entry = dynamic_cast<AclEntry*>(it.Value());

@@ -1,5 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
-// Loading entries from files: one, or every one of the store.
+// Loading entries from files: one, or every one of the store. An entry that is passed over takes
+// with it the trust that it gives, which is a refusal too many, and the source of revocation lists
+// that it names, which is a refusal too few. Malformed files are passed over all the same, as one
+// bad file must not stop a machine; what was only not read is an error.
 #include <vesk2/acl_entry.h>
 
 #include <cstring>
@@ -9,6 +12,8 @@
 
 namespace ZvVesk2 {
 
+// A "/" makes it a path, as names in a store have none: nobody reaches outside the store by a name,
+// and a path needs no store.
 int AclEntry::Import(const char* name) {
   VESK2_REQUIRE(name != nullptr && First() == nullptr, VESK2_ERR_INVALID_PARAM);
   if (std::strchr(name, '/') != nullptr) {
@@ -25,6 +30,9 @@ int AclEntry::Import(const char* name) {
   return Import(buffer.get());
 }
 
+// Each entry keeps the path that it was read from: explanations name it, and InstallAcls tells the
+// store's own by it. The result is that of the last file, which programs rely on to hear of a bad
+// one; those before it were loaded or passed over.
 int AclEntry::LoadDirectory(SExpression* list, const char* directory) {
   Scan scan;
   VESK2_TRY(scan.Open(directory, "*.acl"));
@@ -46,9 +54,12 @@ int AclEntry::Import(SExpression*& out, Vesk2ContextStruct* ctx, const char* ext
   VESK2_TRY(SExpression::Create(list.Out(), "acl", ctx));
 
   TextPtr store;
+  // No root and no directory are one thing: a machine without a store.
   int stored = StoreDirectory(store, DirectoryName(true), StorageGlobal);
   if (stored == 0) stored = LoadDirectory(list.get(), store.get());
   VESK2_REQUIRE(!IsNoAbsence(stored), stored);
+  // With a directory of his own the caller can do without the store; without both nobody is
+  // trusted.
   VESK2_REQUIRE(stored == 0 || extraDir != nullptr, VESK2_ERR_FILE_NOT_FOUND);
   if (extraDir != nullptr) {
     const int extra = LoadDirectory(list.get(), extraDir);

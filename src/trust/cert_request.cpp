@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// CertRequest: a certificate sequence in a ".req" file, outside every store.
+// CertRequest: a certificate sequence in a ".req" file, outside every store. A request travels to
+// who may grant it and is not kept: it has no store, and its name is a path wherever it is given.
 #include <vesk2/cert_sequence.h>
 
 #include "src/sexpr/storage.h"
@@ -15,6 +16,8 @@ const char* CertRequest::DirectoryName() const { return ""; }
 
 const char* CertRequest::ExtensionName() const { return ".req"; }
 
+// Only the first triple: what a requester asks for is one certificate, and the rest of the file is
+// not read for it.
 int CertRequest::Import(Cert*& cert, Signature*& signature, SExpression*& sequence,
                         const char* file, Vesk2ContextStruct* context) {
   VESK2_REQUIRE(cert == nullptr && signature == nullptr && sequence == nullptr && file != nullptr,

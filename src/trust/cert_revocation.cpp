@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // What a certificate asks of the trust store: whether it was revoked; and a trust root seen as a
-// certificate.
+// certificate. It is here, above the class, because a certificate knows nothing of stores: the
+// arrows point down.
 #include <vesk2/cert.h>
 
 #include <vesk2/acl_entry.h>
@@ -12,6 +13,8 @@
 
 namespace ZvVesk2 {
 
+// Nothing is counted: the entry outlives its view, which is made for the time of one question. No
+// list is built, so that nobody can write a certificate that nobody issued.
 Cert::Cert(AclEntry* entry)
     : SExpression(entry->GetContext()),
       subject(entry->GetSubject()),
@@ -21,6 +24,10 @@ Cert::Cert(AclEntry* entry)
       notAfter(entry->GetNotAfter()),
       comment(entry->GetComment()) {}
 
+// The key is asked first: a revoked key ends it, whatever its certificates say, and needs no list
+// of the certificate's own source. Only the subject's key is asked. The issuer is the subject of
+// the next certificate, or is named by an entry, which is taken back by removing it; members of a
+// k-of-n are asked by nobody, as the question is about the group's digest.
 int RevocationLists::Mark(Decision& decision, Cert* cert, const TimeStamp* notBefore) {
   // Chain verification looks at the status alone: it speaks for the certificate only when both
   // questions were answered.
@@ -33,6 +40,8 @@ int RevocationLists::Mark(Decision& decision, Cert* cert, const TimeStamp* notBe
   }
   VESK2_TRY(key);
 
+  // A certificate that names no source cannot be revoked itself, and one that does is lost without
+  // a list of it: its issuer wanted it so.
   if (cert->GetRevocationElement() != nullptr) {
     Ref<SExpression> source;
     VESK2_TRY(MakeTag(source, cert->GetRevocationElement()));
@@ -47,6 +56,8 @@ int RevocationLists::Mark(Decision& decision, Cert* cert, const TimeStamp* notBe
   return 0;
 }
 
+// The end of the period plays no part: what is revoked at its start stays revoked, and what is
+// revoked within it was good when it began.
 int Cert::IsRevoked(bool& revoked, SExpression* acls, SExpression* crls, TimeStamp* from,
                     TimeStamp*) {
   revoked = false;
@@ -58,6 +69,7 @@ int Cert::IsRevoked(bool& revoked, SExpression* acls, SExpression* crls, TimeSta
 
 int Cert::IsRevoked(bool& revoked) {
   revoked = false;
+  // Who looks at the status after a failure on the way must not see an older answer.
   revocationStatus = Undetermined;
   const ZVsysutil::ZvCall call;
   Ref<SExpression> acls;

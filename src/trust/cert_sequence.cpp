@@ -1,5 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // CertSequence: reading a chain of certificates, whole, triple by triple, or only its first triple.
+// A chain comes from whoever wants something granted. Reading it proves nothing; what it costs is
+// bounded by the file's size and by the depth of lists.
 #include <vesk2/cert_sequence.h>
 
 #include "src/sexpr/storage.h"
@@ -42,6 +44,8 @@ struct Triple {
   Ref<Signature> signature;
   Ref<SExpression> extra;
 
+  // In this order, as each kind has another reader: a certificate where a signature belongs fails
+  // here, and later stages need not ask what they hold.
   [[nodiscard]] int Import(ZvBuffer* buffer, Vesk2ContextStruct* ctx) {
     VESK2_TRY(ImportNew(cert, buffer, ctx));
     VESK2_TRY(ImportNew(signature, buffer, ctx));
@@ -49,7 +53,8 @@ struct Triple {
   }
 };
 
-// Finds and reads the file of a sequence.
+// Finds and reads the file of a sequence, whole: a file that changes while triples are read from it
+// would be a chain that nobody wrote.
 [[nodiscard]] int OpenFile(BufferOwner& buffer, TextPtr& path, const char* name, bool usePath) {
   const int code =
       FilePath(path, CertSequence::DirectoryName(true), CertSequence::ExtensionName(true), name,
@@ -60,7 +65,8 @@ struct Triple {
 
 }  // namespace
 
-// (8:sequence (CERT SIGNATURE EXPRESSION)...)
+// (8:sequence (CERT SIGNATURE EXPRESSION)...) A sequence without triples is one: what needs a
+// certificate says so itself. Bytes after the last ")" are nobody's, and left.
 int CertSequence::Import(CertSequence*& out, ZvBuffer* buffer, Vesk2ContextStruct* ctx) {
   VESK2_REQUIRE(out == nullptr && buffer != nullptr, VESK2_ERR_INVALID_PARAM);
   VESK2_TRY(buffer->Expect(kOpening));
@@ -87,12 +93,15 @@ int CertSequence::Import(CertSequence*& out, const char* name, bool usePath,
   VESK2_TRY(OpenFile(buffer, path, name, usePath));
   Ref<CertSequence> sequence;
   VESK2_TRY(Import(sequence.Out(), buffer.get(), ctx));
+  // So that a program can write it back to where it was.
   sequence->SetStorageType(usePath ? StoragePath : StorageHome);
   VESK2_TRY(sequence->SetFilePath(path.get()));
   out = sequence.Release();
   return 0;
 }
 
+// The first triple tells what a stored chain is about: a store of many is searched without reading
+// chains to their ends.
 int CertSequence::Import(Cert*& cert, Signature*& signature, SExpression*& extra, ZvBuffer* buffer,
                          Vesk2ContextStruct* ctx) {
   // `extra` may be left over from an earlier read; it is overwritten.
@@ -108,6 +117,7 @@ int CertSequence::Import(Cert*& cert, Signature*& signature, SExpression*& extra
   return 0;
 }
 
+// Here `extra` is tested as well, as callers of this form have always had to empty it.
 int CertSequence::Import(Cert*& cert, Signature*& signature, SExpression*& extra, const char* name,
                          bool usePath, Vesk2ContextStruct* ctx) {
   VESK2_REQUIRE(cert == nullptr && signature == nullptr && extra == nullptr && name != nullptr,
@@ -120,6 +130,8 @@ int CertSequence::Import(Cert*& cert, Signature*& signature, SExpression*& extra
 
 // ---- One triple at a time ----
 
+// The walk holds a buffer and no sequence: a program can look at one triple at a time of a chain
+// that it would not want in memory as objects.
 int CertSequence::GetFirstPair(ZvBuffer*& buffer, Cert*& cert, Signature*& signature,
                                SExpression*& extra, const char* name, bool usePath,
                                Vesk2ContextStruct* ctx) {
@@ -141,6 +153,8 @@ int CertSequence::GetFirstPair(ZvBuffer*& buffer, Cert*& cert, Signature*& signa
   return 0;
 }
 
+// The outputs are emptied before anything is tested, so that a loop that looks at `cert` ends on
+// every failure.
 int CertSequence::GetNextPair(ZvBuffer*& buffer, Cert*& cert, Signature*& signature,
                               SExpression*& extra, Vesk2ContextStruct* ctx) {
   // What the outputs held is the caller's: nothing here frees it.
@@ -148,6 +162,7 @@ int CertSequence::GetNextPair(ZvBuffer*& buffer, Cert*& cert, Signature*& signat
   signature = nullptr;
   VESK2_REQUIRE(buffer != nullptr, VESK2_ERR_INVALID_PARAM);
   if (buffer->Peek() == ')') return 0;
+  // After a failure the place in the text means nothing, so nobody is to go on from it.
   BufferOwner opened(std::exchange(buffer, nullptr));
   Triple triple;
   VESK2_TRY(triple.Import(opened.get(), ctx));

@@ -1,5 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
-// CertSequence: looking for a stored chain by what its first certificate grants.
+// CertSequence: looking for a stored chain by what its first certificate grants. Nothing is
+// verified: who finds a chain here presents it, and is judged then. The two searches differ in what
+// a file that cannot be read means: for "the one chain" it is an error, for "all that could do" one
+// fewer.
 #include <vesk2/cert_sequence.h>
 
 #include <cstring>
@@ -12,6 +15,7 @@
 namespace ZvVesk2 {
 namespace {
 
+// Programs know a missing home root by this code.
 [[nodiscard]] int OpenStore(Scan& scan) {
   TextPtr directory;
   VESK2_REQUIRE(StoreDirectory(directory, CertSequence::DirectoryName(true), StorageHome) == 0,
@@ -19,6 +23,8 @@ namespace {
   return scan.Open(directory.get(), "*.cert");
 }
 
+// What the chain is for is said by the tag of its first certificate: the rest of the file is not
+// read.
 [[nodiscard]] int ReadFirst(Ref<Cert>& cert, const char* path, Vesk2ContextStruct* ctx) {
   BufferOwner buffer;
   VESK2_TRY(WrapFile(buffer, path, VESK2_ERR_FILE_OPEN));
@@ -27,7 +33,7 @@ namespace {
   return CertSequence::Import(cert.Out(), signature.Out(), extra.Out(), buffer.get(), ctx);
 }
 
-// The bare name of what was found.
+// The bare name of what was found. A scan's paths always have a "/".
 const char* NameOf(const char* path) { return std::strrchr(path, '/') + 1; }
 
 // Appends the name together with its terminating 0 byte: callers print the bytes as a C string.
@@ -41,6 +47,8 @@ const char* NameOf(const char* path) { return std::strrchr(path, '/') + 1; }
 
 }  // namespace
 
+// Goes on after the first match: that there are several is the answer, and the first name is handed
+// out with it.
 int CertSequence::Find(char*& fileName, SExpression* tag) {
   VESK2_REQUIRE(fileName == nullptr && tag != nullptr, VESK2_ERR_INVALID_PARAM);
   Scan scan;
@@ -64,6 +72,8 @@ int CertSequence::Find(char*& fileName, SExpression* tag) {
   return status;
 }
 
+// A comparison that fails reads as "does not cover" (IsSubset), so that a chain may be left out;
+// none is named that does not.
 int CertSequence::Find(SExpression*& names, SExpression* tag) {
   VESK2_REQUIRE(names == nullptr && tag != nullptr, VESK2_ERR_INVALID_PARAM);
   Ref<SExpression> list(TryNew<SExpression>(tag->GetContext()));

@@ -2,6 +2,9 @@
 // CertSequence: whether a chain proves that a subject holds a tag. The first failure is the answer.
 //
 // Each stage works on an Evidence, which judges; the stages load into it what they need, afresh.
+// Stages are exported one by one, so each loads the stores itself: what a caller did in between to
+// the stores counts, as it always has. The signatures come first, so that nobody is told of
+// revocation or grants about a text that was never signed.
 #include <vesk2/cert_sequence.h>
 #include <vesk2/crl.h>
 #include <vesk2/evidence.h>
@@ -14,7 +17,9 @@ namespace ZvVesk2 {
 namespace {
 
 // Takes the certificates of a sequence. With `verify`, their signatures are verified: up to the
-// first failure, or all of them for `wholly`.
+// first failure, or all of them for `wholly`. Each signature costs an exponentiation with numbers
+// that the chain brings (bounded: limits.h), so that a chain's verification is linear in its
+// certificates. After a failure only an explanation wants the rest.
 [[nodiscard]] int TakeCerts(const CertSequence& sequence, Evidence& evidence, bool verify,
                             bool wholly) {
   auto at = FirstItem(&sequence);
@@ -22,9 +27,12 @@ namespace {
   int failure = 0;
   while (at) {
     ChainLink link;
+    // An answer that a signature gave first stays the answer, also when the chain turns out to be
+    // cut off behind it.
     const int whole = ReadWholeLink(link, at);
     VESK2_REQUIRE(whole == 0, failure != 0 ? failure : whole);
     const int code = verify ? link.signature->Verify(link.cert) : 0;
+    // That there was no memory says nothing about the signature.
     VESK2_REQUIRE(!LacksMemory(code), code);
     VESK2_TRY(evidence.AddCert(link.cert, link.signature, code));
     if (failure == 0) failure = code;
@@ -33,6 +41,7 @@ namespace {
   return failure;
 }
 
+// The roots of this moment.
 [[nodiscard]] int LoadEntries(Evidence& evidence, Vesk2ContextStruct* ctx) {
   Ref<SExpression> acls;
   VESK2_TRY(LoadRoots(acls, ctx));
@@ -40,6 +49,7 @@ namespace {
   return 0;
 }
 
+// Which lists there are, the roots say: a list of a source that no entry names is not even opened.
 [[nodiscard]] int LoadLists(Evidence& evidence, Vesk2ContextStruct* ctx) {
   VESK2_TRY(LoadEntries(evidence, ctx));
   Ref<SExpression> lists;
@@ -55,6 +65,8 @@ namespace {
 
 }  // namespace
 
+// The form for files that callers hold by name. The wait for files that others hold is one for all
+// of it (ZvCall).
 int CertSequence::Verify(Subject* subject, SExpression* tag, TimeStamp* notBefore,
                          TimeStamp* notAfter, const char* name, bool usePath,
                          Vesk2ContextStruct* ctx) {
@@ -79,6 +91,8 @@ int CertSequence::Verify(Subject* subject, SExpression* tag, TimeStamp* notBefor
   evidence.Clear(Evidence::Chain);
   evidence.SetSubject(subject);
   evidence.SetPeriod(notBefore, notAfter);
+  // All of it is taken before an answer is given: an explanation tells of every signature, also of
+  // a chain whose first one fails.
   const int signatures = TakeCerts(*this, evidence, true, true);
   VESK2_REQUIRE(!LacksMemory(signatures), signatures);
   const int stores = AskStores(evidence, GetContext());
@@ -87,6 +101,8 @@ int CertSequence::Verify(Subject* subject, SExpression* tag, TimeStamp* notBefor
   VESK2_TRY(signatures);
   VESK2_TRY(stores);
   VESK2_TRY(evidence.CheckRevoked());
+  // Read again, as the stage of that name does: both verifications must answer alike when the store
+  // changes in between.
   VESK2_TRY(LoadEntries(evidence, GetContext()));
   return evidence.Prove(tag);
 }
@@ -96,6 +112,7 @@ int CertSequence::VerifySignatures() {
   return TakeCerts(*this, evidence, true, false);
 }
 
+// Also of certificates that nothing vouches for yet: this stage alone grants nothing.
 int CertSequence::VerifyRevocations(TimeStamp* notBefore, TimeStamp* notAfter) {
   const ZVsysutil::ZvCall call;
   Evidence evidence(GetContext());
@@ -105,6 +122,7 @@ int CertSequence::VerifyRevocations(TimeStamp* notBefore, TimeStamp* notAfter) {
   return evidence.CheckRevoked();
 }
 
+// The reduction alone. It believes that signatures were checked and knows of no revocation.
 int CertSequence::VerifyChain(Subject* subject, SExpression* tag, TimeStamp* notBefore,
                               TimeStamp* notAfter) {
   Evidence evidence(GetContext());

@@ -1,5 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-// CertSequence: what a chain grants when the certificates that fail are left out of it.
+// CertSequence: what a chain grants when the certificates that fail are left out of it. It tells
+// what could be granted, for tools that show it. It is lenient where a verdict must not be:
+// undetermined certificates are kept, and no time is asked.
 #include <vesk2/acl_entry.h>
 #include <vesk2/cert_sequence.h>
 #include <vesk2/crl.h>
@@ -13,11 +15,13 @@
 namespace ZvVesk2 {
 namespace {
 
+// Items of other kinds fail like a bad signature: the walk goes on behind them by the same rule.
 [[nodiscard]] int VerifyLink(const ChainLink& link) {
   VESK2_REQUIRE(link.cert != nullptr && link.signature != nullptr, VESK2_ERR_SIGNATURE);
   return link.signature->Verify(link.cert);
 }
 
+// Both stores once, for all certificates together.
 [[nodiscard]] int AskStores(Evidence& evidence, Vesk2ContextStruct* ctx) {
   const ZVsysutil::ZvCall call;
   Ref<SExpression> acls;
@@ -29,7 +33,8 @@ namespace {
   return evidence.MarkRevoked();
 }
 
-// Replaces the lists by what is not revoked of them. Both are as they were after a failure.
+// Replaces the lists by what is not revoked of them. Both are as they were after a failure. The two
+// lists run in step: the extra item of a certificate goes with it.
 [[nodiscard]] int DropRevoked(Ref<SExpression>& certs, Ref<SExpression>& extras, Evidence& evidence,
                               Vesk2ContextStruct* ctx) {
   for (auto it = certs->Begin(); it; it.Next()) {
@@ -40,6 +45,7 @@ namespace {
 
   Ref<SExpression> keptCerts(TryNew<SExpression>(ctx));
   Ref<SExpression> keptExtras(TryNew<SExpression>(ctx));
+  // Both lists are made before either is filled.
   VESK2_REQUIRE(keptCerts && keptExtras, VESK2_ERR_MEM_ALLOC);
   auto extra = extras->Begin();
   for (auto it = certs->Begin(); it && extra; it.Next(), extra.Next()) {
@@ -63,8 +69,11 @@ int CertSequence::Verify2(SExpression*& tag, SExpression*& notBefore, SExpressio
   return Verify2(tag, notBefore, notAfter, evidence);
 }
 
+// Unlike Verify, a bad signature costs its certificate only, and what is left may still be a chain.
 int CertSequence::Verify2(SExpression*& tag, SExpression*& notBefore, SExpression*& notAfter,
                           Evidence& evidence) {
+  // Emptied before anything is tested: evidence of an earlier question must not stand beside this
+  // refusal.
   evidence.Clear(Evidence::Chain);
   VESK2_REQUIRE(tag == nullptr && notBefore == nullptr && notAfter == nullptr,
                 VESK2_ERR_INVALID_PARAM);
@@ -77,6 +86,7 @@ int CertSequence::Verify2(SExpression*& tag, SExpression*& notBefore, SExpressio
   return VerifyChain2(certs.get(), tag, notBefore, notAfter);
 }
 
+// Lists that a caller hands in are added to, never emptied: programs gather several chains in one.
 int CertSequence::VerifySignatures2(SExpression* goodCerts, SExpression* goodExtras) {
   VESK2_REQUIRE(goodCerts != nullptr && goodExtras != nullptr, VESK2_ERR_PARAM_NULL);
   auto at = FirstItem(this);
@@ -96,6 +106,7 @@ int CertSequence::VerifySignatures2(SExpression* goodCerts, SExpression* goodExt
   return 0;
 }
 
+// The new lists are whole before the old ones go, so that a failure leaves the caller what it had.
 int CertSequence::VerifyRevocations2(SExpression*& goodCerts, SExpression*& goodExtras) {
   VESK2_REQUIRE(goodCerts != nullptr && goodExtras != nullptr, VESK2_ERR_PARAM_NULL);
   Ref<SExpression> certs = Ref<SExpression>::Share(goodCerts);
@@ -107,10 +118,13 @@ int CertSequence::VerifyRevocations2(SExpression*& goodCerts, SExpression*& good
   return 0;
 }
 
+// The question is about the subject of the first certificate that is left, which may be another
+// than the chain began with: who decides by this must look whose grant it is.
 int CertSequence::VerifyChain2(SExpression* goodCerts, SExpression*& tag, SExpression*& notBefore,
                                SExpression*& notAfter) {
   VESK2_REQUIRE(goodCerts != nullptr, VESK2_ERR_PARAM_NULL);
   Ref<SExpression> acls;
+  // Loaded anew: the lists may have been made long before.
   VESK2_TRY(LoadRoots(acls, GetContext()));
   auto* const leaf = dynamic_cast<Cert*>(goodCerts->First());
   VESK2_REQUIRE(leaf != nullptr, VESK2_ERR_INVALID_SEQUENCE);

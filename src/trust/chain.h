@@ -26,9 +26,9 @@ SExpression::Iterator FirstItem(const SExpression* sequence);
 // triple.
 [[nodiscard]] int ReadWholeLink(ChainLink& link, SExpression::Iterator& at);
 
-// LoadRoots loads the ACL store. A store that is absent or has a file that cannot be read is
-// VESK2_ERR_ACL_ENTRY_NOT_FOUND: without all of its roots a machine trusts nobody. A lack of memory
-// and a file that another process holds (VESK2_ERR_READ_FILE) are no absence and come through.
+// LoadRoots loads the ACL store. A store that is absent or empty, or whose last file cannot be
+// read, is VESK2_ERR_ACL_ENTRY_NOT_FOUND: nobody is trusted then. A lack of memory and a file that
+// another process holds (VESK2_ERR_READ_FILE) are no absence and come through.
 [[nodiscard]] int LoadRoots(Ref<SExpression>& acls, Vesk2ContextStruct* ctx);
 
 // The two changes that a chain makes to a certificate, each in a clone that shares the other parts.

@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// Crl: reading one revocation list and writing its fields back as a list.
+// Crl: reading one revocation list and writing its fields back as a list. The two lists are held
+// beside the expression, so that it can be built anew from them after a change.
 #include <vesk2/crl.h>
 
 #include <vesk2/hash.h>
@@ -19,7 +20,8 @@ Crl::~Crl() {
 
 namespace {
 
-// (4:item HASH STAMP)
+// (4:item HASH STAMP) The date is any byte string: what is no full stamp revokes from ever on
+// (item_index.h), as a list must not lose an item by a misprint.
 [[nodiscard]] int ImportItem(SExpression* list, ZvBuffer* buffer) {
   VESK2_TRY(buffer->Expect("(4:item"));
   Ref<Hash> hash;
@@ -34,7 +36,8 @@ namespace {
   return buffer->Expect(")");
 }
 
-// (5:list1 ITEM...), or list2, as `opening` says.
+// (5:list1 ITEM...), or list2, as `opening` says. Both lists must be there, in this order, empty or
+// not: a list that ends early would revoke less than was signed.
 [[nodiscard]] int ImportItems(SExpression*& out, const char* opening, const char* keyword,
                               ZvBuffer* buffer, Vesk2ContextStruct* ctx) {
   VESK2_TRY(buffer->Expect(opening));
@@ -48,7 +51,8 @@ namespace {
 
 }  // namespace
 
-// (3:crl(7:version1:1)(5:list1 ITEM...)(5:list2 ITEM...))
+// (3:crl(7:version1:1)(5:list1 ITEM...)(5:list2 ITEM...)) Another version is refused at its text:
+// what it would mean nobody knows.
 int Crl::Import(ZvBuffer* buffer) {
   VESK2_REQUIRE(buffer != nullptr && First() == nullptr, VESK2_ERR_INVALID_PARAM);
   VESK2_REQUIRE(list1 == nullptr && list2 == nullptr, VESK2_ERR_INVALID_PARAM);

@@ -1,5 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
-// CrlSequence: reading one, and proving it against the trust roots.
+// CrlSequence: reading one, and proving it against the trust roots. A list is worth what an entry
+// of this machine makes of its issuer. The proof is kept with the list, so that a list is proved
+// once for all the questions that are put to it; who wants it proved by other entries takes it back
+// (ForgetProof).
 #include <vesk2/crl.h>
 
 #include <vesk2/acl_entry.h>
@@ -37,6 +40,8 @@ char* CrlSequence::CalcPath(const char* name, StorageType type) {
 
 // ---- Reading ----
 
+// The path is taken as it stands, without an extension being added: the store's names and a scan's
+// paths are whole.
 int CrlSequence::Import(const char* path) {
   VESK2_REQUIRE(First() == nullptr && crl == nullptr, VESK2_ERR_INVALID_PARAM);
   VESK2_REQUIRE(path != nullptr, VESK2_ERR_FILE_NOT_FOUND);
@@ -84,6 +89,8 @@ int CrlSequence::BuildSExpression() {
 
 // ---- Checking ----
 
+// For callers with a period of their own; the verifications ask list by list (crl_status.cpp). A
+// list without an end reads as one that ended in 1970, and is refused when both times are given.
 int CrlSequence::VerifyValidity(long* notBefore, long* notAfter) {
   VESK2_REQUIRE(notBefore != nullptr && notAfter != nullptr && cert != nullptr,
                 VESK2_ERR_PARAM_NULL);
@@ -105,7 +112,9 @@ int CrlSequence::VerifyValidity(long* notBefore, long* notAfter) {
 
 namespace {
 
-// The last entry with the tag decides; null when there is none.
+// The last entry with the tag decides; null when there is none. Entries are loaded in byte order of
+// their names, so that of two for one source the later name counts, everywhere alike:
+// RevocationLists::Prove goes by it, too.
 [[nodiscard]] int LastWithTag(AclEntry*& found, SExpression* entries, SExpression* tag) {
   found = nullptr;
   for (auto it = entries->Begin(); it; it.Next()) {
@@ -118,14 +127,15 @@ namespace {
   return 0;
 }
 
-// `mismatch` unless the two are equal.
+// `mismatch` unless the two are equal; another code when that cannot be told.
 [[nodiscard]] int RequireEqual(DExpression* a, DExpression* b, int mismatch) {
   bool equal = false;
   VESK2_TRY(CompareValues(equal, a, b));
   return equal ? 0 : mismatch;
 }
 
-// Whether `subject` is the hash of the list.
+// Whether `subject` is the hash of the list. With display hints: the issuer's certificate is for
+// what was signed, byte for byte.
 [[nodiscard]] int VerifyHash(Crl* crl, Subject* subject) {
   auto* const expected = dynamic_cast<Hash*>(subject);
   VESK2_REQUIRE(expected != nullptr, VESK2_ERR_HASH_ID);
@@ -140,6 +150,10 @@ namespace {
 
 }  // namespace
 
+// In the order of what it costs: comparing before hashing, hashing before the signature. The period
+// of the certificate is not asked (the questions ask for it, list by list), and neither are the
+// entry's period and propagate flag: a list is not a grant, and an entry that has ended still says
+// whose lists to believe. An entry is taken back by removing it.
 int CrlSequence::VerifySelf(SExpression* aclEntries) {
   VESK2_REQUIRE(aclEntries != nullptr && aclEntries->First() != nullptr, VESK2_ERR_INVALID_PARAM);
   VESK2_REQUIRE(First() != nullptr, VESK2_ERR_INVALID_PARAM);

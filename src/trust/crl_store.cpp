@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 // Loading revocation lists: those of the sources that the trust roots name from the store, and
-// those of a directory.
+// those of a directory. Missing, unreadable and malformed lists are absent: one file must not stop
+// all verification. With such a list goes what it revokes, which is the store's administrator's to
+// see. What is there and was not read is never absent.
 #include <vesk2/crl.h>
 
 #include <vesk2/acl_entry.h>
@@ -19,6 +21,7 @@ namespace {
 // that would bring revoked keys back.
 [[nodiscard]] int LoadSource(SExpression* store, SExpression* tag) {
   TextPtr name;
+  // A tag that names no file has no list, and without a root nobody has.
   VESK2_TRY(StoreName(name, tag));
   if (!name || *VeskConf::GetGlobalDirectory() == '\0') return 0;
   TextPtr path;
@@ -32,6 +35,8 @@ namespace {
 
 }  // namespace
 
+// One read for each source that an entry names, twice for one that two entries name: the lists are
+// few, and proving them asks for each once.
 int CrlSequence::ImportStore(SExpression*& store, SExpression* aclEntries,
                              Vesk2ContextStruct* ctx) {
   store = nullptr;
@@ -41,6 +46,7 @@ int CrlSequence::ImportStore(SExpression*& store, SExpression* aclEntries,
     VESK2_TRY(AclEntry::Import(loaded.Out(), ctx, nullptr));
     aclEntries = loaded.get();
   }
+  // Not even a keyword: nobody loaded this.
   VESK2_REQUIRE(aclEntries->First() != nullptr, VESK2_ERR_INVALID_PARAM);
 
   Ref<SExpression> list(TryNew<SExpression>(ctx));
@@ -54,6 +60,8 @@ int CrlSequence::ImportStore(SExpression*& store, SExpression* aclEntries,
   return 0;
 }
 
+// For what was brought from outside. Nothing is believed of it yet, and a file that is no list does
+// not keep the others from being offered.
 int CrlSequence::ImportDir(SExpression*& list, const char* dir, StorageType type,
                            Vesk2ContextStruct* ctx) {
   VESK2_REQUIRE(list == nullptr, VESK2_ERR_INVALID_PARAM);
@@ -77,6 +85,7 @@ int CrlSequence::ImportDir(SExpression*& list, const char* dir, StorageType type
   return 0;
 }
 
+// The entries are loaded once for all: which lists are believed must not change half-way.
 int CrlSequence::ImportDirAndStore(const char* dir, Vesk2ContextStruct* ctx) {
   const ZVsysutil::ZvCall call;
   Ref<SExpression> acls;
@@ -91,6 +100,8 @@ int CrlSequence::ImportDirAndStore(const char* dir, Vesk2ContextStruct* ctx) {
   return 0;
 }
 
+// Looks at every file and not only at the one that the tag names: a list may have been put there by
+// hand. Nothing is proved.
 int CrlSequence::Find(CrlSequence*& out, SExpression* tag) {
   VESK2_REQUIRE(out == nullptr, VESK2_ERR_PARAM_NOT_NULL);
   VESK2_REQUIRE(tag != nullptr, VESK2_ERR_PARAM_NULL);

@@ -1,5 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-// See crl_update.h.
+// See crl_update.h. What is written here decides which keys pass on this machine, so that a list is
+// replaced whole, by one that was proved, or not at all. Two writers of one source both succeed,
+// and the later stays; each has judged what it found.
 #include "src/trust/crl_update.h"
 
 #include <vesk2/crl.h>
@@ -19,7 +21,8 @@
 namespace ZvVesk2 {
 namespace {
 
-// Whether the text of `tag` has a 0 byte in it: as a C string it would name another tag's file.
+// Whether the text of `tag` has a 0 byte in it: as a C string it would name another tag's file. A
+// list of the one source in the place of the other's would take that one's revocations away.
 [[nodiscard]] int HoldsZeroByte(bool& holds, SExpression* tag) {
   const unsigned int size = tag->AdvancedLength();
   const std::unique_ptr<unsigned char[]> text(TryNewArray<unsigned char>(size_t{size} + 1));
@@ -31,7 +34,8 @@ namespace {
 }
 
 // "/" becomes "%2F": what a tag says must not choose a directory, and only the last component of a
-// name would count.
+// name would count. No more is escaped: the names are read by people, and "%2F" itself in a tag is
+// told apart by the tag in the file.
 TextPtr EscapeSlashes(std::string_view text) {
   TextPtr escaped(TryNewArray<char>(3 * text.size() + 1));
   if (!escaped) return nullptr;
@@ -49,6 +53,8 @@ TextPtr EscapeSlashes(std::string_view text) {
 
 }  // namespace
 
+// Success without a name is no list; a lack of memory must not look like it, or the list would
+// count as missing.
 int StoreName(TextPtr& name, SExpression* tag) {
   name = nullptr;
   if (tag == nullptr) return 0;
@@ -76,7 +82,10 @@ int StoredPath(TextPtr& path, const char* name) {
 
 namespace {
 
-// Whether the list of `fresh` takes the place of the stored one.
+// Whether the list of `fresh` takes the place of the stored one. An equal end is enough, so that an
+// issuer can put out a list again before it ends; an older list with that end can be played back
+// so. A stored one from the future would keep every list of today out, and goes for any that has
+// begun, even one that has ended.
 bool Replaces(const Cert* fresh, const Cert* stored, const TimeStamp* now) {
   // Texts of different tags can read the same; none may push another's list out.
   if (!fresh->GetTag()->IsEqual(stored->GetTag())) return false;
@@ -88,6 +97,9 @@ bool Replaces(const Cert* fresh, const Cert* stored, const TimeStamp* now) {
 }
 
 // Whether the store should take the list: it has none at `path` that can be read, or an older one.
+// A stored list that cannot be read says nothing, so that the first that verifies takes its place,
+// whatever its period: an administrator restores a store by it. One that was merely not read
+// (memory, a lease) stays.
 [[nodiscard]] int IsWanted(bool& wanted, const Cert* fresh, const char* path) {
   wanted = false;
   Ref<CrlSequence> stored(TryNew<CrlSequence>(fresh->GetContext()));
@@ -106,6 +118,7 @@ bool Replaces(const Cert* fresh, const Cert* stored, const TimeStamp* now) {
 
 }  // namespace
 
+// What programs ask in order to look at, or watch, the file. It makes no directory.
 int CrlSequence::StorePath(char*& out, SExpression* tag) {
   VESK2_REQUIRE(out == nullptr, VESK2_ERR_INVALID_PARAM);
   TextPtr name;
@@ -127,6 +140,8 @@ int CrlSequence::UpdateStore(SExpression* aclEntries) {
   TextPtr path;
   if (StoredPath(path, name.get()) != 0) return 0;
   bool wanted = false;
+  // Asked before the list is proved: reading is cheaper than a signature, and most lists that are
+  // offered are there already.
   if (IsWanted(wanted, cert, path.get()) != 0 || !wanted) return 0;
   if (crl->GetIssuerTag() == nullptr && VerifySelf(aclEntries) != 0) return 0;
   if (CreateFileDirectory() != 0 || SetFilePath(path.get()) != 0) return 0;

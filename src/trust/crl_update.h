@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // The CRL store: one file for each source of revocation lists that the trust roots name, holding
-// the newest list that verified.
+// the newest list that verified. The file's name is made of the source's tag, so that a source is
+// found without reading the others', and nobody's list can push another's out.
 #ifndef VESK2_SRC_TRUST_CRL_UPDATE_H
 #define VESK2_SRC_TRUST_CRL_UPDATE_H
 

@@ -1,5 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-// Evidence: what a verification read, and changes to it. Judging it: evidence_judge.cpp.
+// Evidence: what a verification read, and changes to it. Judging it: evidence_judge.cpp. All values
+// are shared and none is changed, so that a copy costs an array and its counts: whoever asks "what
+// if" copies, changes, and judges, without a file being read.
 #include <vesk2/evidence.h>
 
 #include <algorithm>
@@ -13,6 +15,7 @@ namespace ZvVesk2 {
 Evidence::Evidence(Vesk2ContextStruct* ctx) : context(ctx) {}
 Evidence::~Evidence() = default;
 
+// Everything but the context: no fact of another verification may stand beside those of this one.
 void Evidence::Clear(Kind newKind) {
   kind = newKind;
   links.reset();
@@ -26,6 +29,7 @@ void Evidence::Clear(Kind newKind) {
   work = 0;
 }
 
+// Room first: after that nothing can fail, and what is half-copied cannot be seen.
 int Evidence::Copy(const Evidence& other) {
   Clear(other.kind);
   VESK2_TRY(Reserve(other.count));
@@ -64,6 +68,7 @@ SExpression* Evidence::GetRevocationSource(size_t index) const { return links[in
 CrlSequence* Evidence::GetRevocationList(size_t index) const { return links[index].list.get(); }
 TimeStamp* Evidence::GetRevokedSince(size_t index) const { return links[index].since.get(); }
 
+// A manifest without a period is judged at the moment that its signer wrote.
 TimeStamp* Evidence::GetFirst() const {
   return AskedAboutSigning() ? signingTime.get() : first.get();
 }
@@ -83,6 +88,7 @@ TimeStamp* Evidence::GetRevocationLast() const {
 
 // ---- Changes ----
 
+// Grows by doubling: a manifest may have as many certificates as its file holds.
 int Evidence::Reserve(size_t wanted) {
   if (wanted <= capacity) return 0;
   const size_t larger = std::max(wanted, capacity * 2);
@@ -94,6 +100,7 @@ int Evidence::Reserve(size_t wanted) {
   return 0;
 }
 
+// The source is made a tag here, once: it is compared and shown as one.
 int Evidence::AddCert(Cert* cert, Signature* signature, int signatureCode) {
   VESK2_REQUIRE(cert != nullptr, VESK2_ERR_PARAM_NULL);
   VESK2_TRY(Reserve(count + 1));
@@ -108,6 +115,8 @@ int Evidence::AddCert(Cert* cert, Signature* signature, int signatureCode) {
   return 0;
 }
 
+// The subject is kept before its certificate goes: the question must not become one about somebody
+// else, and a grant for that one a yes.
 void Evidence::RemoveCerts() {
   if (!subject) subject = Ref<Subject>::Share(AskedSubject());
   links.reset();
@@ -127,6 +136,7 @@ void Evidence::SetLists(SExpression* stored, SExpression* carried) {
   carriedLists = Ref<SExpression>::Share(carried);
 }
 
+// A new list each time, as a copy may hold the old one.
 int Evidence::AssumeList(SExpression* source) {
   VESK2_REQUIRE(source != nullptr, VESK2_ERR_PARAM_NULL);
   Ref<SExpression> more(TryNew<SExpression>(context));

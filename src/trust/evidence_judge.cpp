@@ -1,5 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-// Evidence: what the certificates, entries and lists that were read come to.
+// Evidence: what the certificates, entries and lists that were read come to. These steps are the
+// verification: CertSequence::Verify and the reader of manifests call them, and whoever judges a
+// changed copy gets the same rules. A yes comes from Reduce alone.
 #include <vesk2/evidence.h>
 
 #include <utility>
@@ -20,6 +22,8 @@ namespace {
 // pass its grant on: the signer certificate, which only names the content, is no delegation.
 constexpr size_t kIssuersPlace = 1;
 
+// Not to know is a refusal of its own, so that an operator hears that a list is missing and not
+// that something is revoked.
 [[nodiscard]] int CodeOfStatus(int32_t status) {
   VESK2_REQUIRE(status != Cert::Undetermined, VESK2_ERR_CRL_NOT_FOUND);
   return status == Cert::NotRevoked ? 0 : VESK2_ERR_CERT_REVOKED;
@@ -44,6 +48,8 @@ Subject* Evidence::AskedSubject() const {
 
 // ---- Revocation ----
 
+// The lists are put together anew for each question, and proved anew: a changed copy may have other
+// entries. Each list is proved once, whatever the number of certificates.
 int Evidence::MarkRevoked() {
   VESK2_REQUIRE(entries, VESK2_ERR_PARAM_NULL);
   Ref<SExpression> lists(TryNew<SExpression>(context));
@@ -61,6 +67,7 @@ int Evidence::MarkRevoked() {
     link.status = link.cert->GetRevocationStatus();
     link.list = Ref<CrlSequence>::Share(decision.list);
     link.since = Ref<TimeStamp>::Share(decision.since);
+    // An assumed list only ever fills a gap: what is revoked stays revoked.
     if (link.status != Cert::Undetermined) continue;
     bool listed = false;
     VESK2_TRY(Assumed(listed, link.source.get()));
@@ -69,6 +76,7 @@ int Evidence::MarkRevoked() {
   return 0;
 }
 
+// Linear, over what this program's own caller assumed: a few.
 int Evidence::Assumed(bool& found, SExpression* source) const {
   found = false;
   if (!assumed || source == nullptr) return 0;
@@ -78,6 +86,8 @@ int Evidence::Assumed(bool& found, SExpression* source) const {
   return 0;
 }
 
+// A chain is what a requester chose to present, so one bad certificate refuses it. A manifest
+// carries what its maker collected, and stands on what is left.
 int Evidence::CheckRevoked() const {
   if (kind == Chain) {
     for (size_t i = 0; i < count; ++i) VESK2_TRY(CodeOfStatus(links[i].status));
@@ -96,6 +106,8 @@ int Evidence::CheckRevoked() const {
 
 // ---- Reduction ----
 
+// The order is kept, and the places are those after what is revoked has gone: the second place is
+// the signer's own, whichever certificate has it.
 int Evidence::BuildChain(Ref<SExpression>& out) const {
   Ref<SExpression> chain;
   VESK2_TRY(SExpression::Create(chain.Out(), "sequence", context));
@@ -108,6 +120,8 @@ int Evidence::BuildChain(Ref<SExpression>& out) const {
   return 0;
 }
 
+// The reduction reads a manifest's other certificates as they are, revocation element and all: it
+// ignores what it does not know.
 int Evidence::AppendLink(SExpression* chain, size_t index, size_t place) const {
   if (kind == Chain) return AppendIrrevocable(chain, *GetCert(index));
   if (place == kIssuersPlace) return AppendPropagating(chain, *GetCert(index));
@@ -136,6 +150,7 @@ int Evidence::Reduce(SExpression* tag) {
   VESK2_TRY(BuildChain(chain));
   Ref<SExpression> period;
   VESK2_TRY(MakePeriod(period));
+  // What it cost is told to who wants to ask again (Explanation).
   const uint64_t before = Verify::WorkDone();
   const int code = Verify::ReductA(context, granting ? granting.get() : entries.get(), chain.get(),
                                    AskedSubject(), tag, period.get());
@@ -168,12 +183,14 @@ int Evidence::CheckForm() const {
   return entries ? 0 : VESK2_ERR_ACL_ENTRY_NOT_FOUND;
 }
 
+// In the order of a verification, so that the first refusal is the one that it would give.
 int Evidence::Judge(SExpression* tag) {
   VESK2_TRY(CheckForm());
   VESK2_TRY(MarkRevoked());
   return Prove(tag);
 }
 
+// By canonical lengths, which a judgement exports and parses; a rough measure, for budgets.
 size_t Evidence::Size() const {
   size_t size = 0;
   for (size_t i = 0; i < count; ++i) size += GetCert(i)->CanonicalLength();

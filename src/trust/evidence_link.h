@@ -8,13 +8,17 @@
 
 namespace ZvVesk2 {
 
+// `status` is copied out of the certificate after each question: the certificate is shared with
+// other evidence, whose questions overwrite the one in it.
 struct Evidence::Link {
   Ref<Cert> cert;
   Ref<Signature> signature;
   Ref<SExpression> source;
   int signatureCode = 0;
-  int32_t status = Cert::Undetermined;  // until the lists were asked
-  Ref<CrlSequence> list;                // see RevocationLists::Decision
+  // Undetermined until the lists were asked.
+  int32_t status = Cert::Undetermined;
+  // See RevocationLists::Decision.
+  Ref<CrlSequence> list;
   Ref<TimeStamp> since;
 };
 

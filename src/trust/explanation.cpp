@@ -1,6 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 // Explanation: the question, what it may cost, and what was found. Reasons: explanation_losses.cpp;
-// the way of a yes: explanation_path.cpp.
+// the way of a yes: explanation_path.cpp. An explanation is a service to whoever was refused, and
+// asks many questions about what a stranger wrote. So all of it is counted, the reduction's work
+// and the bytes that are exported and told, and when that is spent what was found so far is the
+// answer. It never touches the verdict: it judges copies.
 #include <vesk2/explanation.h>
 
 #include <algorithm>
@@ -23,11 +26,13 @@ constexpr const char* kWords[] = {
 static_assert(std::size(kWords) == Explanation::CannotBeRead + 1);
 
 // What an explanation may cost when the answer took next to nothing, and else the multiple of what
-// that cost. Work is counted as Verify::WorkDone does.
+// that cost. Work is counted as Verify::WorkDone does. A fraction of a second, for chains that are
+// answered in microseconds.
 constexpr uint64_t kLeastWork = 20'000'000;
 constexpr uint64_t kLeastBytes = uint64_t{48} << 20;
 constexpr uint64_t kMultiple = 2;
 
+// For an index that is none: a caller's mistake must not become a read past the array.
 const Explanation::Reason kNoReason = {};
 
 }  // namespace
@@ -48,6 +53,8 @@ int Explanation::SetNames(const char* newFile, const char* newDirectory) {
   return 0;
 }
 
+// What was explained before goes first, and the new state is published last: a failure leaves
+// nothing that could pass for the reasons of this answer.
 int Explanation::Explain(const Evidence& evidence, int code, SExpression* tag,
                          SExpression* members) {
   state.reset();
@@ -55,6 +62,7 @@ int Explanation::Explain(const Evidence& evidence, int code, SExpression* tag,
   std::unique_ptr<ExplanationState> fresh(TryNew<ExplanationState>(context));
   VESK2_REQUIRE(fresh, VESK2_ERR_MEM_ALLOC);
   VESK2_TRY(fresh->evidence.Copy(evidence));
+  // Indexed once, since each entry of the store is compared with each key of the chain otherwise.
   VESK2_TRY(fresh->principals.Load(fresh->evidence));
   VESK2_TRY(fresh->evidence.RelevantEntries(fresh->relevant.Out()));
   fresh->tag = Ref<SExpression>::Share(tag);
@@ -71,17 +79,21 @@ int Explanation::Explain(const Evidence& evidence, int code, SExpression* tag,
 
 // ---- What it may cost ----
 
+// A multiple of what the answer cost: who made that expensive has paid for this as well.
 void ExplanationState::StartCounting() {
   workLimit = Verify::WorkDone() + std::max(kLeastWork, kMultiple * evidence.GetWork());
   bytesLimit = std::max(kLeastBytes, kMultiple * uint64_t{evidence.Size()});
 }
 
+// Asked before the work. The first question past the limit ends it, so that it overshoots by one
+// question, which has a budget of its own.
 bool ExplanationState::Afford(uint64_t bytes) {
   bytesSpent += bytes;
   if (Verify::WorkDone() > workLimit || bytesSpent > bytesLimit) complete = false;
   return complete;
 }
 
+// That there was no memory for one question is the explanation's failure, and no "no".
 int ExplanationState::ProveMembers(Evidence& changed) const {
   const int code = EachMember([&](SExpression* member) { return changed.Prove(member); });
   return LacksMemory(code) ? VESK2_ERR_MEM_ALLOC : code;
@@ -89,6 +101,7 @@ int ExplanationState::ProveMembers(Evidence& changed) const {
 
 // ---- Reasons ----
 
+// A text may quote what a stranger wrote at length, so it is paid for like any work.
 int ExplanationState::Add(Reason reason, TextWriter& text) {
   ++found;
   if (count == Limits::kMaxReasons) complete = false;
@@ -109,6 +122,8 @@ int ExplanationState::Add(Reason reason, TextWriter& text) {
   return 0;
 }
 
+// What was found out not to be one, once a later place was looked at. `found` keeps counting: it
+// tells whether anything was said at all.
 void ExplanationState::DropReasons(size_t from) {
   while (count > from) reasons[--count] = Held();
 }

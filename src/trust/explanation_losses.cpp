@@ -1,6 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 // Explanation: where authority was lost on its way from the entries to the end of a chain. Each
-// step puts one question to every certificate or entry; the code tells which can have led to it.
+// step puts one question to every certificate or entry; the code tells which can have led to it. No
+// rule is written a second time here: tags are compared by IsSubset, periods as stamps are,
+// subjects by Principals. What no step can name is told by Rest, from the library's own reduction.
+// A reason never says more than its question asked: an explanation that guesses would be believed.
+//
+// Names and tags are a stranger's words, and go through the TextWriter, which escapes them.
 #include <vesk2/limits.h>
 #include <vesk2/verify.h>
 
@@ -9,6 +14,8 @@
 
 namespace ZvVesk2 {
 
+// What can have led to each code, in the order in which it is told. Codes that are missing speak
+// for themselves.
 const ExplanationLosses::Row ExplanationLosses::kRows[] = {
     {VESK2_ERR_SIGNATURE, {&ExplanationLosses::Signatures}},
     {VESK2_ERR_SIGNATURE_ID, {&ExplanationLosses::Signatures}},
@@ -29,6 +36,7 @@ const ExplanationLosses::Row ExplanationLosses::kRows[] = {
     {VESK2_ERR_FILE_NOT_FOUND, {&ExplanationLosses::NoStore}},
 };
 
+// A negative code is the reduction's, about a credential that it could not read or a budget.
 int ExplanationLosses::Find(int code) {
   if (code < 0) return evidence_.CountCerts() > 0 ? Unreadable() : 0;
   for (const Row& row : kRows) {
@@ -42,6 +50,7 @@ int ExplanationLosses::Find(int code) {
 
 // ---- Names ----
 
+// Certificates are told by number, from 1, and by who issued them: a chain has no other names.
 TextWriter& ExplanationLosses::CertName(TextWriter& text, size_t index) const {
   text << "certificate " << index + 1 << " (issuer ";
   return text.Of(evidence_.GetCert(index)->GetIssuer()) << ")";
@@ -52,11 +61,13 @@ TextWriter& ExplanationLosses::Name(TextWriter& text, const Reason& reason) cons
   return (text << "ACL entry ").Of(reason.entry);
 }
 
+// Where an entry was looked for: who is told that none was found must see where.
 TextWriter& ExplanationLosses::Store(TextWriter& text) const {
   text.AclStore();
   return extraDirectory_.empty() ? text : (text << " or ").Escaped(extraDirectory_);
 }
 
+// The moment that a manifest was judged at is its signer's word, which the text says.
 TextWriter& ExplanationLosses::Asked(TextWriter& text) const {
   const TimeStamp* const first = evidence_.GetFirst();
   if (first != nullptr && first == evidence_.GetSigningTime()) {
@@ -67,6 +78,7 @@ TextWriter& ExplanationLosses::Asked(TextWriter& text) const {
 
 // ---- What a certificate is ----
 
+// All that do not hold, though the first was the answer: who mends one wants to know of the next.
 int ExplanationLosses::Signatures() {
   for (size_t i = 0; i < evidence_.CountCerts(); ++i) {
     Reason reason = About(Explanation::SignatureFails, i);
@@ -79,6 +91,7 @@ int ExplanationLosses::Signatures() {
   return 0;
 }
 
+// Fewer than two certificates cannot be a manifest's: its reader refused that already.
 int ExplanationLosses::Order() {
   if (!state_.IsManifest() || evidence_.CountCerts() == 0) return 0;
   TextWriter text;
@@ -95,6 +108,9 @@ int ExplanationLosses::Order() {
   return state_.Add(About(Explanation::OutOfOrder, 1), text);
 }
 
+// A listing that cannot be read is named with its byte: mostly the file was damaged on its way, and
+// the digest only noticed. What else it can be cannot be told, as a digest does not say what
+// differs.
 int ExplanationLosses::Content() {
   if (const int code = evidence_.GetListingCode(); code != 0) {
     Reason reason = About(Explanation::OtherContent, kNone);
@@ -110,6 +126,7 @@ int ExplanationLosses::Content() {
   return state_.Add(About(Explanation::OtherContent, size_t{0}), text);
 }
 
+// The status that the verification found, and no list is asked again.
 int ExplanationLosses::Revocations() {
   for (size_t i = 0; i < evidence_.CountCerts(); ++i) {
     Reason reason = About(Explanation::Revoked, i);
@@ -135,6 +152,7 @@ int ExplanationLosses::Revocations() {
   return 0;
 }
 
+// A tag that is missing grants everything and loses nothing.
 int ExplanationLosses::Certificates() {
   for (size_t i = 0; i < evidence_.CountCerts() && state_.complete; ++i) {
     const Cert* const cert = evidence_.GetCert(i);
@@ -148,7 +166,8 @@ int ExplanationLosses::Certificates() {
   return Conflicts();
 }
 
-// Whether the next one follows from it.
+// Whether the next one follows from it. Found by keys and digests, without reducing, so that each
+// certificate that leads nowhere is told, also when several do.
 int ExplanationLosses::Link(size_t index) {
   const Cert* const cert = evidence_.GetCert(index);
   bool leads = false;
@@ -164,7 +183,9 @@ int ExplanationLosses::Link(size_t index) {
   return state_.Add(About(Explanation::LeadsNowhere, index), text);
 }
 
-// Periods that each meet what was asked and not one another.
+// Periods that each meet what was asked and not one another. Pairs are as many as the square of the
+// certificates: only those whose period ends before the latest begin are looked at in pairs, and
+// all of it is charged by the texts.
 int ExplanationLosses::Conflicts() {
   const size_t count = evidence_.CountCerts();
   const TimeStamp* latest = nullptr;
@@ -191,6 +212,8 @@ int ExplanationLosses::Conflicts() {
 
 // ---- What was granted ----
 
+// The rule of the reduction: a period must meet the asked one. Stamps that are missing compare as
+// false, and lose nothing.
 int ExplanationLosses::Period(const Reason& where, const TimeStamp* notBefore,
                               const TimeStamp* notAfter) {
   if (notAfter != nullptr && notAfter->IsBefore(evidence_.GetFirst())) {
@@ -206,10 +229,12 @@ int ExplanationLosses::Period(const Reason& where, const TimeStamp* notBefore,
   return state_.Add(where, text);
 }
 
+// Of a question about several tags the first that is beyond: one example is enough.
 int ExplanationLosses::Tag(const Reason& where, SExpression* tag) {
   if (tag == nullptr) return 0;
   SExpression* beyond = nullptr;
   static_cast<void>(state_.EachMember([&](SExpression* member) {
+    // Ends the loop without a finding.
     if (!state_.Afford()) return 1;
     if (!member->IsSubset(tag)) beyond = member;
     return beyond != nullptr ? 1 : 0;
@@ -221,7 +246,9 @@ int ExplanationLosses::Tag(const Reason& where, SExpression* tag) {
   return state_.Add(where, text);
 }
 
-// Entries that name a key of the chain and do not help; none of it when one does.
+// Entries that name a key of the chain and do not help; none of it when one does. An entry about
+// which there is nothing to say could have granted: then the loss lies elsewhere, and the reasons
+// of the other entries would mislead.
 int ExplanationLosses::Roots() {
   const size_t before = state_.count;
   for (auto it = state_.relevant->Begin(); it && state_.complete; it.Next()) {
@@ -234,6 +261,8 @@ int ExplanationLosses::Roots() {
   return state_.relevant->Begin() ? 0 : NoEntryAtAll();
 }
 
+// Only an entry that names an issuer has to let it pass the grant on; one for the asked subject
+// itself need not.
 int ExplanationLosses::Root(AclEntry* entry) {
   bool issues = false;
   VESK2_TRY(state_.principals.NamesIssuer(issues, entry->GetSubject()));
@@ -250,6 +279,7 @@ int ExplanationLosses::Root(AclEntry* entry) {
   return threshold != nullptr ? Threshold(entry, threshold) : 0;
 }
 
+// How many of its keys take part in the chain at all, which is the most that can have been counted.
 int ExplanationLosses::Threshold(AclEntry* entry, ThresholdSubject* threshold) {
   size_t present = 0;
   VESK2_TRY(state_.principals.CountMembers(present, threshold));
@@ -262,6 +292,7 @@ int ExplanationLosses::Threshold(AclEntry* entry, ThresholdSubject* threshold) {
   return state_.Add(reason, text);
 }
 
+// Each key once, in the order of the chain: what an entry would have to name.
 int ExplanationLosses::NoEntryAtAll() {
   TextWriter text;
   Store(text << "no ACL entry in ") << " names a key of this chain:";
@@ -274,6 +305,8 @@ int ExplanationLosses::NoEntryAtAll() {
   return state_.Add(About(Explanation::NoEntry, kNone), text);
 }
 
+// Said of a refusal for want of entries only, and not of a manifest that could not be read that
+// far.
 int ExplanationLosses::NoStore() {
   if (evidence_.GetEntries() != nullptr || evidence_.CountCerts() == 0) return 0;
   TextWriter text;
@@ -281,7 +314,8 @@ int ExplanationLosses::NoStore() {
   return state_.Add(About(Explanation::NoEntry, kNone), text);
 }
 
-// What the chain does grant, beside what was asked for.
+// What the chain does grant, beside what was asked for. It is one more reduction, without a tag and
+// a period, and is paid for as such.
 int ExplanationLosses::Rest() {
   if (!state_.Afford(evidence_.Size())) return 0;
   Ref<SExpression> tag;
@@ -302,6 +336,7 @@ int ExplanationLosses::Rest() {
     text.Period(evidence_.GetFirst(), evidence_.GetLast());
     return state_.Add(About(Explanation::NotCombined, kNone), text);
   }
+  // Nothing is granted at all, and reasons for it were given.
   if (state_.count > 0) return 0;
   text << "the certificates and the ACL entries do not combine to what was asked, ";
   text.Tag(state_.tag.get());
@@ -310,7 +345,9 @@ int ExplanationLosses::Rest() {
 
 // ---- What the reduction cannot read ----
 
-// One such credential is enough to stop it.
+// One such credential is enough to stop it. Each credential is given to the reduction alone, so
+// that the one that stops it is named. That is a call for each: it is charged, and ends when the
+// budget does.
 int ExplanationLosses::Unreadable() {
   const auto tell = [this](Reason reason) {
     TextWriter text;
@@ -337,7 +374,8 @@ int ExplanationLosses::Unreadable() {
   return state_.Add(About(Explanation::CannotBeRead, size_t{0}), text);
 }
 
-// The reduction's answer about one credential alone.
+// The reduction's answer about one credential alone. About the first issuer, as any key will do:
+// the question is whether it can be read.
 int ExplanationLosses::TryReduction(int& code, bool isEntry, DExpression* credential) {
   Vesk2ContextStruct* const context = evidence_.GetContext();
   Ref<SExpression> acl;

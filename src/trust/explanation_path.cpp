@@ -1,7 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 // Explanation: by which way authority came. One entry is enough for most answers, and most of a
 // chain is needed: the entry is found by letting each grant alone, and the certificates by leaving
-// out each of them. The library's own rules judge what is left.
+// out each of them. The library's own rules judge what is left. It costs a judgement for each entry
+// that names a key of the chain and one for each certificate, all of them charged (Afford). When
+// that is too much, no path is told at all: half of one would name certificates that are not
+// needed.
 #include <utility>
 
 #include <vesk2/crl.h>
@@ -24,6 +27,8 @@ int ExplanationPath::Find() {
   return 0;
 }
 
+// The first that suffices, in the order of the store. An answer that needs two entries together has
+// no single one to name.
 int ExplanationPath::FindEntry() {
   for (auto it = state_.relevant->Begin(); it && state_.entry == nullptr; it.Next()) {
     auto* const entry = static_cast<AclEntry*>(it.Value());
@@ -35,6 +40,7 @@ int ExplanationPath::FindEntry() {
   return 0;
 }
 
+// The other entries still vouch for revocation lists: without them it would be another question.
 int ExplanationPath::GrantAlone(bool& granted, AclEntry* entry) {
   Ref<SExpression> list;
   VESK2_TRY(SExpression::Create(list.Out(), "acl", evidence_.GetContext()));
@@ -47,6 +53,8 @@ int ExplanationPath::GrantAlone(bool& granted, AclEntry* entry) {
   return 0;
 }
 
+// From the root on, as it is told. What could go is left out at once, so that of two ways the one
+// is found and not the union.
 int ExplanationPath::FindCerts() {
   const size_t count = evidence_.CountCerts();
   state_.path.reset(TryNewArray<size_t>(count));
@@ -63,6 +71,7 @@ int ExplanationPath::FindCerts() {
   return 0;
 }
 
+// The last certificate of a chain stays: without any there is no question.
 int ExplanationPath::CanGo(bool& gone, size_t index, size_t second) {
   const bool manifest = state_.IsManifest();
   if (manifest ? index == 0 || index == second : alone_.CountCerts() == 1) return 0;
@@ -84,6 +93,7 @@ int ExplanationPath::CanGo(bool& gone, size_t index, size_t second) {
 
 // ---- Until when ----
 
+// Only ends count: what has begun stays begun, and what will be revoked no list of today tells.
 void ExplanationPath::FindEnd() {
   EndsAt(state_.entry->GetNotAfter(), Explanation::EntryEnds, kNone);
   for (size_t i = 0; i < state_.pathCount; ++i) {
@@ -94,6 +104,7 @@ void ExplanationPath::FindEnd() {
   }
 }
 
+// Of equal ends the entry is named, then the earlier on the path: what is looked at first.
 void ExplanationPath::EndsAt(TimeStamp* end, End kind, size_t cert) {
   if (end == nullptr || (state_.end != nullptr && !end->IsBefore(state_.end))) return;
   state_.end = end;

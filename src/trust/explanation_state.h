@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// What an Explanation holds: the question, what may still be spent, and what was found.
+// What an Explanation holds: the question, what may still be spent, and what was found. The state
+// is made anew for each answer and has no public name: an Explanation holds one or none.
 #ifndef VESK2_SRC_TRUST_EXPLANATION_STATE_H
 #define VESK2_SRC_TRUST_EXPLANATION_STATE_H
 
@@ -16,6 +17,7 @@ struct ExplanationState {
   using Reason = Explanation::Reason;
   using End = Explanation::End;
   static constexpr size_t kNone = Explanation::kNone;
+  // A reason and the text that it points to.
   struct Held {
     Reason reason = {};
     std::unique_ptr<char[]> text;
@@ -40,6 +42,7 @@ struct ExplanationState {
   void StartCounting();
   // Afford counts `bytes` that are about to be worked on; false when no more may be spent.
   bool Afford(uint64_t bytes = 0);
+  // Cleared when the budget or a limit ended the search; nothing sets it again.
   bool complete = true;
 
   // ---- Reasons ----
@@ -47,11 +50,14 @@ struct ExplanationState {
   [[nodiscard]] int Add(Reason reason, TextWriter& text);
   void DropReasons(size_t from);
   std::unique_ptr<Held[]> reasons;
+  // `found` counts also what was dropped or had no room: it tells a place without a reason from one
+  // whose reason did not fit.
   size_t count = 0;
   size_t capacity = 0;
   size_t found = 0;
 
   // ---- The path ----
+  // Borrowed from the copy of the evidence above.
   AclEntry* entry = nullptr;
   std::unique_ptr<size_t[]> path;
   size_t pathCount = 0;
@@ -75,7 +81,9 @@ int ExplanationState::EachMember(Ask ask) const {
   return code;
 }
 
-// Where authority was lost.
+// Where authority was lost. The steps share one form: each looks at every certificate, or every
+// entry, puts one question, and adds a reason where the answer is no. Texts are made here, so that
+// all who show a reason show the same words.
 class ExplanationLosses {
  public:
   using Kind = Explanation::Kind;
@@ -88,18 +96,22 @@ class ExplanationLosses {
   [[nodiscard]] int Find(int code);
 
  private:
+  // What a certificate, a manifest's order and content, and the lists say of themselves.
   [[nodiscard]] int Signatures();
   [[nodiscard]] int Order();
   [[nodiscard]] int Content();
   [[nodiscard]] int Revocations();
+  // Where the grant is lost on its way along the chain.
   [[nodiscard]] int Certificates();
   [[nodiscard]] int Link(size_t index);
   [[nodiscard]] int Conflicts();
+  // And where it would have to come from.
   [[nodiscard]] int Roots();
   [[nodiscard]] int Root(AclEntry* entry);
   [[nodiscard]] int Threshold(AclEntry* entry, ThresholdSubject* threshold);
   [[nodiscard]] int NoEntryAtAll();
   [[nodiscard]] int NoStore();
+  // When each alone would do: what they come to together, and what cannot be read at all.
   [[nodiscard]] int Rest();
   [[nodiscard]] int Unreadable();
   [[nodiscard]] int TryReduction(int& code, bool isEntry, DExpression* credential);
@@ -119,6 +131,7 @@ class ExplanationLosses {
   TextWriter& Store(TextWriter& text) const;
   TextWriter& Asked(TextWriter& text) const;
 
+  // Which steps can have led to a code. A row, so that a new code is a line and not a branch.
   using Step = int (ExplanationLosses::*)();
   struct Row {
     int code;
@@ -132,7 +145,8 @@ class ExplanationLosses {
   std::string_view extraDirectory_;
 };
 
-// By which way authority came, and until when it lasts.
+// By which way authority came, and until when it lasts. It takes away what the answer does not need
+// and asks again, so that what is left is by the library's own rules.
 class ExplanationPath {
  public:
   using End = Explanation::End;

@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// See item_index.h.
+// See item_index.h. Items and digests are borrowed from the lists, which outlive the index: a list
+// of a million items costs an array and a sort.
 #include "src/trust/item_index.h"
 
 #include <algorithm>
@@ -12,12 +13,14 @@ namespace {
 using Bytes = ItemIndex::Bytes;
 using Item = ItemIndex::Item;
 
+// Any of them may name an object in a list, whatever the issuer preferred.
 constexpr ZvclmHashID kAlgorithms[] = {ZVCLM_HASH_SHA1, ZVCLM_HASH_SHA256, ZVCLM_HASH_RMD160};
 
 bool IsKnown(ZvclmHashID id) {
   return std::find(std::begin(kAlgorithms), std::end(kAlgorithms), id) != std::end(kAlgorithms);
 }
 
+// Ids are small numbers (ZvclmHashID): each is a bit of one word.
 unsigned Bit(ZvclmHashID id) { return 1U << static_cast<unsigned>(id); }
 
 Bytes View(const ByteString* value) {
@@ -32,10 +35,12 @@ bool IsLess(const Item& a, const Item& b) {
   return a.from->IsBefore(b.from);
 }
 
+// Equal digests of different algorithms name different things.
 bool Names(const Item& item, ZvclmHashID algorithm, Bytes digest) {
   return item.algorithm == algorithm && item.digest == digest;
 }
 
+// The one that revokes earlier; an item without a date always did.
 const Item* Earlier(const Item* a, const Item* b) {
   if (a == nullptr || b == nullptr) return a != nullptr ? a : b;
   if (a->from == nullptr || b->from == nullptr) return a->from == nullptr ? a : b;
@@ -44,6 +49,7 @@ const Item* Earlier(const Item* a, const Item* b) {
 
 }  // namespace
 
+// Digits are not judged: 31st of February sorts where it belongs.
 bool IsStamp(const TimeStamp* stamp) {
   constexpr std::string_view kForm = "####-##-##_##:##:##";
   if (stamp->GetLength() != kForm.size()) return false;
@@ -54,12 +60,15 @@ bool IsStamp(const TimeStamp* stamp) {
   return true;
 }
 
+// Made once with the room that all lists together can need, counted by the caller.
 int ItemIndex::Reserve(size_t count) {
   items_.reset(TryNewArray<Item>(count));
   VESK2_REQUIRE(items_ != nullptr, VESK2_ERR_MEM_ALLOC);
   return 0;
 }
 
+// Items that name nothing we could compare are passed over, as the rest of a signed list still
+// counts.
 void ItemIndex::Add(SExpression* items, CrlSequence* list) {
   for (auto it = items->Begin(); it; it.Next()) {
     auto* const item = dynamic_cast<SExpression*>(it.Value());
@@ -73,12 +82,14 @@ void ItemIndex::Add(SExpression* items, CrlSequence* list) {
     auto* const date = dynamic_cast<TimeStamp*>(item->Last());
     const bool isDated = date != nullptr && IsStamp(date);
     items_[count_++] = {named->GetAlgorithm(), digest, isDated ? date : nullptr, list};
+    // So that an object is hashed by no algorithm that nobody used.
     algorithms_ |= Bit(named->GetAlgorithm());
   }
 }
 
 void ItemIndex::Sort() { std::sort(items_.get(), items_.get() + count_, IsLess); }
 
+// The first of several about one object is the earliest (IsLess).
 const Item* ItemIndex::Find(ZvclmHashID algorithm, Bytes digest) const {
   const Item* const begin = items_.get();
   const Item* const end = begin + count_;
@@ -91,6 +102,7 @@ const Item* ItemIndex::Find(ZvclmHashID algorithm, Bytes digest) const {
   return first != end && Names(*first, algorithm, digest) ? first : nullptr;
 }
 
+// Two digests for each algorithm that items use, at most six, whatever the lists hold.
 int ItemIndex::Find(const Item*& found, DExpression* object) const {
   found = nullptr;
   for (const ZvclmHashID algorithm : kAlgorithms) {
@@ -103,6 +115,7 @@ int ItemIndex::Find(const Item*& found, DExpression* object) const {
       found = Earlier(found, Find(algorithm, Bytes(bytes, length)));
     }
   }
+  // A subject that is a hash: the item names the key that it stands for.
   auto* const hash = dynamic_cast<Hash*>(object);
   if (hash != nullptr) {
     found = Earlier(found, Find(hash->GetAlgorithm(), View(hash->GetDigest())));

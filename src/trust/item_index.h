@@ -49,6 +49,7 @@ class ItemIndex {
   const Item* Find(ZvclmHashID algorithm, Bytes digest) const;
 
   std::unique_ptr<Item[]> items_;
+  // Items that were taken in; Reserve made room for no fewer.
   size_t count_ = 0;
   unsigned algorithms_ = 0;  // a bit for each that an item uses
 };

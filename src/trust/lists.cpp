@@ -1,11 +1,14 @@
 // SPDX-License-Identifier: Apache-2.0
-// See lists.h.
+// See lists.h. Small steps over the value model that several files here take; none decides
+// anything.
 #include "src/trust/lists.h"
 
 #include "src/platform/clock.h"
 
 namespace ZvVesk2 {
 
+// The new list shares the elements and replaces the keyword: a revocation element and the tag of
+// its source differ in that alone.
 int MakeTag(Ref<SExpression>& out, SExpression* source, bool dropLast) {
   Ref<SExpression> tag;
   VESK2_TRY(SExpression::Create(tag.Out(), "tag", source->GetContext()));
@@ -18,12 +21,15 @@ int MakeTag(Ref<SExpression>& out, SExpression* source, bool dropLast) {
   return 0;
 }
 
+// Only the last element counts: (tag (revoke ...) x) grants something that is called so.
 bool EndsInRevoke(SExpression* tag) {
   auto* last = tag != nullptr ? dynamic_cast<SExpression*>(tag->Last()) : nullptr;
   auto* keyword = last != nullptr ? dynamic_cast<ByteString*>(last->First()) : nullptr;
   return keyword != nullptr && keyword->IsEqual("revoke");
 }
 
+// A moment that cannot be written could not be compared, and must not be left out: an open end
+// would be a wider question.
 int MakeStamp(Ref<TimeStamp>& out, long seconds, Vesk2ContextStruct* ctx) {
   Ref<TimeStamp> stamp(TryNew<TimeStamp>(ctx));
   VESK2_REQUIRE(stamp, VESK2_ERR_MEM_ALLOC);

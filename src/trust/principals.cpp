@@ -1,5 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-// See principals.h.
+// See principals.h. A key is known by its digest, so that an entry that names it by key, by hash or
+// within a group is found with one search; without the index a large store and a long chain would
+// cost their product.
 #include "src/trust/principals.h"
 
 #include <algorithm>
@@ -11,13 +13,13 @@
 namespace ZvVesk2 {
 namespace {
 
-// Those by which a hash can name a key.
+// Those by which a hash can name a key. A key is filed under each, as an entry may use any.
 constexpr ZvclmHashID kAlgorithms[] = {ZVCLM_HASH_SHA256, ZVCLM_HASH_SHA1, ZVCLM_HASH_RMD160};
 
 }  // namespace
 
 // The digest of a key; of a hash what it says itself, whatever the algorithm asked for. Not known
-// when the digest is none that names a key.
+// when the digest is none that names a key. Hints do not count, as they do not in the reduction.
 int Principals::DigestOf(bool& known, Digest& digest, DExpression* key, ZvclmHashID algorithm) {
   digest = {algorithm, {}};
   if (const auto* hash = dynamic_cast<Hash*>(key)) {
@@ -37,6 +39,8 @@ int Principals::DigestOf(bool& known, Digest& digest, DExpression* key, ZvclmHas
   return 0;
 }
 
+// Sorted by digest and then by certificate: the run of one key lists the certificates that it
+// issued in their order.
 int Principals::Load(const Evidence& evidence) {
   certs_ = evidence.CountCerts();
   count_ = 0;
@@ -50,6 +54,7 @@ int Principals::Load(const Evidence& evidence) {
   return 0;
 }
 
+// One mark for each digest that the key can be named by; a hash is only what it says.
 int Principals::Add(DExpression* key, size_t cert) {
   const bool isHash = dynamic_cast<Hash*>(key) != nullptr;
   for (const ZvclmHashID algorithm : kAlgorithms) {
@@ -58,11 +63,13 @@ int Principals::Add(DExpression* key, size_t cert) {
     VESK2_TRY(DigestOf(known, mark.digest, key, algorithm));
     mark.cert = cert;
     if (known) ++count_;
+    // It has one digest, whatever is asked for.
     if (isHash) break;
   }
   return 0;
 }
 
+// By SHA-256, which every key of the chain is filed under; a hash is looked for as it stands.
 int Principals::Find(std::span<const Mark>& marks, DExpression* key) const {
   marks = {};
   Digest digest;
@@ -79,10 +86,12 @@ int Principals::Find(std::span<const Mark>& marks, DExpression* key) const {
 }
 
 template <typename Matches>
+// A k-of-n is as good as its best member, for the question whether it has to do with the chain.
 int Principals::Any(bool& any, Subject* subject, Matches matches) const {
   any = false;
   std::span<const Mark> marks;
   auto* const threshold = dynamic_cast<ThresholdSubject*>(subject);
+  // A key or a hash.
   if (threshold == nullptr) {
     VESK2_TRY(Find(marks, subject));
     any = matches(marks);
@@ -101,6 +110,7 @@ int Principals::Names(bool& named, Subject* subject) const {
   return Any(named, subject, [](std::span<const Mark> marks) { return !marks.empty(); });
 }
 
+// The mark of the first subject has the number behind the last certificate, and is no issuer's.
 int Principals::NamesIssuer(bool& named, Subject* subject) const {
   return NamesOtherIssuer(named, subject, certs_);
 }
@@ -114,6 +124,7 @@ int Principals::NamesOtherIssuer(bool& named, Subject* subject, size_t cert) con
   });
 }
 
+// Members, not marks: a key that issued ten certificates is one key.
 int Principals::CountMembers(size_t& count, ThresholdSubject* subject) const {
   count = 0;
   Ref<SExpression> members;
@@ -126,6 +137,7 @@ int Principals::CountMembers(size_t& count, ThresholdSubject* subject) const {
   return 0;
 }
 
+// So that a text names each key once.
 int Principals::IsFirstOf(bool& first, Principal* issuer, size_t cert) const {
   std::span<const Mark> marks;
   VESK2_TRY(Find(marks, issuer));
@@ -133,6 +145,8 @@ int Principals::IsFirstOf(bool& first, Principal* issuer, size_t cert) const {
   return 0;
 }
 
+// In the order of the store, sharing the entries: what an explanation and an editor of entries look
+// at, instead of all.
 int Evidence::RelevantEntries(SExpression*& out) const {
   VESK2_REQUIRE(out == nullptr, VESK2_ERR_INVALID_PARAM);
   Ref<SExpression> relevant(TryNew<SExpression>(context));

@@ -37,7 +37,8 @@ class Principals {
   };
   struct Mark {
     Digest digest;
-    size_t cert;  // whose issuer; the number of certificates for the subject of the first
+    // Whose issuer it is; the number of certificates for the subject of the first.
+    size_t cert;
   };
   [[nodiscard]] static int DigestOf(bool& known, Digest& digest, DExpression* key,
                                     ZvclmHashID algorithm);
@@ -47,6 +48,7 @@ class Principals {
   template <typename Matches>
   [[nodiscard]] int Any(bool& any, Subject* subject, Matches matches) const;
 
+  // Sorted; at most three for each key.
   std::unique_ptr<Mark[]> marks_;
   size_t count_ = 0;
   size_t certs_ = 0;

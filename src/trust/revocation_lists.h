@@ -1,7 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 // RevocationLists: what the revocation lists of one call say, kept for all its questions. Each list
 // is proved at most once, and only items of proved lists are looked at: whoever writes a manifest
-// chooses how many certificates it has, and how many lists, true ones or not.
+// chooses how many certificates it has, and how many lists, true ones or not. It borrows all that
+// it is given and lives for one call: nothing of it is kept for the next, as the store may have
+// changed by then.
 #ifndef VESK2_SRC_TRUST_REVOCATION_LISTS_H
 #define VESK2_SRC_TRUST_REVOCATION_LISTS_H
 
@@ -49,14 +51,18 @@ class RevocationLists {
   using Source = TagIndex<List>::Entry;
   // What the lists of one source say together, or all lists. Their order makes no difference.
   struct Answers {
+    // The items are gathered when a question asks for them first.
     bool ready = false;
     ItemIndex items;
     const TimeStamp* latest = nullptr;  // the latest end of a list
     CrlSequence* last = nullptr;        // that list
   };
 
+  // The lists, each filed under its source's tag; and the roots, under theirs.
   [[nodiscard]] int Load();
   [[nodiscard]] int LoadRoots();
+  // What a source answers, made ready by Collect; and the proof of one list, which is kept whatever
+  // it was.
   [[nodiscard]] int Find(Answers*& answers, bool critical, SExpression* tag);
   [[nodiscard]] int Collect(Answers& answers, bool critical, std::span<Source> lists);
   [[nodiscard]] int Prove(Source& list);

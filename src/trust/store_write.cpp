@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// See store_write.h.
+// See store_write.h. The temporary file, its lock and the renaming are the platform's (replace.h).
 #include "src/trust/store_write.h"
 
 #include "src/frame/check.h"

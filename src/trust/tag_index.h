@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 // TagIndex: values found by the tag that they are about, each tag hashed once. Comparing every tag
-// with every other would cost the product of two numbers, either of which a stranger can choose.
+// with every other would cost the product of two numbers, either of which a stranger can choose. A
+// digest costs as much as writing the tag once, and lists and entries are looked up by it alone:
+// two tags with one SHA-256 would be one tag, which nobody can make.
 #ifndef VESK2_SRC_TRUST_TAG_INDEX_H
 #define VESK2_SRC_TRUST_TAG_INDEX_H
 
@@ -57,6 +59,7 @@ class TagIndex {
     bool hashed = false;
     VESK2_TRY(DigestTag(hashed, entry.digest, tag));
     if (!hashed) return 0;
+    // What was added later comes later in its run: the last entry of a tag decides about its lists.
     entry.order = count_++;
     entry.value = value;
     return 0;

@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// See text_writer.h.
+// See text_writer.h. Everything that a stranger wrote goes through Escaped: a name in an
+// explanation must not move the cursor, forge a line, or turn the direction of what follows.
 #include "src/trust/text_writer.h"
 
 #include <algorithm>
@@ -15,6 +16,7 @@
 namespace ZvVesk2 {
 namespace {
 
+// A missing word has no bytes.
 std::string_view BytesOf(const ByteString* word) {
   if (word == nullptr) return {};
   return {reinterpret_cast<const char*>(word->GetData()), word->GetLength()};
@@ -37,6 +39,8 @@ size_t DecodeUtf8(std::string_view text, char32_t& point) {
   return point < kLeast[length] || point > 0x10ffff || surrogate ? 0 : length;
 }
 
+// What a terminal does something with instead of showing it. Letters of every language stay
+// readable.
 bool IsUnsafe(char32_t point) {
   constexpr struct {
     char32_t first, last;
@@ -51,6 +55,7 @@ bool IsUnsafe(char32_t point) {
   return false;
 }
 
+// Two stamps that are the same text are one moment.
 bool IsMoment(const TimeStamp* notBefore, const TimeStamp* notAfter) {
   return notBefore != nullptr && notAfter != nullptr && !notBefore->IsBefore(notAfter) &&
          !notBefore->IsAfter(notAfter);
@@ -58,6 +63,7 @@ bool IsMoment(const TimeStamp* notBefore, const TimeStamp* notAfter) {
 
 }  // namespace
 
+// After a failure nothing is written any more: half a sentence must not be taken for a whole one.
 bool TextWriter::Reserve(size_t more) {
   if (code_ != 0) return false;
   if (more < capacity_ - length_) return true;  // the terminator has its place
@@ -95,11 +101,15 @@ void TextWriter::Hex(const unsigned char* bytes, size_t length) {
   }
 }
 
+// What is no UTF-8 is told byte by byte, and decoding goes on behind that byte, so that nothing
+// hides in a broken sequence. A backslash is doubled: an escape can then not be forged by writing
+// one.
 TextWriter& TextWriter::Escaped(std::string_view bytes) {
   while (!bytes.empty()) {
     char32_t point = 0;
     size_t length = DecodeUtf8(bytes, point);
     const bool plain = length != 0 && !IsUnsafe(point);
+    // One byte on, and try again from there.
     if (length == 0) length = 1;
     for (const char byte : bytes.substr(0, length)) {
       const auto value = static_cast<unsigned char>(byte);
@@ -111,6 +121,7 @@ TextWriter& TextWriter::Escaped(std::string_view bytes) {
   return *this;
 }
 
+// Without hints: the identity of a key must not change with how it is shown.
 TextWriter& TextWriter::Fingerprint(DExpression* expression) {
   unsigned char* digest = nullptr;
   unsigned int length = 0;
@@ -122,6 +133,7 @@ TextWriter& TextWriter::Fingerprint(DExpression* expression) {
   return *this;
 }
 
+// A hash is told as it says itself, which is not the fingerprint of the hash.
 TextWriter& TextWriter::Of(Subject* subject) {
   if (const auto* hash = dynamic_cast<Hash*>(subject)) {
     *this << (hash->GetAlgorithm() == ZVCLM_HASH_SHA256 ? "sha256:"
@@ -141,6 +153,7 @@ TextWriter& TextWriter::Of(Subject* subject) {
   return *this;
 }
 
+// The root as it is set now: an explanation is told in the process that verified.
 std::unique_ptr<char[]> TextWriter::StorePath() {
   std::unique_ptr<char[]> path(
       ZVsysutil::zv_join_path(VeskConf::GetGlobalDirectory(), AclEntry::DirectoryName(true)));
@@ -153,6 +166,8 @@ TextWriter& TextWriter::AclStore() {
   return path ? Escaped(path.get()) : *this;
 }
 
+// The bare name for the store's own, as administrators know it; a path for all others, so that a
+// file of that name elsewhere is not taken for it.
 TextWriter& TextWriter::Of(const AclEntry* entry) {
   const std::string_view path = entry->GetFileName() != nullptr ? entry->GetFileName() : "";
   const std::unique_ptr<char[]> store = StorePath();
@@ -162,6 +177,8 @@ TextWriter& TextWriter::Of(const AclEntry* entry) {
   return Escaped(inStore ? path.substr(directory.size() + 1) : path);
 }
 
+// All bytes of the text, not those up to the first 0: two tags must not read the same because one
+// goes on behind it.
 TextWriter& TextWriter::List(SExpression* list, std::string_view keyword) {
   if (code_ != 0) return *this;
   const unsigned int size = list->AdvancedLength();
@@ -180,6 +197,7 @@ TextWriter& TextWriter::List(SExpression* list, std::string_view keyword) {
   return Escaped(text);
 }
 
+// No tag grants everything, and is told so: an empty text would read as nothing.
 TextWriter& TextWriter::Tag(SExpression* tag) {
   return tag != nullptr ? List(tag, "tag") : *this << "everything";
 }
@@ -194,6 +212,7 @@ TextWriter& TextWriter::Period(const TimeStamp* notBefore, const TimeStamp* notA
   return notAfter != nullptr ? (*this << "until ").Of(notAfter) : *this;
 }
 
+// Words for people, and the name for whoever looks it up.
 TextWriter& TextWriter::Code(int code) {
   const std::string_view words = V2CodeWords(code);
   const char* const name = V2CodeName(code);
@@ -204,6 +223,8 @@ TextWriter& TextWriter::Code(int code) {
   return words.empty() ? *this : *this << ")";
 }
 
+// The first failure of all that was written. The writer is empty afterwards, and may be used again
+// when it did not fail.
 int TextWriter::Take(std::unique_ptr<char[]>& out) {
   static_cast<void>(Reserve(0));
   VESK2_TRY(code_);

@@ -45,6 +45,7 @@ class TextWriter {
   std::unique_ptr<char[]> text_;
   size_t length_ = 0;
   size_t capacity_ = 0;
+  // The first failure. Nothing is written behind it.
   int code_ = 0;
 };
 

@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// See wording.h.
+// See wording.h. Each is a TextWriter with one thing in it, so that programs, the command and
+// explanations call an object the same.
 #include <vesk2/wording.h>
 
 #include "src/trust/text_writer.h"
@@ -7,6 +8,7 @@
 namespace ZvVesk2::Wording {
 namespace {
 
+// A failure of any kind is null: the caller has no text.
 char* Taken(TextWriter& writer) {
   std::unique_ptr<char[]> text;
   return writer.Take(text) == 0 ? text.release() : nullptr;
