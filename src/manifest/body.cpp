@@ -1,5 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-// The objects of a manifest body: what a file and a directory of the tree carry, and their order.
+// The objects of a manifest body: what a file and a directory of the tree carry, and their order. A
+// listing has an object for each file of a tree, of which there may be a million: they hold a name,
+// a digest and little else.
 #include <algorithm>
 #include <cstring>
 
@@ -15,6 +17,8 @@ BodyObject::~BodyObject() = default;
 BodyFile::BodyFile(Vesk2ContextStruct* ctx) : BodyObject(ctx) {}
 BodyFile::~BodyFile() = default;
 
+// By bytes, as names have no encoding, and so that the order of the results is the same on every
+// machine. Without a name it is last, where nobody looks for it.
 int BodyObject::Cmp(const void* a, const void* b) {
   const char* const left = (*static_cast<BodyObject* const*>(a))->GetName();
   const char* const right = (*static_cast<BodyObject* const*>(b))->GetName();
@@ -23,11 +27,14 @@ int BodyObject::Cmp(const void* a, const void* b) {
   return ZVsysutil::zv_filenamecmp(left, right);
 }
 
+// A file without a digest equals none but an empty one: nothing passes for as listed because its
+// digest was never set.
 bool BodyFile::Equal(const unsigned char* digest, int length) const {
   return length >= 0 && hashLength == static_cast<uint32_t>(length) &&
          (length == 0 || std::memcmp(hash, digest, hashLength) == 0);
 }
 
+// What is no file differs from every file.
 bool BodyFile::Equal(const BodyObject* other) const {
   const auto* const file = dynamic_cast<const BodyFile*>(other);
   return file != nullptr && Equal(file->hash, static_cast<int>(file->hashLength));

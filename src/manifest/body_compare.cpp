@@ -1,5 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-// The comparison of two bodies, without the disk.
+// The comparison of two bodies, without the disk. Both bodies are sorted, so that one pass over the
+// two tells what is in both, and the cost is that of reading them. The ignored names are read by
+// the same pass (ignore.h).
 #include <vesk2/manifest.h>
 #include <vesk2/manifest_body.h>
 
@@ -19,7 +21,8 @@ namespace {
 }
 
 // The code of the whole comparison is that of the two roots: a difference further down makes the
-// directory that holds it invalid, whatever the difference is.
+// directory that holds it invalid, whatever the difference is. It recurses as deeply as the bodies
+// nest, which their reader bounds (Limits::kMaxDepth).
 class BodyComparison {
  public:
   explicit BodyComparison(Findings& findings) : findings_(findings) {}
@@ -39,7 +42,10 @@ class BodyComparison {
   Findings& findings_;
 };
 
+// Files and directories are kept in two lists, so that a file and a directory of one name never
+// meet: the one is missing and the other extra.
 int BodyComparison::Files(BodyDirectory& a, BodyDirectory& b, StatusSet& statuses) {
+  // Each side was read with the same list, and each walk serves one sequence of names.
   IgnoreWalk ignoreOfA(a.GetIgnored());
   IgnoreWalk ignoreOfB(b.GetIgnored());
   BodyObject* fileA = a.GetFiles().begin();
@@ -47,6 +53,7 @@ int BodyComparison::Files(BodyDirectory& a, BodyDirectory& b, StatusSet& statuse
   while (fileA != nullptr || fileB != nullptr) {
     // As long as both sides have files, the reference's list decides for both.
     IgnoreWalk& ignore = fileA != nullptr ? ignoreOfA : ignoreOfB;
+    // The smaller name is the one that the other side does not have.
     const int order = Order(fileA, fileB);
     const char* const name = order <= 0 ? fileA->GetName() : fileB->GetName();
     uint32_t status = order < 0 ? BodyObject::Missing : BodyObject::Extra;
@@ -61,6 +68,7 @@ int BodyComparison::Files(BodyDirectory& a, BodyDirectory& b, StatusSet& statuse
   return 0;
 }
 
+// Here each side's own list decides: a path below is collected by the directory that has it.
 int BodyComparison::Subdirectories(BodyDirectory& a, BodyDirectory& b, StatusSet& statuses) {
   IgnoreWalk ignoreOfA(a.GetIgnored());
   IgnoreWalk ignoreOfB(b.GetIgnored());
@@ -81,6 +89,7 @@ int BodyComparison::Subdirectories(BodyDirectory& a, BodyDirectory& b, StatusSet
   return 0;
 }
 
+// The directory stands in the results behind what is in it, as whoever prints them expects.
 int BodyComparison::Pair(BodyDirectory& a, BodyDirectory& b, StatusSet& statuses) {
   StatusSet inside;
   VESK2_TRY(Directories(a, b, inside));
@@ -88,7 +97,9 @@ int BodyComparison::Pair(BodyDirectory& a, BodyDirectory& b, StatusSet& statuses
   return findings_.AddDirectory(a.GetName(), status, statuses);
 }
 
-// Records a directory and all that is below it.
+// Records a directory and all that is below it. Ignored names below are not looked for: the
+// reference says nothing of this directory, and a directory that is ignored as a whole did not come
+// here.
 int BodyComparison::Subtree(BodyDirectory& directory, uint32_t status, StatusSet& statuses) {
   VESK2_TRY(findings_.AddDirectory(directory.GetName(), status, statuses));
   PointerArray<BodyObject>& files = directory.GetFiles();
@@ -104,6 +115,9 @@ int BodyComparison::Subtree(BodyDirectory& directory, uint32_t status, StatusSet
 
 }  // namespace
 
+// Nothing here is proved: the caller has read both bodies from manifests, or has them from
+// anywhere. The findings are published when all of them are made, so that no list shows half a
+// comparison.
 int Manifest::Compare(ZvBuffer* body1, ZvBuffer* body2) {
   VESK2_REQUIRE(body1 != nullptr && body2 != nullptr, VESK2_ERR_PARAM_NULL);
   PointerArray<char> ignoreList;

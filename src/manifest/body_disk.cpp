@@ -1,5 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
-// See body_disk.h.
+// See body_disk.h. The order of calls is what matters: a directory is opened once, from the one
+// above it, listed, and its files are opened from it by bare names. Once it is open, its files are
+// read from it, wherever it is moved and whatever is put in its place; and no path is looked up
+// from the root a million times.
+//
+// Descriptors are few and trees are deep: kHeldLevels directories stay open, and those below are
+// opened by a longer path from the last of them.
 #include "src/manifest/body_disk.h"
 
 #include <sys/stat.h>
@@ -21,14 +27,15 @@ using ZVsysutil::ZvPlace;
 // Directories that are held open on the way down; those below are opened from the last of them.
 constexpr unsigned kHeldLevels = 64;
 
-// The bytes of the paths below a directory before a name in it.
+// The bytes of the paths below a directory before a name in it. The names in a listed directory are
+// paths; on the disk they are bare. Both are compared from here on.
 size_t PrefixOf(const BodyDirectory& directory) {
   const size_t length = std::strlen(directory.GetName());
   return length + (length > 0 && directory.GetName()[length - 1] != '/' ? 1 : 0);
 }
 
 // The first entry of a sorted list whose name, without its first `prefix` bytes, is not before
-// `name`.
+// `name`. Searched by halves: a directory on disk may hold a million names that nobody listed.
 uint32_t LowerBound(const PointerArray<BodyObject>& entries, size_t prefix, const char* name) {
   uint32_t first = 0;
   uint32_t end = entries.GetCount();
@@ -44,12 +51,13 @@ uint32_t LowerBound(const PointerArray<BodyObject>& entries, size_t prefix, cons
   return first;
 }
 
+// Past the end of the list there is no entry.
 bool IsNamed(const BodyObject* entry, size_t prefix, const char* name) {
   return entry != nullptr && ZVsysutil::zv_filenamecmp(entry->GetName() + prefix, name) == 0;
 }
 
 // Notes that a regular file of this name was seen; false when none is listed. A name may be listed
-// more than once.
+// more than once. All of that name are noted, since each is compared with the one file on disk.
 bool NoteSeen(DirectoryFound& found, const char* name, bool regular) {
   const PointerArray<BodyObject>& files = found.directory->GetFiles();
   const uint32_t first = LowerBound(files, 0, name);
@@ -59,13 +67,15 @@ bool NoteSeen(DirectoryFound& found, const char* name, bool regular) {
   return IsNamed(files.at(first), 0, name);
 }
 
+// Of the same kind only: a file where a directory is listed is unlisted, and the directory missing.
 bool ListsDirectory(BodyDirectory& directory, size_t prefix, const char* name) {
   const PointerArray<BodyObject>& below = directory.GetSubdirectories();
   return IsNamed(below.at(LowerBound(below, prefix, name)), prefix, name);
 }
 
 // The kind of an entry of which the directory said nothing, behind links. What nobody can look at
-// is no directory.
+// is no directory. It follows links, as opening the file would. Asked where the listing says
+// nothing: of links, and on disks that do not tell kinds.
 [[nodiscard]] int Ask(ZvKind& kind, const ZvPlace& place) {
   struct stat about {};
   const int code = ZVsysutil::zv_stat(place, &about);
@@ -88,6 +98,7 @@ bool ListsDirectory(BodyDirectory& directory, size_t prefix, const char* name) {
   return 0;
 }
 
+// Ignored files are marked at once, by a walk through both sorted lists: they are never opened.
 [[nodiscard]] int MakeFound(std::unique_ptr<DirectoryFound>& out, BodyDirectory& directory) {
   std::unique_ptr<DirectoryFound> found(TryNew<DirectoryFound>());
   VESK2_REQUIRE(found, VESK2_ERR_MEM_ALLOC);
@@ -103,14 +114,19 @@ bool ListsDirectory(BodyDirectory& directory, size_t prefix, const char* name) {
   return 0;
 }
 
-// Goes through the entries of a directory; keeps those that are not listed if it is `searched`.
+// Goes through the entries of a directory; keeps those that are not listed if it is `searched`. The
+// root is listed as well, though it is not searched: what is said of its files spares a question
+// for each.
 [[nodiscard]] int List(DirectoryFound& found, OpenDirectory& open, bool searched) {
   for (;;) {
     const char* name = nullptr;
     ZvKind kind = ZvKind::kUnknown;
+    // A listing that breaks off says nothing about what did not come.
     VESK2_TRY(open.listing.Next(&name, &kind));
     if (name == nullptr) break;
     const bool regular = kind == ZvKind::kFile;
+    // Only who looks for unlisted entries has to know what they are; a listed file is judged when
+    // it is opened.
     if (searched && kind == ZvKind::kUnknown) {
       VESK2_TRY(Ask(kind, {open.listing.Descriptor(), name}));
     }
@@ -127,11 +143,13 @@ bool ListsDirectory(BodyDirectory& directory, size_t prefix, const char* name) {
 
 }  // namespace
 
+// A path below `open` is looked up from there, without its prefix.
 ZvPlace PlaceOf(const OpenDirectory* open, const char* path) {
   if (open == nullptr) return {ZVsysutil::kZvNoDirectory, path};
   return {open->listing.Descriptor(), path + open->prefix};
 }
 
+// One for each directory on the way down: at most Limits::kMaxDepth.
 struct DiskWalk::Level {
   Level(BodyDirectory& entered, Level* outer)
       : directory(entered),
@@ -149,6 +167,7 @@ struct DiskWalk::Level {
   const unsigned depth;
 };
 
+// Whoever stops half-way (no memory, a callback) leaves directories open and findings untaken.
 DiskWalk::~DiskWalk() {
   Release(open_);
   while (top_ != nullptr) Leave();
@@ -162,6 +181,8 @@ std::unique_ptr<DirectoryFound> DiskWalk::TakeFound() {
   return found;
 }
 
+// Threads hash files of a directory that the walk has left: the last of its users closes it. The
+// caller holds the lock.
 void DiskWalk::Release(OpenDirectory* open) {
   if (open != nullptr && --open->users == 0) delete open;
 }
@@ -172,9 +193,12 @@ void DiskWalk::Leave() {
   top_ = left->above;
 }
 
+// A thread takes some files of one directory at a time. The walk itself goes on under the caller's
+// lock, which is cheap beside hashing.
 int DiskWalk::Next(FileChunk& chunk) {
   chunk = {};
   bool more = true;
+  // Directories without files are passed over here, and are found all the same.
   while (last_ == nullptr || nextFile_ == last_->directory->GetFiles().GetCount()) {
     VESK2_TRY(GoOn(more));
     if (!more) return 0;
@@ -186,7 +210,8 @@ int DiskWalk::Next(FileChunk& chunk) {
   return 0;
 }
 
-// Enters the next directory, the root first.
+// Enters the next directory, the root first. Depth first, in the order of the listing, as the
+// findings are told. An ignored directory is not even opened.
 int DiskWalk::GoOn(bool& more) {
   Release(std::exchange(open_, nullptr));
   if (!std::exchange(begun_, true)) return Enter(root_);
@@ -202,6 +227,8 @@ int DiskWalk::GoOn(bool& more) {
   return 0;
 }
 
+// The findings are chained in the order in which directories are entered: a recursion through the
+// listing takes them off in the same order.
 int DiskWalk::Enter(BodyDirectory& directory) {
   std::unique_ptr<DirectoryFound> found;
   VESK2_TRY(MakeFound(found, directory));
@@ -210,18 +237,22 @@ int DiskWalk::Enter(BodyDirectory& directory) {
   top_ = level;
   VESK2_TRY(Search(*found));
   (last_ != nullptr ? last_->next : first_) = found.get();
+  // Nothing can fail behind the chaining, so that the walk and its findings agree.
   last_ = found.release();
   nextFile_ = 0;
   return 0;
 }
 
 // Opens and lists the directory that was entered last. Files of one that cannot be opened are asked
-// by their paths.
+// by their paths. A directory that is missing or cannot be listed keeps its reason; its files are
+// then missing by their own doing. For want of memory or descriptors nothing is decided.
 int DiskWalk::Search(DirectoryFound& found) {
   std::unique_ptr<OpenDirectory> open(TryNew<OpenDirectory>());
   VESK2_REQUIRE(open, VESK2_ERR_MEM_ALLOC);
   const char* const path = found.directory->GetName();
   int code = VESK2_ERR_FIND_DIR;
+  // A longer path could be opened from a directory held open, and by nobody else who has the name
+  // from us: it counts as not there.
   if (std::strlen(path) <= kLongestPath) code = open->listing.Open(PlaceOf(top_->open, path));
   const bool opened = code == 0;
   // The root is not searched: it may hold more than the manifest lists, the manifest itself for

@@ -4,7 +4,8 @@
 //
 // Directories are listed before their files are opened, and what they say of an entry's kind is
 // believed; of links and where a disk says nothing, the entry is asked. A listed file that a
-// directory calls regular is opened from that directory without a look of its own.
+// directory calls regular is opened from that directory without a look of its own. A walk belongs
+// to one caller at a time: threads that share one take turns under a lock (body_verify.cpp).
 #ifndef VESK2_SRC_MANIFEST_BODY_DISK_H
 #define VESK2_SRC_MANIFEST_BODY_DISK_H
 
@@ -16,7 +17,8 @@
 
 namespace ZvVesk2 {
 
-// What is known of a listed file: one of these, or the code of what kept it from being read.
+// What is known of a listed file: one of these, or the code of what kept it from being read. Codes
+// of the library are positive and 0 is kSame, so that one int holds both without meeting.
 enum FileState : int {
   kSame = 0,
   kDiffers = -1,
@@ -28,8 +30,10 @@ enum FileState : int {
 
 // A directory that is held open.
 struct OpenDirectory {
+  // Open as long as this is.
   ZVsysutil::ZvListing listing;
-  size_t prefix = 0;   // of the paths below it that it stands for
+  // The bytes of the paths below it that it stands for.
+  size_t prefix = 0;
   unsigned users = 1;  // the walk, and files that are being hashed
 };
 
@@ -39,13 +43,17 @@ ZVsysutil::ZvPlace PlaceOf(const OpenDirectory* open, const char* path);
 // What was found in one listed directory.
 struct DirectoryFound {
   BodyDirectory* directory;
-  std::unique_ptr<int[]> files;       // a FileState for each, in their order
-  PointerArray<BodyObject> unlisted;  // entries of the disk, ignored ones too, sorted
-  int reason = 0;                     // why it was not searched for them, or 0
+  // A FileState for each, in their order. Threads write those of their chunks, and the walk those
+  // that it has not handed out: never two at one place.
+  std::unique_ptr<int[]> files;
+  // Entries of the disk, ignored ones too, sorted: files by bare name, directories by path.
+  PointerArray<BodyObject> unlisted;
+  // Why it was not searched for them, or 0. VESK2_ERR_FIND_DIR, mostly.
+  int reason = 0;
   DirectoryFound* next = nullptr;
 };
 
-// Some files of one directory.
+// Some files of one directory: the work that a thread takes at once.
 struct FileChunk {
   DirectoryFound* found = nullptr;
   OpenDirectory* open = nullptr;  // null: they are opened by their paths

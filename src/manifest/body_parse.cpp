@@ -5,7 +5,10 @@
 //   (4:file<name><ignored><digest of 32 bytes>)      (3:dir<name><ignored><entry>...)
 //
 // The text comes from whoever signed the manifest, and every name in it becomes a path that is
-// opened: names that are not one plain component are refused.
+// opened: names that are not one plain component are refused. A signed listing is a stranger's all
+// the same: sizes, depth and names are bounded as they are read (limits.h). A listing of a million
+// files is read through here, so that a byte string is looked at where it stands, without an
+// object.
 #include <cstring>
 #include <string_view>
 
@@ -26,6 +29,7 @@ constexpr unsigned kTokenLength = 4;
 constexpr unsigned kDigestLength = 32;
 constexpr char kSeparator = '/';
 
+// A view of no bytes has no pointer to be followed.
 std::string_view Text(const unsigned char* bytes, size_t length) {
   if (length == 0) return {};
   return {reinterpret_cast<const char*>(bytes), length};
@@ -45,7 +49,8 @@ class ReadString {
   std::string_view Text() const { return text_; }
 
  private:
-  // "<digits>:<bytes>"
+  // "<digits>:<bytes>" Takes exactly what ByteString::Import takes without a hint. What it does not
+  // take is left to that one, untouched, for the code that it gives.
   bool ReadInPlace(ZvBuffer& buffer) {
     const unsigned char* const bytes = buffer.Data();
     const size_t left = buffer.Remaining();
@@ -66,6 +71,8 @@ class ReadString {
   Ref<ByteString> read_;
 };
 
+// Every name becomes part of a path: with ".." or "/" a signer could have files outside the tree
+// read, and told about; with a 0 byte the path would end before the name does.
 bool IsBareName(std::string_view name) {
   return !name.empty() && name != "." && name != ".." &&
          name.find(kSeparator) == std::string_view::npos &&
@@ -74,7 +81,8 @@ bool IsBareName(std::string_view name) {
 
 // The part of an ignored path that names something directly inside `directory` or below it; null
 // when the path lies elsewhere. `directory` may end in a separator: callers pass what they were
-// given.
+// given. "lib" does not hold "library/x": behind the directory's name a separator must stand, or
+// the end of a name that brought one.
 const char* RestInside(const char* directory, const char* path) {
   const size_t length = directory != nullptr ? std::strlen(directory) : 0;
   if (length == 0) return path;
@@ -86,6 +94,7 @@ const char* RestInside(const char* directory, const char* path) {
 
 }  // namespace
 
+// The token makes two signatures over equal trees differ. Its length is all that is asked of it.
 int BodyDirectory::ParseBody(ZvBuffer* buffer, PointerArray<char>* ignoreList) {
   VESK2_REQUIRE(buffer != nullptr, VESK2_ERR_PARAM_NULL);
   VESK2_TRY(buffer->Expect("(4:body(12:random-token"));
@@ -101,9 +110,12 @@ int BodyDirectory::ParseDir(ZvBuffer* buffer, PointerArray<char>* ignoreList) {
   return ParseEntries(buffer, ignoreList, 1, 0);
 }
 
+// Depth counts directories, the root's being 1. The lists are sorted when they are whole: signers
+// write them in any order, and whoever compares walks them side by side.
 int BodyDirectory::ParseEntries(ZvBuffer* buffer, PointerArray<char>* ignoreList, unsigned depth,
                                 size_t length) {
   VESK2_REQUIRE(depth <= Limits::kMaxDepth, VESK2_ERR_PARSE_FILE);
+  // The end of the text ends the loop too, and then the ")" is missing.
   while (buffer->Peek() != ')' && buffer->Peek() >= 0) {
     VESK2_TRY(ParseEntry(buffer, ignoreList, depth, length));
   }
@@ -113,6 +125,8 @@ int BodyDirectory::ParseEntries(ZvBuffer* buffer, PointerArray<char>* ignoreList
   return ignoreList != nullptr ? CollectIgnored(ignoreList) : 0;
 }
 
+// There are two kinds, and no third is passed over: a reader that did would let a signer list what
+// nobody compares.
 int BodyDirectory::ParseEntry(ZvBuffer* buffer, PointerArray<char>* ignoreList, unsigned depth,
                               size_t length) {
   if (buffer->Accept("(3:dir")) return ParseSubdirectory(buffer, ignoreList, depth + 1, length);
@@ -121,7 +135,8 @@ int BodyDirectory::ParseEntry(ZvBuffer* buffer, PointerArray<char>* ignoreList, 
 }
 
 // Reads an entry's name and the byte string after it, whose meaning is the signer's. `length` is
-// that of the directory's path within the body, and becomes the entry's.
+// that of the directory's path within the body, and becomes the entry's. The second byte string is
+// read and not kept, whatever it says.
 int BodyDirectory::ParseName(ZvBuffer* buffer, std::unique_ptr<char[]>& bare, size_t& length) {
   ReadString string;
   VESK2_TRY(string.Import(buffer, GetContext()));
@@ -137,6 +152,8 @@ int BodyDirectory::ParseName(ZvBuffer* buffer, std::unique_ptr<char[]>& bare, si
   return ignoredString.Import(buffer, GetContext());
 }
 
+// A file keeps its bare name: joined paths of a million files would take more memory than all the
+// rest.
 int BodyDirectory::ParseFile(ZvBuffer* buffer, size_t length) {
   std::unique_ptr<char[]> bare;
   VESK2_TRY(ParseName(buffer, bare, length));
@@ -145,6 +162,8 @@ int BodyDirectory::ParseFile(ZvBuffer* buffer, size_t length) {
   std::unique_ptr<BodyFile> file(TryNew<BodyFile>(GetContext()));
   VESK2_REQUIRE(file, VESK2_ERR_MEM_ALLOC);
   file->SetName(bare.release());
+  // One algorithm, known by its length: another digest is another format and not a file that
+  // differs.
   VESK2_REQUIRE(digest.Text().size() == kDigestLength, VESK2_ERR_UNKNOWN_HASH_ID);
   file->SetHash(reinterpret_cast<const unsigned char*>(digest.Text().data()));
   VESK2_TRY(buffer->Expect(")"));
@@ -153,6 +172,8 @@ int BodyDirectory::ParseFile(ZvBuffer* buffer, size_t length) {
   return 0;
 }
 
+// A directory keeps its path, since results name it so and names below are made of it. Its length
+// is bounded by kMaxBodyPath, so that a deep tree costs at most its square.
 int BodyDirectory::ParseSubdirectory(ZvBuffer* buffer, PointerArray<char>* ignoreList,
                                      unsigned depth, size_t length) {
   std::unique_ptr<char[]> bare;
@@ -168,7 +189,8 @@ int BodyDirectory::ParseSubdirectory(ZvBuffer* buffer, PointerArray<char>* ignor
 }
 
 // Picks the names to ignore inside this directory out of the sorted list, where the paths below one
-// directory stand together.
+// directory stand together. Each directory walks the list up to its own run, directories times
+// ignored names in all: the latter are what a caller wrote, and few.
 int BodyDirectory::CollectIgnored(PointerArray<char>* ignoreList) {
   bool found = false;
   for (const char* path = ignoreList->begin(); path != nullptr; path = ignoreList->next()) {
@@ -176,6 +198,7 @@ int BodyDirectory::CollectIgnored(PointerArray<char>* ignoreList) {
     if (rest == nullptr && found) break;
     if (rest == nullptr) continue;
     found = true;
+    // It lies further down, and is picked up there.
     if (std::strchr(rest, kSeparator) != nullptr) continue;
     std::unique_ptr<char[]> copy(ZVsysutil::zv_fstrdup(rest));
     VESK2_REQUIRE(copy && ignored.push(copy.get()), VESK2_ERR_MEM_ALLOC);

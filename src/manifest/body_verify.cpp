@@ -3,7 +3,10 @@
 //
 // A listed file counts by its contents alone: links are followed, and what is no regular file is
 // never opened and counts as missing. Nothing is descended into that is not listed. The result
-// speaks of the moment of reading; nothing keeps the tree from changing afterwards.
+// speaks of the moment of reading; nothing keeps the tree from changing afterwards. Two steps: all
+// listed files are hashed, by any number of threads, in whatever order they come; then what was
+// found is told in the order of the listing, by one. So the results do not depend on who was
+// faster.
 #include <cstring>
 #include <memory>
 #include <utility>
@@ -26,7 +29,8 @@ namespace {
 using ZVsysutil::zv_join_path;
 using ZVsysutil::ZvLocked;
 
-// Hashes the listed files. Any number of threads take part in it.
+// Hashes the listed files. Any number of threads take part in it. The lock guards the walk and the
+// first trouble; a file's state is written by the one thread that has its chunk.
 class FileHashing {
  public:
   FileHashing(BodyDirectory& root, const Manifest& manifest, const Vesk2TaskRunner* runner,
@@ -56,6 +60,8 @@ class FileHashing {
   ZVsysutil::ZvCall& call_;
 };
 
+// Each thread has its own digester, and so its buffers, for all its files. It waits within the
+// call's allowance: a tree of held files must not stop as many waits as there are threads.
 void FileHashing::TakePart() {
   const ZVsysutil::ZvCall call(call_);
   FileDigester digester(manifest_.GetContext(), manifest_.GetFileCallbacks());
@@ -64,7 +70,8 @@ void FileHashing::TakePart() {
   while (Exchange(chunk, code)) code = Hash(chunk, digester);
 }
 
-// Gives a chunk back, with what came of it, for another; false when there is no more to do.
+// Gives a chunk back, with what came of it, for another; false when there is no more to do. The
+// first trouble ends it for all: what the others still do is not asked about.
 bool FileHashing::Exchange(FileChunk& chunk, int code) {
   const ZvLocked locked(lock_);
   walk_.Done(chunk);
@@ -74,6 +81,7 @@ bool FileHashing::Exchange(FileChunk& chunk, int code) {
   return trouble_ == 0 && chunk.found != nullptr;
 }
 
+// Ignored files are in the chunk and are skipped: a chunk is a range.
 int FileHashing::Hash(const FileChunk& chunk, FileDigester& digester) {
   for (uint32_t i = chunk.first; i < chunk.end; ++i) {
     int& state = chunk.found->files[i];
@@ -84,6 +92,9 @@ int FileHashing::Hash(const FileChunk& chunk, FileDigester& digester) {
   return 0;
 }
 
+// Opened from the directory that was listed, where there is one, so that nobody can put another
+// tree in its place between two files. Why a file was not read is its state and not an error: the
+// other files are compared all the same.
 int FileHashing::HashOne(int& state, const FileChunk& chunk, const BodyFile& file,
                          FileDigester& digester) {
   const char* const directory = chunk.found->directory->GetName();
@@ -95,12 +106,14 @@ int FileHashing::HashOne(int& state, const FileChunk& chunk, const BodyFile& fil
   FileToDigest wanted = {{ZVsysutil::kZvNoDirectory, path.get()}, path.get()};
   if (chunk.open != nullptr) {
     wanted.place = {chunk.open->listing.Descriptor(), file.GetName(), state == kSeenRegular};
+    // What nobody can name is not there: the same answer as by its path.
     if (chunk.open->prefix + std::strlen(file.GetName()) > kLongestPath)
       wanted.place.name = nullptr;
   }
   unsigned char digest[kFileDigestSize];
   bool held = false;
   const int code = digester.Digest(wanted, digest, held);
+  // These two end the verification; nothing was decided about the file.
   VESK2_REQUIRE(code != VESK2_ERR_USER_INTERRUPT, code);
   VESK2_REQUIRE(!LacksMemory(code), VESK2_ERR_MEM_ALLOC);
   state = held ? static_cast<int>(kHeldByOther) : code;
@@ -108,7 +121,8 @@ int FileHashing::HashOne(int& state, const FileChunk& chunk, const BodyFile& fil
   return 0;
 }
 
-// Records what was found, in the order of a recursion through the listed directories.
+// Records what was found, in the order of a recursion through the listed directories. The recursion
+// goes as deep as the listing nests, which its reader bounds.
 class FindingTree {
  public:
   FindingTree(DiskWalk& walk, Findings& findings) : walk_(walk), findings_(findings) {}
@@ -130,6 +144,9 @@ class FindingTree {
   Findings& findings_;
 };
 
+// A file that could not be opened is missing, as what is no regular file is: both are not there as
+// a file. One that another process held is there, and so has changed as far as can be told. Both
+// carry the reason.
 int FindingTree::Files(const DirectoryFound& found, StatusSet& statuses) {
   const PointerArray<BodyObject>& files = found.directory->GetFiles();
   for (uint32_t i = 0; i < files.GetCount(); ++i) {
@@ -144,6 +161,7 @@ int FindingTree::Files(const DirectoryFound& found, StatusSet& statuses) {
   return 0;
 }
 
+// Inside first: what is in a directory decides about it.
 int FindingTree::Subdirectories(BodyDirectory& directory, StatusSet& statuses) {
   IgnoreWalk ignore(directory.GetIgnored());
   PointerArray<BodyObject>& subdirectories = directory.GetSubdirectories();
@@ -162,6 +180,8 @@ int FindingTree::Subdirectories(BodyDirectory& directory, StatusSet& statuses) {
   return 0;
 }
 
+// What the disk holds and nobody listed. An unlisted directory is named and not looked into: how
+// much is in it is nobody's promise, and may be without end.
 int FindingTree::Unlisted(DirectoryFound& found, StatusSet& statuses) {
   // The parent records it once more: callers see such a directory twice.
   if (found.reason != 0) {
@@ -194,12 +214,16 @@ size_t CountFiles(BodyDirectory& directory) {
 
 }  // namespace
 
+// Reading and comparing are two halves, since VerifyManifest tells in between how far the listing
+// made sense.
 int Manifest::Verify(ZvBuffer* body, const char* directoryPath) {
   std::unique_ptr<BodyDirectory> root;
   VESK2_TRY(ParseListing(root, body, directoryPath));
   return CheckListing(std::move(root));
 }
 
+// The root is named by the directory as the caller wrote it, so that results are paths that he can
+// open.
 int Manifest::ParseListing(std::unique_ptr<BodyDirectory>& out, ZvBuffer* body,
                            const char* directoryPath) {
   VESK2_REQUIRE(body != nullptr && directoryPath != nullptr, VESK2_ERR_PARAM_NULL);
@@ -214,6 +238,8 @@ int Manifest::ParseListing(std::unique_ptr<BodyDirectory>& out, ZvBuffer* body,
   return 0;
 }
 
+// Findings are published when all of them are there. The listing is kept for who wants evidence,
+// also of a comparison that was broken off.
 int Manifest::CheckListing(std::unique_ptr<BodyDirectory> root) {
   ZVsysutil::ZvCall call;
   Findings findings;

@@ -1,5 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-// Recording findings, and handing them to the manifest's four lists.
+// Recording findings, and handing them to the manifest's four lists. A finding costs one record and
+// its name. Reasons are few and are kept apart, sorted by record, so that a million records need no
+// member for them.
 #include "src/manifest/findings.h"
 
 #include <algorithm>
@@ -12,6 +14,8 @@
 
 namespace ZvVesk2 {
 
+// What is wrong comes before what is missing, and that before what is too much: a caller who looks
+// at the code alone sees the worst.
 int StatusSet::Code() const {
   if (statuses_ & BodyObject::Invalid) return VESK2_ERR_HASH_MISMATCH;
   if (statuses_ & BodyObject::Missing) return VESK2_ERR_FILE_NOT_FOUND;
@@ -30,12 +34,15 @@ int Findings::AddDirectory(const char* path, uint32_t status, StatusSet& statuse
   return Add(std::move(copy), true, status, statuses, reason);
 }
 
+// The fourth is for what is too much, and there is no fifth.
 Findings::List& Findings::ListOf(uint32_t status) {
   if (status == BodyObject::Valid) return valid_;
   if (status == BodyObject::Invalid) return invalid_;
   return status == BodyObject::Missing ? missing_ : extra_;
 }
 
+// The record is made before anything changes; it then goes to the front, which costs nothing
+// however long the list is.
 int Findings::Add(std::unique_ptr<char[]> name, bool isDirectory, uint32_t status,
                   StatusSet& statuses, int reason) {
   VESK2_REQUIRE(name, VESK2_ERR_MEM_ALLOC);
@@ -52,6 +59,7 @@ int Findings::Add(std::unique_ptr<char[]> name, bool isDirectory, uint32_t statu
   return 0;
 }
 
+// Grows by doubling: in a tree that cannot be read every file has one.
 int Findings::AddReason(const FileItem* item, int reason) {
   if (reasonCount_ == reasonRoom_) {
     const uint32_t room = reasonRoom_ > 0 ? 2 * reasonRoom_ : 16;
@@ -67,6 +75,7 @@ int Findings::AddReason(const FileItem* item, int reason) {
 
 namespace {
 
+// By address: it is only looked for, never told in order.
 [[nodiscard]] int CompareEntries(const void* a, const void* b) {
   const FileItem* const left = static_cast<const Manifest::Reason*>(a)->entry;
   const FileItem* const right = static_cast<const Manifest::Reason*>(b)->entry;
@@ -76,6 +85,7 @@ namespace {
 
 }  // namespace
 
+// Earlier records stay, behind the new ones: Verify and Compare add to what is there.
 int Manifest::Publish(Findings& findings) {
   // All is made before anything is handed over: the lists change whole or not at all.
   const uint32_t size = reasonCount + findings.reasonCount_;
@@ -98,6 +108,7 @@ int Manifest::Publish(Findings& findings) {
   return 0;
 }
 
+// Searched by halves, for who asks about each record of a long list.
 int Manifest::GetReason(const FileItem* entry) const {
   const Reason* const end = reasons.get() + reasonCount;
   const Reason* const found = std::lower_bound(

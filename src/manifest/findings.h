@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// What a comparison found, and the code that a set of findings amounts to.
+// What a comparison found, and the code that a set of findings amounts to. Nothing is seen of a
+// comparison that did not come to its end: Publish moves all of it at once.
 #ifndef VESK2_SRC_MANIFEST_FINDINGS_H
 #define VESK2_SRC_MANIFEST_FINDINGS_H
 
@@ -39,6 +40,7 @@ class Findings {
 
  private:
   friend class Manifest;
+  // The last of a list is known, so that an older list can be hung behind it.
   struct List {
     FileItemList items;
     FileItem* last = nullptr;

@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// Matching of ignored names.
+// See ignore.h. Both sides are sorted, so that all names of a directory are asked in one pass: with
+// a list of n and a directory of m names it costs their sum.
 #include "src/manifest/ignore.h"
 
 #include <cstring>
@@ -13,6 +14,8 @@ const char* BareName(const char* path) {
   return separator != nullptr ? separator + 1 : path;
 }
 
+// Of a path the last component counts: a directory of the listing is asked by its path, and its
+// list holds bare names.
 bool IgnoreWalk::Ignores(const char* name) {
   const char* const bare = BareName(name);
   while (const char* const entry = ignored_.at(cursor_)) {

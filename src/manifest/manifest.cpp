@@ -1,5 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-// The manifest object: its settings, and the order of work of the two verifications.
+// The manifest object: its settings, and the order of work of the two verifications. The proof of a
+// manifest is ManifestReader's; what is done here is what belongs to the object: settings that
+// outlive a verification, results that must not outlive it.
 #include <vesk2/manifest.h>
 
 #include <utility>
@@ -20,11 +22,13 @@ using ZVsysutil::zv_fstrdup;
 using ZVsysutil::zv_join_path;
 using ZVsysutil::zv_strdup;
 
+// As the entries of a body are ordered: both are walked side by side.
 [[nodiscard]] int ComparePaths(const void* a, const void* b) {
   return zv_filenamecmp(*static_cast<const char* const*>(a), *static_cast<const char* const*>(b));
 }
 
-// Copies the names of a record, to the front of `list`.
+// Copies the names of a record, to the front of `list`. The order is reversed by it, as it has
+// always been for who reads the list back.
 [[nodiscard]] int PushCopy(const FileItem& item, FileItemList& list) {
   std::unique_ptr<char[]> name(zv_fstrdup(item.name));
   std::unique_ptr<char[]> nameA(zv_strdup(item.nameA));
@@ -39,6 +43,7 @@ using ZVsysutil::zv_strdup;
   return 0;
 }
 
+// ReadManifest with an owner for the body.
 [[nodiscard]] int ReadBody(Manifest& manifest, bool verifyChain, long notBefore, long notAfter,
                            BufferOwner& body) {
   ZvBuffer* read = nullptr;
@@ -52,6 +57,7 @@ using ZVsysutil::zv_strdup;
 Manifest::Manifest(Vesk2ContextStruct* ctx) : context(ctx) {}
 Manifest::~Manifest() = default;
 
+// Nothing is opened or tested but the tag: paths may name what does not exist yet.
 int Manifest::Initialize(const char* directoryPath, const char* path, const char* tagText) {
   VESK2_REQUIRE(directoryPath != nullptr && path != nullptr && tagText != nullptr,
                 VESK2_ERR_INVALID_PARAM);
@@ -61,12 +67,16 @@ int Manifest::Initialize(const char* directoryPath, const char* path, const char
   return SExpression::ParseTagAdvanced(tag.Out(), tagText, "tag", context);
 }
 
+// A setting that was lost must not be forgotten: without the directory, and the sources of
+// revocation that its entries name, the verification would be another one, and could say yes.
 int Manifest::CopyExtraAclDirectory(const char* text) {
   SetExtraAclDirectory(zv_fstrdup(text));
   lostSetting = text != nullptr && extraAclDirectory == nullptr;
   return lostSetting ? VESK2_ERR_MEM_ALLOC : 0;
 }
 
+// All or none: with part of the names ignored the result would be none that anyone asked for.
+// Without any it can only find more.
 int Manifest::SetIgnoredEntries(const FileItem* list) {
   FileItemList copies;
   const FileItem* item = list;
@@ -79,6 +89,7 @@ int Manifest::SetIgnoredEntries(const FileItem* list) {
   return code;
 }
 
+// The size tells which members the caller knows of.
 int Manifest::SetFileCallbacks(const Vesk2FileCallbacks* callbacks) {
   VESK2_REQUIRE(callbacks == nullptr || callbacks->size == sizeof *callbacks,
                 VESK2_ERR_INVALID_PARAM);
@@ -86,6 +97,8 @@ int Manifest::SetFileCallbacks(const Vesk2FileCallbacks* callbacks) {
   return 0;
 }
 
+// Paths as the listing makes them, from the same base by the same join, so that both can be
+// compared byte by byte.
 int Manifest::BuildIgnoreList(const char* base, PointerArray<char>& list) const {
   for (const FileItem* item = ignoredEntries.get(); item != nullptr; item = item->next) {
     std::unique_ptr<char[]> path(zv_join_path(base, item->name));
@@ -96,6 +109,7 @@ int Manifest::BuildIgnoreList(const char* base, PointerArray<char>& list) const 
   return 0;
 }
 
+// Before each read: what getters tell afterwards is of that read or nothing.
 void Manifest::ClearRead() {
   version.Reset();
   type.Reset();
@@ -114,12 +128,16 @@ void Manifest::ClearResults() {
   listedFiles = 0;
 }
 
+// The lost setting matters to who asks about authority only.
 int Manifest::ReadManifest(bool verifyChain, long notBefore, long notAfter, ZvBuffer** body) {
   if (body != nullptr) *body = nullptr;
   VESK2_REQUIRE(!verifyChain || !lostSetting, VESK2_ERR_MEM_ALLOC);
   return ManifestReader(*this, verifyChain, notBefore, notAfter).Read(body);
 }
 
+// Authority first, then the tree: no file of the tree is opened for a manifest that nobody may
+// believe. The answer about unlisted entries is changed here and nowhere else, so that the lists
+// tell of them either way.
 int Manifest::VerifyManifest(long notBefore, long notAfter) {
   const ZVsysutil::ZvCall call;
   // A failure on the way must not leave the findings of an earlier verification to be read.
@@ -137,6 +155,8 @@ int Manifest::VerifyManifest(long notBefore, long notAfter) {
   return code;
 }
 
+// The reader refuses what is damaged, and asks no store. The results of an earlier comparison stay
+// until both are read.
 int Manifest::CompareManifest(const char* otherManifestPath) {
   const ZVsysutil::ZvCall call;
   BufferOwner body1;

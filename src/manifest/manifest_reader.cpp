@@ -8,7 +8,13 @@
 //     <body>)
 //
 // (without the blanks). The signer certificate's subject is the hash over the version, type and
-// time elements and the body's bytes; the revocation lists and the certificates are outside it.
+// time elements and the body's bytes; the revocation lists and the certificates are outside it. It
+// reads once, from the front, in the order of the file: form, signatures, authority, content. The
+// first failure is the answer. Who wants evidence is told more: the reader then keeps that answer
+// and reads on (Refuse), as long as the form allows.
+//
+// What it costs: an exponentiation for each certificate and list, a reduction with its budget, a
+// digest of the file. A file is at most Limits::kMaxFile bytes.
 #include "src/manifest/manifest_reader.h"
 
 #include <utility>
@@ -33,6 +39,8 @@ constexpr unsigned kStampLength = 19;
 
 }  // namespace
 
+// The file is read whole before anything is looked at: what is proved and what is handed on are the
+// same bytes, whatever happens to the file.
 int ManifestReader::Read(ZvBuffer** body) {
   if (body != nullptr) *body = nullptr;
   manifest_.ClearRead();
@@ -41,9 +49,11 @@ int ManifestReader::Read(ZvBuffer** body) {
   const ZVsysutil::ZvCall call;
   const char* const path = manifest_.manifestPath.get();
   const int opened = WrapFile(buffer_, path, VESK2_ERR_OPEN_MANIFEST_FILE);
+  // For a manifest, and unlike a list in the store, "held" and "not there" are both a no.
   VESK2_REQUIRE(opened != VESK2_ERR_READ_FILE, VESK2_ERR_OPEN_MANIFEST_FILE);
   VESK2_TRY(opened);
   const int code = ReadFile(body);
+  // Where it stopped making sense, or where the answer was found.
   manifest_.readPosition = refusal_ != 0 ? refusedAt_ : buffer_->Position();
   VESK2_REQUIRE(!LacksMemory(code), code);
   if (Inspects()) Publish();
@@ -53,12 +63,15 @@ int ManifestReader::Read(ZvBuffer** body) {
   return 0;
 }
 
+// Shared with the evidence, which may outlive the manifest.
 void ManifestReader::Publish() {
   manifest_.version = Ref<SExpression>::Share(head_.version.get());
   manifest_.type = Ref<SExpression>::Share(head_.type.get());
   manifest_.signingTime = Ref<TimeStamp>::Share(signingTime_.get());
 }
 
+// The lists lie between the certificates and the body, so that authority is asked before the
+// content is known to be the signed one: the answers keep that order.
 int ManifestReader::ReadFile(ZvBuffer** body) {
   VESK2_TRY(ReadHead());
   VESK2_TRY(ReadSignatureBlock());
@@ -68,6 +81,8 @@ int ManifestReader::ReadFile(ZvBuffer** body) {
   return ProveBody(body);
 }
 
+// A lack of memory is never kept: with it nothing is known, and going on would only find it again.
+// The first answer stays, so that evidence changes no answer.
 int ManifestReader::Refuse(int code) {
   VESK2_REQUIRE(code != 0 && readsOn_ && !LacksMemory(code), code);
   if (refusal_ == 0) {
@@ -77,6 +92,7 @@ int ManifestReader::Refuse(int code) {
   return 0;
 }
 
+// What is hashed later is made anew from what is read here.
 int ManifestReader::ReadHead() {
   VESK2_TRY(buffer_->Expect("(8:manifest(7:version"));
   VESK2_TRY(ReadVersion());
@@ -99,6 +115,7 @@ int ManifestReader::ReadVersion() {
   return Append(head_.version.get(), std::move(text));
 }
 
+// One type is known, whose body is a listing; another would be read wrong.
 int ManifestReader::ReadType() {
   Ref<ByteString> name;
   VESK2_TRY(ImportNew(name, buffer_.get(), Context()));
@@ -107,6 +124,8 @@ int ManifestReader::ReadType() {
   return Append(head_.type.get(), std::move(name));
 }
 
+// It is the signer's word. With no period given it decides what chain is good, so that at least it
+// must be one.
 int ManifestReader::ReadSigningTime() {
   VESK2_TRY(ImportNew(signingTime_, buffer_.get(), Context()));
   // Stamps are compared by their 19 characters; a shorter or longer text is no moment.
@@ -116,6 +135,8 @@ int ManifestReader::ReadSigningTime() {
   return Append(head_.time.get(), Ref<TimeStamp>::Share(signingTime_.get()));
 }
 
+// All pairs are verified, whether or not the chain will need them: a certificate with a bad
+// signature in a manifest is a damaged manifest.
 int ManifestReader::ReadSignatureBlock() {
   VESK2_TRY(ReadSigner());
   // The signer certificate speaks for the content only; at least one more must speak for its
@@ -128,12 +149,14 @@ int ManifestReader::ReadSignatureBlock() {
   return buffer_->Expect(")");
 }
 
+// The signer certificate is kept: its subject is what the content is compared with.
 int ManifestReader::ReadSigner() {
   VESK2_TRY(ImportNew(signer_, buffer_.get(), Context()));
   VESK2_TRY(Refuse(signer_->GetSubject()->IsHash() ? 0 : VESK2_ERR_NOT_OBJECT_CERT));
   return ReadSignature(*signer_);
 }
 
+// Verified when it is read, so that the position of the first bad one is known.
 int ManifestReader::ReadSignature(Cert& cert) {
   Ref<Signature> signature;
   VESK2_TRY(ImportNew(signature, buffer_.get(), Context()));
@@ -142,7 +165,9 @@ int ManifestReader::ReadSignature(Cert& cert) {
   return Refuse(code);
 }
 
-// Reads the revocation lists that the manifest carries.
+// Reads the revocation lists that the manifest carries. They lie outside of what is signed: anybody
+// can take them out or put others in. Each is proved before it counts, and none can take another's
+// revocation back.
 int ManifestReader::ReadRevocationLists(SExpression& lists) {
   evidence_.SetLists(nullptr, &lists);
   VESK2_TRY(buffer_->Expect("(3:crl"));
@@ -164,6 +189,7 @@ int ManifestReader::SetPeriod() {
   return 0;
 }
 
+// With the further directory, whose entries also vouch for lists.
 int ManifestReader::LoadEntries() {
   Ref<SExpression> acls;
   VESK2_TRY(AclEntry::Import(acls.Out(), Context(), manifest_.extraAclDirectory.get()));
@@ -171,6 +197,8 @@ int ManifestReader::LoadEntries() {
   return 0;
 }
 
+// Stored and carried lists together: a carried one may be newer, and what either revokes is
+// revoked.
 int ManifestReader::LoadLists(SExpression* carried) {
   Ref<SExpression> stored;
   VESK2_TRY(CrlSequence::ImportStore(stored.Out(), evidence_.GetEntries(), Context()));
@@ -178,6 +206,7 @@ int ManifestReader::LoadLists(SExpression* carried) {
   return evidence_.MarkRevoked();
 }
 
+// The period first, as a time without a text is the caller's mistake and not the manifest's.
 int ManifestReader::ProveAuthority(SExpression& carried) {
   VESK2_TRY(Refuse(SetPeriod()));
   VESK2_TRY(Refuse(LoadEntries()));
@@ -185,6 +214,9 @@ int ManifestReader::ProveAuthority(SExpression& carried) {
   return evidence_.GetEntries() != nullptr ? AskAuthority(&carried) : 0;
 }
 
+// Carried lists are offered to the store whatever the chain is worth: they are proved by
+// themselves, and a manifest that is refused may bring the list that says why. Who does not want
+// that sets SetStoreUpdate.
 int ManifestReader::AskAuthority(SExpression* carried) {
   VESK2_TRY(Refuse(LoadLists(carried)));
   if (refusal_ != 0) return 0;
@@ -195,6 +227,7 @@ int ManifestReader::AskAuthority(SExpression* carried) {
   return Refuse(evidence_.Prove(manifest_.tag.get()));
 }
 
+// The body is what is left up to the last byte; that it is whole is its own reader's to say.
 int ManifestReader::ProveBody(ZvBuffer** body) {
   // All that is left but the final ")".
   VESK2_REQUIRE(buffer_->Remaining() > 0, VESK2_ERR_PARSE_FILE);
@@ -208,10 +241,13 @@ int ManifestReader::ProveBody(ZvBuffer** body) {
   VESK2_TRY(buffer_->Expect(")"));
   if (body == nullptr) return 0;
   *body = ZVsysutil::zv_buffer_wrap(bytes, length);
+  // Known to callers by this code, though it is memory that lacks.
   return *body != nullptr ? 0 : VESK2_ERR_FILE_OPEN;
 }
 
-// Notes whether a body, refused or not, is whole.
+// Notes whether a body, refused or not, is whole. Only for evidence: a refusal because of the
+// content is mostly a damaged file, and the byte at which it stops making sense is the best hint
+// there is.
 int ManifestReader::InspectBody(const unsigned char* bytes, size_t length, int contentCode) {
   const size_t start = buffer_->Position();
   const BufferOwner body(ZVsysutil::zv_buffer_wrap(bytes, length));
@@ -226,6 +262,7 @@ int ManifestReader::InspectBody(const unsigned char* bytes, size_t length, int c
   return 0;
 }
 
+// By the algorithm that the signer chose, of the three that there are.
 int ManifestReader::CheckDigest(const unsigned char* body, size_t length) {
   auto* const signedDigest = dynamic_cast<Hash*>(signer_->GetSubject());
   VESK2_REQUIRE(signedDigest != nullptr, VESK2_ERR_NOT_OBJECT_CERT);

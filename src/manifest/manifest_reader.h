@@ -58,17 +58,21 @@ class ManifestReader {
   Vesk2ContextStruct* Context() const { return manifest_.context; }
 
   Manifest& manifest_;
+  // Judging needs one, also when nobody asked for it.
   Evidence own_;
   Evidence& evidence_;
+  // Whether the caller wants the evidence of what comes after a refusal.
   const bool readsOn_;
-  int refusal_ = 0;  // the answer, while reading goes on
+  // The answer, while reading goes on; and the byte at which it was found.
+  int refusal_ = 0;
   size_t refusedAt_ = 0;
   const bool verifyChain_;
   const long notBefore_;
   const long notAfter_;
   BufferOwner buffer_;
   ManifestHead head_;
-  Ref<TimeStamp> signingTime_;  // the one in the head
+  // The one in the head, shared with it.
+  Ref<TimeStamp> signingTime_;
   Ref<Cert> signer_;
 };
 

@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 // The writer of manifest files; manifest_reader.cpp and body_parse.cpp hold the form that they
-// have.
+// have. It writes what the readers take, and refuses by form what they would refuse, so that nobody
+// signs a manifest that nobody can read. It holds no key: the digest goes out, certificates come
+// in.
 #include <vesk2/manifest_writer.h>
 
 #include <algorithm>
@@ -18,19 +20,23 @@
 namespace ZvVesk2 {
 namespace {
 
+// Readers take no stamp of another length.
 constexpr unsigned kStampLength = 19;
 
+// The reader's rule; a 0 byte cannot stand in a C string.
 bool IsBareName(std::string_view name) {
   return !name.empty() && name != "." && name != ".." && name.find('/') == std::string_view::npos;
 }
 
-// Text that grows; what was appended stays when there is no memory for more.
+// Text that grows; what was appended stays when there is no memory for more. A body is as long as
+// its tree is large: it grows by doubling.
 class GrowingText {
  public:
   size_t length() const { return length_; }
   const char* data() const { return text_.get(); }
 
-  // Makes room for that many bytes more.
+  // Makes room for that many bytes more. Everything that can fail, before anything is appended: a
+  // call that lacked memory can be made again.
   [[nodiscard]] int Reserve(size_t more) {
     if (more <= capacity_ - length_) return 0;
     const size_t larger = std::max({2 * capacity_, length_ + more, size_t{4096}});
@@ -67,6 +73,7 @@ constexpr size_t kEntryRoom = 96;
 struct ManifestWriter::Parts {
   explicit Parts(Vesk2ContextStruct* ctx) : context(ctx) {}
 
+  // The room for all of the entry is made first, also for what AddFile appends behind it.
   [[nodiscard]] int Entry(std::string_view opening, const char* name) {
     VESK2_REQUIRE(open > 0 && name != nullptr && IsBareName(name), VESK2_ERR_INVALID_PARAM);
     VESK2_REQUIRE(std::strlen(name) <= Limits::kMaxBodyPath, VESK2_ERR_MAX_BYTE_STRING);
@@ -86,9 +93,12 @@ struct ManifestWriter::Parts {
   Ref<SExpression> lists;
 };
 
+// A constructor cannot answer: that there was no memory every later call says.
 ManifestWriter::ManifestWriter(Vesk2ContextStruct* ctx) : parts_(TryNew<Parts>(ctx)) {}
 ManifestWriter::~ManifestWriter() { delete parts_; }
 
+// Made whole, then put in the place of the old one. The stamp is copied, as a caller may go on to
+// change it; and without a hint, which would be part of what is signed.
 int ManifestWriter::SetHead(const char* creator, TimeStamp* signedAt) {
   VESK2_REQUIRE(parts_ != nullptr, VESK2_ERR_MEM_ALLOC);
   VESK2_REQUIRE(creator != nullptr && signedAt != nullptr, VESK2_ERR_INVALID_PARAM);
@@ -107,6 +117,7 @@ int ManifestWriter::SetHead(const char* creator, TimeStamp* signedAt) {
   return 0;
 }
 
+// Once a manifest: what was signed must not be begun anew.
 int ManifestWriter::BeginBody(const unsigned char (&token)[4]) {
   VESK2_REQUIRE(parts_ != nullptr, VESK2_ERR_MEM_ALLOC);
   VESK2_REQUIRE(parts_->open == 0 && !parts_->ended, VESK2_ERR_INVALID_PARAM);
@@ -118,6 +129,7 @@ int ManifestWriter::BeginBody(const unsigned char (&token)[4]) {
   return 0;
 }
 
+// Order and doubles are the caller's: the reader sorts.
 int ManifestWriter::AddFile(const char* name, const unsigned char (&sha256)[32]) {
   VESK2_REQUIRE(parts_ != nullptr, VESK2_ERR_MEM_ALLOC);
   VESK2_TRY(parts_->Entry("(4:file", name));
@@ -126,6 +138,7 @@ int ManifestWriter::AddFile(const char* name, const unsigned char (&sha256)[32])
   return 0;
 }
 
+// As deep as readers go. Path lengths are not counted here: readers refuse longer ones.
 int ManifestWriter::OpenDirectory(const char* name) {
   VESK2_REQUIRE(parts_ != nullptr, VESK2_ERR_MEM_ALLOC);
   VESK2_REQUIRE(parts_->open < Limits::kMaxDepth, VESK2_ERR_INVALID_PARAM);
@@ -143,6 +156,7 @@ int ManifestWriter::CloseDirectory() {
   return 0;
 }
 
+// All directories must be closed, or the body would end within one.
 int ManifestWriter::EndBody() {
   VESK2_REQUIRE(parts_ != nullptr, VESK2_ERR_MEM_ALLOC);
   VESK2_REQUIRE(parts_->open == 1, VESK2_ERR_INVALID_PARAM);
@@ -159,6 +173,7 @@ const char* ManifestWriter::GetBody(size_t* length) const {
   return begun ? parts_->body.data() : nullptr;
 }
 
+// Over the bytes that Write will write, and no others.
 int ManifestWriter::SignedDigest(Hash*& out, ZvclmHashID id) {
   VESK2_REQUIRE(parts_ != nullptr, VESK2_ERR_MEM_ALLOC);
   VESK2_REQUIRE(out == nullptr && parts_->head.time && parts_->ended, VESK2_ERR_INVALID_PARAM);
@@ -169,6 +184,7 @@ int ManifestWriter::SignedDigest(Hash*& out, ZvclmHashID id) {
   return 0;
 }
 
+// Pairs, so that a certificate without its signature can never be written.
 int ManifestWriter::AddCertificate(Cert* cert, Signature* signature) {
   VESK2_REQUIRE(parts_ != nullptr, VESK2_ERR_MEM_ALLOC);
   VESK2_REQUIRE(cert != nullptr && signature != nullptr, VESK2_ERR_INVALID_PARAM);
@@ -205,6 +221,8 @@ namespace {
 
 }  // namespace
 
+// May be called again: nothing is used up. Two certificates at least: the signer's own is what
+// makes the first worth anything.
 int ManifestWriter::Write(FILE* stream) {
   VESK2_REQUIRE(parts_ != nullptr, VESK2_ERR_MEM_ALLOC);
   const Parts& parts = *parts_;

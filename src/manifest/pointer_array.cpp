@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // PointerArray: the growable arrays of a manifest body. Callers see a capacity that grows by a
-// fixed step; memory that did would be copied once for every 32 files of a directory.
+// fixed step; memory that did would be copied once for every 32 files of a directory. The cursor is
+// part of the array, as programs walk it so; whoever walks within a walk goes by at.
 #include <vesk2/pointer_array.h>
 
 #include <algorithm>
@@ -28,6 +29,7 @@ PointerArray<T>::~PointerArray() {
 }
 
 template <typename T>
+// The element is the caller's until there is room for it.
 int PointerArray<T>::push(T* element) {
   if (count == slots) {
     if (slots > UINT32_MAX / 2) return 0;
@@ -44,6 +46,7 @@ int PointerArray<T>::push(T* element) {
 }
 
 template <typename T>
+// The three ways of one old function: look, take, go on. Past the end nothing moves.
 T* PointerArray<T>::get(int mode) {
   if (mode > 0) ++cursor;
   T* const element = at(cursor);
@@ -78,6 +81,7 @@ uint32_t PointerArray<T>::GetCount() const {
 }
 
 template <typename T>
+// What callers have always been told, whatever the memory beneath does.
 uint32_t PointerArray<T>::GetCapacity() const {
   return (count + 31) / 32 * 32;
 }
@@ -88,11 +92,13 @@ uint32_t PointerArray<T>::GetCursor() const {
 }
 
 template <typename T>
+// Stable: a name that is listed twice keeps the order of its listings.
 void PointerArray<T>::sort(int (*compare)(const void*, const void*)) {
   if (count != 0) ZVsysutil::zv_sort(items, count, sizeof(T*), compare);
 }
 
 template <typename T>
+// Names are arrays whatever the flag says: delete of one would be wrong.
 void PointerArray<T>::clear() {
   for (uint32_t i = 0; i < count; ++i) {
     if (ownsArrays || std::is_same_v<T, char>) {

@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// See signed_digest.h.
+// See signed_digest.h. Reader and writer share it, so that they cannot disagree about what is
+// signed.
 #include "src/manifest/signed_digest.h"
 
 #include <climits>
@@ -8,6 +9,8 @@
 
 namespace ZvVesk2 {
 
+// The elements are hashed as they are written, hints included, and the body as it stands: what the
+// signer saw is what counts, without the certificates and lists that lie between.
 int SignedDigest(Ref<Hash>& out, ZvclmHashID id, const ManifestHead& head,
                  const unsigned char* body, size_t length) {
   VESK2_REQUIRE(length <= UINT_MAX, VESK2_ERR_INVALID_PARAM);

@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// The digest that a manifest's signer signs, for its reader and its writer.
+// The digest that a manifest's signer signs, for its reader and its writer. What it leaves out
+// anybody can exchange: the chain and the revocation lists of a manifest.
 #ifndef VESK2_SRC_MANIFEST_SIGNED_DIGEST_H
 #define VESK2_SRC_MANIFEST_SIGNED_DIGEST_H
 
