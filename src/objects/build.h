@@ -1,6 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 // What every reader and builder of a typed object does: read a part into a new value, and hand it
 // to a list. References travel as Ref, so that a part that was not appended is freed on every path.
+// A reader is a row of these calls in the order of its grammar, each of which returns on failure:
+// there is no cleaning up to forget. What was read up to a failure stays in the object, whose owner
+// frees it.
 #ifndef VESK2_SRC_OBJECTS_BUILD_H
 #define VESK2_SRC_OBJECTS_BUILD_H
 
@@ -41,7 +44,8 @@ template <typename T>
   return 0;
 }
 
-// AppendHead appends the new list (name) and points `head` at it, borrowed, for more elements.
+// AppendHead appends the new list (name) and points `head` at it, borrowed, for more elements. The
+// list is in its parent before it is filled, so that nothing has to be handed over afterwards.
 [[nodiscard]] inline int AppendHead(SExpression* list, const char* name, SExpression*& head) {
   Ref<SExpression> made;
   VESK2_TRY(SExpression::Create(made.Out(), name, list->GetContext()));
@@ -63,7 +67,8 @@ template <typename T>
 }
 
 // AppendBounds appends (not-before <stamp>) and (not-after <stamp>) to a list (valid), each unless
-// it is null, and points the fields at them.
+// it is null, and points the fields at them. Certificates, entries and questions write their
+// periods with it, in the one order that readers take.
 [[nodiscard]] inline int AppendBounds(SExpression* valid, Ref<TimeStamp> begin, Ref<TimeStamp> end,
                                       TimeStamp*& beginField, TimeStamp*& endField) {
   if (begin) VESK2_TRY(AppendPair(valid, "not-before", std::move(begin), beginField));

@@ -1,5 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-// Cert: reading an authorization certificate and building one from parts.
+// Cert: reading an authorization certificate and building one from parts. The class only holds what
+// a certificate says. What it is worth is asked by those above it: its signature by Signature, its
+// place in a chain by the reduction, its revocation by src/trust.
 #include <vesk2/cert.h>
 
 #include "src/objects/build.h"
@@ -18,6 +20,9 @@ Cert::~Cert() = default;
 //   ["(7:comment" <text> ")"] [<revocation element>] ")"
 //
 // Each element is looked for once, at its place; what does not fit fails at the next required text.
+// Certificates that are in use rest on each oddity here: on the tag's keyword, and on the "(1". A
+// tag with another keyword is no tag to the reduction, and the certificate then grants whatever is
+// asked: issuers look before they sign.
 int Cert::Import(ZvBuffer* buffer) {
   VESK2_REQUIRE(buffer != nullptr && First() == nullptr, VESK2_ERR_INVALID_PARAM);
   VESK2_TRY(buffer->Expect("(4:cert"));
@@ -38,6 +43,8 @@ int Cert::Import(ZvBuffer* buffer) {
   return buffer->Expect(")");
 }
 
+// Both are required, and in this order: without an issuer nobody could have signed it, without a
+// subject nobody is granted anything.
 int Cert::ImportParties(ZvBuffer* buffer) {
   if (buffer->Accept("(7:version1:1)")) VESK2_TRY(AppendVersion());
   VESK2_TRY(buffer->Expect("(6:issuer"));
@@ -53,7 +60,9 @@ int Cert::ImportParties(ZvBuffer* buffer) {
   return buffer->Expect(")");
 }
 
-// Either bound may be missing, and both. The stamps are read as byte strings and not judged.
+// Either bound may be missing, and both. The stamps are read as byte strings and not judged. The
+// reduction compares them as text. A wrong one is worth what it compares to, which its signer
+// chose.
 int Cert::ImportValidity(ZvBuffer* buffer) {
   SExpression* valid = nullptr;
   VESK2_TRY(AppendHead(this, "valid", valid));
@@ -72,12 +81,15 @@ int Cert::ImportValidity(ZvBuffer* buffer) {
   return buffer->Expect(")");
 }
 
+// Any list, with what is nested in it; depth and sizes are the reader's to bound.
 int Cert::ImportElement(ZvBuffer* buffer, SExpression*& field) {
   Ref<SExpression> element;
   VESK2_TRY(SExpression::Import(element.Out(), buffer, GetContext()));
   return Append(this, std::move(element), field);
 }
 
+// Always with a version: what is built here is written in the present form. The order is Import's,
+// as what is written must read back.
 int Cert::Set(Principal* newIssuer, Subject* newSubject, bool newPropagate, SExpression* newTag,
               TimeStamp* newNotBefore, TimeStamp* newNotAfter, ByteString* newComment,
               SExpression* newRevocationElement) {
@@ -107,12 +119,15 @@ int Cert::SetValidity(TimeStamp* newNotBefore, TimeStamp* newNotAfter) {
                       Ref<TimeStamp>::Share(newNotAfter), notBefore, notAfter);
 }
 
+// A clone of a certificate without a version has one, and so another digest: it is for the
+// reduction, which asks no signature.
 int Cert::Clone(Cert* other) {
   VESK2_REQUIRE(other != nullptr, VESK2_ERR_INVALID_PARAM);
   return Set(other->issuer, other->subject, other->propagate, other->tag, other->notBefore,
              other->notAfter, other->comment, other->revocationElement);
 }
 
+// There is one version, whose text was matched.
 int Cert::AppendVersion() {
   VESK2_TRY(AppendHead(this, "version", version));
   return version->Insert("1");

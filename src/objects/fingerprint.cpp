@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// Hash::DumpFingerprint: the line that people compare by eye.
+// Hash::DumpFingerprint: the line that people compare by eye. The text comes from a record
+// (hashText), whose digest is raw bytes: it is taken by length, and looked at no further than that.
 #include <vesk2/hash.h>
 
 #include <cstring>

@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// See granted_tag.h.
+// See granted_tag.h. The reduction wrote the text a moment before, in one form: this is no reader
+// of what strangers wrote, though it reads it as carefully.
 #include "src/objects/granted_tag.h"
 
 #include <vesk2/ref.h>

@@ -1,5 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-// Hash: a digest as a principal, and the running computation of one.
+// Hash: a digest as a principal, and the running computation of one. A computation and a value are
+// one class, as programs insert what they computed where a principal is wanted. An object is one of
+// the two, once: what is in use is refused.
 #include <vesk2/hash.h>
 
 #include "src/objects/build.h"
@@ -18,7 +20,8 @@ Hash::~Hash() {
 bool Hash::IsHash() const { return true; }
 
 // (hash <name> <digest>): "(4:hash" <name> <digest> ")", no digest of another length than the
-// algorithm's.
+// algorithm's. The length is compared here, so that no later comparison of digests can be one of
+// different lengths.
 int Hash::Import(ZvBuffer* buffer) {
   VESK2_REQUIRE(buffer != nullptr && First() == nullptr, VESK2_ERR_INVALID_PARAM);
   VESK2_TRY(buffer->Expect("(4:hash"));
@@ -40,6 +43,7 @@ int Hash::Import(ZvBuffer* buffer) {
   return buffer->Expect(")");
 }
 
+// It has no numbers to check a signature with. A chain names its issuers by key for that reason.
 int Hash::Verify(ByteString*, ByteString*, Hash*, SExpression*) {
   return VESK2_ERR_NOT_IMPLEMENTED;
 }
@@ -50,6 +54,8 @@ int Hash::VerifyMobile(ByteString*, unsigned char*, unsigned int, unsigned char*
 
 int Hash::IsRevoked(bool&) { return 0; }
 
+// The context is made first: an object whose hash could not be started holds no list, and can be
+// started again.
 int Hash::Init(ZvclmHashID id) {
   const HashAlgorithm* const known = FindHashAlgorithm(id);
   VESK2_REQUIRE(known != nullptr, VESK2_ERR_HASH_ID);
@@ -64,6 +70,7 @@ int Hash::Init(ZvclmHashID id) {
   return Insert(known->name);
 }
 
+// With hints, as in a file: what is signed is what stands there.
 int Hash::Update(DExpression* expression) {
   VESK2_REQUIRE(expression != nullptr, VESK2_ERR_INVALID_PARAM);
   return expression->UpdateHash(hashContext, false);
@@ -73,6 +80,8 @@ int Hash::Update(const unsigned char* data, unsigned int length) {
   return zvclm_HashUpdate(hashContext, data, length, CryptoHandle());
 }
 
+// The digest is handed to the list by one reference; `value` stays null, as programs tell an
+// imported hash by it.
 int Hash::Finalize() {
   // A finished computation cannot be finished again: its list would get a second digest.
   VESK2_REQUIRE(hashContext != nullptr && GetDigest() == nullptr, VESK2_ERR_INVALID_PARAM);
@@ -86,6 +95,8 @@ int Hash::Finalize() {
   return Append(this, std::move(item));
 }
 
+// Adopted on every path, also when it is refused: the caller need not ask what became of it. Its
+// length is the caller's word, since digests of other makings are set so.
 int Hash::Set(ZvclmHashID id, unsigned char* data, unsigned int length) {
   std::unique_ptr<unsigned char[]> owned(data);
   const HashAlgorithm* const known = FindHashAlgorithm(id);
@@ -100,6 +111,7 @@ int Hash::Set(ZvclmHashID id, unsigned char* data, unsigned int length) {
   return Append(this, std::move(digest));
 }
 
+// Wherever it came from: the third element is the digest in each of the three ways of making one.
 ByteString* Hash::GetDigest() const {
   if (value != nullptr) return value;
   Iterator element = Begin();

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // The three hash algorithms, as identifier, name in expressions and digest length. Everything that
-// is not in this table is refused.
+// is not in this table is refused. SHA-1 is among them because stored keys, entries and lists use
+// it; nothing new should. The reduction takes the first two only.
 #ifndef VESK2_SRC_OBJECTS_HASH_ALGORITHMS_H
 #define VESK2_SRC_OBJECTS_HASH_ALGORITHMS_H
 

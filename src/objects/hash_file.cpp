@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 // Hash::HashFile: the SHA-256 of a file, the loop that most of a manifest's verification time goes
-// through.
+// through. The bytes are asked for four at a time, by the contract of the layer below, and are
+// moved in blocks all the same (ReadAndFeed): the file's block and the hash's block are filled and
+// emptied where they stand.
 #include "src/objects/hash_file.h"
 
 #include <algorithm>
@@ -18,6 +20,7 @@ using ZVsysutil::ZvFile;
 // The file is read this many bytes a call, into a larger buffer; the layer below makes such small
 // calls cheap.
 constexpr size_t kReadSize = 4;
+// Only its first bytes are used.
 constexpr size_t kBufferSize = 1024;
 
 // What a loop that nobody watches tells.
@@ -27,7 +30,8 @@ struct Unwatched {
   [[nodiscard]] int End() { return 0; }
 };
 
-// Tells the callbacks about every kTold bytes.
+// Tells the callbacks about every kTold bytes. Whoever watches is asked between blocks, so that a
+// callback can stop even a file of a terabyte soon.
 class Watched {
  public:
   explicit Watched(const Vesk2FileCallbacks& callbacks) : callbacks_(callbacks) {}
@@ -37,6 +41,7 @@ class Watched {
     untold_ += count;
     return untold_ >= kTold ? End() : 0;
   }
+  // What is left is told before the file is done with, so that the bytes add up to what it held.
   [[nodiscard]] int End() {
     const size_t count = std::exchange(untold_, 0);
     if (count == 0 || callbacks_.fileBytes == nullptr) return 0;
@@ -63,6 +68,8 @@ void ReadAndFeed(unsigned char* __restrict to, const unsigned char* __restrict f
 }  // namespace
 
 template <typename Watch>
+// It ends with the file, which yields no more bytes than it held when it was opened (file.h): one
+// that grows as fast as it is read ends it as well.
 int FileDigester::Feed(Watch watch) {
   unsigned char* const bytes = buffer_.get();
   ZVsysutil::ZvReader reader(file_.get());
@@ -81,6 +88,8 @@ int FileDigester::Feed(Watch watch) {
   }
 }
 
+// Memory is taken for the first file and kept for all: a tree has a million, and an allocation for
+// each is what would be measured.
 int FileDigester::MakeReady() {
   if (file_ == nullptr) file_ = ZVsysutil::zv_reader();
   if (buffer_ == nullptr) buffer_.reset(TryNewArray<unsigned char>(kBufferSize));
@@ -101,6 +110,8 @@ int FileDigester::DigestOpened(unsigned char* digest, const Vesk2FileCallbacks* 
   return zvclm_HashFinal(hash_.get(), digest, handle_);
 }
 
+// fileEnd follows every fileStart, whatever came between, as callers free by it what they made. A
+// file that cannot be opened is told of by neither.
 int FileDigester::Digest(const FileToDigest& file, unsigned char (&digest)[kFileDigestSize],
                          bool& held) {
   held = false;
@@ -122,6 +133,7 @@ int FileDigester::Digest(const FileToDigest& file, unsigned char (&digest)[kFile
   return code;
 }
 
+// The one form does the other's work without a listener.
 int Hash::HashFile(const char* path, unsigned char* digest, unsigned int* digestLength,
                    Vesk2ContextStruct* context) {
   return HashFile(path, digest, digestLength, context, nullptr);
@@ -136,6 +148,8 @@ int Hash::HashFile(const char* path, unsigned char* digest, unsigned int* digest
   bool held = false;
   FileDigester digester(context, callbacks);
   const int code = digester.Digest({{ZVsysutil::kZvNoDirectory, path}, path}, made, held);
+  // Copied out only when all of the file is in it: a caller who forgets the code does not have half
+  // a digest.
   if (code == 0) std::copy_n(made, kFileDigestSize, digest);
   *digestLength = code == 0 ? kFileDigestSize : 0;
   return code;

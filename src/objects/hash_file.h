@@ -17,10 +17,12 @@ constexpr unsigned kFileDigestSize = 32;
 // A file to make the digest of.
 struct FileToDigest {
   ZVsysutil::ZvPlace place;
-  const char* path;  // what callbacks hear; may be null without them
+  // What callbacks hear; may be null without them.
+  const char* path;
 };
 
-// FileDigester makes the digests of one file after the other with the same memory.
+// FileDigester makes the digests of one file after the other with the same memory. It belongs to
+// one thread; each thread that takes part in a comparison has its own.
 class FileDigester {
  public:
   // `callbacks` may be null.
@@ -42,6 +44,7 @@ class FileDigester {
 
   uint32_t handle_;
   const Vesk2FileCallbacks* callbacks_;
+  // Made for the first file, and open for one file at a time.
   ZVsysutil::ZvFileOwner file_;
   HashOwner hash_;
   std::unique_ptr<unsigned char[]> buffer_;

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // The two kinds of key, as tables: which numbers a key has, how they are called and ordered in
-// expressions, and where the crypto layer's records hold them.
+// expressions, and where the crypto layer's records hold them. What is done with a key is written
+// once, over these tables: a new kind is a table.
 #ifndef VESK2_SRC_OBJECTS_KEY_FORMS_H
 #define VESK2_SRC_OBJECTS_KEY_FORMS_H
 
@@ -16,7 +17,8 @@ struct KeyNumber {
   ZVCLMBigInt* Record::*field;
 };
 
-// kLength is the number whose bits are the length of the key.
+// kLength is the number whose bits are the length of the key. e before n in expressions, n before e
+// in records: the table says both.
 struct RsaForm {
   using Record = ZVCLMRSAKeyData;
   static constexpr const char* kName = "rsa";
@@ -51,6 +53,7 @@ struct DsaForm {
 
 // A record whose numbers are wiped when it goes.
 template <typename Form>
+// Numbers of public keys are no secret; they are freed with the record on every path.
 class KeyRecord {
  public:
   KeyRecord() = default;

@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 // PublicKey: a key as an expression and as a key object of the crypto layer; reading and building
-// it.
+// it. Both forms are made at once, from the same numbers, and never again: what is exported, hashed
+// and verified with is one key, and const functions need not make anything (several threads may
+// call them).
 #include <vesk2/public_key.h>
 
 #include <algorithm>
@@ -13,7 +15,8 @@
 namespace ZvVesk2 {
 namespace {
 
-// A number of the crypto layer as a byte string, without leading zeros.
+// A number of the crypto layer as a byte string, without leading zeros. Hinted as bytes, so that
+// nobody prints it.
 [[nodiscard]] int NumberText(Ref<ByteString>& out, const ZVCLMBigInt* number,
                              Vesk2ContextStruct* context) {
   const int size = zvclm_BigIntGetBufferSize(number);
@@ -28,7 +31,8 @@ namespace {
   return 0;
 }
 
-// The bits of a number, leading zeros not counted.
+// The bits of a number, leading zeros not counted. Of the text, which may have leading zeros: they
+// make another principal and the same length.
 uint32_t BitLength(const ByteString& number) {
   const unsigned char* const end = number.GetData() + number.GetLength();
   const unsigned char* const first =
@@ -52,7 +56,8 @@ const char* PublicKey::ExtensionName() const { return ".pub"; }
 
 int PublicKey::IsRevoked(bool&) { return 0; }
 
-// "(10:public-key(3:" and, by the next character, the RSA or the DSA half, "))".
+// "(10:public-key(3:" and, by the next character, the RSA or the DSA half, "))". "(3:" is part of
+// the opening: both kinds have a name of three letters.
 int PublicKey::Import(ZvBuffer* buffer) {
   VESK2_REQUIRE(buffer != nullptr && IsEmpty(), VESK2_ERR_INVALID_PARAM);
   VESK2_TRY(buffer->Expect("(10:public-key(3:"));
@@ -69,6 +74,7 @@ int PublicKey::Import(ZvBuffer* buffer) {
   return buffer->Expect("))");
 }
 
+// A key has no store, so that every name is a path.
 int PublicKey::Import(const char* name) {
   VESK2_REQUIRE(name != nullptr, VESK2_ERR_INVALID_PARAM);
   std::unique_ptr<char[]> path;
@@ -91,6 +97,8 @@ int PublicKey::SetDSA(ZVCLMPublicKeyData* newKey) { return SetNumbers<DsaForm>(n
 
 bool PublicKey::IsEmpty() const { return key == nullptr && First() == nullptr; }
 
+// Numbers are read in the one order of the form. Whether they make a key libcrypto is not asked: a
+// list with an odd key in it must stay readable, and nothing verifies with it.
 template <typename Form>
 int PublicKey::ImportNumbers(ZvBuffer* buffer) {
   VESK2_REQUIRE(buffer != nullptr && IsEmpty(), VESK2_ERR_INVALID_PARAM);
@@ -109,6 +117,7 @@ int PublicKey::ImportNumbers(ZvBuffer* buffer) {
     Ref<ByteString> text;
     VESK2_TRY(ImportNew(text, buffer, GetContext()));
     VESK2_TRY(buffer->Expect(")"));
+    // By the text rather than by libcrypto, before the text is handed to the list.
     if (number.field == Form::kLength) length = BitLength(*text);
     VESK2_TRY(InOwnWords(
         zvclm_BigIntFromBuffer(&record.Number(number), text->GetData(), text->GetLength())));
@@ -121,6 +130,7 @@ int PublicKey::ImportNumbers(ZvBuffer* buffer) {
 
 ZVCLMPublicKeyData* PublicKey::GetKey() const { return key; }
 
+// Adopted first: from here on the object frees it, whatever happens.
 template <typename Form>
 int PublicKey::SetNumbers(ZVCLMPublicKeyData* newKey) {
   VESK2_REQUIRE(newKey != nullptr && IsEmpty(), VESK2_ERR_INVALID_PARAM);

@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// PublicKey: the key in the encodings of other programs.
+// PublicKey: the key in the encodings of other programs. What other programs read: the blob of SSH,
+// and what an X.509 certificate holds of a key.
 #include <memory>
 
 #include <vesk2/public_key.h>
@@ -10,6 +11,7 @@
 namespace ZvVesk2 {
 namespace {
 
+// The size is asked first, so that nothing is guessed; both calls see the same key.
 [[nodiscard]] int ExportKey(const ZVCLMPublicKeyData* key, int format, unsigned char*& out,
                             unsigned int& length, uint32_t handle) {
   // Asking for the size is answered with "too small".

@@ -1,5 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-// Signature: what was signed, by whom, and the signature bytes.
+// Signature: what was signed, by whom, and the signature bytes. It binds three things: what was
+// signed (the hash), who signed it, and the value. Each is believed only when Verify has compared
+// it with the object at hand.
 #include <vesk2/cert.h>
 #include <vesk2/signature.h>
 
@@ -14,6 +16,7 @@ Signature::~Signature() = default;
 
 // (signature <hash> <principal> (<algorithm> <value>)):
 //   "(9:signature" <hash> <principal> "(" <algorithm> <value> "))"
+// The hash is read as it is stated; that it is the object's own is asked when the object is there.
 int Signature::Import(ZvBuffer* buffer) {
   VESK2_REQUIRE(buffer != nullptr && First() == nullptr, VESK2_ERR_INVALID_PARAM);
   VESK2_TRY(buffer->Expect("(9:signature"));
@@ -35,6 +38,7 @@ int Signature::Import(ZvBuffer* buffer) {
   return buffer->Expect("))");
 }
 
+// The object is handed out before it is whole, as callers look at what was made, and free it.
 int Signature::Create(Signature*& signature, Hash* hash, Principal* principal,
                       const char* algorithm, unsigned char* value, unsigned int length,
                       Vesk2ContextStruct* context) {
@@ -59,6 +63,7 @@ int Signature::Create(Signature*& signature, Hash* hash, Principal* principal,
   return 0;
 }
 
+// The pair has no keyword, so that it is made by hand.
 int Signature::AppendValue(Ref<ByteString> newAlgorithm, Ref<ByteString> newValue) {
   Ref<SExpression> made(TryNew<SExpression>(GetContext()));
   VESK2_REQUIRE(made, VESK2_ERR_MEM_ALLOC);
@@ -68,6 +73,8 @@ int Signature::AppendValue(Ref<ByteString> newAlgorithm, Ref<ByteString> newValu
   return Append(pair, std::move(newValue), value);
 }
 
+// A certificate is worth what its issuer is: another key's signature over it proves nothing about
+// that one. Compared by the canonical form, so that a hash of the issuer's key is not the issuer.
 int Signature::Verify(Cert* cert) {
   VESK2_REQUIRE(cert != nullptr, VESK2_ERR_PARAM_NULL);
   bool own = false;
@@ -76,6 +83,8 @@ int Signature::Verify(Cert* cert) {
   return Verify(static_cast<SExpression*>(cert));
 }
 
+// An object that was never read has no principal. The code of a lack of memory is the library's
+// own, so that callers test for one.
 int Signature::Verify(SExpression* object) {
   VESK2_REQUIRE(object != nullptr, VESK2_ERR_PARAM_NULL);
   VESK2_REQUIRE(principal != nullptr, VESK2_ERR_SIGNATURE);

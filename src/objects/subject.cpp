@@ -1,5 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-// Subject and Principal: the choice of a class by the first two characters of the text.
+// Subject and Principal: the choice of a class by the first two characters of the text. The choice
+// is by as little of the text as ever decided it; what was chosen then reads all of it, so that a
+// wrong beginning fails there.
 #include <vesk2/subject.h>
 
 #include <vesk2/hash.h>
@@ -11,6 +13,7 @@ namespace ZvVesk2 {
 namespace {
 
 template <typename T, typename Base>
+// `out` is set when the object is whole: no caller sees a subject that is half read.
 [[nodiscard]] int ImportAs(Base*& out, ZvBuffer* buffer, Vesk2ContextStruct* context) {
   Ref<T> made;
   VESK2_TRY(ImportNew(made, buffer, context));
@@ -20,6 +23,7 @@ template <typename T, typename Base>
 
 // "(1" begins "(10:public-key", "(4" begins "(4:hash".
 template <typename Base>
+// "(4:name" begins like a hash, and fails as one: names are not read.
 [[nodiscard]] int ImportPrincipal(Base*& out, ZvBuffer* buffer, Vesk2ContextStruct* context) {
   if (buffer->LooksAt("(1")) return ImportAs<PublicKey>(out, buffer, context);
   if (buffer->LooksAt("(4")) return ImportAs<Hash>(out, buffer, context);

@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// ThresholdSubject: any k of n keys.
+// ThresholdSubject: any k of n keys. It is only held here. Counting k distinct keys is the
+// reduction's work, which also refuses counts that make no sense.
 #include <vesk2/public_key.h>
 
 #include "src/objects/build.h"
@@ -16,7 +17,7 @@ SExpression::Iterator Members(const SExpression& list) {
   return element;
 }
 
-// One count: a raw byte, the first of its text.
+// One count: a raw byte, the first of its text. A raw byte, and no digits: "2" is 50.
 [[nodiscard]] int ReadCount(unsigned int& count, ZvBuffer* buffer, ByteString* text) {
   VESK2_TRY(text->Import(buffer));
   VESK2_REQUIRE(text->GetLength() > 0, VESK2_ERR_PARSE_FILE);
@@ -32,6 +33,8 @@ ThresholdSubject::~ThresholdSubject() = default;
 
 bool ThresholdSubject::IsThresholdSubject() const { return true; }
 
+// Counts over 255 have no form; the fields keep them for the caller's own use, and the list, which
+// is what counts, has their low bytes.
 int ThresholdSubject::Set(unsigned int newK, unsigned int newN) {
   VESK2_REQUIRE(First() == nullptr, VESK2_ERR_INVALID_PARAM);
   const auto byteK = static_cast<unsigned char>(newK);
@@ -51,7 +54,8 @@ int ThresholdSubject::Set(unsigned int newK, unsigned int newN) {
 
 // (k-of-n <k> <n> <key>...): "(6:k-of-n" <k> <n> n public keys ")". Only the first byte of each
 // count is read, and the list is the one that Set writes: a certificate verifies when its signer
-// hashed the counts in that form.
+// hashed the counts in that form. Members are keys, not hashes: HasMember compares them as they
+// stand, and a key named in two ways would be two members.
 int ThresholdSubject::Import(ZvBuffer* buffer) {
   VESK2_REQUIRE(buffer != nullptr && First() == nullptr, VESK2_ERR_INVALID_PARAM);
   VESK2_TRY(buffer->Expect("(6:k-of-n"));
@@ -70,6 +74,7 @@ int ThresholdSubject::Import(ZvBuffer* buffer) {
   return buffer->Expect(")");
 }
 
+// Linear, over at most 255 keys of a text that was read.
 bool ThresholdSubject::HasMember(Principal* principal) {
   for (Iterator element = Members(*this); element; element.Next()) {
     if (element.Value()->IsEqual(principal)) return true;
@@ -77,6 +82,7 @@ bool ThresholdSubject::HasMember(Principal* principal) {
   return false;
 }
 
+// Shared: the members stay in the group as well.
 int ThresholdSubject::GetSubjects(SExpression*& members) {
   VESK2_REQUIRE(members == nullptr, VESK2_ERR_INVALID_PARAM);
   Ref<SExpression> list(TryNew<SExpression>(GetContext()));

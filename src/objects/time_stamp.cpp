@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// TimeStamp: the fixed-width text of a moment, which sorts as text.
+// TimeStamp: the fixed-width text of a moment, which sorts as text. Nothing here asks the C library
+// for a date: its answers depend on the time zone, on the locale and on another thread.
 #include <vesk2/time_stamp.h>
 
 #include <algorithm>
@@ -18,7 +19,8 @@ namespace {
 constexpr unsigned int kLength = 19;
 constexpr size_t kYearLength = 4;
 
-// A field after the year: its separator stands at `place`, its two digits behind that.
+// A field after the year: its separator stands at `place`, its two digits behind that. A table, so
+// that reading, writing and completing a stamp go by one form.
 struct Field {
   size_t place;
   char separator;
@@ -38,18 +40,22 @@ constexpr std::array<Field, 5> kFields{{
 
 // The value of `count` characters, taken as digits without a test.
 template <typename Char>
+// What is no digit gives a number that is none of a date; who reads a stamp from people compares
+// the text that comes back.
 [[nodiscard]] int Digits(const Char* text, size_t count) {
   int value = 0;
   for (size_t i = 0; i < count; ++i) value = value * 10 + (text[i] - '0');
   return value;
 }
 
+// The zone is asked where it would matter and is UTC: clock.h.
 long ToSeconds(const std::tm& fields) {
   const long seconds = ZVsysutil::zv_mktime(&fields);
   return seconds - ZVsysutil::zv_timezone(seconds);
 }
 
-// Reads the fields that `text` has; the others are those of the period's first second.
+// Reads the fields that `text` has; the others are those of the period's first second. Years from
+// 1970, where seconds begin, to 3900.
 [[nodiscard]] int ParseFields(std::tm& fields, const char* text, size_t length) {
   fields = {};
   fields.tm_mday = 1;
@@ -66,7 +72,8 @@ long ToSeconds(const std::tm& fields) {
   return 0;
 }
 
-// Moves the fields to the first second after the period that a text of `length` names.
+// Moves the fields to the first second after the period that a text of `length` names. Fields may
+// run over, as "2005-12" goes on to month 13: zv_mktime carries.
 void NextPeriod(std::tm& fields, size_t length) {
   if (length == kYearLength) ++fields.tm_year;
   for (const Field& field : kFields) {
@@ -75,7 +82,8 @@ void NextPeriod(std::tm& fields, size_t length) {
 }
 
 // Both texts by their first 19 bytes. Stamps come from text that nobody checked: bytes that one
-// does not have count as 0.
+// does not have count as 0. Nineteen bytes and no more, whatever a text holds behind them: stored
+// stamps are compared so, and a tail must not change what is later.
 [[nodiscard]] int Compare(const TimeStamp& a, const TimeStamp& b) {
   const auto bytes = [](const TimeStamp& stamp) {
     std::array<unsigned char, kLength> text{};
@@ -107,6 +115,8 @@ int TimeStamp::Set(long seconds) {
   return 0;
 }
 
+// Parsed, written anew and compared: so an impossible day is found without a table of months. The
+// end of a period is the second before the next one begins.
 int TimeStamp::Set(const char* text, bool endOfPeriod) {
   VESK2_REQUIRE(text != nullptr, VESK2_ERR_PARAM_NULL);
   const size_t size = std::strlen(text);
@@ -121,6 +131,8 @@ int TimeStamp::Set(const char* text, bool endOfPeriod) {
   return Set(ToSeconds(fields) - 1);
 }
 
+// Programs call it for stamps of records that nobody checked: it answers something for every text
+// of 19 bytes.
 long TimeStamp::ToTime() const {
   if (length != kLength) return 0;
   std::tm fields{};
@@ -131,6 +143,7 @@ long TimeStamp::ToTime() const {
   return ToSeconds(fields);
 }
 
+// For who groups moments by day; in UTC, as all else.
 long TimeStamp::DayBegin(long seconds) {
   std::tm fields{};
   if (ZVsysutil::zv_gmtime(&fields, &seconds) != 0) return 0;
