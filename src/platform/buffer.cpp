@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // ZvBuffer: the one bounded cursor that every reader of canonical text is built on. Nothing else
-// moves a read position.
+// moves a read position. It compares `remaining < wanted`, never `position + wanted > end`, which
+// could wrap.
 #include <algorithm>
 #include <cstring>
 #include <memory>
@@ -18,6 +19,7 @@ ZvBuffer::ZvBuffer(unsigned char* data, size_t size) : data_(data), size_(size) 
 
 ZvBuffer::~ZvBuffer() { delete[] data_; }
 
+// The base of all matching: nothing is consumed here, so that a look can never be one too many.
 bool ZvBuffer::LooksAt(const char* text) const {
   const std::string_view wanted = text;
   return Remaining() >= wanted.size() && std::memcmp(Data(), wanted.data(), wanted.size()) == 0;
@@ -34,6 +36,7 @@ int ZvBuffer::Expect(const char* text) { return Accept(text) ? 0 : VESK2_ERR_PAR
 int ZvBuffer::Peek() const { return Remaining() > 0 ? data_[position_] : -1; }
 int ZvBuffer::Next() { return Remaining() > 0 ? data_[position_++] : -1; }
 
+// As many as there are: who needs them all compares.
 size_t ZvBuffer::Read(void* out, size_t length) {
   const unsigned char* const from = Data();
   const size_t count = Skip(length);
@@ -47,6 +50,7 @@ size_t ZvBuffer::Skip(size_t length) {
   return count;
 }
 
+// A copy, since the caller's bytes may go or change while they are parsed.
 ZvBuffer* zv_buffer_wrap(const void* data, size_t size) {
   if (data == nullptr && size > 0) return nullptr;
   auto* const copy = new (std::nothrow) unsigned char[size];
@@ -54,6 +58,7 @@ ZvBuffer* zv_buffer_wrap(const void* data, size_t size) {
   return zv_buffer_adopt(copy, size);
 }
 
+// Takes the bytes on every path, so that its callers have nothing to free.
 ZvBuffer* zv_buffer_adopt(unsigned char* data, size_t size) {
   std::unique_ptr<unsigned char[]> bytes(data);
   if (bytes == nullptr) return nullptr;

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // Calendar arithmetic on the proleptic Gregorian calendar, by <chrono>: the process's time zone and
-// the C library's global state never enter a date that decides a verdict.
+// the C library's global state never enter a date that decides a verdict. Dates come from
+// strangers' texts: every function is defined for every value that it can be given.
 #include "src/platform/clock.h"
 
 #include <chrono>
@@ -11,6 +12,7 @@ namespace {
 
 using namespace std::chrono;
 
+// Four digits is what a stamp has room for.
 constexpr int64_t kFirstYear = 0;
 constexpr int64_t kLastYear = 9999;
 constexpr int64_t kCycleYears = 400;  // after which the calendar repeats
@@ -23,12 +25,14 @@ constexpr int64_t FirstSecond(int64_t year) {
       .count();
 }
 
+// Division that rounds down also below zero, as months before January do.
 constexpr int64_t FloorDivide(int64_t a, int64_t b) {
   return a / b - (a % b != 0 && (a < 0) != (b < 0) ? 1 : 0);
 }
 
 }  // namespace
 
+// Whole seconds, rounded down: "now" is never a moment that has not come.
 long zv_time(long* out) {
   const long now =
       static_cast<long>(floor<seconds>(system_clock::now()).time_since_epoch().count());
@@ -36,6 +40,7 @@ long zv_time(long* out) {
   return now;
 }
 
+// The years are tested before the calendar types see them, which hold 16 bits.
 int zv_gmtime(std::tm* out, const long* seconds) {
   if (out == nullptr || seconds == nullptr) return -1;
   if (*seconds < FirstSecond(kFirstYear) || *seconds >= FirstSecond(kLastYear + 1)) return -1;
@@ -55,6 +60,7 @@ int zv_gmtime(std::tm* out, const long* seconds) {
   return 0;
 }
 
+// Fields of any size carry over, and no int overflows on the way: all is counted in 64 bits.
 long zv_mktime(const std::tm* fields) {
   if (fields == nullptr) return -1;
   // Any int may stand in any field, since callers hand over what untested digits gave; the year is
@@ -70,6 +76,7 @@ long zv_mktime(const std::tm* fields) {
                            int64_t{fields->tm_min} * 60 + fields->tm_sec);
 }
 
+// Kept as a function of its own, for the arithmetic that asks for it.
 long zv_timezone(long /*seconds*/) { return 0; }
 
 }  // namespace ZVsysutil

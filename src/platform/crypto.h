@@ -15,7 +15,9 @@
 struct evp_md_ctx_st;
 
 // A running hash. Small updates are gathered in `block`, inline, so that libcrypto sees whole
-// blocks. A loop of them goes through a ZVCLMHashFeed. (Opaque to callers of the library.)
+// blocks. A loop of them goes through a ZVCLMHashFeed. (Opaque to callers of the library.) `end` is
+// `block` when the hash is finished: there is no room then, and the quick road is closed without a
+// test of its own.
 struct ZVCLMHashContextData {
   static constexpr size_t kBlock = 16384;
   unsigned char* next = block;  // where the next byte goes
@@ -53,11 +55,15 @@ extern "C" {
 // zvclm_HashRestart forgets what a context was fed and starts it again. 0, ZVCLM_ERR_NULL_PARAM or
 // ZVCLM_ERR_NO_MEM.
 [[nodiscard]] int zvclm_HashRestart(ZVCLMHashContextData* context, uint32_t handle);
+// zvclm_HashInfo tells the length of an algorithm's digests. 0, ZVCLM_ERR_NULL_PARAM,
+// ZVCLM_ERR_KEY_TYPE for a record of another size, or ZVCLM_ERR_UNKNOWN_HASH.
 [[nodiscard]] int zvclm_HashInfo(ZvclmHashID id, ZVCLMHashInfo* info);
 // Writes the digest; the context can then only be started again or freed.
 [[nodiscard]] int zvclm_HashFinal(ZVCLMHashContextData* context, unsigned char* digest,
                                   uint32_t handle);
+// Frees a context, finished or not; null is allowed.
 void zvclm_HashFree(ZVCLMHashContextData* context, uint32_t handle);
+// What zvclm_HashUpdate does when the block has no room: it is given to libcrypto.
 [[nodiscard]] int zvclm_HashUpdateSlow(ZVCLMHashContextData* context, const unsigned char* data,
                                        size_t length);
 

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // ZvListing: the entries of one directory as the disk has them. ZvDir: the names of one directory,
-// all read and sorted when it is opened.
+// all read and sorted when it is opened. Both say when they could not go on: a list of names that
+// was cut short hides files, and with a revocation list what it revokes.
 #include <dirent.h>
 #include <fcntl.h>
 #include <unistd.h>
@@ -16,12 +17,14 @@
 namespace ZVsysutil {
 namespace {
 
+// A link is asked about where it matters: what it leads to may be anything.
 ZvKind KindOf(unsigned char type) {
   if (type == DT_REG) return ZvKind::kFile;
   if (type == DT_DIR) return ZvKind::kDirectory;
   return type == DT_UNKNOWN || type == DT_LNK ? ZvKind::kUnknown : ZvKind::kOther;
 }
 
+// The directory itself and the one above are entries of no store and no tree.
 bool IsDots(std::string_view name) { return name == "." || name == ".."; }
 
 // "*" and what follows it: a suffix. Anything else is a name.
@@ -32,6 +35,8 @@ bool Matches(std::string_view pattern, std::string_view name) {
 
 }  // namespace
 
+// O_DIRECTORY refuses what is none, before anything is opened that could block or act; O_NONBLOCK
+// is for what takes its place in that moment.
 int ZvListing::Open(const ZvPlace& place) {
   Close();
   if (place.name == nullptr) return VESK2_ERR_FIND_DIR;
@@ -51,6 +56,7 @@ int ZvListing::Open(const ZvPlace& place) {
   return 0;
 }
 
+// readdir tells its end and its failure by the same null: errno decides, which is cleared before.
 int ZvListing::Next(const char** name, ZvKind* kind) {
   const dirent* entry;
   do {
@@ -68,6 +74,8 @@ void ZvListing::Close() {
   descriptor_ = -1;
 }
 
+// All names are read at once and sorted: the search goes by them whatever is added to the directory
+// meanwhile.
 int ZvDir::open(const char* directory, const char* pattern) {
   close();
   const int code = Load(directory, pattern);
@@ -75,6 +83,7 @@ int ZvDir::open(const char* directory, const char* pattern) {
   return code;
 }
 
+// The directory stays open behind it, so that files are opened from the one that was listed.
 int ZvDir::Load(const char* directory, const char* pattern) {
   if (directory == nullptr || pattern == nullptr) return VESK2_ERR_FIND_DIR;
   if (const int code = listing_.Open({kZvNoDirectory, directory})) return code;
@@ -95,6 +104,7 @@ int ZvDir::Load(const char* directory, const char* pattern) {
   return 0;
 }
 
+// Grows by doubling; the names are copies, since a listing's name lives until the next.
 int ZvDir::Add(const char* name, bool regular) {
   if (count_ == capacity_) {
     const size_t larger = capacity_ > 0 ? 2 * capacity_ : 32;
@@ -111,6 +121,7 @@ int ZvDir::Add(const char* name, bool regular) {
   return 0;
 }
 
+// A null for want of memory is told apart (failed): else it would be the end.
 const char* ZvDir::read(bool fullPath) {
   failed_ = false;
   if (cursor_ == count_) return nullptr;

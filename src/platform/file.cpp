@@ -1,5 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-// Opening, reading, writing and testing files.
+// Opening, reading, writing and testing files. A path is a stranger's choice, and what lies there
+// can change between two looks. So what was opened is judged by its descriptor, nothing is opened
+// that could block or act, and every wait is counted (wait.h).
 #include "src/platform/file.h"
 
 #include <fcntl.h>
@@ -14,14 +16,16 @@
 namespace ZVsysutil {
 namespace {
 
+// As much as a read call needs to cost next to nothing for each byte.
 constexpr size_t kReadBlock = size_t{64} << 10;
 constexpr mode_t kFileMode = 0666;
 
-// The pauses between attempts to open a file that is held, in milliseconds.
+// The pauses between attempts to open a file that is held, in milliseconds: short at first, as most
+// holders let go at once, then rare.
 constexpr uint32_t kFirstPause = 1;
 constexpr uint32_t kLongestPause = 100;
 
-// A descriptor that is closed unless it is handed over.
+// A descriptor that is closed unless it is handed over. Every path out of a function closes it.
 class Descriptor {
  public:
   Descriptor() = default;
@@ -39,10 +43,12 @@ class Descriptor {
   int fd_ = -1;
 };
 
+// The code of the call that failed just now: nothing may come between it and this.
 [[nodiscard]] int OpenError() { return zv_error_code(errno, VESK2_ERR_FILE_OPEN); }
 
 // 0 for a regular file. Opening a device can do something by itself, so what is none is not even
-// opened.
+// opened. A tape rewinds, a terminal answers, a FIFO makes its writer go on: looking first costs a
+// call for each file that no listing vouched for.
 [[nodiscard]] int RequireRegular(const ZvPlace& place) {
   struct stat about {};
   if (place.name == nullptr) return VESK2_ERR_FILE_OPEN;
@@ -50,6 +56,8 @@ class Descriptor {
   return S_ISREG(about.st_mode) ? 0 : VESK2_ERR_FILE_OPEN;
 }
 
+// O_NOCTTY: a terminal that is opened must not become ours. EAGAIN is what a lease answers to
+// O_NONBLOCK, and nothing else of a regular file.
 [[nodiscard]] int OpenNow(Descriptor& out, const ZvPlace& place, int flags) {
   constexpr int kAlways = O_NONBLOCK | O_CLOEXEC | O_NOCTTY;
   do {
@@ -61,6 +69,8 @@ class Descriptor {
 
 // Opens a file, waiting for one that is held. Every attempt is made without blocking, and only
 // after a look that it is still a regular file: a FIFO or a device can take its place meanwhile.
+// Twice as long each time up to a tenth of a second, so that the kernel's own end of a lease is
+// noticed soon.
 [[nodiscard]] int OpenOrWait(Descriptor& out, const ZvPlace& place, int flags) {
   int code = OpenNow(out, place, flags);
   if (code != VESK2_ERR_READ_FILE) return code;
@@ -92,17 +102,21 @@ class Descriptor {
   return OpenRegular(out, place, O_RDONLY, opened);
 }
 
-// What was listed as a file is no link; one that took its place could lead to a device.
+// What was listed as a file is no link; one that took its place could lead to a device. When it is
+// none any more, O_NOFOLLOW makes that an error, and the caller looks again.
 [[nodiscard]] int OpenListed(Descriptor& out, const ZvPlace& place, struct stat* opened) {
   return OpenRegular(out, place, O_RDONLY | O_NOFOLLOW, opened);
 }
 
-// Makes a file one that all can read, and tells whether it is. Another's file may be one already.
+// Makes a file one that all can read, and tells whether it is. Another's file may be one already. A
+// file that we may not change and that all can read is as good.
 bool Share(int fd, mode_t mode) {
   constexpr mode_t kReadable = 0444;
   return fchmod(fd, kZvSharedFile) == 0 || (mode & kReadable) == kReadable;
 }
 
+// Truncated by the opening. Store files that must be whole are not written here but by
+// ZvReplacement.
 [[nodiscard]] int OpenForWriting(ZvFileOwner& out, const char* path, int mode) {
   ZvFileOwner file(new (std::nothrow) ZvFile);
   if (file == nullptr) return VESK2_ERR_MEM_ALLOC;
@@ -118,7 +132,8 @@ bool Share(int fd, mode_t mode) {
   return 0;
 }
 
-// Reads once, at most `length` bytes. 0 at the end, -1 for an error.
+// Reads once, at most `length` bytes. 0 at the end, -1 for an error. A signal that came between is
+// no error.
 ssize_t ReadDescriptor(int fd, unsigned char* out, size_t length) {
   ssize_t count;
   do {
@@ -127,7 +142,8 @@ ssize_t ReadDescriptor(int fd, unsigned char* out, size_t length) {
   return count;
 }
 
-// The same with the bytes counted. 0 at the end and on an error.
+// The same with the bytes counted. 0 at the end and on an error. More than it held when it was
+// opened is an error, as else a file that grows as fast as it is read would never end.
 size_t ReadOnce(ZvFile* file, unsigned char* out, size_t length) {
   const ssize_t count = ReadDescriptor(file->fd, out, length);
   if (count > 0) file->taken += static_cast<size_t>(count);
@@ -147,11 +163,14 @@ size_t ReadOnce(ZvFile* file, unsigned char* out, size_t length) {
 
 const int kZvNoDirectory = AT_FDCWD;
 
+// Descriptors count as memory does: a process that is driven out of either must not conclude that
+// files are gone.
 int zv_error_code(int error, int otherwise) {
   const bool ranOut = error == ENOMEM || error == EMFILE || error == ENFILE;
   return ranOut ? VESK2_ERR_MEM_ALLOC : otherwise;
 }
 
+// For reading it takes a block; a reader of many files keeps one (zv_reader).
 int zv_open(ZvFileOwner& out, const char* path, int mode) {
   out.reset();
   if (mode != ZV_READ) return OpenForWriting(out, path, mode);
@@ -169,6 +188,8 @@ ZvFileOwner zv_reader() {
   return file;
 }
 
+// A file that a listing called regular and that does not open so is tried as any other: what it was
+// may have changed for a good reason. The state of the file before is forgotten whole.
 int zv_reopen(ZvFile* file, const ZvPlace& place) {
   zv_shut(file);
   Descriptor fd;
@@ -188,6 +209,7 @@ void zv_shut(ZvFile* file) {
   if (file->fd >= 0) close(std::exchange(file->fd, -1));
 }
 
+// Errors of earlier writes count as well: a stream keeps them, and its last flush may go well.
 int zv_close(ZvFile* file) {
   if (file == nullptr) return 0;
   const std::unique_ptr<ZvFile> owner(file);
@@ -198,6 +220,8 @@ int zv_close(ZvFile* file) {
   return fclose(file->stream) != 0 || lost ? VESK2_ERR_WRITE_FILE : 0;
 }
 
+// Reads on until all is there or the file has ended: a short read of the system is not the end. As
+// much as a block goes past the block.
 size_t zv_read_slow(ZvFile* file, unsigned char* out, size_t length) {
   size_t copied = 0;
   while (copied < length) {
@@ -224,6 +248,8 @@ size_t zv_read_slow(ZvFile* file, unsigned char* out, size_t length) {
   return copied;
 }
 
+// Everything that is parsed comes through here, so that the parsed bytes are one state of the file
+// or none: other than the size that it had when it was opened is refused.
 int zv_read_whole(std::unique_ptr<unsigned char[]>& out, size_t* size, const ZvPlace& place,
                   uint64_t limit) {
   struct stat opened {};
@@ -232,6 +258,7 @@ int zv_read_whole(std::unique_ptr<unsigned char[]>& out, size_t* size, const ZvP
       place.listed ? OpenListed(fd, place, &opened) : OpenAfterLook(fd, place, &opened);
   if (code != 0) return code;
   const auto held = static_cast<uint64_t>(opened.st_size);
+  // Before memory is taken for it.
   if (held > limit) return VESK2_ERR_FILE_OPEN;
   // One byte more than it held is asked for, so that the read that gets it all meets the end.
   std::unique_ptr<unsigned char[]> bytes(new (std::nothrow) unsigned char[held + 1]);
@@ -249,6 +276,8 @@ int zv_read_whole(std::unique_ptr<unsigned char[]>& out, size_t* size, const ZvP
   return 0;
 }
 
+// A writer that restores size and time is not noticed: whoever can write the tree while it is read
+// is beyond what this can promise.
 int zv_check_unchanged(const ZvFile* file) {
   struct stat now {};
   if (fstat(file->fd, &now) != 0) return zv_error_code(errno, VESK2_ERR_READ_FILE);
@@ -259,16 +288,20 @@ int zv_check_unchanged(const ZvFile* file) {
   return same ? 0 : VESK2_ERR_READ_FILE;
 }
 
+// Short when the disk is full; the stream remembers it.
 size_t zv_write(FILE* stream, const void* data, size_t length) {
   return length > 0 ? fwrite(data, 1, length, stream) : 0;
 }
 
+// By a place, so that a file in a directory held open is asked about there.
 int zv_stat(const ZvPlace& place, struct stat* out) {
   if (place.name == nullptr) return VESK2_ERR_STAT_FILE;
   const bool told = fstatat(place.directory, place.name, out, 0) == 0;
   return told ? 0 : zv_error_code(errno, VESK2_ERR_STAT_FILE);
 }
 
+// The mode is set behind the umask, as others must be able to read what is shared, and nobody what
+// is not. What is there already is left as it is: its mode is its owner's choice.
 int zv_mkdir(const char* path, mode_t mode) {
   if (path == nullptr) return VESK2_ERR_CREATE_DIR;
   if (mkdir(path, mode) == 0) {

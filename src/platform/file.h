@@ -24,7 +24,8 @@ namespace ZVsysutil {
 // directory just said that it is a regular file and no link, which spares the question before it is
 // opened.
 struct ZvPlace {
-  int directory;  // a descriptor, or kZvNoDirectory
+  // A descriptor, or kZvNoDirectory.
+  int directory;
   const char* name;
   bool listed = false;
 };
@@ -36,11 +37,16 @@ struct ZvFile {
   const unsigned char* end = nullptr;
   unsigned char* block = nullptr;
   int fd = -1;
-  uint64_t taken = 0;      // bytes read from the file so far
-  bool ended = false;      // they are all that it held
-  int failure = 0;         // the code of a read error that happened
-  FILE* stream = nullptr;  // writing only
-  struct stat opened {};   // reading only: the file as it was when it was opened
+  // Bytes read from the file so far.
+  uint64_t taken = 0;
+  // They are all that it held.
+  bool ended = false;
+  // The code of a read error that happened: kept, as reads only tell how many bytes there were.
+  int failure = 0;
+  // Writing only.
+  FILE* stream = nullptr;
+  // Reading only: the file as it was when it was opened.
+  struct stat opened {};
 };
 
 enum ZvOpenMode : int {

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // Hashes: a block in front of libcrypto, so that many small updates cost about as much as a few
-// large ones.
+// large ones. Which algorithm is meant is in a table; libcrypto is asked by name, once for each
+// hash that is started.
 #include <openssl/evp.h>
 #include <memory>
 #include <new>
@@ -24,6 +25,7 @@ constexpr Algorithm kAlgorithms[] = {
     {ZVCLM_HASH_RMD160, 20, "RIPEMD160"},
 };
 
+// By a wide id, as ids come as enumerators and as words of records.
 const Algorithm* FindAlgorithm(int64_t id) {
   for (const Algorithm& algorithm : kAlgorithms) {
     if (algorithm.id == id) return &algorithm;
@@ -31,7 +33,8 @@ const Algorithm* FindAlgorithm(int64_t id) {
   return nullptr;
 }
 
-// Gives libcrypto the gathered bytes and empties the block.
+// Gives libcrypto the gathered bytes and empties the block. Emptied whether or not libcrypto took
+// it: after a failure the digest is never finished.
 bool Flush(ZVCLMHashContextData* context) {
   const auto gathered = static_cast<size_t>(context->next - context->block);
   context->next = context->block;
@@ -74,6 +77,7 @@ int zvclm_HashAlloc(ZVCLMHashContextData** context, ZvclmHashID id, uint32_t /*h
   return 0;
 }
 
+// The context keeps its algorithm and its memory, which for small files cost more than the hashing.
 int zvclm_HashRestart(ZVCLMHashContextData* context, uint32_t /*handle*/) {
   if (context == nullptr) return ZVCLM_ERR_NULL_PARAM;
   const ErrorMark mark;
@@ -92,6 +96,7 @@ int zvclm_HashInfo(ZvclmHashID id, ZVCLMHashInfo* info) {
   return 0;
 }
 
+// Whole blocks go past ours; what is left waits for more.
 int zvclm_HashUpdateSlow(ZVCLMHashContextData* context, const unsigned char* data, size_t length) {
   if (context == nullptr || (data == nullptr && length > 0)) return ZVCLM_ERR_NULL_PARAM;
   if (Finished(context)) return ZVCLM_ERR_FAILURE;
@@ -113,6 +118,7 @@ int zvclm_HashUpdateSlow(ZVCLMHashContextData* context, const unsigned char* dat
   return 0;
 }
 
+// Closed also after a failure: bytes that come later would be in no digest.
 int zvclm_HashFinal(ZVCLMHashContextData* context, unsigned char* digest, uint32_t /*handle*/) {
   if (context == nullptr || digest == nullptr) return ZVCLM_ERR_NULL_PARAM;
   if (Finished(context)) return ZVCLM_ERR_FAILURE;

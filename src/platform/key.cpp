@@ -1,5 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // Key records and keys. Both kinds go the same road: a record is a row of numbers behind two marks.
+// The records are an old interface: marks in the place of sizes, numbers in an order of their own.
+// All of it ends here; the library works with ZVCLMPublicKeyData.
 #include "src/platform/key.h"
 
 #include <openssl/core_names.h>
@@ -17,7 +19,8 @@ constexpr uint32_t kRsaMark = 20;
 constexpr uint32_t kDsaMark = 60;
 constexpr uint32_t kDsaParameterMark = 48;
 
-// The changeable fields of a record, in the order of a key's numbers.
+// The changeable fields of a record, in the order of a key's numbers. A row of pointers, so that
+// both kinds are filled, copied and freed by one loop.
 struct Fields {
   std::span<ZVCLMBigInt** const> used() const { return {numbers.data(), count}; }
 
@@ -35,7 +38,8 @@ Fields FieldsOf(ZVCLMDSSKeyData* record) {
   return {ZVCLM_KEY_DSA, 4, &record->keyLength, {&record->p, &record->q, &record->g, &record->y}};
 }
 
-// The fields of an initialised record of `id`; no fields for anything else.
+// The fields of an initialised record of `id`; no fields for anything else. The marks are what
+// tells an initialised record from any memory: without them nothing is read behind it.
 Fields FieldsOf(int id, void* record) {
   if (id == ZVCLM_DATA_RSA) {
     auto* rsa = static_cast<ZVCLMRSAKeyData*>(record);
@@ -48,6 +52,7 @@ Fields FieldsOf(int id, void* record) {
   return {};
 }
 
+// Safe to call twice, as numbers become null.
 [[nodiscard]] int Zeroize(int id, void* record) {
   if (record == nullptr) return ZVCLM_ERR_NULL_PARAM;
   const Fields fields = FieldsOf(id, record);
@@ -67,6 +72,7 @@ ZVCLMBigInt* CopyNumber(const BIGNUM* number) {
   return copy->value != nullptr ? copy.release() : nullptr;
 }
 
+// In the order of ZVCLMPublicKeyData.
 bool PushNumbers(OSSL_PARAM_BLD* builder, const ZVCLMPublicKeyData& key) {
   static constexpr const char* kRsaNames[] = {OSSL_PKEY_PARAM_RSA_N, OSSL_PKEY_PARAM_RSA_E};
   static constexpr const char* kDsaNames[] = {OSSL_PKEY_PARAM_FFC_P, OSSL_PKEY_PARAM_FFC_Q,
@@ -83,6 +89,8 @@ bool PushNumbers(OSSL_PARAM_BLD* builder, const ZVCLMPublicKeyData& key) {
 
 namespace ZVsysutil {
 
+// Made for each use and not kept: a key is verified with seldom, and held often. libcrypto takes
+// any numbers, so that null is a lack of memory.
 PkeyOwner MakePkey(const ZVCLMPublicKeyData& key) {
   const Evp<OSSL_PARAM_BLD, OSSL_PARAM_BLD_free> builder(OSSL_PARAM_BLD_new());
   if (builder == nullptr || !PushNumbers(builder.get(), key)) return nullptr;
@@ -101,6 +109,7 @@ PkeyOwner MakePkey(const ZVCLMPublicKeyData& key) {
 
 }  // namespace ZVsysutil
 
+// What was in the record is overwritten: it may be fresh memory.
 int zvclm_RSAKeyStructInit(int id, ZVCLMRSAKeyData* record) {
   if (record == nullptr) return ZVCLM_ERR_NULL_PARAM;
   if (id != ZVCLM_DATA_RSA) return ZVCLM_ERR_KEY_TYPE;
@@ -126,6 +135,7 @@ int zvclm_DSSKeyStructZeroize(int id, ZVCLMDSSKeyData* record) {
   return id == ZVCLM_DATA_DSA ? Zeroize(id, record) : ZVCLM_ERR_KEY_TYPE;
 }
 
+// Copied, so that the caller's record can go at once.
 int zvclm_PublicKeyDefine(ZVCLMPublicKeyData** key, int type, int id, const void* record,
                           uint32_t /*parameters*/, uint32_t /*handle*/) {
   if (key == nullptr || *key != nullptr || record == nullptr) return ZVCLM_ERR_NULL_PARAM;
@@ -145,6 +155,7 @@ int zvclm_PublicKeyDefine(ZVCLMPublicKeyData** key, int type, int id, const void
   return 0;
 }
 
+// All copies are made before a number is replaced: the record changes whole or not at all.
 int zvclm_PublicKeyGetData(const ZVCLMPublicKeyData* key, int id, void* record,
                            uint32_t /*handle*/) {
   if (key == nullptr || record == nullptr) return ZVCLM_ERR_NULL_PARAM;

@@ -12,6 +12,7 @@
 
 #include "src/platform/openssl.h"
 
+// A number, in libcrypto's form, cleared when it goes.
 struct ZVCLMBigInt {
   ZVsysutil::Evp<BIGNUM, BN_clear_free> value;
 };

@@ -22,6 +22,7 @@ struct Encoding {
   uint32_t length = 0;
 };
 
+// Both forms know their length before they write.
 [[nodiscard]] int Allocate(Encoding* out, size_t length) {
   out->bytes.reset(new (std::nothrow) unsigned char[length]);
   out->length = static_cast<uint32_t>(length);
@@ -41,6 +42,7 @@ struct Encoding {
 
 constexpr size_t kLengthBytes = 4;
 
+// Zero has no bytes at all in this form.
 size_t MpintLength(const BIGNUM* number) {
   const auto bits = static_cast<size_t>(BN_num_bits(number));
   return bits > 0 ? bits / 8 + 1 : 0;  // room for a sign bit of 0
@@ -51,6 +53,7 @@ unsigned char* WriteLength(unsigned char* at, size_t length) {
   return at;
 }
 
+// By hand: libcrypto does not write it.
 [[nodiscard]] int EncodeSsh(const ZVCLMPublicKeyData& key, Encoding* out) {
   static constexpr size_t kRsaOrder[] = {kRsaE, kRsaN};
   static constexpr size_t kDsaOrder[] = {kDsaP, kDsaQ, kDsaG, kDsaY};
@@ -74,6 +77,7 @@ unsigned char* WriteLength(unsigned char* at, size_t length) {
   return 0;
 }
 
+// The formats of this interface have numbers with gaps, and the others are refused.
 [[nodiscard]] int Encode(const ZVCLMPublicKeyData& key, int format, Encoding* out) {
   switch (format) {
     case ZVCLM_FORMAT_X509:
@@ -87,6 +91,7 @@ unsigned char* WriteLength(unsigned char* at, size_t length) {
 
 }  // namespace
 
+// Encoded anew for each call, also for the one that asks for the length: it is called seldom.
 int zvclm_PublicKeyExport(const ZVCLMPublicKeyData* key, int format, uint32_t /*parameters*/,
                           unsigned char* out, uint32_t* length, uint32_t /*handle*/) {
   if (key == nullptr || length == nullptr) return ZVCLM_ERR_NULL_PARAM;

@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// A lock among the threads of a caller; the library itself has none.
+// A lock among the threads of a caller; the library itself has none. It is held for the time of
+// handing out work, never while files are read.
 #ifndef VESK2_SRC_PLATFORM_LOCK_H
 #define VESK2_SRC_PLATFORM_LOCK_H
 
@@ -18,7 +19,7 @@ class ZvLock {
   pthread_mutex_t mutex_ = PTHREAD_MUTEX_INITIALIZER;
 };
 
-// Holds the lock for as long as it lives.
+// Holds the lock for as long as it lives. pthreads' own calls are used, as they do not throw.
 class ZvLocked {
  public:
   explicit ZvLocked(ZvLock& lock) : mutex_(&lock.mutex_) { pthread_mutex_lock(mutex_); }

@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// Owners of libcrypto's objects, and what the files over libcrypto share.
+// Owners of libcrypto's objects, and what the files over libcrypto share. Nothing of libcrypto is
+// seen outside this folder: its errors become codes here, and its queue is left as it was found.
 #ifndef VESK2_SRC_PLATFORM_OPENSSL_H
 #define VESK2_SRC_PLATFORM_OPENSSL_H
 

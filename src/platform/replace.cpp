@@ -1,5 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-// See replace.h.
+// See replace.h. Stores are read by others while they are written, and a writer can be killed at
+// any call: after each of these calls the directory holds the old file or the new one under the
+// name, and at most one temporary file beside it.
 #include "src/platform/replace.h"
 
 #include <dirent.h>
@@ -32,6 +34,8 @@ constexpr size_t kMaxFileName = 255;
 // Names drawn before giving up: each is new, so that a second one is hardly ever needed.
 constexpr int kAttempts = 8;
 
+// By the form of the name alone, so that the file of another program is hardly ever meant; who has
+// its lock is asked before it goes.
 bool IsLeftover(std::string_view name) {
   if (name.size() <= kSuffix) return false;
   const std::string_view suffix = name.substr(name.size() - kSuffix);
@@ -39,7 +43,8 @@ bool IsLeftover(std::string_view name) {
          suffix.find_first_not_of("0123456789abcdef", kMarkLength) == std::string_view::npos;
 }
 
-// Whether a name (in `directory`, or a path) leads to the open file, and through no link.
+// Whether a name (in `directory`, or a path) leads to the open file, and through no link. Names can
+// be moved between any two calls: what is about to be removed is compared with what is locked.
 bool LeadsTo(int directory, const char* name, int fd) {
   struct stat named {};
   struct stat opened {};
@@ -48,7 +53,8 @@ bool LeadsTo(int directory, const char* name, int fd) {
 }
 
 // Only who has the lock may remove the file, and only under a name that still is the file's: its
-// writer may have given it the final name before it let the lock go.
+// writer may have given it the final name before it let the lock go. O_NOFOLLOW and O_NONBLOCK, as
+// the directory may hold anything by such a name.
 void RemoveLeftover(int directory, const char* name) {
   constexpr int kFlags = O_RDONLY | O_NOFOLLOW | O_NONBLOCK | O_CLOEXEC | O_NOCTTY;
   const int fd = openat(directory, name, kFlags);
@@ -61,6 +67,7 @@ void RemoveLeftover(int directory, const char* name) {
 
 }  // namespace
 
+// Whoever did not keep the file wants none of it.
 ZvReplacement::~ZvReplacement() {
   if (fd_ < 0) return;
   // Removed before the lock goes with the descriptor.
@@ -68,6 +75,8 @@ ZvReplacement::~ZvReplacement() {
   static_cast<void>(stream_ != nullptr ? fclose(stream_) : close(fd_));
 }
 
+// In the same directory, as only there a renaming is one step. A name that would grow too long is
+// shortened; the mark and the random part never are.
 int ZvReplacement::Open(const char* path, mode_t mode) {
   if (path == nullptr || path_ != nullptr) return VESK2_ERR_FILE_OPEN;
   path_.reset(zv_fstrdup(path));
@@ -83,7 +92,8 @@ int ZvReplacement::Open(const char* path, mode_t mode) {
   return stream_ != nullptr ? 0 : VESK2_ERR_MEM_ALLOC;
 }
 
-// Writes a new temporary name.
+// Writes a new temporary name. From the kernel, so that two processes, or one and its fork, never
+// draw the same.
 int ZvReplacement::Name() {
   unsigned char random[kRandomBytes];
   if (getrandom(random, sizeof random, 0) != sizeof random) return VESK2_ERR_FILE_OPEN;
@@ -93,7 +103,8 @@ int ZvReplacement::Name() {
 }
 
 // Makes the file and takes its lock. Somebody who removes leftovers can find it in between, and
-// remove it: it is then made anew.
+// remove it: it is then made anew. Exclusive, so that nobody's file is ever opened here, and closed
+// to others until the mode is set.
 int ZvReplacement::MakeNamed(mode_t mode) {
   constexpr int kFlags = O_WRONLY | O_CREAT | O_EXCL | O_NOFOLLOW | O_CLOEXEC;
   for (int attempt = 0; attempt < kAttempts; ++attempt) {
@@ -113,6 +124,7 @@ int ZvReplacement::MakeNamed(mode_t mode) {
 
 // Where there are no locks, nobody gets one, and nobody removes the file. Whoever has the lock
 // instead of us removes it; with the lock, a file that is not known to have its name goes here.
+// Without the second look a remover that came first could take the name away unseen.
 bool ZvReplacement::HasLock() const {
   if (flock(fd_, LOCK_EX | LOCK_NB) != 0 && errno == EWOULDBLOCK) return false;
   if (LeadsTo(AT_FDCWD, temporary_.get(), fd_)) return true;
@@ -120,6 +132,8 @@ bool ZvReplacement::HasLock() const {
   return false;
 }
 
+// On the disk before it has the name: after a power cut an empty list under the name would revoke
+// nothing. Closing the descriptor gives the lock back, and by then the name is final.
 int ZvReplacement::Keep(bool replace) {
   if (stream_ == nullptr) return VESK2_ERR_WRITE_FILE;
   const bool written = ferror(stream_) == 0 && fflush(stream_) == 0 && fsync(fd_) == 0;
@@ -129,6 +143,8 @@ int ZvReplacement::Keep(bool replace) {
   return 0;
 }
 
+// One call that either happened or did not. Without leave to replace, the kernel refuses where a
+// file has come meanwhile.
 bool ZvReplacement::Publish(bool replace) const {
   const char* const from = temporary_.get();
   const char* const to = path_.get();
@@ -141,6 +157,7 @@ bool ZvReplacement::Publish(bool replace) const {
   return true;
 }
 
+// Failures are nobody's: a leftover that stays is only a file too many.
 void zv_remove_leftovers(const char* directory) {
   if (directory == nullptr) return;
   DIR* const opened = opendir(directory);

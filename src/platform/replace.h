@@ -43,6 +43,7 @@ class ZvReplacement {
   std::unique_ptr<char[]> path_;
   std::unique_ptr<char[]> temporary_;
   size_t stem_ = 0;  // what the temporary path keeps of `path_`
+  // Also what the lock hangs on: it goes with the last descriptor of the file.
   int fd_ = -1;
   FILE* stream_ = nullptr;  // owns fd_
 };

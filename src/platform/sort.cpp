@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 // A stable sort: names that compare equal keep the order in which they were found, whatever the C
-// library's own sort does with them.
+// library's own sort does with them. Results are told in this order, so that it must be the same on
+// every machine. The sort takes memory of the size of what it sorts; without that it is slow and
+// does the same.
 #include <cstring>
 #include <memory>
 #include <new>
@@ -12,14 +14,15 @@ namespace {
 
 using Compare = int (*)(const void*, const void*);
 
-// Elements of `size` bytes at `base`.
+// Elements of `size` bytes at `base`: the array is of a type that only the caller knows.
 struct Elements {
   unsigned char* At(size_t index) const { return base + index * size; }
   unsigned char* base;
   size_t size;
 };
 
-// Merges the sorted runs [first, middle) and [middle, last) of `from` into `to`.
+// Merges the sorted runs [first, middle) and [middle, last) of `from` into `to`. Equal ones come
+// from the left first: that is what makes it stable.
 void Merge(Elements from, Elements to, size_t first, size_t middle, size_t last, Compare compare) {
   size_t left = first;
   size_t right = middle;
@@ -45,7 +48,8 @@ void MergeSort(Elements items, Elements spare, size_t count, Compare compare) {
   if (from.base != items.base) std::memcpy(items.base, from.base, count * items.size);
 }
 
-// Slow, but needs no memory.
+// Slow, but needs no memory. Its cost is the square of the count: only where memory has run out,
+// and there it still ends.
 void InsertionSort(Elements items, size_t count, Compare compare) {
   for (size_t i = 1; i < count; ++i) {
     for (size_t j = i; j > 0 && compare(items.At(j - 1), items.At(j)) > 0; --j) {
@@ -58,6 +62,7 @@ void InsertionSort(Elements items, size_t count, Compare compare) {
 
 }  // namespace
 
+// Fewer than two are sorted.
 void zv_sort(void* items, size_t count, size_t size, Compare compare) {
   if (items == nullptr || count < 2) return;
   const Elements elements{static_cast<unsigned char*>(items), size};

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // Copies, conversions, joins and number scanning over 0-terminated bytes. Nothing here throws or
-// aborts: text that cannot be copied for lack of memory is null.
+// aborts: text that cannot be copied for lack of memory is null. File names are bytes: none of this
+// knows an encoding, and comparing is byte by byte.
 #include "src/platform/text.h"
 
 #include <algorithm>
@@ -24,7 +25,8 @@ char* CopyBytes(std::string_view text) {
   return copy;
 }
 
-// The two parts of a joined path; one of them may be empty.
+// The two parts of a joined path; one of them may be empty. One separator between the two, whatever
+// they bring: results are compared as text, so that a/b and a//b must not both come about.
 struct Join {
   Join(const char* a, const char* b) : head(a != nullptr ? a : ""), tail(b != nullptr ? b : "") {
     if (head.empty() || tail.empty()) return;
@@ -48,6 +50,7 @@ struct Join {
   bool separator = false;
 };
 
+// "/" alone is a component, of which a store makes no file.
 std::string_view LastComponent(std::string_view path) {
   while (path.size() > 1 && path.back() == kSeparator) path.remove_suffix(1);
   if (path.size() <= 1) return path;
@@ -63,6 +66,7 @@ char* zv_strdup(const char* text) { return text != nullptr ? CopyBytes(text) : n
 char* zv_fstrdup(const char* text) { return zv_strdup(text); }
 size_t zv_fstrlen(const char* text) { return text != nullptr ? std::strlen(text) : 0; }
 
+// Tells whether it was cut, as a cut path is another file's.
 bool zv_fstrcpy(char* out, size_t size, const char* text) {
   const std::string_view from = text != nullptr ? text : "";
   if (size == 0) return from.empty();
@@ -72,6 +76,7 @@ bool zv_fstrcpy(char* out, size_t size, const char* text) {
 
 char* zv_atof(const char* text) { return zv_strdup(text); }
 char* zv_ftoa(const char* text) { return zv_strdup(text); }
+// A conversion that changes nothing may hand out its argument on other systems.
 void zv_atof_free(const char* text, char* copy) {
   if (copy != text) delete[] copy;
 }
@@ -109,6 +114,7 @@ char* zv_join_path(const char* a, const char* b) {
   return joined;
 }
 
+// Nothing is written of what does not fit: a half path would lead elsewhere.
 bool zv_concat_path_to(char* out, size_t size, const char* a, const char* b) {
   const Join join(a, b);
   if (size > 0) out[0] = '\0';
@@ -128,6 +134,7 @@ char* zv_basename(const char* path) {
   return path != nullptr ? CopyBytes(LastComponent(path)) : nullptr;
 }
 
+// Of the last component only: a dot in a directory's name is none of the file's.
 const char* zv_extname(const char* path) {
   if (path == nullptr) return nullptr;
   const char* separator = std::strrchr(path, kSeparator);
@@ -143,6 +150,7 @@ void zv_binhex(char* out, const unsigned char* data, size_t length) {
   *out = '\0';
 }
 
+// Digits are counted before they are added up, so that no value overflows.
 int zv_scan_numbers(const unsigned char* text, size_t length, int* values, int count) {
   const unsigned char* const end = text + length;
   int found = 0;

@@ -36,6 +36,8 @@ using Number = Evp<BIGNUM, BN_free>;
 // Stands in libcrypto's error queue between the caller's entries and ours.
 constexpr int kOurs = 1;
 
+// Told by library and reason: a caller may have raised such an entry too, so that the last one
+// counts.
 bool IsOurs(unsigned long entry) {
   return ERR_GET_LIB(entry) == ERR_LIB_USER && ERR_GET_REASON(entry) == kOurs;
 }
@@ -50,7 +52,8 @@ bool IsVerdict(unsigned long entry) {
 
 // Whether a verdict stands behind kOurs, the last one: the caller may have such an entry too, and
 // old verdicts behind it. The queue can only be read from its old end: the caller's entries are
-// taken out and put back, without their texts.
+// taken out and put back, without their texts. An array of the queue's own size, on the stack: this
+// must work when memory has run out.
 bool FindVerdict() {
   std::array<unsigned long, ERR_NUM_ERRORS> entries;
   size_t count = 0;
@@ -85,6 +88,7 @@ enum class Zero { kIsNo, kNeedsReason };
   return told ? 0 : ZVCLM_ERR_NO_MEM;
 }
 
+// Null is a lack of memory: the key was looked at before.
 PkeyContext MakeContext(const ZVCLMPublicKeyData& key) {
   const PkeyOwner pkey = MakePkey(key);
   return PkeyContext(pkey != nullptr ? EVP_PKEY_CTX_new_from_pkey(nullptr, pkey.get(), nullptr)
@@ -102,6 +106,8 @@ PkeyContext StartVerify(const ZVCLMPublicKeyData& key) {
 
 constexpr size_t kMaxModulus = Limits::kMaxRsaModulusBits / 8;
 
+// An even modulus or exponent, or an exponent of 1, has no signature that means anything: with 1
+// the "signature" is the block itself, and anybody could write one.
 bool WithinRsaLimits(const ZVCLMPublicKeyData& key) {
   const BIGNUM* n = key.number(kRsaN);
   const BIGNUM* e = key.number(kRsaE);
@@ -109,7 +115,8 @@ bool WithinRsaLimits(const ZVCLMPublicKeyData& key) {
          !BN_is_one(e) && BN_num_bits(e) <= Limits::kMaxRsaExponentBits && BN_cmp(e, n) < 0;
 }
 
-// Whether it is as long as n and smaller: a bare number of that range.
+// Whether it is as long as n and smaller: a bare number of that range. A longer one, with zeros
+// before it, would be a second text of the same signature.
 bool FitsModulus(Bytes signature, const BIGNUM* n) {
   std::array<unsigned char, kMaxModulus> modulus;
   const auto length = static_cast<size_t>(BN_bn2bin(n, modulus.data()));
@@ -134,6 +141,7 @@ using Block = std::array<unsigned char, kMaxModulus>;
 
 // Whether the block is the one that there is for the digest:
 //   00 01 ff...ff 00 <name> <digest>      with eight or more ff
+// Built and compared whole, never parsed: what a parser skips, a forger fills.
 bool IsBlockOf(Bytes block, uint32_t hash, Bytes digest) {
   constexpr size_t kFrame = 3 + 8;
   const auto* const name = std::ranges::find(kDigestNames, hash, &DigestName::hash);
@@ -182,6 +190,8 @@ bool SetRsaScheme(EVP_PKEY_CTX* context, int scheme, const EVP_MD* hash) {
          EVP_PKEY_CTX_set_rsa_pss_saltlen(context, RSA_PSS_SALTLEN_AUTO) == 1;
 }
 
+// Whatever cannot be good is "no" with code 0 and without libcrypto; whatever cannot be found out
+// is a code.
 [[nodiscard]] int VerifyRsa(bool* good, const ZVCLMPublicKeyData& key, int scheme,
                             const ZVCLMRSAParameters& parameters, Bytes digest, Bytes signature) {
   const uint32_t hashId = parameters.words[3];
@@ -198,6 +208,8 @@ bool SetRsaScheme(EVP_PKEY_CTX* context, int scheme, const EVP_MD* hash) {
 
 // ---- DSA ----
 
+// The lengths of q that the format knows. g and y of 0 or 1 would make every signature good or
+// none.
 bool WithinDsaLimits(const ZVCLMPublicKeyData& key) {
   const BIGNUM* p = key.number(kDsaP);
   const int qBits = BN_num_bits(key.number(kDsaQ));
@@ -244,6 +256,7 @@ bool ToDer(DerSignature* out, Number r, Number s) {
 
 // ---- Either ----
 
+// A scheme that does not go with the key is a "no": the names in signatures are a stranger's.
 [[nodiscard]] int Verify(bool* good, const ZVCLMPublicKeyData& key, int scheme,
                          const void* parameters, Bytes digest, Bytes signature) {
   if (scheme == ZVCLM_SCHEME_DSA) {
@@ -258,6 +271,7 @@ bool ToDer(DerSignature* out, Number r, Number s) {
 
 }  // namespace
 
+// The one place of yes: *valid is 0 until every test has passed.
 int zvclm_PublicKeyVerifySignature(const ZVCLMPublicKeyData* key, int scheme,
                                    const void* parameters, const unsigned char* digest,
                                    uint32_t digestLength, const unsigned char* signature,

@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// See wait.h.
+// See wait.h. The marks lie on the stacks of the calls, linked by one pointer for each thread:
+// nothing is allocated, as waiting must work when memory has run out.
 #include "src/platform/wait.h"
 
 #include <algorithm>
@@ -16,8 +17,10 @@ namespace {
 // refused, so without memory the process would end.
 __attribute__((tls_model("initial-exec"))) thread_local ZvCall* outermost = nullptr;
 
+// Atomic, as threads of a comparison read it while a test may set it.
 std::atomic<uint32_t> allowance{ZvVesk2::Limits::kMaxHeldWait};
 
+// By a clock that nobody sets; a signal does not shorten it.
 void Sleep(uint32_t milliseconds) {
   timespec left{};
   left.tv_sec = static_cast<time_t>(milliseconds / 1000);
@@ -32,12 +35,16 @@ ZvCall::ZvCall() : outer_(outermost), shared_(outer_ != nullptr ? outer_ : this)
   outermost = shared_;
 }
 
+// It starts with what the call has waited already, so that threads which come late do not wait a
+// minute more.
 ZvCall::ZvCall(ZvCall& begun)
     : outer_(outermost), begun_(begun.shared_), shared_(outer_ == begun_ ? outer_ : this) {
   if (shared_ == this) waited_ = begun_->waited_.load();
   outermost = shared_;
 }
 
+// What the longest of its threads waited counts for the call, not the sum: they waited at the same
+// time.
 ZvCall::~ZvCall() {
   outermost = outer_;
   if (shared_ != this || begun_ == nullptr) return;
@@ -46,6 +53,7 @@ ZvCall::~ZvCall() {
   }
 }
 
+// Asked for the last time, it gives what is left, and then nothing.
 bool ZvCall::Pause(uint32_t milliseconds) {
   std::atomic<uint32_t>& waited = shared_->waited_;
   const uint32_t most = allowance;
