@@ -9,7 +9,8 @@
 
 #include <vesk2.h>
 
-// Returns the code of `expression` from the enclosing function unless it is 0.
+// Returns the code of `expression` from the enclosing function unless it is 0. The good path is
+// then the one that is not indented, and no result can be dropped on the way.
 #define VESK2_TRY(expression)                                               \
   do {                                                                      \
     if (const int vesk2_code = (expression); vesk2_code) return vesk2_code; \
@@ -43,7 +44,8 @@ namespace ZvVesk2 {
 }
 
 // The library is built without exceptions: memory that cannot be had is a null pointer, tested
-// where it is asked for.
+// where it is asked for. Plain values only: a class that may throw in its constructor has no place
+// here.
 template <typename T, typename... Args>
 [[nodiscard]] T* TryNew(Args&&... args) {
   return new (std::nothrow) T(std::forward<Args>(args)...);

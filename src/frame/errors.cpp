@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 // Version and error texts. The tables in vesk2.h hold number, name and text of every code; this
-// file only looks things up in them.
+// file only looks things up in them. Three kinds of text for three readers: the stable one
+// (V2Error), the constant's name, and words for people, which only say what is true whoever
+// answered the code.
 #include <vesk2/context.h>
 
 #include <iterator>
@@ -28,6 +30,8 @@ struct Words {
   int code;
   const char* words;
 };
+// A code that means one thing to one caller and another to the next has no words here: the caller
+// knows better.
 constexpr Words kWords[] = {
     {VESK2_ERR_MEM_ALLOC, "out of memory"},
     {VESK2_ERR_FILE_OPEN, "cannot be opened"},
@@ -60,6 +64,7 @@ constexpr Words kWords[] = {
     {SPKI_ERR_NO_MEM, "the reduction ran out of memory or of its work budget"},
 };
 
+// By a walk: the codes of the engine are no row of numbers, and texts are asked for once an answer.
 const Row* FindRow(int code) {
   for (const Row& row : kErrors) {
     if (row.code == code) return &row;
@@ -97,6 +102,8 @@ const char* V2CodeName(int code) {
   return row != nullptr ? row->name : nullptr;
 }
 
+// What the reduction cannot read has many codes and one meaning for people. Its own texts say more
+// where they are more than a name: whoever shows those asks for them first.
 const char* V2CodeWords(int code) {
   for (const Words& row : kWords) {
     if (row.code == code) return row.words;

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // Records of file names. Each gives its name in both string forms, because callers of the ASCII
-// functions and of the others read the same lists.
+// functions and of the others read the same lists. The layout is an old one that programs walk by
+// themselves, so that each record holds all four names, of which the library fills two.
 #include <vesk2/file_item.h>
 
 #include <memory>
@@ -16,6 +17,7 @@ constexpr uint32_t kRecordMark = 28;  // what callers test; not the size of the 
 
 }  // namespace
 
+// The names are taken over when there is a record to hold them, and not before.
 FileItem* FileItemCreate(char* name, char* nameA) {
   std::unique_ptr<FileItem> item(TryNew<FileItem>());
   if (item == nullptr) return nullptr;
@@ -28,6 +30,7 @@ FileItem* FileItemCreate(char* name, char* nameA) {
   return item.release();
 }
 
+// A loop and no recursion: a chain has as many records as a tree has files.
 unsigned int FileItemDelete(FileItem* chain) {
   unsigned int count = 0;
   while (chain != nullptr) {

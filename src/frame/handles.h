@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// Owners of platform handles, so that no error path releases one by hand.
+// Owners of platform handles, so that no error path releases one by hand. Each is a unique_ptr with
+// the handle's own way of being freed.
 #ifndef VESK2_SRC_FRAME_HANDLES_H
 #define VESK2_SRC_FRAME_HANDLES_H
 

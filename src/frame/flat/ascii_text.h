@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 // AsciiText: the file-name form of an ASCII argument, for the time of one call. On Linux both forms
-// are bytes, but callers of the A functions must not come to depend on that.
+// are bytes, but callers of the A functions must not come to depend on that. A conversion that
+// lacked memory must not become a null argument, which some functions take for "the store": every
+// caller tests OutOfMemory.
 #ifndef VESK2_SRC_FRAME_FLAT_ASCII_TEXT_H
 #define VESK2_SRC_FRAME_FLAT_ASCII_TEXT_H
 

@@ -1,5 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-// Flat functions: reading a certificate sequence into a chain of records, and freeing it.
+// Flat functions: reading a certificate sequence into a chain of records, and freeing it. Records
+// are shown and never judged: a verification goes back to the sequence, so that no text of a
+// record, changed by a program or not, enters a verdict.
 #include <vesk2/cert_sequence.h>
 #include <vesk2/public_key.h>
 
@@ -20,8 +22,10 @@ struct ChainFree {
 };
 using ChainOwner = std::unique_ptr<Vesk2CertInfoStruct, ChainFree>;
 
+// 0 where there is none, and for a text that is no stamp: the record has no other word for either.
 time_t TimeOf(const TimeStamp* stamp) { return stamp != nullptr ? stamp->ToTime() : 0; }
 
+// With the digest as raw bytes, so that it has a length of its own beside the text.
 [[nodiscard]] int ReadHash(Vesk2CertInfoStruct& record, Hash* hash) {
   const unsigned int size = hash->AdvancedLength();
   record.hashText = TryNewArray<char>(size_t{size} + 1);
@@ -30,6 +34,7 @@ time_t TimeOf(const TimeStamp* stamp) { return stamp != nullptr ? stamp->ToTime(
                               record.hashTextLength, size);
 }
 
+// What was filled in before a failure goes with the record.
 [[nodiscard]] int ReadRecord(Vesk2CertInfoStruct& record, Cert* cert, Signature* signature,
                              SExpression* extra) {
   record.size = kRecordMark;
@@ -43,7 +48,8 @@ time_t TimeOf(const TimeStamp* stamp) { return stamp != nullptr ? stamp->ToTime(
   return key != nullptr ? InOwnWords(key->X509Export(record.keyData, record.keyLength)) : 0;
 }
 
-// The records of all triples behind the keyword. None holds the sequence yet.
+// The records of all triples behind the keyword. None holds the sequence yet. So that a chain that
+// is freed half-made frees no sequence.
 [[nodiscard]] int ReadRecords(ChainOwner& chain, CertSequence* sequence) {
   Vesk2CertInfoStruct* last = nullptr;
   auto item = sequence->Begin();
@@ -80,6 +86,7 @@ int Vesk2CertReadCtx(Vesk2CertInfoStruct** out, const char* path, Vesk2ContextSt
   for (auto* record = chain.get(); record != nullptr; record = record->next) {
     record->sequence = sequence.get();
   }
+  // A sequence without certificates has no record to hold it, and goes here.
   if (chain) static_cast<void>(sequence.Release());  // the chain's reference now
   *out = chain.release();
   return 0;
@@ -99,6 +106,7 @@ int Vesk2CertReadA(Vesk2CertInfoStruct** out, const char* path) {
   return Vesk2CertReadCtxA(out, path, nullptr);
 }
 
+// All records hold one sequence, which has one reference of the chain's.
 int Vesk2CertFree(Vesk2CertInfoStruct* chain) {
   // Callers tell a read that gave nothing by this; the record of a list is freed without a word.
   VESK2_REQUIRE(chain != nullptr, VESK2_ERR_PARAM_NULL);

@@ -1,5 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-// Flat functions: verifying certificate sequences, and listing those of a directory.
+// Flat functions: verifying certificate sequences, and listing those of a directory. They turn
+// texts and seconds into objects, ask the class, and hand on its code. No rule of verification is
+// here.
 #include <vesk2/cert_sequence.h>
 #include <vesk2/manifest.h>
 
@@ -20,7 +22,9 @@ namespace {
 
 // ---- Verifying ----
 
-// `out` is null when nobody wants to know why. `path` is for its texts.
+// `out` is null when nobody wants to know why. `path` is for its texts. 0 seconds are no time, so
+// that the epoch itself cannot be asked about: callers have always meant "not given" by it. The
+// code is in the library's own words, so that whoever calls from C tests for one lack of memory.
 [[nodiscard]] int VerifySequence(CertSequence* sequence, const char* tagText, time_t notBefore,
                                  time_t notAfter, const char* path, Vesk2ExplanationStruct** out) {
   Vesk2ContextStruct* const context = sequence->GetContext();
@@ -34,12 +38,14 @@ namespace {
   if (out == nullptr) {
     return InOwnWords(sequence->Verify(nullptr, tag.get(), from.get(), to.get()));
   }
+  // Kept for the explanation alone; the verification answers the same with and without it.
   Evidence evidence(context);
   const int code = InOwnWords(sequence->Verify(nullptr, tag.get(), from.get(), to.get(), evidence));
   *out = ExplainAnswer({evidence, code, code, tag.get(), path, nullptr});
   return code;
 }
 
+// One ZvCall for reading and verifying: the wait for held files is one for the whole call.
 [[nodiscard]] int VerifyFile(const char* path, const char* tagText, time_t notBefore,
                              time_t notAfter, Vesk2ExplanationStruct** out) {
   VESK2_REQUIRE(path != nullptr, VESK2_ERR_PARAM_NULL);
@@ -57,6 +63,7 @@ int Vesk2CertVerify(Vesk2CertInfoStruct* chain, const char* tagText, time_t notB
   return VerifySequence(chain->sequence, tagText, notBefore, notAfter, nullptr, nullptr);
 }
 
+// The output is null before anything can fail, so that a program can free it whatever is answered.
 int Vesk2CertVerifyExplained(Vesk2CertInfoStruct* chain, const char* tagText, time_t notBefore,
                              time_t notAfter, Vesk2ExplanationStruct** out) {
   VESK2_REQUIRE(out != nullptr, VESK2_ERR_PARAM_NULL);
@@ -95,7 +102,7 @@ int Vesk2CertVerifyFileA(const char* path, const char* tagText, time_t notBefore
 
 namespace {
 
-// A record of one name; null without memory.
+// A record of one name; null without memory. The name is the record's, or goes.
 FileItem* MakeItem(const char* name) {
   std::unique_ptr<char[]> copy(ZVsysutil::zv_fstrdup(name));
   FileItem* const item = copy ? FileItemCreate(copy.get(), nullptr) : nullptr;
@@ -105,6 +112,8 @@ FileItem* MakeItem(const char* name) {
 
 }  // namespace
 
+// Bare names, since a program joins them with the directory that it asked about, or hands them to
+// what looks into the home store.
 FileItem* CertFind(const char* directory) {
   constexpr const char* kPattern = "*.cert";
   Scan scan;

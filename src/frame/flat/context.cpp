@@ -1,9 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
-// Flat functions: the context, and memory that was handed out.
+// Flat functions: the context, and memory that was handed out. What is handed out for Vesk2Free
+// comes from new char[] or new unsigned char[] everywhere in the library: one function can release
+// it without knowing what it was.
 #include <vesk2.h>
 
 #include "src/frame/check.h"
 
+// The handle is only carried: the crypto layer beneath is libcrypto, which needs none.
 int Vesk2Init(Vesk2ContextStruct** ctx, uint32_t value) {
   if (ctx == nullptr) return 0;  // callers without a use for a context may say so
   *ctx = ZvVesk2::TryNew<Vesk2ContextStruct>();

@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// Flat functions: the two store roots.
+// Flat functions: the two store roots. They only set them: whether a root exists, whose it is and
+// who may write there is the program's to check.
 #include <vesk2/context.h>
 
 #include "src/frame/flat/ascii_text.h"

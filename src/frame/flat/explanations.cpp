@@ -1,5 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-// Flat functions: why an answer is what it is, as records.
+// Flat functions: why an answer is what it is, as records. A C program gets no objects, so that all
+// it may want to know is copied into one record with its texts, which it frees by one call. An
+// explanation that cannot be made is null: it never changes an answer.
 #include "src/frame/flat/explanations.h"
 
 #include <cstring>
@@ -25,12 +27,15 @@ uint32_t Number(size_t index) {
   return index != Explanation::kNone ? static_cast<uint32_t>(index + 1) : 0;
 }
 
-// A text that was made; null means that there was no memory for it.
+// A text that was made; null means that there was no memory for it. Handed to the record at once,
+// whether or not the next one can be made.
 [[nodiscard]] int Take(char*& out, char* made) {
   out = made;
   return made != nullptr ? 0 : VESK2_ERR_MEM_ALLOC;
 }
 
+// Texts were made safe where they were written (TextWriter); only names are made anew here, by the
+// same.
 [[nodiscard]] int FillReason(Vesk2ReasonStruct& record, const Explanation::Reason& reason) {
   record.kind = Explanation::Word(reason.kind);
   record.certificate = Number(reason.cert);
@@ -40,6 +45,7 @@ uint32_t Number(size_t index) {
   return reason.source != nullptr ? Take(record.source, Wording::OfTag(reason.source)) : 0;
 }
 
+// In their order: the first tells where authority was lost first.
 [[nodiscard]] int AddReasons(Vesk2ExplanationStruct& record, const Explanation& explanation) {
   Vesk2ReasonStruct** tail = &record.reasons;
   for (size_t i = 0; i < explanation.CountReasons(); ++i) {
@@ -51,6 +57,7 @@ uint32_t Number(size_t index) {
   return 0;
 }
 
+// Without an entry that grants alone there is no path to tell, and no end.
 [[nodiscard]] int AddPath(Vesk2ExplanationStruct& record, const Explanation& explanation) {
   if (explanation.GetEntry() == nullptr) return 0;
   VESK2_TRY(Take(record.entry, Wording::OfEntry(explanation.GetEntry())));
@@ -67,6 +74,8 @@ uint32_t Number(size_t index) {
   return 0;
 }
 
+// The time as the manifest says, proved or not; the signer only when its signature holds: a name
+// that was merely claimed must not look like one that signed.
 [[nodiscard]] int AddSigner(Vesk2ExplanationStruct& record, const Evidence& evidence) {
   if (evidence.GetKind() != Evidence::SignedManifest) return 0;
   if (evidence.GetSigningTime() != nullptr) record.signedAt = evidence.GetSigningTime()->ToTime();
@@ -74,6 +83,7 @@ uint32_t Number(size_t index) {
   return Take(record.signer, Wording::Fingerprint(evidence.GetCert(0)->GetIssuer()));
 }
 
+// Explained from what the verification kept: no file is opened.
 [[nodiscard]] int Fill(Vesk2ExplanationStruct& record, const Answer& answer) {
   record.size = sizeof record;
   record.code = answer.code;
@@ -88,6 +98,7 @@ uint32_t Number(size_t index) {
 
 // ---- Counting ----
 
+// As deep as the listing nests, which its reader bounds.
 uint64_t CountListed(BodyDirectory& directory) {
   uint64_t count = directory.GetFiles().GetCount();
   PointerArray<BodyObject>& subdirectories = directory.GetSubdirectories();
@@ -97,6 +108,7 @@ uint64_t CountListed(BodyDirectory& directory) {
   return count;
 }
 
+// Files only: a directory stands in a list for what is in it.
 uint64_t CountFiles(const FileItem* list) {
   uint64_t count = 0;
   for (; list != nullptr; list = list->next) count += list->isDirectory == 0 ? 1 : 0;
@@ -129,12 +141,14 @@ uint64_t CountExtra(const FileItem* list) {
 
 }  // namespace
 
+// After a lack of memory there is nothing to tell but that.
 Vesk2ExplanationStruct* ExplainAnswer(const Answer& answer) {
   RecordOwner record(TryNew<Vesk2ExplanationStruct>());
   if (!record || LacksMemory(answer.code)) return nullptr;
   return Fill(*record, answer) == 0 ? record.release() : nullptr;
 }
 
+// From the lists that the comparison made; without a listing nothing was compared.
 void CountEntries(Vesk2ExplanationStruct& record, const Manifest& manifest) {
   if (manifest.GetListing() == nullptr) return;
   record.listed = CountListed(*manifest.GetListing());

@@ -11,7 +11,9 @@ namespace ZvVesk2 {
 struct Answer {
   const Evidence& evidence;
   int code;
-  int authority;  // what was found about authority: the answer, unless that is about a tree
+  // What was found about authority: the answer, unless that is about a tree, before which authority
+  // was proved.
+  int authority;
   SExpression* tag;
   const char* path;  // of the file, and of the directory of further entries; or null
   const char* extraAclDirectory;

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // Flat functions: manifest contexts and the records of their results. A manifest context is a
-// Manifest; the getters and setters trust its pointer, the way callers have always used them.
+// Manifest; the getters and setters trust its pointer, the way callers have always used them. Codes
+// are the class's own, a lack of memory told by one code (InOwnWords).
 #include <vesk2/file_item.h>
 #include <vesk2/manifest.h>
 
@@ -18,6 +19,7 @@ unsigned int FreeFileItemList(FileItem* chain) { return ZvVesk2::FileItemDelete(
 
 // ---- Making and configuring ----
 
+// *out is tested and not overwritten: a context that a program still holds would be lost.
 int CreateManifestContext(Manifest** out, const char* directory, const char* manifestPath,
                           const char* tagText) {
   VESK2_REQUIRE(
@@ -64,10 +66,13 @@ void SetStoreUpdate(Manifest* manifest, int update) { manifest->SetStoreUpdate(u
 
 // ---- Verifying ----
 
+// The pair of settings that a careful caller wants is in vesk2.h, and none of it is forced here:
+// programs rely on the defaults.
 int VerifyManifest(Manifest* manifest, time_t notBefore, time_t notAfter) {
   return ZvVesk2::InOwnWords(manifest->VerifyManifest(notBefore, notAfter));
 }
 
+// The evidence lives as long as this call, and is taken back from the manifest before it goes.
 int VerifyManifestExplained(Manifest* manifest, time_t notBefore, time_t notAfter,
                             Vesk2ExplanationStruct** out) {
   VESK2_REQUIRE(out != nullptr, VESK2_ERR_PARAM_NULL);
@@ -98,6 +103,7 @@ int CompareManifestA(Manifest* manifest, const char* otherManifestPath) {
 
 // ---- Results ----
 
+// Of the last read that proved it.
 time_t GetTimeOfSigning(Manifest* manifest) {
   const ZvVesk2::TimeStamp* const stamp = manifest->GetSigningTime();
   return stamp != nullptr ? stamp->ToTime() : 0;

@@ -1,5 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // Flat functions: revocation lists, read, found in the store, verified and imported into it.
+// Reading, finding and verifying are apart, as the class has them: only Vesk2CrlVerify proves
+// anything, and it asks the entries of this moment.
 #include <vesk2/acl_entry.h>
 #include <vesk2/crl.h>
 
@@ -42,6 +44,7 @@ struct RecordFree {
 };
 using RecordOwner = std::unique_ptr<Vesk2CrlInfoStruct, RecordFree>;
 
+// The record is whole before it gets the sequence: a failure frees each once.
 [[nodiscard]] int MakeRecord(Vesk2CrlInfoStruct** out, Ref<CrlSequence> sequence) {
   RecordOwner record(TryNew<Vesk2CrlInfoStruct>());
   VESK2_REQUIRE(record, VESK2_ERR_MEM_ALLOC);
@@ -57,6 +60,7 @@ using RecordOwner = std::unique_ptr<Vesk2CrlInfoStruct, RecordFree>;
 
 }  // namespace
 
+// A list at any path; the store is asked by tag (Vesk2CrlFindA).
 int Vesk2CrlRead(Vesk2CrlInfoStruct** out, const char* path, Vesk2ContextStruct* context) {
   *out = nullptr;
   Ref<CrlSequence> sequence(TryNew<CrlSequence>(context));
@@ -81,6 +85,8 @@ int Vesk2CrlReadA(Vesk2CrlInfoStruct** out, const char* path, Vesk2ContextStruct
   return Vesk2CrlRead(out, name.get(), context);
 }
 
+// What the class hands out of a search without success is freed here: a C program gets a record or
+// nothing.
 int Vesk2CrlFindA(Vesk2CrlInfoStruct** out, const char* tagText, Vesk2ContextStruct* context) {
   *out = nullptr;
   Ref<SExpression> tag;
@@ -92,6 +98,7 @@ int Vesk2CrlFindA(Vesk2CrlInfoStruct** out, const char* tagText, Vesk2ContextStr
   return MakeRecord(out, std::move(found));
 }
 
+// Null is no error here, unlike a chain's: both are old promises.
 int Vesk2CrlFree(Vesk2CrlInfoStruct* record) {
   if (record == nullptr) return 0;
   if (record->crl != nullptr) record->crl->Free();
@@ -117,6 +124,7 @@ namespace {
   return 0;
 }
 
+// Compared as text, as callers write it, byte by byte.
 [[nodiscard]] int RequireTag(const Vesk2CrlInfoStruct& record, const char* tagText) {
   VESK2_REQUIRE(record.tag != nullptr, VESK2_ERR_AUTH_TAG_MISSING);
   VESK2_REQUIRE(std::strcmp(tagText, record.tag) == 0, VESK2_ERR_NOT_AUTHORIZED);
@@ -127,6 +135,8 @@ namespace {
 
 }  // namespace
 
+// The tag first, then the proof, then the period: who asks about another source hears that first.
+// Only two times ask about a period; a list without an end then counts as ended.
 int Vesk2CrlVerify(Vesk2CrlInfoStruct* record, const char* tagText, time_t from, time_t to) {
   VESK2_REQUIRE(record != nullptr, VESK2_ERR_PARAM_NULL);
   if (tagText != nullptr) VESK2_TRY(RequireTag(*record, tagText));
@@ -140,6 +150,7 @@ int Vesk2CrlVerify(Vesk2CrlInfoStruct* record, const char* tagText, time_t from,
   return 0;
 }
 
+// One wait for the list and the entries together (ZvCall).
 int Vesk2CrlVerifyFile(const char* path, const char* tagText, time_t from, time_t to,
                        Vesk2ContextStruct* context) {
   const ZVsysutil::ZvCall call;

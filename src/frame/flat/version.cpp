@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// Flat functions: the version and the texts of codes.
+// Flat functions: the version and the texts of codes. All texts are static: none needs to be freed,
+// and none changes.
 #include <vesk2/context.h>
 
 #include <cstring>
@@ -12,6 +13,7 @@ const char* Vesk2VersionExtraA(void) { return ZvVesk2::V2VersionExtraA(); }
 
 const char* Vesk2ErrorMessage(int code) { return ZvVesk2::V2Error(code); }
 
+// Never null, for programs that print it without a test.
 const char* Vesk2ErrorName(int code) {
   const char* const name = ZvVesk2::V2CodeName(code);
   return name != nullptr ? name : ZvVesk2::V2Error(code);
