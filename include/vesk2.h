@@ -494,15 +494,14 @@ VESK2_API int Vesk2VersionNumber(void);
 VESK2_API const char* Vesk2VersionExtra(void);
 VESK2_API const char* Vesk2VersionExtraA(void);
 /* Vesk2ErrorMessage returns the text of a code from 0 to 76, for any other (77 and the negative
- * ones included) "VESK_UNKNOWN_ERROR". Never null. These texts are for logs, and do not change. */
+ * ones included) "VESK_UNKNOWN_ERROR". Never null. These texts are for logs. */
 VESK2_API const char* Vesk2ErrorMessage(int code);
 /* Vesk2ErrorName returns the constant's name of a code of either table, such as
  * "SPKI_ERR_NO_MEM"; for a number that is none "VESK_UNKNOWN_ERROR". Never null. */
 VESK2_API const char* Vesk2ErrorName(int code);
 /* Vesk2ErrorWords says in words what a code of either table means: what a program shows to
- * people, the codes of the reduction included. A code without words gives its name. Never null.
- * The words of a code that has two meanings (see VerifyManifest) are those that hold for most
- * who ask. */
+ * people, the codes of the reduction included. A code without words, as one whose meaning
+ * depends on who answered it, gives its name. Never null. */
 VESK2_API const char* Vesk2ErrorWords(int code);
 
 /* Vesk2Escape returns a copy of `length` bytes that is safe to be shown, to be released with
@@ -612,8 +611,9 @@ VESK2_API void SetStoreUpdate(Manifest* manifest, int update);
  *   SPKI_ERR_*                     an entry or certificate that the reduction cannot read, or a
  *                                  spent budget
  * About the manifest file:
- *   VESK2_ERR_OPEN_MANIFEST_FILE  it cannot be opened or read, is over Limits::kMaxFile bytes,
- *                                 or was held by another process for the whole wait
+ *   VESK2_ERR_OPEN_MANIFEST_FILE  it cannot be opened or read, is over 256 MiB
+ *                                 (Limits::kMaxFile), or was held by another process for the
+ *                                 whole wait
  *   VESK2_ERR_MANIFEST_VERSION    its version is not 1
  *   VESK2_ERR_MANIFEST_TYPE       its type is not plain
  *   VESK2_ERR_TIME_STAMP          the time of signing, or one that was asked about, is none
@@ -649,7 +649,12 @@ VESK2_API void SetStoreUpdate(Manifest* manifest, int update);
  *     ACL entry, an issuer that no certificate is for, or the members of a k-of-n: remove such
  *     an entry. A list that is missing, cannot be read or does not verify is passed over, and
  *     with it every key that it revokes; so is a malformed entry, with the source of lists that
- *     it names. The command tells of files of the store that it could not use. */
+ *     it names. The command tells of files of the store that it could not use.
+ *   - A certificate or an entry without a tag, or whose tag has another keyword than "tag",
+ *     grants whatever is asked, and so does (tag) alone: look at what is installed and issued.
+ *     The command issues none without a tag.
+ *   - It writes: lists that the manifest carries and that verify go to the store
+ *     (SetStoreUpdate). */
 VESK2_VERDICT int VerifyManifest(Manifest* manifest, time_t notBefore, time_t notAfter);
 
 /* VerifyManifestExplained is VerifyManifest and tells why: *out receives the explanation, of a
@@ -695,9 +700,9 @@ VESK2_API FileItem* GetExtraEntries(Manifest* manifest);
  * certificates gives 0 and a null *out.
  *   VESK2_ERR_PARAM_NULL     `out` or `path` is null
  *   VESK2_ERR_INVALID_PARAM  the path is empty
- *   VESK2_ERR_FILE_OPEN      it cannot be opened, is no regular file, or is over
- *                            Limits::kMaxFile bytes
- *   VESK2_ERR_READ_FILE      another process held it for Limits::kMaxHeldWait
+ *   VESK2_ERR_FILE_OPEN      it cannot be opened, is no regular file, or is over 256 MiB
+ *                            (Limits::kMaxFile)
+ *   VESK2_ERR_READ_FILE      another process held it for a minute (Limits::kMaxHeldWait)
  *   VESK2_ERR_MEM_ALLOC      also: a path of over 4096 bytes
  *   VESK2_ERR_PARSE_FILE, VESK2_ERR_PRINCIPAL, VESK2_ERR_HASH_ID, VESK2_ERR_INVALID_HASH,
  *     VESK2_ERR_MAX_BYTE_STRING
@@ -741,7 +746,7 @@ VESK2_API int Vesk2CertFree(Vesk2CertInfoStruct* chain);
  *                                  cannot be read
  *   VESK2_ERR_NOT_AUTHORIZED       nothing is granted
  *   VESK2_ERR_PACKAGE_NOT_GRANTED  something is, but not the tag
- *   VESK2_ERR_MEM_ALLOC, VESK2_ERR_READ_FILE
+ *   VESK2_ERR_MEM_ALLOC, VESK2_ERR_READ_FILE, VESK2_ERR_FILE_OPEN
  *                                  as in VerifyManifest
  *   VESK2_ERR_TIME_STAMP           a time that has no text
  *   VESK2_ERR_UNEXPECTED_CHAR, VESK2_ERR_INVALID_S_EXPRESSION
@@ -790,7 +795,7 @@ VESK2_API FileItem* CertFindA(const char* directory);
  *   0                         whether any was kept or not
  *   VESK2_ERR_FILE_NOT_FOUND  no ACL entry, no such directory (null included)
  *   VESK2_ERR_CRL_NOT_FOUND   no list that can be read
- *   VESK2_ERR_READ_FILE       another process held a file for Limits::kMaxHeldWait
+ *   VESK2_ERR_READ_FILE       another process held a file for a minute (Limits::kMaxHeldWait)
  *   VESK2_ERR_MEM_ALLOC       memory or descriptors ran out
  * A list that ends when the stored one ends replaces it, so that an older one can be played
  * back; a stored one that begins in the future is replaced by any that has begun, even by one
@@ -807,7 +812,8 @@ VESK2_API int Vesk2ImportCrlsA(const char* directory);
  * Vesk2CrlFree. Nothing is verified. `out` must not be null; `context` may be, and must outlive
  * the record. *out is null after a failure.
  *   VESK2_ERR_FILE_NOT_FOUND           it cannot be opened, or its path is none (null included)
- *   VESK2_ERR_READ_FILE                another process held it for Limits::kMaxHeldWait
+ *   VESK2_ERR_READ_FILE                another process held it for a minute
+ *                                      (Limits::kMaxHeldWait)
  *   VESK2_ERR_MEM_ALLOC                memory or descriptors ran out
  *   VESK2_ERR_PARSE_FILE and the like  of the readers of its parts */
 VESK2_API int Vesk2CrlRead(Vesk2CrlInfoStruct** out, const char* path, Vesk2ContextStruct* context);

@@ -110,7 +110,7 @@ class VESK2_API AclEntry : public SExpression {
   //   0                              an entry contains the tag
   //   VESK2_ERR_AUTH_TAGS_ARE_EQUAL  a success that tells an exact match
   //   VESK2_ERR_ACL_ENTRY_NOT_FOUND  none does; an entry of the principal was seen
-  //   VESK2_ERR_ACL_KEY_NOT_FOUND    no entry of the principal was seen
+  //   VESK2_ERR_ACL_KEY_NOT_FOUND    no entry of the principal was seen, or none was given
   //   VESK2_ERR_PARAM_NULL           no tag; `k` is as it was
   //   VESK2_ERR_FIND_DIR             there is no store
   //   VESK2_ERR_READ_FILE, VESK2_ERR_MEM_ALLOC
@@ -156,13 +156,13 @@ class VESK2_API AclEntry : public SExpression {
   Subject* GetSubject() const;
   // Whether it may pass the grant on: without it a chain of one certificate leads nowhere.
   bool GetPropagate() const;
-  // With what. Any list that is not headed by "tag" is the widest grant. One whose last element is
-  // (revoke ...) is a source of revocation lists.
+  // With what. (tag) alone, and any list that is not headed by "tag", are the widest grant. One
+  // whose last element is (revoke ...) is a source of revocation lists.
   SExpression* GetTag() const;
   // The period; null where it is open. They are byte strings that nobody checked.
   TimeStamp* GetNotBefore() const;
   TimeStamp* GetNotAfter() const;
-  // A number of the writer's, 0 to 255 when it was read; nothing goes by it.
+  // A number of the writer's, 0 to 255; nothing goes by it.
   unsigned int GetGeneration() const;
   // Text of the writer, as it was written: see Wording::Escape.
   ByteString* GetComment() const;

@@ -105,7 +105,8 @@ class VESK2_API Cert : public SExpression {
   // Whether the subject may pass the grant on. For the second certificate of a manifest it makes no
   // difference.
   bool GetPropagate() const;
-  // What is granted. Null, and any list that is not headed by "tag", is the widest grant.
+  // What is granted. Null, (tag) alone, and any list that is not headed by "tag" are the widest
+  // grant.
   SExpression* GetTag() const;
   // The period; null where it is open. Of an imported certificate these are byte strings that
   // nobody checked, and compared as they are.
@@ -113,8 +114,8 @@ class VESK2_API Cert : public SExpression {
   TimeStamp* GetNotAfter() const;
   // Text of the issuer, as it was written: see Wording::Escape.
   ByteString* GetComment() const;
-  // What names the source of lists without which the certificate is undetermined; with none it
-  // cannot be revoked by a list, but its key can.
+  // What names the source of lists without which the certificate is undetermined. Without this
+  // element no list can name the certificate, only its key.
   SExpression* GetRevocationElement() const;
   // A RevocationStatus, as the last question left it. Evidence keeps one for each certificate of
   // its own.

@@ -46,8 +46,9 @@ namespace ZvVesk2::Verify {
 // caller to free, each null when the grant has none. An empty result is a success with all three
 // null: a null tag is a refusal. Of several grants, what is found last is returned, tag and dates
 // each for themselves, so that they may come from different grants, and a list named `not-before`
-// or `not-after` inside a tag is taken for a date. Ask ReductA about one tag and one moment in
-// order to decide. The outputs must be null and are null again after a failure.
+// or `not-after` inside a tag is taken for a date. Grants without a tag, which ReductA takes for
+// whatever is asked, are not told. Ask ReductA about one tag and one moment in order to decide. The
+// outputs must be null and are null again after a failure.
 //   0                         also when nothing is granted
 //   VESK2_ERR_INVALID_PARAM   a null argument other than `ctx`
 //   VESK2_ERR_PARAM_NOT_NULL  an output is not null
