@@ -28,6 +28,11 @@ namespace ZvVesk2 {
 
 // AclEntry is read or built whole, and does not change then. GetFileName is the path that it was
 // read from.
+//
+//   Ref<AclEntry> entry;
+//   int code = AclEntry::Create(entry.Out(), key, true, tag, nullptr, nullptr, 0, nullptr);
+//   if (code == 0) entry->SetStorageType(StorageGlobal);       key and tag are the entry's now
+//   if (code == 0) code = entry->Export("vendor");             GLOBAL/acl/vendor.acl
 class VESK2_API AclEntry : public SExpression {
  public:
   // An empty entry, for Import. A program that makes one of parts uses Create.

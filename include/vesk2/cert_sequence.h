@@ -72,6 +72,16 @@ class VESK2_API CertSequence : public SExpression {
   // one, for GetNextPair or zv_buffer_free. `buffer`, `cert` and `signature` must be null and
   // `name` given (VESK2_ERR_INVALID_PARAM); `extra` is overwritten. After a failure `buffer` is
   // freed and null; outputs that were set by then are the caller's. Codes as in Import.
+  //
+  //   int code = CertSequence::GetFirstPair(buffer, cert, signature, extra, name, true, nullptr);
+  //   while (code == 0 && cert != nullptr) {
+  //     const Ref<Cert> held(cert);                 each of the three is to be freed
+  //     const Ref<Signature> heldToo(signature);
+  //     const Ref<SExpression> heldAsWell(extra);
+  //     Use(*cert);
+  //     code = CertSequence::GetNextPair(buffer, cert, signature, extra, nullptr);
+  //   }
+  //   zv_buffer_free(buffer);
   [[nodiscard]] static int GetFirstPair(ZvBuffer*& buffer, Cert*& cert, Signature*& signature,
                                         SExpression*& extra, const char* name, bool usePath,
                                         Vesk2ContextStruct* ctx);

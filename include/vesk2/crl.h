@@ -32,7 +32,16 @@ namespace ZvVesk2 {
 
 class Hash;
 
-// Crl is the list alone: what is revoked, without anybody who says so.
+// Crl is the list alone: what is revoked, without anybody who says so. A program makes one, has a
+// certificate for its hash issued and signed by who holds the source's key, and puts the three
+// together:
+//
+//   Ref<Crl> list;
+//   int code = Crl::Create(list.Out(), nullptr);
+//   if (code == 0) code = list->RevokeAllOf(previous);             nothing is let go
+//   if (code == 0) code = list->RevokeKey(digestOfKey, now);
+//   ...                                                            a Cert for the Hash of `list`
+//   if (code == 0) code = CrlSequence::Create(out, list.get(), cert, signature, nullptr);
 class VESK2_API Crl : public SExpression {
  public:
   // An empty object, for Import. A program that makes a list uses Create.
@@ -55,9 +64,9 @@ class VESK2_API Crl : public SExpression {
   // Create makes a list that revokes nothing yet, for the caller to free; `out` must be null.
   // RevokeCertificate and RevokeKey add (item <digest> <date>) to list1 and list2, sharing both:
   // the digest of the certificate as it stands in its file, of the key without display hints, by
-  // any algorithm of Hash. `from` is required for a key, too, which it does not spare before that
-  // date. A list that was verified counts as unverified again. VESK2_ERR_INVALID_PARAM (also: a
-  // digest that is not complete), VESK2_ERR_MEM_ALLOC.
+  // any algorithm of Hash. `from` is required for a key, too, though a revoked key is revoked
+  // whatever the date. A list that was verified counts as unverified again. VESK2_ERR_INVALID_PARAM
+  // (also: a digest that is not complete), VESK2_ERR_MEM_ALLOC.
   [[nodiscard]] static int Create(Crl*& out, Vesk2ContextStruct* context);
   [[nodiscard]] int RevokeCertificate(Hash* digest, TimeStamp* from);
   [[nodiscard]] int RevokeKey(Hash* digest, TimeStamp* from);

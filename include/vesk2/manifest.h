@@ -41,6 +41,13 @@ class Findings;
 // on each thread that it lends, on all at the same time, and returns when all these calls have
 // returned; it must not let an exception out. Where it lends none, the verification does all alone.
 // `user` is handed to `run`, and both must stay valid as long as they are set.
+//
+//   void LendOne(void*, void (*task)(void*), void* work) {
+//     std::thread lent(task, work);            and catch what this throws
+//     lent.join();
+//   }
+//   const Vesk2TaskRunner runner = {nullptr, LendOne};
+//   manifest.SetTaskRunner(&runner);           two threads: the caller's takes part afterwards
 struct Vesk2TaskRunner {
   void* user = nullptr;
   void (*run)(void* user, void (*task)(void* work), void* work) = nullptr;
@@ -91,14 +98,15 @@ class VESK2_API Manifest {
   // that something is listed. Below it, unlisted entries are VESK2_ERR_EXTRA_FILES here whatever
   // SetFailOnExtraEntries says. Links are followed. The command refuses unlisted entries in the top
   // directory, too, but for the manifest itself.
-  //   0  everything listed is there, and as listed
+  //   0                     everything listed is there, and as listed
   //   VESK2_ERR_HASH_MISMATCH, VESK2_ERR_FILE_NOT_FOUND, VESK2_ERR_EXTRA_FILES
-  //      the worst that was found, in this order
+  //                         the worst that was found, in this order
   //   VESK2_ERR_PARSE_FILE, VESK2_ERR_RANDOM_TOKEN, VESK2_ERR_UNKNOWN_HASH_ID,
   //     VESK2_ERR_MAX_BYTE_STRING
-  //      the body cannot be read: see BodyDirectory::ParseBody
+  //                         the body cannot be read: see BodyDirectory::ParseBody
   //   VESK2_ERR_USER_INTERRUPT, VESK2_ERR_MEM_ALLOC
-  //      ended by a callback; memory or descriptors ran out. The lists are as they were
+  //                         ended by a callback; memory or descriptors ran out. The lists are as
+  //                         they were
   [[nodiscard]] int Verify(ZvBuffer* body, const char* directory);
   // The same of two bodies: what the first lists alone is missing, what the second lists alone is
   // extra. Names in the results are relative to the bodies' root.

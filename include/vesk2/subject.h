@@ -118,6 +118,14 @@ class VESK2_API Name : public Subject {
 // byte each, so at most 255; no relation between them is required here. The reduction refuses k = 0
 // and k > n, and one such object in a store stops every reduction.
 //
+//   Ref<ThresholdSubject> two(new ThresholdSubject(nullptr));
+//   int code = two->Set(2, 3);                           any two of three
+//   for (PublicKey* key : keys) {
+//     Ref<PublicKey> member = Ref<PublicKey>::Share(key);
+//     if (code == 0) code = two->Insert(member.get());
+//     if (code == 0) (void)member.Release();             the list's now
+//   }
+//
 // A member whose key is revoked still counts towards k: only subjects of certificates are looked up
 // in revocation lists, so a member is never asked about. Replace the entry by one without that key.
 // The command does no better, but its advice never makes a threshold smaller.

@@ -13,6 +13,9 @@ namespace ZvVesk2 {
 
 // TimeStamp is a byte string with the arithmetic of moments. Times are those of the proleptic
 // Gregorian calendar without leap seconds; the time zone of the process plays no part.
+//
+//   Ref<TimeStamp> end(new TimeStamp(nullptr));
+//   const int code = end->Set("2026-06", true);          2026-06-30_23:59:59
 class VESK2_API TimeStamp : public ByteString {
  public:
   // A stamp of no moment, for Set or Import.

@@ -2,10 +2,13 @@
 // wording.h: what people are told about objects: texts that are safe for a terminal, whoever wrote
 // the object. This library's own explanations use them too.
 //
-// Each returns a new text, to be released with Vesk2Free, or null when memory runs out or, for an
-// object, when it is nested too deeply to be written. Arguments are borrowed, and not null unless
-// that is said. A text is safe for a terminal, not for a shell: quote it last. It is for people;
-// programs compare objects.
+//   const std::unique_ptr<char[]> text(Wording::OfTag(cert->GetTag()));
+//   if (text != nullptr) std::printf("grants %s\n", text.get());
+//
+// Each returns a new text, to be released with Vesk2Free (an array from new[]), or null when memory
+// runs out or, for an object, when it is nested too deeply to be written. Arguments are borrowed,
+// and not null unless that is said. A text is safe for a terminal, not for a shell: quote it last.
+// It is for people; programs compare objects.
 #ifndef VESK2_WORDING_H
 #define VESK2_WORDING_H
 
