@@ -49,8 +49,10 @@ class ReadString {
   std::string_view Text() const { return text_; }
 
  private:
-  // "<digits>:<bytes>" Takes exactly what ByteString::Import takes without a hint. What it does not
-  // take is left to that one, untouched, for the code that it gives.
+  // "<digits>:<bytes>"
+  //
+  // Takes exactly what ByteString::Import takes without a hint. What it does not take is left to
+  // that one, untouched, for the code that it gives.
   bool ReadInPlace(ZvBuffer& buffer) {
     const unsigned char* const bytes = buffer.Data();
     const size_t left = buffer.Remaining();

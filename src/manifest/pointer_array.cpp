@@ -28,8 +28,8 @@ PointerArray<T>::~PointerArray() {
   clear();
 }
 
-template <typename T>
 // The element is the caller's until there is room for it.
+template <typename T>
 int PointerArray<T>::push(T* element) {
   if (count == slots) {
     if (slots > UINT32_MAX / 2) return 0;
@@ -45,8 +45,8 @@ int PointerArray<T>::push(T* element) {
   return 1;
 }
 
-template <typename T>
 // The three ways of one old function: look, take, go on. Past the end nothing moves.
+template <typename T>
 T* PointerArray<T>::get(int mode) {
   if (mode > 0) ++cursor;
   T* const element = at(cursor);
@@ -80,8 +80,8 @@ uint32_t PointerArray<T>::GetCount() const {
   return count;
 }
 
-template <typename T>
 // What callers have always been told, whatever the memory beneath does.
+template <typename T>
 uint32_t PointerArray<T>::GetCapacity() const {
   return (count + 31) / 32 * 32;
 }
@@ -91,14 +91,14 @@ uint32_t PointerArray<T>::GetCursor() const {
   return cursor;
 }
 
-template <typename T>
 // Stable: a name that is listed twice keeps the order of its listings.
+template <typename T>
 void PointerArray<T>::sort(int (*compare)(const void*, const void*)) {
   if (count != 0) ZVsysutil::zv_sort(items, count, sizeof(T*), compare);
 }
 
-template <typename T>
 // Names are arrays whatever the flag says: delete of one would be wrong.
+template <typename T>
 void PointerArray<T>::clear() {
   for (uint32_t i = 0; i < count; ++i) {
     if (ownsArrays || std::is_same_v<T, char>) {

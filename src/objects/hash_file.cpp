@@ -67,9 +67,9 @@ void ReadAndFeed(unsigned char* __restrict to, const unsigned char* __restrict f
 
 }  // namespace
 
-template <typename Watch>
 // It ends with the file, which yields no more bytes than it held when it was opened (file.h): one
 // that grows as fast as it is read ends it as well.
+template <typename Watch>
 int FileDigester::Feed(Watch watch) {
   unsigned char* const bytes = buffer_.get();
   ZVsysutil::ZvReader reader(file_.get());

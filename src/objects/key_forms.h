@@ -52,8 +52,8 @@ struct DsaForm {
 };
 
 // A record whose numbers are wiped when it goes.
-template <typename Form>
 // Numbers of public keys are no secret; they are freed with the record on every path.
+template <typename Form>
 class KeyRecord {
  public:
   KeyRecord() = default;

@@ -12,8 +12,8 @@
 namespace ZvVesk2 {
 namespace {
 
-template <typename T, typename Base>
 // `out` is set when the object is whole: no caller sees a subject that is half read.
+template <typename T, typename Base>
 [[nodiscard]] int ImportAs(Base*& out, ZvBuffer* buffer, Vesk2ContextStruct* context) {
   Ref<T> made;
   VESK2_TRY(ImportNew(made, buffer, context));
@@ -22,8 +22,8 @@ template <typename T, typename Base>
 }
 
 // "(1" begins "(10:public-key", "(4" begins "(4:hash".
-template <typename Base>
 // "(4:name" begins like a hash, and fails as one: names are not read.
+template <typename Base>
 [[nodiscard]] int ImportPrincipal(Base*& out, ZvBuffer* buffer, Vesk2ContextStruct* context) {
   if (buffer->LooksAt("(1")) return ImportAs<PublicKey>(out, buffer, context);
   if (buffer->LooksAt("(4")) return ImportAs<Hash>(out, buffer, context);

@@ -39,9 +39,9 @@ constexpr std::array<Field, 5> kFields{{
 }};
 
 // The value of `count` characters, taken as digits without a test.
-template <typename Char>
 // What is no digit gives a number that is none of a date; who reads a stamp from people compares
 // the text that comes back.
+template <typename Char>
 [[nodiscard]] int Digits(const Char* text, size_t count) {
   int value = 0;
   for (size_t i = 0; i < count; ++i) value = value * 10 + (text[i] - '0');

@@ -45,11 +45,10 @@ struct AclEntry::Parts {
 
 namespace {
 
-// [OPENING BYTES ")"], OPENING being for instance "(7:comment"; null when it is not there.
-template <typename Atom>
 // [OPENING BYTES ")"], OPENING being for instance "(7:comment"; null when it is not there. Looked
 // for at its place only: an element out of order is an error, as the next required text is not
 // found, and never passed over. A period that was passed over would be none.
+template <typename Atom>
 [[nodiscard]] int ImportOptional(Ref<Atom>& out, const char* opening, ZvBuffer* buffer,
                                  Vesk2ContextStruct* ctx) {
   if (!buffer->Accept(opening)) return 0;

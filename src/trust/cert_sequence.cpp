@@ -65,8 +65,10 @@ struct Triple {
 
 }  // namespace
 
-// (8:sequence (CERT SIGNATURE EXPRESSION)...) A sequence without triples is one: what needs a
-// certificate says so itself. Bytes after the last ")" are nobody's, and left.
+// (8:sequence (CERT SIGNATURE EXPRESSION)...)
+//
+// A sequence without triples is one: what needs a certificate says so itself. Bytes after the last
+// ")" are nobody's, and left.
 int CertSequence::Import(CertSequence*& out, ZvBuffer* buffer, Vesk2ContextStruct* ctx) {
   VESK2_REQUIRE(out == nullptr && buffer != nullptr, VESK2_ERR_INVALID_PARAM);
   VESK2_TRY(buffer->Expect(kOpening));

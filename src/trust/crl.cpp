@@ -20,8 +20,10 @@ Crl::~Crl() {
 
 namespace {
 
-// (4:item HASH STAMP) The date is any byte string: what is no full stamp revokes from ever on
-// (item_index.h), as a list must not lose an item by a misprint.
+// (4:item HASH STAMP)
+//
+// The date is any byte string: what is no full stamp revokes always (item_index.h), as a list must
+// not lose an item by a misprint.
 [[nodiscard]] int ImportItem(SExpression* list, ZvBuffer* buffer) {
   VESK2_TRY(buffer->Expect("(4:item"));
   Ref<Hash> hash;
@@ -36,8 +38,10 @@ namespace {
   return buffer->Expect(")");
 }
 
-// (5:list1 ITEM...), or list2, as `opening` says. Both lists must be there, in this order, empty or
-// not: a list that ends early would revoke less than was signed.
+// (5:list1 ITEM...), or list2, as `opening` says.
+//
+// Both lists must be there, in this order, empty or not: one that was left out would revoke less
+// than its issuer meant.
 [[nodiscard]] int ImportItems(SExpression*& out, const char* opening, const char* keyword,
                               ZvBuffer* buffer, Vesk2ContextStruct* ctx) {
   VESK2_TRY(buffer->Expect(opening));
@@ -51,8 +55,9 @@ namespace {
 
 }  // namespace
 
-// (3:crl(7:version1:1)(5:list1 ITEM...)(5:list2 ITEM...)) Another version is refused at its text:
-// what it would mean nobody knows.
+// (3:crl(7:version1:1)(5:list1 ITEM...)(5:list2 ITEM...))
+//
+// Another version is refused at its text: what it would mean nobody knows.
 int Crl::Import(ZvBuffer* buffer) {
   VESK2_REQUIRE(buffer != nullptr && First() == nullptr, VESK2_ERR_INVALID_PARAM);
   VESK2_REQUIRE(list1 == nullptr && list2 == nullptr, VESK2_ERR_INVALID_PARAM);

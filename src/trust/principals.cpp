@@ -85,8 +85,8 @@ int Principals::Find(std::span<const Mark>& marks, DExpression* key) const {
   return 0;
 }
 
-template <typename Matches>
 // A k-of-n is as good as its best member, for the question whether it has to do with the chain.
+template <typename Matches>
 int Principals::Any(bool& any, Subject* subject, Matches matches) const {
   any = false;
   std::span<const Mark> marks;
