@@ -10,6 +10,7 @@
 namespace ZvVesk2 {
 namespace {
 
+// Both tables are expanded from vesk2.h, so that a code has one place where it is made.
 struct Row {
   int code;
   const char* text;

@@ -34,6 +34,7 @@ using BufferOwner = std::unique_ptr<ZvBuffer, BufferFree>;
   return WrapFile(out, ZVsysutil::ZvPlace{ZVsysutil::kZvNoDirectory, path}, failure);
 }
 
+// The handle is kept, as freeing asks for it as well.
 struct HashFree {
   uint32_t handle;  // the context's cryptoHandle
   void operator()(ZVCLMHashContextData* hash) const { zvclm_HashFree(hash, handle); }

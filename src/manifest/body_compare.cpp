@@ -56,6 +56,7 @@ int BodyComparison::Files(BodyDirectory& a, BodyDirectory& b, StatusSet& statuse
     // The smaller name is the one that the other side does not have.
     const int order = Order(fileA, fileB);
     const char* const name = order <= 0 ? fileA->GetName() : fileB->GetName();
+    // Alone in the reference: missing. Alone in the other: extra.
     uint32_t status = order < 0 ? BodyObject::Missing : BodyObject::Extra;
     if (order == 0) {
       const bool same = static_cast<const BodyFile*>(fileA)->Equal(fileB);

@@ -37,7 +37,8 @@ struct OpenDirectory {
   unsigned users = 1;  // the walk, and files that are being hashed
 };
 
-// Where to look up a path that lies below `open`, or anywhere if that is null.
+// Where to look up a path that lies below `open`, or anywhere if that is null. It is borrowed from
+// both.
 ZVsysutil::ZvPlace PlaceOf(const OpenDirectory* open, const char* path);
 
 // What was found in one listed directory.
@@ -91,11 +92,14 @@ class DiskWalk {
 
   BodyDirectory& root_;
   const uint32_t chunkSize_;
+  // The root has been entered.
   bool begun_ = false;
   DirectoryFound* first_ = nullptr;
   DirectoryFound* last_ = nullptr;  // whose files are handed out
   OpenDirectory* open_ = nullptr;   // that directory
+  // The first file of `last_` that was not handed out.
   uint32_t nextFile_ = 0;
+  // The directory whose subdirectories are visited now; those above hang behind it.
   Level* top_ = nullptr;
 };
 

@@ -52,6 +52,7 @@ int Findings::Add(std::unique_ptr<char[]> name, bool isDirectory, uint32_t statu
   made->isDirectory = isDirectory ? 1 : 0;
   if (reason != 0) VESK2_TRY(AddReason(made.get(), reason));
   List& list = ListOf(status);
+  // The first finding stays the last of the list.
   if (list.last == nullptr) list.last = made.get();
   made->next = list.items.release();
   list.items = std::move(made);
@@ -87,7 +88,8 @@ namespace {
 
 // Earlier records stay, behind the new ones: Verify and Compare add to what is there.
 int Manifest::Publish(Findings& findings) {
-  // All is made before anything is handed over: the lists change whole or not at all.
+  // All is made before anything is handed over: the lists change whole or not at all. Both sets
+  // together, sorted anew: records of earlier calls are still asked about.
   const uint32_t size = reasonCount + findings.reasonCount_;
   std::unique_ptr<Reason[]> merged(TryNewArray<Reason>(size));
   VESK2_REQUIRE(merged, VESK2_ERR_MEM_ALLOC);

@@ -144,7 +144,8 @@ int Manifest::VerifyManifest(long notBefore, long notAfter) {
   ClearResults();
   BufferOwner body;
   VESK2_TRY(ReadBody(*this, true, notBefore, notAfter, body));
-  // From here on the position tells how far the body made sense; it lies before the final ")".
+  // From here on the position tells how far the body made sense; it lies before the final ")". The
+  // body's own position counts from its first byte; people are told the byte of the file.
   const size_t bodyStart = readPosition - 1 - body->Remaining();
   std::unique_ptr<BodyDirectory> root;
   int code = ParseListing(root, body.get(), directory.get());
@@ -196,6 +197,7 @@ TimeStamp* Manifest::GetSigningTime() const { return signingTime.get(); }
 size_t Manifest::GetReadPosition() const { return readPosition; }
 size_t Manifest::CountListedFiles() const { return listedFiles; }
 BodyDirectory* Manifest::GetListing() const { return listing.get(); }
+// A setting that is made takes back the trouble of one that was lost.
 void Manifest::SetExtraAclDirectory(char* owned) {
   extraAclDirectory.reset(owned);
   lostSetting = false;

@@ -34,6 +34,7 @@ class ManifestReader {
   [[nodiscard]] int ReadFile(ZvBuffer** body);
   // Refuse returns `code`, which ends the reading, or keeps it as the answer and returns 0.
   [[nodiscard]] int Refuse(int code);
+  // One for each part of the form, in its order; what each matches is written above its body.
   [[nodiscard]] int ReadHead();
   [[nodiscard]] int ReadVersion();
   [[nodiscard]] int ReadType();
@@ -42,11 +43,13 @@ class ManifestReader {
   [[nodiscard]] int ReadSigner();
   [[nodiscard]] int ReadSignature(Cert& cert);
   [[nodiscard]] int ReadRevocationLists(SExpression& lists);
+  // And what authority is asked of, in the order in which a failure is told.
   [[nodiscard]] int SetPeriod();
   [[nodiscard]] int LoadEntries();
   [[nodiscard]] int LoadLists(SExpression* carried);
   [[nodiscard]] int ProveAuthority(SExpression& carried);
   [[nodiscard]] int AskAuthority(SExpression* carried);
+  // The content: whether it is the one that was signed, and for evidence whether it is whole.
   [[nodiscard]] int ProveBody(ZvBuffer** body);
   [[nodiscard]] int InspectBody(const unsigned char* bytes, size_t length, int contentCode);
   [[nodiscard]] int CheckDigest(const unsigned char* body, size_t length);

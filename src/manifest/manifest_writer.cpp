@@ -65,7 +65,8 @@ class GrowingText {
   size_t capacity_ = 0;
 };
 
-// What an entry takes beside its name: its opening, lengths and a digest.
+// What an entry takes beside its name: its opening, lengths and a digest, and the parenthesis
+// behind it.
 constexpr size_t kEntryRoom = 96;
 
 }  // namespace
@@ -189,6 +190,7 @@ int ManifestWriter::AddCertificate(Cert* cert, Signature* signature) {
   VESK2_REQUIRE(parts_ != nullptr, VESK2_ERR_MEM_ALLOC);
   VESK2_REQUIRE(cert != nullptr && signature != nullptr, VESK2_ERR_INVALID_PARAM);
   Ref<SExpression>& certs = parts_->certs;
+  // Made with the first; a manifest without lists has none to free.
   if (!certs) certs.Reset(TryNew<SExpression>(parts_->context));
   Ref<SExpression> pair(TryNew<SExpression>(parts_->context));
   VESK2_REQUIRE(certs && pair, VESK2_ERR_MEM_ALLOC);
@@ -208,6 +210,7 @@ int ManifestWriter::AddList(CrlSequence* list) {
 
 namespace {
 
+// A short write is an error here, and not a shorter manifest.
 [[nodiscard]] int Print(FILE* stream, std::string_view text) {
   const bool written = ZVsysutil::zv_write(stream, text.data(), text.size()) == text.size();
   return written ? 0 : VESK2_ERR_WRITE_FILE;

@@ -76,6 +76,7 @@ int Hash::Update(DExpression* expression) {
   return expression->UpdateHash(hashContext, false);
 }
 
+// Before Init there is no context, which the layer below refuses.
 int Hash::Update(const unsigned char* data, unsigned int length) {
   return zvclm_HashUpdate(hashContext, data, length, CryptoHandle());
 }

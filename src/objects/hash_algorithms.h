@@ -31,6 +31,7 @@ inline const HashAlgorithm* FindHashAlgorithm(ZvclmHashID id) {
   }
   return nullptr;
 }
+// The whole name: "sha" is none.
 inline const HashAlgorithm* FindHashAlgorithm(std::string_view name) {
   for (const HashAlgorithm& algorithm : kHashAlgorithms) {
     if (name == algorithm.name) return &algorithm;

@@ -12,6 +12,7 @@
 namespace ZvVesk2 {
 
 template <typename Record>
+// A number by its name in expressions and its place in records.
 struct KeyNumber {
   const char* name;
   ZVCLMBigInt* Record::*field;
@@ -42,6 +43,7 @@ struct DsaForm {
   static constexpr std::array<KeyNumber<Record>, 4> kNumbers{
       {{"p", &Record::p}, {"g", &Record::g}, {"q", &Record::q}, {"y", &Record::y}}};
   static constexpr ZVCLMBigInt* Record::*kLength = &Record::p;
+  // The mark that the record of this kind has.
   static constexpr uint32_t kParameterSize = 48;
   [[nodiscard]] static int Init(Record* record) {
     return zvclm_DSSKeyStructInit(kDataId, record, kParameterSize);

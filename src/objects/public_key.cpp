@@ -123,6 +123,7 @@ int PublicKey::ImportNumbers(ZvBuffer* buffer) {
         zvclm_BigIntFromBuffer(&record.Number(number), text->GetData(), text->GetLength())));
     VESK2_TRY(AppendPair(numbers, number.name, std::move(text)));
   }
+  // Set with the last number: a key that is half read has no length.
   keyLength = length;
   return InOwnWords(
       zvclm_PublicKeyDefine(&key, Form::kType, Form::kDataId, record.get(), 0, CryptoHandle()));
@@ -134,6 +135,7 @@ ZVCLMPublicKeyData* PublicKey::GetKey() const { return key; }
 template <typename Form>
 int PublicKey::SetNumbers(ZVCLMPublicKeyData* newKey) {
   VESK2_REQUIRE(newKey != nullptr && IsEmpty(), VESK2_ERR_INVALID_PARAM);
+  // From here on it is this object's, also when the rest fails.
   key = newKey;
   KeyRecord<Form> record;
   VESK2_TRY(record.Init());

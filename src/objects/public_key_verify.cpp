@@ -34,6 +34,8 @@ bool Matches(const ByteString* name, std::string_view known) {
   return known.starts_with(std::string_view(bytes, name->GetLength()));
 }
 
+// With its length: it was made by the algorithm that was asked for, and no digest is compared with
+// one of another length.
 struct Digest {
   std::unique_ptr<unsigned char[]> bytes;
   unsigned int length = 0;
@@ -53,7 +55,8 @@ struct Digest {
   return 0;
 }
 
-// One signature check, as its verdict.
+// One signature check, as its verdict. "Not valid" is an answer of the layer below and a code of
+// this one.
 struct Check {
   const ZVCLMPublicKeyData* key;
   int scheme;
@@ -93,6 +96,7 @@ int PublicKey::VerifyRSA(ByteString* algorithm, ByteString* signatureValue, Hash
   VESK2_REQUIRE(algorithm != nullptr && signatureValue != nullptr && hash != nullptr &&
                     signedObject != nullptr,
                 VESK2_ERR_INVALID_PARAM);
+  // Both names begin alike, so that "rsa" is both.
   const bool pss = Matches(algorithm, "rsa-pss");
   VESK2_REQUIRE(pss || Matches(algorithm, "rsa-1.5"), VESK2_ERR_SIGNATURE_ID);
   const ZvclmHashID id = hash->GetAlgorithm();

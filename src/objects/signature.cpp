@@ -77,6 +77,7 @@ int Signature::AppendValue(Ref<ByteString> newAlgorithm, Ref<ByteString> newValu
 // that one. Compared by the canonical form, so that a hash of the issuer's key is not the issuer.
 int Signature::Verify(Cert* cert) {
   VESK2_REQUIRE(cert != nullptr, VESK2_ERR_PARAM_NULL);
+  // Comparing can fail (a principal nested too deeply), which is no verdict.
   bool own = false;
   VESK2_TRY(CompareValues(own, cert->GetIssuer(), principal));
   VESK2_REQUIRE(own, VESK2_ERR_SIGNATURE);

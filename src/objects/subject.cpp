@@ -32,6 +32,7 @@ template <typename Base>
 
 }  // namespace
 
+// A key's file is a path; no subject has a store.
 Subject::Subject(Vesk2ContextStruct* ctx) : SExpression(ctx) { SetStorageType(StoragePath); }
 
 Subject::~Subject() = default;

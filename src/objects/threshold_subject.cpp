@@ -11,6 +11,7 @@ namespace {
 // The elements before the members: keyword, k and n.
 constexpr int kHeadElements = 3;
 
+// Fewer elements mean no members: a list that was never filled.
 SExpression::Iterator Members(const SExpression& list) {
   SExpression::Iterator element = list.Begin();
   for (int i = 0; i < kHeadElements && element; ++i) element.Next();

@@ -167,6 +167,8 @@ bool TimeStamp::IsAfter(const TimeStamp* other) const {
   return other != nullptr && Compare(*this, *other) > 0;
 }
 
+// The comparison is written four times and not turned round: with a missing stamp "not before"
+// would be "after".
 bool TimeStamp::IsAfterOrEqual(const TimeStamp* other) const {
   return other != nullptr && Compare(*this, *other) >= 0;
 }

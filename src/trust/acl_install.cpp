@@ -71,6 +71,7 @@ using StoredTags = TagIndex<Nothing>;
   VESK2_REQUIRE(name, VESK2_ERR_MEM_ALLOC);
   entry->SetStorageType(StorageGlobal);
   VESK2_TRY(entry->SetFileName(name.get()));
+  // A name that is taken, by whatever it is, keeps the entry out.
   struct stat there {};
   const int code = ZVsysutil::zv_stat(entry->GetFileName(), &there);
   VESK2_REQUIRE(code == VESK2_ERR_STAT_FILE, code);

@@ -38,6 +38,7 @@ int RevocationLists::Mark(Decision& decision, Cert* cert, const TimeStamp* notBe
     cert->revocationStatus = Cert::KeyRevoked;
     return 0;
   }
+  // An answer that failed leaves the certificate undetermined.
   VESK2_TRY(key);
 
   // A certificate that names no source cannot be revoked itself, and one that does is lost without

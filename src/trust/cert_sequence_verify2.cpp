@@ -126,6 +126,7 @@ int CertSequence::VerifyChain2(SExpression* goodCerts, SExpression*& tag, SExpre
   Ref<SExpression> acls;
   // Loaded anew: the lists may have been made long before.
   VESK2_TRY(LoadRoots(acls, GetContext()));
+  // Nobody is asked about when no certificate is left.
   auto* const leaf = dynamic_cast<Cert*>(goodCerts->First());
   VESK2_REQUIRE(leaf != nullptr, VESK2_ERR_INVALID_SEQUENCE);
   Ref<SExpression> chain;

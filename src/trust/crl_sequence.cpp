@@ -165,6 +165,7 @@ int CrlSequence::VerifySelf(SExpression* aclEntries) {
   VESK2_TRY(VerifyHash(crl, cert->GetSubject()));
   VESK2_TRY(signature->Verify(cert));
 
+  // Proved again: the reference of the earlier proof goes.
   if (crl->issuerTag != nullptr) crl->issuerTag->Free();
   crl->issuerTag = Ref<SExpression>::Share(cert->GetTag()).Release();
   return 0;

@@ -25,6 +25,7 @@ void Evidence::Clear(Kind newKind) {
   }
   subject.Reset();
   for (Ref<TimeStamp>* stamp : {&signingTime, &first, &last, &revocationTime}) stamp->Reset();
+  // 0 is "as it should be": what was not looked at is no reproach.
   SetContent(0, 0, 0);
   work = 0;
 }
@@ -123,6 +124,7 @@ void Evidence::RemoveCerts() {
   count = capacity = 0;
 }
 
+// The others move up, with what was found about them.
 void Evidence::RemoveCert(size_t index) {
   if (!subject) subject = Ref<Subject>::Share(AskedSubject());
   std::move(links.get() + index + 1, links.get() + count, links.get() + index);
@@ -131,6 +133,7 @@ void Evidence::RemoveCert(size_t index) {
 
 void Evidence::SetEntries(SExpression* acl) { entries = Ref<SExpression>::Share(acl); }
 void Evidence::SetGrantingEntries(SExpression* acl) { granting = Ref<SExpression>::Share(acl); }
+// The statuses stay as they were until somebody asks again: MarkRevoked.
 void Evidence::SetLists(SExpression* stored, SExpression* carried) {
   storedLists = Ref<SExpression>::Share(stored);
   carriedLists = Ref<SExpression>::Share(carried);
@@ -176,6 +179,7 @@ int Evidence::GetContentCode() const { return contentCode; }
 int Evidence::GetListingCode() const { return listingCode; }
 size_t Evidence::GetListingPosition() const { return listingPosition; }
 uint64_t Evidence::GetWork() const { return work; }
+// Only with both ends open. One end alone is a period, as programs mean it.
 bool Evidence::AskedAboutSigning() const { return kind == SignedManifest && !first && !last; }
 
 }  // namespace ZvVesk2

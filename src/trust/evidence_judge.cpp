@@ -41,6 +41,7 @@ constexpr size_t kIssuersPlace = 1;
 
 }  // namespace
 
+// A subject that was set stands, whatever certificates come and go: the question is about somebody.
 Subject* Evidence::AskedSubject() const {
   if (subject) return subject.get();
   return count > 0 ? GetCert(0)->GetSubject() : nullptr;
@@ -65,6 +66,7 @@ int Evidence::MarkRevoked() {
     const int code = revocations.Mark(decision, link.cert.get(), GetRevocationFirst());
     VESK2_REQUIRE(!LacksMemory(code), VESK2_ERR_MEM_ALLOC);
     link.status = link.cert->GetRevocationStatus();
+    // Told by the explanation, and by the moment that it ends, since then the answer does.
     link.list = Ref<CrlSequence>::Share(decision.list);
     link.since = Ref<TimeStamp>::Share(decision.since);
     // An assumed list only ever fills a gap: what is revoked stays revoked.
@@ -96,6 +98,8 @@ int Evidence::CheckRevoked() const {
   // Without its signer the chain would be another one, about nothing that was signed. The others
   // are left out, and what is then the second must be the signer's own.
   VESK2_TRY(count > 0 ? CodeOfStatus(links[0].status) : VESK2_ERR_SIGNING_CERT_ORDER);
+  // Whichever comes first of those that are left: a revoked one before it is as if it were not
+  // there.
   size_t second = 1;
   while (second < count && links[second].status != Cert::NotRevoked) ++second;
   VESK2_REQUIRE(second < count, VESK2_ERR_SIGNING_CERT_ORDER);
@@ -129,7 +133,8 @@ int Evidence::AppendLink(SExpression* chain, size_t index, size_t place) const {
 }
 
 // (valid <stamp>) for the moment of signing, else (valid [(not-before <stamp>)] [(not-after
-// <stamp>)]); null for a chain and no period.
+// <stamp>)]); null for a chain and no period. The bare stamp asks for one moment that must lie in
+// every period.
 int Evidence::MakePeriod(Ref<SExpression>& out) const {
   if (kind == Chain && !first && !last) return 0;
   Ref<SExpression> valid;
@@ -158,6 +163,7 @@ int Evidence::Reduce(SExpression* tag) {
   return code;
 }
 
+// Revocation before the reduction, which knows nothing of it.
 int Evidence::Prove(SExpression* tag) {
   VESK2_TRY(CheckRevoked());
   return Reduce(tag);

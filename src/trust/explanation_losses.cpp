@@ -172,6 +172,7 @@ int ExplanationLosses::Link(size_t index) {
   const Cert* const cert = evidence_.GetCert(index);
   bool leads = false;
   VESK2_TRY(state_.principals.NamesOtherIssuer(leads, cert->GetSubject(), index));
+  // It leads somewhere and may: nothing is lost here.
   if (leads && cert->GetPropagate()) return 0;
   TextWriter text;
   if (leads) {
@@ -188,6 +189,7 @@ int ExplanationLosses::Link(size_t index) {
 // all of it is charged by the texts.
 int ExplanationLosses::Conflicts() {
   const size_t count = evidence_.CountCerts();
+  // A period that ends after this meets all the others.
   const TimeStamp* latest = nullptr;
   for (size_t j = 0; j < count; ++j) {
     const TimeStamp* const begin = evidence_.GetCert(j)->GetNotBefore();
@@ -255,6 +257,7 @@ int ExplanationLosses::Roots() {
     const size_t found = state_.found;
     VESK2_TRY(Root(static_cast<AclEntry*>(it.Value())));
     if (state_.found != found || !state_.complete) continue;
+    // One entry that could have granted makes the others no loss.
     state_.DropReasons(before);
     return 0;
   }
@@ -325,6 +328,8 @@ int ExplanationLosses::Rest() {
   TextWriter text;
   if (tag) {
     (text << "the chain grants ").Tag(tag.get());
+    // The dates are read from text, and told as they are: they may be of another grant than the
+    // tag.
     for (const bool last : {false, true}) {
       const Ref<SExpression>& limit = limits[last ? 1 : 0];
       auto* const stamp = limit ? dynamic_cast<ByteString*>(limit->Last()) : nullptr;
@@ -359,6 +364,7 @@ int ExplanationLosses::Unreadable() {
     VESK2_TRY(TryReduction(reason.code, false, evidence_.GetCert(i)));
     VESK2_TRY(tell(reason));
   }
+  // A reading that did not come to the entries has none to name.
   if (evidence_.GetEntries() == nullptr) return 0;
   for (auto it = evidence_.GetEntries()->Begin(); it && state_.Afford(); it.Next()) {
     auto* const entry = dynamic_cast<AclEntry*>(it.Value());

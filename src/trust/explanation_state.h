@@ -23,6 +23,7 @@ struct ExplanationState {
     std::unique_ptr<char[]> text;
   };
 
+  // All else is filled by Explain.
   explicit ExplanationState(Vesk2ContextStruct* ctx) : evidence(ctx) {}
 
   // ---- The question ----
@@ -39,6 +40,8 @@ struct ExplanationState {
   [[nodiscard]] int ProveMembers(Evidence& changed) const;
 
   // ---- What it may cost ----
+  // From here on the explanation pays; what it cost to index the question is bounded by the
+  // question.
   void StartCounting();
   // Afford counts `bytes` that are about to be worked on; false when no more may be spent.
   bool Afford(uint64_t bytes = 0);
@@ -103,10 +106,13 @@ class ExplanationLosses {
   [[nodiscard]] int Revocations();
   // Where the grant is lost on its way along the chain.
   [[nodiscard]] int Certificates();
+  // Of one certificate: whether another follows from it; and of pairs, whether their periods meet.
   [[nodiscard]] int Link(size_t index);
   [[nodiscard]] int Conflicts();
   // And where it would have to come from.
   [[nodiscard]] int Roots();
+  // Of one entry that names a key of the chain; the two answers when there is none at all, and when
+  // there is no store.
   [[nodiscard]] int Root(AclEntry* entry);
   [[nodiscard]] int Threshold(AclEntry* entry, ThresholdSubject* threshold);
   [[nodiscard]] int NoEntryAtAll();
@@ -114,7 +120,10 @@ class ExplanationLosses {
   // When each alone would do: what they come to together, and what cannot be read at all.
   [[nodiscard]] int Rest();
   [[nodiscard]] int Unreadable();
+  // What the reduction says of one credential alone, a code below 0 when it cannot read it.
   [[nodiscard]] int TryReduction(int& code, bool isEntry, DExpression* credential);
+  // The two questions that certificates and entries have in common. `where` has the kind and the
+  // place, and becomes the reason.
   [[nodiscard]] int Period(const Reason& where, const TimeStamp* notBefore,
                            const TimeStamp* notAfter);
   [[nodiscard]] int Tag(const Reason& where, SExpression* tag);
@@ -126,6 +135,7 @@ class ExplanationLosses {
   static Reason About(Kind kind, AclEntry* entry) {
     return {kind, 0, kNone, kNone, entry, nullptr, nullptr};
   }
+  // How a place is called, so that one certificate has one name in all texts.
   TextWriter& Name(TextWriter& text, const Reason& reason) const;
   TextWriter& CertName(TextWriter& text, size_t index) const;
   TextWriter& Store(TextWriter& text) const;
@@ -137,6 +147,7 @@ class ExplanationLosses {
     int code;
     Step steps[4];
   };
+  // One row for each code that has reasons.
   static const Row kRows[];
 
   ExplanationState& state_;
@@ -157,10 +168,13 @@ class ExplanationPath {
   [[nodiscard]] int Find();
 
  private:
+  // Which entry suffices alone, and what of the chain it needs.
   [[nodiscard]] int FindEntry();
   [[nodiscard]] int GrantAlone(bool& granted, AclEntry* entry);
   [[nodiscard]] int FindCerts();
   [[nodiscard]] int CanGo(bool& gone, size_t index, size_t second);
+  // The earliest end of the path, of the entry, or of a list that speaks for one of its
+  // certificates.
   void FindEnd();
   void EndsAt(TimeStamp* end, End kind, size_t cert);
 

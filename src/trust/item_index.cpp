@@ -76,6 +76,7 @@ void ItemIndex::Add(SExpression* items, CrlSequence* list) {
     auto at = item->Begin();
     if (at) at.Next();
     auto* const named = at ? dynamic_cast<Hash*>(at.Value()) : nullptr;
+    // A list that was made by a program can hold anything.
     if (named == nullptr || !IsKnown(named->GetAlgorithm())) continue;
     const Bytes digest = View(named->GetDigest());
     if (digest.empty()) continue;

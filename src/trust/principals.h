@@ -13,6 +13,8 @@
 
 namespace ZvVesk2 {
 
+// Filled once by Load, and asked as often as needed: each question costs a digest and a search by
+// halves.
 class Principals {
  public:
   // The issuers of the certificates, and whom the first is for. VESK2_ERR_MEM_ALLOC.
@@ -40,6 +42,7 @@ class Principals {
     // Whose issuer it is; the number of certificates for the subject of the first.
     size_t cert;
   };
+  // How a key is known here. Codes of the two: VESK2_ERR_MEM_ALLOC.
   [[nodiscard]] static int DigestOf(bool& known, Digest& digest, DExpression* key,
                                     ZvclmHashID algorithm);
   [[nodiscard]] int Add(DExpression* key, size_t cert);

@@ -43,6 +43,7 @@ class RevocationLists {
   [[nodiscard]] int Store(SExpression* carried);
 
  private:
+  // Asked for once: a list that fails fails for the whole call.
   enum class Proof : uint8_t { kUnknown, kHolds, kFails };
   struct List {
     CrlSequence* sequence;
@@ -64,11 +65,13 @@ class RevocationLists {
   // What a source answers, made ready by Collect; and the proof of one list, which is kept whatever
   // it was.
   [[nodiscard]] int Find(Answers*& answers, bool critical, SExpression* tag);
+  // Gathers the items of the proved lists among `lists`.
   [[nodiscard]] int Collect(Answers& answers, bool critical, std::span<Source> lists);
   [[nodiscard]] int Prove(Source& list);
 
   SExpression* acls_;
   SExpression* store_;
+  // Loading hashes every tag, which is only done when something is asked.
   bool loaded_ = false;
   bool rootsLoaded_ = false;
   TagIndex<List> lists_;  // by source; a list without one can never be proved

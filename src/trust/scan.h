@@ -36,7 +36,8 @@ class Scan {
     return Open(directory.get(), pattern);
   }
 
-  // Next moves on to another file; false at the end, and when the scan was ended.
+  // Next moves on to another file; false at the end, and when the scan was ended. A null path is
+  // the end, or a lack of memory, which the listing tells apart.
   [[nodiscard]] bool Next() {
     path_ = IsNoAbsence(last_) ? nullptr : files_.read(true);
     if (files_.failed()) last_ = VESK2_ERR_MEM_ALLOC;

@@ -41,6 +41,7 @@ using TagDigest = std::array<unsigned char, 32>;
 template <typename T>
 class TagIndex {
  public:
+  // `order` keeps the run of one tag in the order of adding: sorting alone would not.
   struct Entry {
     TagDigest digest;
     size_t order;

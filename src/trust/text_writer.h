@@ -14,6 +14,8 @@
 
 namespace ZvVesk2 {
 
+// What is written by << must be ours: everything else goes through one of the named calls, which
+// escape it.
 class TextWriter {
  public:
   // As it is: words of ours, and what was escaped.

@@ -37,6 +37,7 @@ time_t TimeOf(const TimeStamp* stamp) { return stamp != nullptr ? stamp->ToTime(
 // What was filled in before a failure goes with the record.
 [[nodiscard]] int ReadRecord(Vesk2CertInfoStruct& record, Cert* cert, Signature* signature,
                              SExpression* extra) {
+  // Each record has the mark, as programs test it one by one.
   record.size = kRecordMark;
   record.notBefore = TimeOf(cert->GetNotBefore());
   record.notAfter = TimeOf(cert->GetNotAfter());

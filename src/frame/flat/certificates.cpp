@@ -32,6 +32,7 @@ namespace {
   VESK2_TRY(SExpression::ParseTagAdvanced(tag.Out(), tagText, "tag", context));
   Ref<TimeStamp> from;
   Ref<TimeStamp> to;
+  // Stamps of what is given; the other end stays open.
   if (notBefore != 0) VESK2_TRY(MakeStamp(from, notBefore, context));
   if (notAfter != 0) VESK2_TRY(MakeStamp(to, notAfter, context));
   // No subject: the chain is presented for whoever its first certificate is about.
@@ -120,6 +121,7 @@ FileItem* CertFind(const char* directory) {
   const int code = directory != nullptr
                        ? scan.Open(directory, kPattern)
                        : scan.OpenStore(CertSequence::DirectoryName(true), kPattern, StorageHome);
+  // A record list has no place for a code: no directory and no memory are both null.
   if (code != 0) return nullptr;
   FileItemList chain;
   FileItem* last = nullptr;

@@ -8,6 +8,7 @@
 using ZvVesk2::AsciiText;
 using ZvVesk2::VeskConf;
 
+// Copied before the call returns; the program's text may go.
 void Vesk2HomeDirectory(const char* directory) { VeskConf::SetHomeDirectory(directory); }
 
 void Vesk2GlobalDirectory(const char* directory) { VeskConf::SetGlobalDirectory(directory); }

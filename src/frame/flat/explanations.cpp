@@ -67,6 +67,7 @@ uint32_t Number(size_t index) {
   for (size_t i = 0; i < count; ++i) record.certificates[i] = Number(explanation.GetPathCert(i));
   record.certificateCount = static_cast<uint32_t>(count);
   if (explanation.GetEnd() == nullptr) return 0;
+  // By End, in its order.
   constexpr const char* kEnds[] = {nullptr, "certificate", "entry", "list"};
   record.holdsUntil = explanation.GetEnd()->ToTime();
   record.endedBy = kEnds[explanation.GetEndKind()];
@@ -85,6 +86,7 @@ uint32_t Number(size_t index) {
 
 // Explained from what the verification kept: no file is opened.
 [[nodiscard]] int Fill(Vesk2ExplanationStruct& record, const Answer& answer) {
+  // So that a program compiled with a shorter record knows what it may read.
   record.size = sizeof record;
   record.code = answer.code;
   Explanation explanation(answer.evidence.GetContext());
@@ -116,7 +118,8 @@ uint64_t CountFiles(const FileItem* list) {
 }
 
 // A directory that could not be listed is recorded twice, one after the other; one that changed by
-// what is in it counts by that.
+// what is in it counts by that. Findings of a directory that holds a changed file would count the
+// file again.
 uint64_t CountChanged(const Manifest& manifest) {
   uint64_t count = CountFiles(manifest.GetInvalid());
   for (const FileItem* item = manifest.GetInvalid(); item != nullptr; item = item->next) {
@@ -127,7 +130,9 @@ uint64_t CountChanged(const Manifest& manifest) {
   return count;
 }
 
-// A listed directory stands before what is too much in it; an unlisted one was not looked into.
+// A listed directory stands before what is too much in it; an unlisted one was not looked into. By
+// the order of the list: the directory comes before the entries in it, since records are in
+// reverse.
 uint64_t CountExtra(const FileItem* list) {
   uint64_t count = 0;
   for (; list != nullptr; list = list->next) {

@@ -49,6 +49,7 @@ void SetExtraAclDirectory(Manifest* manifest, const char* directory) {
   static_cast<void>(manifest->CopyExtraAclDirectory(directory));  // the verification tells
 }
 
+// Copied by the base function, in the one form that there is.
 void SetExtraAclDirectoryA(Manifest* manifest, const char* directory) {
   SetExtraAclDirectory(manifest, directory);
 }
@@ -109,6 +110,7 @@ time_t GetTimeOfSigning(Manifest* manifest) {
   return stamp != nullptr ? stamp->ToTime() : 0;
 }
 
+// The lists as they are: handed out, not copied.
 FileItem* GetValidEntries(Manifest* manifest) { return manifest->GetValid(); }
 
 FileItem* GetInvalidEntries(Manifest* manifest) { return manifest->GetInvalid(); }

@@ -19,6 +19,7 @@ using namespace ZvVesk2;
 
 // ---- Importing ----
 
+// Its answer is about the reading: whether a list was stored nobody is told here.
 int Vesk2CrlImport(const char* directory, Vesk2ContextStruct* context) {
   return CrlSequence::ImportDirAndStore(directory, context);
 }

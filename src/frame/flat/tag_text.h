@@ -10,7 +10,8 @@
 namespace ZvVesk2 {
 
 // TagText makes the text of the body of `list`, (keyword body...): success with null for null and
-// for another list. ExportTag alone could not tell these from a lack of memory.
+// for another list. ExportTag alone could not tell these from a lack of memory. A tag without a
+// body has no text to show, and neither has a list of another keyword.
 [[nodiscard]] inline int TagText(char*& text, SExpression* list, const char* keyword) {
   text = list != nullptr ? list->ExportTag(keyword) : nullptr;
   if (list == nullptr || text != nullptr) return 0;
