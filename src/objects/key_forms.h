@@ -11,8 +11,8 @@
 
 namespace ZvVesk2 {
 
-template <typename Record>
 // A number by its name in expressions and its place in records.
+template <typename Record>
 struct KeyNumber {
   const char* name;
   ZVCLMBigInt* Record::*field;
