@@ -64,9 +64,10 @@ class VESK2_API Crl : public SExpression {
   // Create makes a list that revokes nothing yet, for the caller to free; `out` must be null.
   // RevokeCertificate and RevokeKey add (item <digest> <date>) to list1 and list2, sharing both:
   // the digest of the certificate as it stands in its file, of the key without display hints, by
-  // any algorithm of Hash. `from` is required for a key, too, though a revoked key is revoked
-  // whatever the date. A list that was verified counts as unverified again. VESK2_ERR_INVALID_PARAM
-  // (also: a digest that is not complete), VESK2_ERR_MEM_ALLOC.
+  // any algorithm of Hash, SHA-1 among them: write SHA-256. `from` is required for a key, too,
+  // though a revoked key is revoked whatever the date. A list that was verified counts as
+  // unverified again. VESK2_ERR_INVALID_PARAM (also: a digest that is not complete),
+  // VESK2_ERR_MEM_ALLOC.
   [[nodiscard]] static int Create(Crl*& out, Vesk2ContextStruct* context);
   [[nodiscard]] int RevokeCertificate(Hash* digest, TimeStamp* from);
   [[nodiscard]] int RevokeKey(Hash* digest, TimeStamp* from);

@@ -8,10 +8,11 @@
 //     <body>)
 //
 // The signer certificate's subject is the hash of the version, type and time elements and the
-// body's bytes; the certificate after it must be the signer's own, and authorizes it. Nothing else
-// is covered by the signature: the chain behind the signer certificate and the revocation lists can
-// be taken out, or exchanged for others that verify, by anyone. Keep current lists in the store,
-// and rely on none that is carried.
+// body's bytes; the certificate after it must be the signer's own, and authorizes it: it counts as
+// if it had (propagate), so that a key that may not pass its grant on can sign manifests. Grant a
+// tag of its own for what is not to be signed so. Nothing else is covered by the signature: the
+// chain behind the signer certificate and the revocation lists can be taken out, or exchanged for
+// others that verify, by anyone. Keep current lists in the store, and rely on none that is carried.
 //
 //   Manifest manifest(nullptr);
 //   int code = manifest.Initialize("app", "app.manifest", "(install (app calc))");
@@ -200,9 +201,9 @@ class VESK2_API Manifest {
   // by the directory; or the one that ReadManifest told (see there), its root without a name. Null
   // when it did not come to that. It lives until the next verification.
   BodyDirectory* GetListing() const;
-  // How many files the listing names that VerifyManifest compares now, those that are ignored not
-  // among them: for callbacks that show how far it has come, on any thread. 0 before the listing is
-  // read.
+  // How many files the listing names that VerifyManifest compares now, those that are ignored, and
+  // not read, among them: for callbacks that show how far it has come, on any thread. 0 before the
+  // listing is read.
   size_t CountListedFiles() const;
 
  private:
