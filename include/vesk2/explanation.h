@@ -124,7 +124,8 @@ class VESK2_API Explanation {
   // ---- Of a no ----
   // How many reasons there are: 0 of a yes, and of a code that has none.
   size_t CountReasons() const;
-  // A reason; one with nothing in it for an `index` that is not below the count.
+  // A reason. `index` must be below the count: beyond it all of the record is 0, which names a kind
+  // and a certificate that are not meant.
   const Reason& GetReason(size_t index) const;
 
   // ---- Of a yes, borrowed ----

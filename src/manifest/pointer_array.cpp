@@ -80,7 +80,7 @@ uint32_t PointerArray<T>::GetCount() const {
   return count;
 }
 
-// What callers have always been told, whatever the memory beneath does.
+// In steps of 32, whatever the memory beneath does.
 template <typename T>
 uint32_t PointerArray<T>::GetCapacity() const {
   return (count + 31) / 32 * 32;

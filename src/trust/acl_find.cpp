@@ -81,8 +81,8 @@ bool HoldsInclusively(const AclEntry* entry, const TimeStamp* from, const TimeSt
   return tag->IsEqual(entry->GetTag()) ? VESK2_ERR_AUTH_TAGS_ARE_EQUAL : 0;
 }
 
-// Asks whether each signer is a member too. The answers do not count. They never did: programs that
-// hand in signers have always been told of the first member alone, and count for themselves.
+// Asks whether each signer is a member too. The answers do not count: the one member that was asked
+// about is enough, and whoever asks counts to k.
 void WalkSigners(ThresholdSubject* threshold, SExpression* signers) {
   for (auto it = signers->Begin(); it; it.Next()) {
     auto* cert = dynamic_cast<Cert*>(it.Value());

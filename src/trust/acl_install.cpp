@@ -59,9 +59,8 @@ using StoredTags = TagIndex<Nothing>;
 }
 
 // Writes the entry into the store under its file's name, unless another trust root has that name,
-// or its tag. Only the tag is compared: an entry with a stored tag and another subject stays out,
-// as installers rely on. The name is tested first for a clear answer; what decides is the writing,
-// which never replaces.
+// or its tag. Only the tag is compared: an entry with a stored tag and another subject stays out.
+// The name is tested first for a clear answer; what decides is the writing, which never replaces.
 [[nodiscard]] int Install(AclEntry* entry, StoredTags& tags) {
   bool hashed = false;
   TagDigest digest;

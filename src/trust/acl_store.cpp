@@ -31,8 +31,8 @@ int AclEntry::Import(const char* name) {
 }
 
 // Each entry keeps the path that it was read from: explanations name it, and InstallAcls tells the
-// store's own by it. The result is that of the last file, which programs rely on to hear of a bad
-// one; those before it were loaded or passed over.
+// store's own by it. The result is that of the last file: a bad one there is reported although
+// those before it were loaded, and a bad one before it is passed over.
 int AclEntry::LoadDirectory(SExpression* list, const char* directory) {
   Scan scan;
   VESK2_TRY(scan.Open(directory, "*.acl"));

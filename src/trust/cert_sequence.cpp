@@ -119,7 +119,7 @@ int CertSequence::Import(Cert*& cert, Signature*& signature, SExpression*& extra
   return 0;
 }
 
-// Here `extra` is tested as well, as callers of this form have always had to empty it.
+// Here all three must be empty: a name is for one chain, and no output is left over from another.
 int CertSequence::Import(Cert*& cert, Signature*& signature, SExpression*& extra, const char* name,
                          bool usePath, Vesk2ContextStruct* ctx) {
   VESK2_REQUIRE(cert == nullptr && signature == nullptr && extra == nullptr && name != nullptr,

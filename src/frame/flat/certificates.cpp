@@ -22,9 +22,9 @@ namespace {
 
 // ---- Verifying ----
 
-// `out` is null when nobody wants to know why. `path` is for its texts. 0 seconds are no time, so
-// that the epoch itself cannot be asked about: callers have always meant "not given" by it. The
-// code is in the library's own words, so that whoever calls from C tests for one lack of memory.
+// `out` is null when nobody wants to know why. `path` is for its texts. 0 seconds mean "not given",
+// so that the epoch itself cannot be asked about. The code is in the library's own words, so that
+// whoever calls from C tests for one lack of memory.
 [[nodiscard]] int VerifySequence(CertSequence* sequence, const char* tagText, time_t notBefore,
                                  time_t notAfter, const char* path, Vesk2ExplanationStruct** out) {
   Vesk2ContextStruct* const context = sequence->GetContext();

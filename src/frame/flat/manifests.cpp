@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // Flat functions: manifest contexts and the records of their results. A manifest context is a
-// Manifest; the getters and setters trust its pointer, the way callers have always used them. Codes
-// are the class's own, a lack of memory told by one code (InOwnWords).
+// Manifest; the getters and setters do not test its pointer. Codes are the class's own, a lack of
+// memory told by one code (InOwnWords).
 #include <vesk2/file_item.h>
 #include <vesk2/manifest.h>
 
@@ -67,8 +67,8 @@ void SetStoreUpdate(Manifest* manifest, int update) { manifest->SetStoreUpdate(u
 
 // ---- Verifying ----
 
-// The pair of settings that a careful caller wants is in vesk2.h, and none of it is forced here:
-// programs rely on the defaults.
+// None of what a careful caller sets (vesk2.h) is set here: unlisted entries pass, and carried
+// lists are stored, until it is said otherwise.
 int VerifyManifest(Manifest* manifest, time_t notBefore, time_t notAfter) {
   return ZvVesk2::InOwnWords(manifest->VerifyManifest(notBefore, notAfter));
 }
