@@ -20,8 +20,7 @@ Hash::~Hash() {
 bool Hash::IsHash() const { return true; }
 
 // (hash <name> <digest>): "(4:hash" <name> <digest> ")", no digest of another length than the
-// algorithm's. The length is compared here, so that no later comparison of digests can be one of
-// different lengths.
+// algorithm's. So an imported digest is always as long as its algorithm makes them.
 int Hash::Import(ZvBuffer* buffer) {
   VESK2_REQUIRE(buffer != nullptr && First() == nullptr, VESK2_ERR_INVALID_PARAM);
   VESK2_TRY(buffer->Expect("(4:hash"));
@@ -97,7 +96,7 @@ int Hash::Finalize() {
 }
 
 // Adopted on every path, also when it is refused: the caller need not ask what became of it. Its
-// length is the caller's word, since digests of other makings are set so.
+// length is the caller's word.
 int Hash::Set(ZvclmHashID id, unsigned char* data, unsigned int length) {
   std::unique_ptr<unsigned char[]> owned(data);
   const HashAlgorithm* const known = FindHashAlgorithm(id);

@@ -123,7 +123,7 @@ int PublicKey::VerifyDSA(ByteString* algorithm, ByteString* signatureValue, Hash
       digest.bytes.get(), digest.length, signatureValue->GetData(), signatureValue->GetLength());
 }
 
-// Devices that write the format have DSA keys.
+// The format has room for a DSA signature, and for no other.
 int PublicKey::VerifyMobile(ByteString* algorithm, unsigned char* signature,
                             unsigned int signatureLength, unsigned char* data,
                             unsigned int dataLength) {

@@ -49,8 +49,8 @@ time_t TimeOf(const TimeStamp* stamp) { return stamp != nullptr ? stamp->ToTime(
   return key != nullptr ? InOwnWords(key->X509Export(record.keyData, record.keyLength)) : 0;
 }
 
-// The records of all triples behind the keyword. None holds the sequence yet. So that a chain that
-// is freed half-made frees no sequence.
+// The records of all triples behind the keyword. None holds the sequence yet: a chain that is freed
+// half-made frees no sequence.
 [[nodiscard]] int ReadRecords(ChainOwner& chain, CertSequence* sequence) {
   Vesk2CertInfoStruct* last = nullptr;
   auto item = sequence->Begin();

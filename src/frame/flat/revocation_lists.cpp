@@ -99,7 +99,7 @@ int Vesk2CrlFindA(Vesk2CrlInfoStruct** out, const char* tagText, Vesk2ContextStr
   return MakeRecord(out, std::move(found));
 }
 
-// Null is no error here, unlike a chain's: both are old promises.
+// Null is no error here, unlike for a chain.
 int Vesk2CrlFree(Vesk2CrlInfoStruct* record) {
   if (record == nullptr) return 0;
   if (record->crl != nullptr) record->crl->Free();

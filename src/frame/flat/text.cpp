@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 // Flat functions: conversion between the two forms of text, and escaping. Both forms are bytes
-// here; the functions stay apart for programs that are compiled elsewhere as well.
+// here; on a system with wide file names they would differ.
 #include <vesk2/wording.h>
 
 #include <cstring>
