@@ -124,8 +124,8 @@ class VESK2_API Explanation {
   // ---- Of a no ----
   // How many reasons there are: 0 of a yes, and of a code that has none.
   size_t CountReasons() const;
-  // A reason. `index` must be below the count: beyond it all of the record is 0, which names a kind
-  // and a certificate that are not meant.
+  // A reason. `index` must be below the count: beyond it the record has no place, code 0 and an
+  // empty text, and its kind says nothing.
   const Reason& GetReason(size_t index) const;
 
   // ---- Of a yes, borrowed ----

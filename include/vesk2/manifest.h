@@ -220,7 +220,6 @@ class VESK2_API Manifest {
   // Moves the records of a comparison to the front of the four lists.
   [[nodiscard]] VESK2_LOCAL int Publish(Findings& findings);
   // The list of findings of a status.
-  VESK2_LOCAL FileItemList& ListOf(uint32_t status);
 
   Vesk2ContextStruct* context;
   std::unique_ptr<char[]> directory;

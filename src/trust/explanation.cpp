@@ -33,7 +33,8 @@ constexpr uint64_t kLeastBytes = uint64_t{48} << 20;
 constexpr uint64_t kMultiple = 2;
 
 // For an index that is none: a caller's mistake must not become a read past the array.
-const Explanation::Reason kNoReason = {};
+const Explanation::Reason kNoReason = {
+    Explanation::SignatureFails, 0, Explanation::kNone, Explanation::kNone, nullptr, nullptr, ""};
 
 }  // namespace
 
