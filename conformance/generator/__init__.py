@@ -1,6 +1,6 @@
 # SPDX-License-Identifier: Apache-2.0
 """What make_cases.py makes the cases with."""
 
-from . import chains, tags
+from . import chains, readers, tags
 
-FAMILIES = [chains.make, tags.make]
+FAMILIES = [chains.make, tags.make, readers.make]

@@ -187,7 +187,8 @@ TextWriter& TextWriter::List(SExpression* list, std::string_view keyword) {
       code_ == 0 ? TryNewArray<unsigned char>(size_t{size} + 1) : nullptr);
   unsigned int length = 0;
   if (code_ == 0)
-    code_ = bytes ? list->ExportAdvanced(bytes.get(), length, size) : VESK2_ERR_MEM_ALLOC;
+    // The text of an empty list wants one byte more than its length says.
+    code_ = bytes ? list->ExportAdvanced(bytes.get(), length, size + 1) : VESK2_ERR_MEM_ALLOC;
   if (code_ != 0) return *this;
   std::string_view text(reinterpret_cast<const char*>(bytes.get()), length);
   if (!keyword.empty() && text.size() > keyword.size() + 2 && text[0] == '(' &&
