@@ -161,8 +161,9 @@ class Manifest:
         if code in UNDECIDED:
             fail(code, doing, file)
         if code == CANNOT_OPEN:
-            with open(self._file, "rb"), open(file, "rb"):  # says why
-                fail(code, doing, file)
+            for path in (self._file, file):  # says why; a pipe would keep a blocking open
+                os.close(os.open(path, os.O_RDONLY | os.O_NONBLOCK | os.O_NOCTTY | os.O_CLOEXEC))
+            fail(code, doing, file)
         handle = self._open()
         lists = (lib.GetInvalidEntries(handle), lib.GetMissingEntries(handle), lib.GetExtraEntries(handle))
         found = [paths(first) for first in lists]
