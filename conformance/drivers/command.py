@@ -83,7 +83,7 @@ def answer(asked: dict) -> dict:
     for name in ("changed", "missing", "unlisted"):
         entries = said["result"].get(name)
         if entries is not None:
-            found[name] = sorted(entry["path"] for entry in entries)
+            found[name] = sorted(entry["path"].removeprefix(asked.get("directory", "") + "/") for entry in entries)
     return found
 
 

@@ -73,7 +73,7 @@ class Key:
         length = len(digest)
         salt = b"\x5a" * length
         mark = hashlib.new(algorithm, bytes(8) + digest + salt).digest()
-        plain = bytes(self.size - 2 * length - 2 - 1) + b"\1" + salt
+        plain = bytes(self.size - 2 * length - 2) + b"\1" + salt
         mask = b""
         while len(mask) < len(plain):
             mask += hashlib.new(algorithm, mark + (len(mask) // length).to_bytes(4, "big")).digest()
