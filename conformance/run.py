@@ -2,7 +2,7 @@
 # SPDX-License-Identifier: Apache-2.0
 """Holds an implementation against the cases of this kit. README.md describes the protocol.
 
-    run.py [--only TEXT] --implementation COMMAND [WORD...]
+    run.py [--only TEXT] [--jobs N] --implementation COMMAND [WORD...]
 """
 
 from __future__ import annotations
@@ -17,6 +17,8 @@ import subprocess
 import sys
 import tempfile
 import time
+from collections import Counter
+from concurrent.futures import ThreadPoolExecutor
 from pathlib import Path
 from typing import Any, Iterator
 
@@ -146,20 +148,26 @@ def run(case: dict, objects: dict[str, dict], asked: Implementation) -> tuple[st
 def main() -> int:
     parser = argparse.ArgumentParser(description="Holds an implementation against the cases of this kit.")
     parser.add_argument("--only", default="", metavar="TEXT", help="the cases with TEXT in their name")
+    parser.add_argument("--jobs", type=int, default=1, metavar="N", help="ask N of them at a time")
     parser.add_argument("--implementation", nargs=argparse.REMAINDER, required=True, metavar="COMMAND")
     options = parser.parse_args()
     objects, cases = load(HERE / "cases")
-    asked = Implementation(options.implementation)
-    counts = {"agreed": 0, "disagreed": 0, "unsupported": 0}
-    for case in cases:
-        if options.only in case["name"]:
-            result, found = run(case, objects, asked)
-            counts[result] += 1
-            if found:
-                print(f"{case['name']}: {'; '.join(found)} ({case['why']})")
-    if asked.close() != 0:
+    wanted = [case for case in cases if options.only in case["name"]]
+    running = [Implementation(options.implementation) for _ in range(options.jobs)]
+
+    def share(number: int) -> list[tuple[dict, str, list[str]]]:
+        return [(case, *run(case, objects, running[number])) for case in wanted[number :: options.jobs]]
+
+    with ThreadPoolExecutor(options.jobs) as pool:
+        done = [one for part in pool.map(share, range(options.jobs)) for one in part]
+    for case, _, found in sorted(done, key=lambda one: str(one[0]["name"])):
+        if found:
+            print(f"{case['name']}: {'; '.join(found)} ({case['why']})")
+    if any([one.close() for one in running]):
         raise SystemExit("run.py: the implementation ended with an error")
-    print(f"{asked.name}: " + ", ".join(f"{count} {result}" for result, count in counts.items()))
+    counts = Counter(result for _, result, _ in done)
+    shown = ", ".join(f"{counts[result]} {result}" for result in ("agreed", "disagreed", "unsupported"))
+    print(f"{running[0].name}: {shown}")
     return 0 if counts["disagreed"] == 0 and counts["agreed"] > 0 else 1
 
 
