@@ -80,10 +80,11 @@ def answer(asked: dict) -> dict:
         printed = run(line, asked, False)
         shown += [printed.stdout.decode("utf-8", "replace"), printed.stderr.decode("utf-8", "replace")]
     found = {"exit": done.returncode, "reason": said["reason"], "verdict": said["verdict"], "shown": shown}
-    for name in ("changed", "missing", "unlisted"):
-        entries = said["result"].get(name)
+    for name, of_two in (("changed", "changed"), ("missing", "removed"), ("unlisted", "added")):
+        entries = said["result"].get(name, said["result"].get(of_two))
         if entries is not None:
-            found[name] = sorted(entry["path"].removeprefix(asked.get("directory", "") + "/") for entry in entries)
+            paths = (entry["path"] if isinstance(entry, dict) else entry for entry in entries)
+            found[name] = sorted(path.removeprefix(asked.get("directory", "") + "/") for path in paths)
     return found
 
 
