@@ -30,7 +30,7 @@ Period ParsePeriod(const PeriodOptions& options) {
   if (!options.notBefore.empty()) period.notBefore = ParseTime(options.notBefore, false);
   if (!options.notAfter.empty()) period.notAfter = ParseTime(options.notAfter, true);
   if (period.notBefore && period.notBefore->IsAfter(period.notAfter.get())) {
-    throw Trouble("--not-before lies after --not-after");
+    throw Trouble("--not-before lies after --not-after", "usage");
   }
   return period;
 }
