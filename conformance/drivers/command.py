@@ -76,10 +76,11 @@ def answer(asked: dict) -> dict:
     done = run(line, asked, True)
     said = json.loads(done.stdout)
     shown = [*texts(said), done.stderr.decode("utf-8", "replace")]
+    found: dict = {"exit": done.returncode, "reason": said["reason"], "verdict": said["verdict"], "shown": shown}
     if asked.get("people"):
         printed = run(line, asked, False)
         shown += [printed.stdout.decode("utf-8", "replace"), printed.stderr.decode("utf-8", "replace")]
-    found = {"exit": done.returncode, "reason": said["reason"], "verdict": said["verdict"], "shown": shown}
+        found["says"] = printed.stdout.decode("utf-8", "replace").partition(":")[0]
     for name, of_two in (("changed", "changed"), ("missing", "removed"), ("unlisted", "added")):
         entries = said["result"].get(name, said["result"].get(of_two))
         if entries is not None:
