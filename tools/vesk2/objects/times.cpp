@@ -15,7 +15,8 @@ Ref<TimeStamp> ParseTime(const std::string& text, bool endOfPeriod) {
                                  : stamp->Set(text.c_str(), endOfPeriod);
   if (code != 0) {
     throw Trouble("time \"" + Escape(text) +
-                  "\": not \"now\", a year from 1970 on, or more of YYYY-MM-DD_hh:mm:ss");
+                      "\": not \"now\", a year from 1970 on, or more of YYYY-MM-DD_hh:mm:ss",
+                  "usage");
   }
   return stamp;
 }
