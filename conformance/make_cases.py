@@ -18,9 +18,9 @@ CASES = Path(__file__).resolve().parent / "cases"
 # The question, and the columns that an interface of ours can answer.
 OPERATIONS = {
     "read-chain", "verify-chain", "read-list", "verify-list", "find-list", "import-lists",
-    "verify-manifest", "compare-manifests", "escape", "tag-within", "show",
+    "verify-manifest", "compare-manifests", "escape", "tag-within", "read-key",
 }  # fmt: skip
-COMMAND_ONLY, LIBRARY_ONLY = {"tag-within", "show"}, {"find-list", "escape"}
+COMMAND_ONLY, LIBRARY_ONLY = {"tag-within", "read-key"}, {"find-list", "escape"}
 
 
 def accepts(case: dict) -> bool:

@@ -21,6 +21,8 @@ def stamp(seconds: int) -> str:
 def times(asked: dict) -> list[str]:
     """One moment, a period, or what the command asks about by itself."""
     start, end = asked["not_before"], asked["not_after"]
+    if "at_text" in asked:
+        return ["--at=" + asked["at_text"]]
     if start and start == end:
         return ["--at", stamp(start)]
     options = ["--not-before", stamp(start)] if start else []
@@ -47,7 +49,7 @@ def words(asked: dict) -> Optional[list[str]]:
         return ["crl", "import", asked["directory"]]
     if operation == "tag-within":
         return ["tag", "check", "--", asked["tag"], asked["within"]]
-    shown = {"read-chain": ["cert", "show"], "read-list": ["crl", "show"], "show": ["show"]}
+    shown = {"read-chain": ["cert", "show"], "read-list": ["crl", "show"], "read-key": ["key", "show"]}
     return [*shown[operation], file] if operation in shown else None
 
 

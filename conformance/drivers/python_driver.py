@@ -27,7 +27,7 @@ def read_chain(asked: dict) -> dict:
 
 def verify_chain(asked: dict) -> dict:
     start, end = moment(asked["not_before"]), moment(asked["not_after"])
-    if start is None and end is None:
+    if (start is None and end is None) or "at_text" in asked:
         return {"unsupported": True}
     with vesk2.Chain(asked["file"]) as chain:
         return {"code": chain.verify(asked["tag"], not_before=start, not_after=end).code}
@@ -108,6 +108,8 @@ def answer(asked: dict) -> dict:
         return ask(asked)
     except vesk2.Error as error:
         return {"code": error.code}
+    except ValueError:  # what the module does not let ask
+        return {"unsupported": True}
     except OSError:  # the module's word for a manifest that cannot be opened
         return {"code": 19}
 

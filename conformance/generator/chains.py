@@ -6,8 +6,9 @@ from __future__ import annotations
 from typing import Any, Optional
 
 from .book import YES, Book, ask_chain, command, library, no
-from .keys import ALICE, BOB, CAROL, DSA, OTHER, ROOT, SIGNER, STRANGER, number
-from .objects import AGO, ALWAYS, FUTURE, LONG_AGO, PAST, TAG, cert, chain, entry, issue, signature, threshold, triple
+from .keys import ALICE, BOB, CAROL, OTHER, ROOT, SIGNER, STRANGER
+from .objects import ALWAYS, FUTURE, PAST, TAG, cert, chain, entry, issue, triple
+from .sexp import canonical
 
 STORE = "global/acl/root.acl"
 
@@ -79,6 +80,44 @@ def _entries(book: Book) -> None:
         book.case(f"chains/entry-{name}", why, files(book, good, *entries), ask_chain(), answer)
 
 
+def _shapes(book: Book) -> None:
+    """Certificates in odd company."""
+    good, link = issue(ROOT, SIGNER), issue(ROOT, ALICE, propagate=True)
+    forged = triple(STRANGER, cert(ROOT, OTHER))
+    around = [issue(ALICE, BOB, propagate=True), issue(BOB, CAROL, propagate=True), issue(CAROL, ALICE, propagate=True)]
+    refused, first = no("NOT_AUTHORIZED"), "look whom the first certificate is for: the answer is about that key"
+    rows: list = [
+        ("empty", chain(), (library("INVALID_SEQUENCE"), command(2, "trouble")), "no certificate at all", None),
+        ("twice", chain(good, good), YES, "the same certificate twice", None),
+        ("unrelated", chain(good, issue(STRANGER, OTHER)), YES, "one that nobody needs", None),
+        ("unrelated-forged", chain(good, forged), no("SIGNATURE"), "its signature must hold all the same", None),
+        ("unrelated-first", chain(issue(STRANGER, OTHER), good), refused, "the first certificate is the one that is asked about", None),
+        ("upside-down", chain(link, issue(ALICE, SIGNER)), YES, "the root's certificate first", first),
+        ("shuffled", chain(issue(BOB, SIGNER), link, issue(ALICE, BOB, propagate=True)), YES, "the others in any order", None),
+        ("two-ways", chain(issue(ALICE, SIGNER), link, issue(ROOT, BOB, propagate=True), issue(BOB, SIGNER)), YES, "two ways to the root", None),
+        ("second-way", chain(issue(ALICE, SIGNER), issue(STRANGER, ALICE, propagate=True), good), YES, "one of two ways is enough", None),
+        ("cycle", chain(issue(CAROL, SIGNER), *around, link), YES, "a way that runs in a circle", None),
+        ("cycle-alone", chain(issue(CAROL, SIGNER), *around), refused, "and one that only does", None),
+        ("own", chain(issue(SIGNER, SIGNER, propagate=True)), refused, "a key that certifies itself", None),
+        ("own-then-root", chain(issue(SIGNER, SIGNER, propagate=True), good), YES, "and is certified, too", None),
+        ("crossed", chain(issue(ALICE, BOB, propagate=True), issue(BOB, ALICE, propagate=True)), refused, "two keys that certify each other", None),
+        ("halves", chain(issue(ALICE, SIGNER), issue(ROOT, ALICE, "(remove)", propagate=True), issue(ROOT, ALICE)), refused, "one link passes on something else, the other nothing", None),
+        ("for-digest", chain(issue(ROOT, SIGNER.hash())), YES, "a certificate for a key's digest", None),
+        ("digest-issues", chain(issue(ALICE, SIGNER), issue(ROOT, ALICE.hash(), propagate=True)), YES, "and the key itself passes it on", None),
+        ("digest-of-other", chain(issue(ALICE, SIGNER), issue(ROOT, BOB.hash(), propagate=True)), refused, "but no other", None),
+        ("digest-rmd160", chain(issue(ALICE, SIGNER), issue(ROOT, ALICE.hash("rmd160"), propagate=True)), (library("SPKI_ERR_UNKNOWN_HASH_ALG"), command(2, "spki-err-unknown-hash-alg")), "a digest that keys are not named by stops the answer", None),
+        ("version-missing", chain(triple(ROOT, cert(ROOT, SIGNER, version=None))), YES, "a certificate that was signed without a version", None),
+    ]  # fmt: skip
+    whole = chain(good)
+    for name, old, new in (("version", b"(7:version1:1)", b""), ("propagate", b"(3:tag", b"(9:propagate)(3:tag"), ("tag", b"4:calc", b"4:calx"), ("comment", b"4:calc)))", b"4:calc)))(7:comment1:x)")):
+        at, why = canonical(whole).index(old), "a signature covers every element of a certificate"
+        altered = files(book, book.changed(whole, "chain", at, len(old), new))
+        book.case(f"chains/altered-{name}", why, altered, ask_chain(), no("HASH_MISMATCH"))
+    for name, sequence, answers, why, must in rows:
+        book.case(f"chains/shape-{name}", why, files(book, sequence), ask_chain(), answers, caller_must=must)
+
+
 def make(book: Book) -> None:
+    _shapes(book)
     _lengths(book)
     _entries(book)
