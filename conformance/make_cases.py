@@ -42,7 +42,9 @@ def faults(book: Book) -> list[str]:
             found.append(f"{case['name']}: no interface of ours answers this")
         lax = case.get("library", {}).get("code") == 0 and case.get("command", {}).get("exit", 0) != 0
         if lax and "caller_must" not in case:
-            found.append(f"{case['name']}: the library says yes and the command no, and nothing says what a caller must do")
+            found.append(
+                f"{case['name']}: the library says yes and the command no, and nothing says what a caller must do",
+            )
     accepted = sum(accepts(case) for case in cases)
     if len(cases) < 1000 or accepted * 4 > len(cases):
         found.append(f"{len(cases)} cases, {accepted} of them accepted: too few, or too friendly")

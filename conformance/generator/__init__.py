@@ -1,6 +1,7 @@
 # SPDX-License-Identifier: Apache-2.0
-"""What make_cases.py makes the cases with."""
+"""What make_cases.py makes the cases with: a module a family, or two."""
 
-from . import chains, kinds, lists, manifests, named, readers, sources, tags, thresholds, trees, warned
+from . import algorithms, chains, kinds, lists, manifests, named, readers, sources, tags, thresholds, trees, warned
 
-FAMILIES = [chains.make, tags.make, readers.make, lists.make, manifests.make, trees.make, thresholds.make, sources.make, named.make, warned.make, kinds.make]
+_MODULES = (chains, thresholds, tags, readers, kinds, lists, sources, manifests, trees, named, warned, algorithms)
+FAMILIES = [module.make for module in _MODULES]

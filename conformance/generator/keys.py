@@ -52,6 +52,7 @@ class Key:
         self.name = name
         _, self.n, self.e, self.d = _integers(name)[:4]
         self.size = (self.n.bit_length() + 7) // 8
+        self._made: dict[bytes, bytes] = {}  # the same certificate is signed for many cases
         self.public: Sexp = [b"public-key", [b"rsa", [b"e", number(self.e)], [b"n", number(self.n)]]]
 
     def digest(self, algorithm: str = "sha256") -> bytes:
@@ -61,7 +62,10 @@ class Key:
         return [b"hash", algorithm.encode(), self.digest(algorithm)]
 
     def _private(self, block: bytes) -> bytes:
-        return pow(int.from_bytes(block, "big"), self.d, self.n).to_bytes(self.size, "big")
+        if block not in self._made:
+            power = pow(int.from_bytes(block, "big"), self.d, self.n)
+            self._made[block] = power.to_bytes(self.size, "big")
+        return self._made[block]
 
     def sign(self, digest: bytes, algorithm: str = "sha256", name: str = "rsa-1.5") -> bytes:
         if name.startswith("rsa-1"):

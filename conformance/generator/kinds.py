@@ -64,7 +64,9 @@ def _subjects(book: Book) -> None:
         good = chain(triple(ROOT, cert(ROOT, subject)))
         for name, old, new, code, why in rows:
             answers = YES if code == "OK" else trouble(code)
-            book.case(f"kinds/{name}", why, {"chain.cert": edit(book, good, "chain", old, new, after)}, question, answers)
+            book.case(
+                f"kinds/{name}", why, {"chain.cert": edit(book, good, "chain", old, new, after)}, question, answers,
+            )
 
 
 KEY_FILES = [
@@ -86,7 +88,9 @@ def _key_files(book: Book) -> None:
         book.case(f"kinds/key-file-{name}", "a key file", file, question, (library("OK"), command(0, "ok")))
     for name, old, new, why in KEY_FILES:
         file = {"key.pub": edit(book, ALICE.public, "key", old, new)}
-        answers = library("OK" if name == "trailing" else "MAX_BYTE_STRING" if name == "length" else "PARSE_FILE"), command(2, "malformed")
+        answers = library("OK" if name == "trailing" else "MAX_BYTE_STRING" if name == "length" else "PARSE_FILE"), command(
+            2, "malformed",
+        )
         must = "test that a file ends where its object does" if name == "trailing" else None
         book.case(f"kinds/key-file-{name}", why, file, question, answers, caller_must=must)
 
@@ -149,16 +153,25 @@ def _entries(book: Book) -> None:
 
 def _stamps(book: Book) -> None:
     """Times as people write them. The whole field must be there, and the day must be."""
-    files = {"global/acl/root.acl": book.object(entry(ROOT), "entry"), "chain.cert": book.object(chain(issue(ROOT, SIGNER)), "chain")}
+    files = {
+        "global/acl/root.acl": book.object(entry(ROOT), "entry"),
+        "chain.cert": book.object(chain(issue(ROOT, SIGNER)), "chain"),
+    }
     for text in ("2030", "2030-06", "2028-02-29", "3900-12-31_23:59:59"):
-        book.case(f"kinds/time-{text}", "a time may end after any field", files, ask_chain(at=None, at_text=text), (library("OK"), command(0, "ok")))
+        book.case(
+            f"kinds/time-{text}", "a time may end after any field", files, ask_chain(at=None, at_text=text),
+            (library("OK"), command(0, "ok")),
+        )
     for text, why in (
         ("1969", "before 1970"), ("3901", "after 3900"), ("203", "three digits"), ("2030-6", "a digit is missing"), ("2030-13", "no such month"),
         ("2030-00", "no such month"), ("2030-02-29", "no such day"), ("2030-04-31", "no such day"), ("2030-06-01_24", "no such hour"),
         ("2030-06-01_12:60", "no such minute"), ("2030-06-01_12:00:60", "no such second"), ("2030/06", "another separator"), ("2030-06-01 12", "another separator"),
         ("2030-06-01T12", "another separator"), ("2030-06-01_12:00:00Z", "a zone"), ("2030-06-01_12:00:00.5", "a fraction"), ("x030", "a letter"), ("tomorrow", "a word"), ("+2030", "a sign"),
     ):  # fmt: skip
-        book.case(f"kinds/time-{text.replace('/', '.')}", why, files, ask_chain(at=None, at_text=text), (library("TIME_STAMP"), command(2, "usage")))
+        book.case(
+            f"kinds/time-{text.replace('/', '.')}", why, files, ask_chain(at=None, at_text=text),
+            (library("TIME_STAMP"), command(2, "usage")),
+        )
 
 
 def make(book: Book) -> None:

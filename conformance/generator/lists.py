@@ -3,13 +3,12 @@
 
 from __future__ import annotations
 
+import hashlib
 from typing import Any, Optional
 
 from .book import YES, Book, ask_chain, command, library, no, trouble
 from .keys import ALICE, OTHER, ROOT, SIGNER, SOURCE, STRANGER
-from .objects import (
-    ALWAYS, FUTURE, MOMENT, NOTHING, PAST, cert, chain, entry, issue, revocations, sha256, signature, triple,
-)  # fmt: skip
+from .objects import ALWAYS, MOMENT, NOTHING, PAST, cert, chain, entry, issue, revocations, sha256, signature, triple
 from .readers import edit
 from .sexp import canonical
 
@@ -64,8 +63,14 @@ def _read(book: Book) -> None:
         one(name, why, edit(book, good, "list", old, new), code)
     size = len(canonical(good))
     for place in (0, 3, 12, 18, 33, 41, 50, 90, 115, 125, 140, 400, 700, size - 3, size - 2):
-        one(f"cut-{place if place < 500 else place - size}", f"the first {place} bytes of {size}", book.cut(good, "list", place), "PARSE_FILE")
-    one("cut-end", "the last byte is not looked for: lists without it are in use", book.cut(good, "list", size - 1), "OK")
+        one(
+            f"cut-{place if place < 500 else place - size}", f"the first {place} bytes of {size}",
+            book.cut(good, "list", place), "PARSE_FILE",
+        )
+    one(
+        "cut-end", "the last byte is not looked for: lists without it are in use", book.cut(good, "list", size - 1),
+        "OK",
+    )
     book.case("lists/read-absent", "no such file", {}, question, trouble("FILE_NOT_FOUND", "io"))
 
 
@@ -117,7 +122,7 @@ def _believed(book: Book) -> None:
 def _revoked(book: Book) -> None:
     """What a good list takes back."""
     digest = {name: [b"hash", name.encode(), SIGNER.digest(name)] for name in ("sha1", "sha256", "rmd160")}
-    leaf_sha1 = [b"hash", b"sha1", __import__("hashlib").sha1(canonical(LEAF[0])).digest()]
+    leaf_sha1 = [b"hash", b"sha1", hashlib.sha1(canonical(LEAF[0])).digest()]
     revoked = no("CERT_REVOKED")
     rows = [
         ("cert", REVOKED, (), revoked, "the certificate is on the list"),
@@ -149,7 +154,9 @@ def _revoked(book: Book) -> None:
     named = chain(issue(ROOT, SIGNER.hash()))
     stored = revocations(SOURCE, TAG, DUMMY, ((SIGNER.hash(), "2025-01-01_00:00:00"),))
     files = store(book, stored, **{"chain.cert": book.object(named, "chain")})
-    book.case("lists/revoked-key-by-hash", "a certificate that names the key by its digest", files, ask_chain(), revoked)
+    book.case(
+        "lists/revoked-key-by-hash", "a certificate that names the key by its digest", files, ask_chain(), revoked,
+    )
 
 
 def make(book: Book) -> None:

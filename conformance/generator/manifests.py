@@ -6,13 +6,13 @@ from __future__ import annotations
 from typing import Any, Optional
 
 from .book import YES, Book, ask_manifest, command, library, no, trouble
-from .keys import ALICE, BOB, DSA, KEYS, OTHER, ROOT, SIGNER, SOURCE, STRANGER
+from .keys import ALICE, ROOT, SIGNER, STRANGER
 from .objects import (
-    ALWAYS, FUTURE, PAST, SIGNED_AT, TAG, body, cert, dir_entry, entry, file_entry, issue, manifest, pairs, revocations,
-    sha256, signature, threshold, triple,
+    ALWAYS, FUTURE, PAST, SIGNED_AT, body, cert, dir_entry, entry, file_entry, issue, manifest, pairs, sha256,
+    signature, triple,
 )  # fmt: skip
 from .readers import edit
-from .sexp import Raw, Sexp, canonical
+from .sexp import Raw, canonical
 
 TREE = {"tree/a": {"content": "x"}, "tree/sub/b": {"content": "y"}}
 LISTING = body(file_entry("a", b"x"), dir_entry("sub", file_entry("b", b"y")))
@@ -61,7 +61,10 @@ def store(book: Book, what: Any, *entries: list, tree: Optional[dict] = None, **
 
 def answers_of(code: str) -> tuple:
     """A file that cannot be read is trouble; one that can, and does not hold, is a no."""
-    unreadable = {"PARSE_FILE", "PRINCIPAL", "MANIFEST_VERSION", "MANIFEST_TYPE", "TIME_STAMP", "UNKNOWN_HASH_ID", "RANDOM_TOKEN", "INVALID_HASH", "HASH_ID", "MAX_BYTE_STRING"}
+    unreadable = {
+        "PARSE_FILE", "PRINCIPAL", "MANIFEST_VERSION", "MANIFEST_TYPE", "TIME_STAMP", "UNKNOWN_HASH_ID",
+        "RANDOM_TOKEN", "INVALID_HASH", "HASH_ID", "MAX_BYTE_STRING",
+    }
     return YES if code == "OK" else trouble(code) if code in unreadable else no(code)
 
 
@@ -74,13 +77,21 @@ def _forms(book: Book) -> None:
     for place in (0, 1, 11, 25, 60, 101, 150, 400, 700, 1000, end_of_lists - 1, end_of_lists, end_of_lists + 1, size - 40, size - 1):
         code = "HASH_MATCH" if place > end_of_lists else "PARSE_FILE"
         files = store(book, book.cut(GOOD, "manifest", place))
-        book.case(f"manifests/cut-{place}", f"the first {place} bytes of {size}", files, ask_manifest(), answers_of(code))
+        book.case(
+            f"manifests/cut-{place}", f"the first {place} bytes of {size}", files, ask_manifest(), answers_of(code),
+        )
     trailing = store(book, book.changed(GOOD, "manifest", size, 0, b"\n"))
-    book.case("manifests/trailing", "a byte after its end moves into the content", trailing, ask_manifest(), no("HASH_MATCH"))
+    book.case(
+        "manifests/trailing", "a byte after its end moves into the content", trailing, ask_manifest(),
+        no("HASH_MATCH"),
+    )
     files = store(book, GOOD)
     del files["app.manifest"]
     book.case("manifests/absent", "no such file", files, ask_manifest(), trouble("OPEN_MANIFEST_FILE", "io"))
-    book.case("manifests/fifo", "a pipe is not opened", {**files, "app.manifest": {"fifo": 1}}, ask_manifest(), trouble("OPEN_MANIFEST_FILE", "io"))
+    book.case(
+        "manifests/fifo", "a pipe is not opened", {**files, "app.manifest": {"fifo": 1}}, ask_manifest(),
+        trouble("OPEN_MANIFEST_FILE", "io"),
+    )
 
 
 F = file_entry("a", b"x")
@@ -132,34 +143,67 @@ def _signatures(book: Book) -> None:
         ("sha1", "rsa-1.5", "sha1", "OK", "SHA-1 is taken for signatures: old chains rely on it"),
         ("pss-sha1", "rsa-pss", "sha1", "OK", "PSS over SHA-1"),
     ):
-        one(f"signed-{name}", why, manifest(LISTING, pairs(triple(ROOT, cert(ROOT, SIGNER), algorithm, digest)), algorithm=algorithm), code)
+        one(
+            f"signed-{name}", why,
+            manifest(LISTING, pairs(triple(ROOT, cert(ROOT, SIGNER), algorithm, digest)), algorithm=algorithm), code,
+        )
     for name, algorithm in (("unknown", "rsa-1.6"), ("longer", "rsa-pss-"), ("upper", "RSA-PSS"), ("dsa", "dsa-sha1"), ("pkcs", "rsa-pkcs1"), ("none", "none")):
         bad = signature(SIGNER, content)
         bad[3] = [algorithm.encode(), bad[3][1]]
-        one(f"algorithm-{name}", "an algorithm that an RSA key does not know", manifest(LISTING, SECOND, signer_cert=[content, bad]), "SIGNATURE_ID")
+        one(
+            f"algorithm-{name}", "an algorithm that an RSA key does not know",
+            manifest(LISTING, SECOND, signer_cert=[content, bad]), "SIGNATURE_ID",
+        )
     rmd = signature(SIGNER, content)
     rmd[1] = [b"hash", b"rmd160", bytes(20)]
-    one("signature-rmd160", "a digest that RSA signatures do not take", manifest(LISTING, SECOND, signer_cert=[content, rmd]), "SIGNATURE_ID")
+    one(
+        "signature-rmd160", "a digest that RSA signatures do not take",
+        manifest(LISTING, SECOND, signer_cert=[content, rmd]), "SIGNATURE_ID",
+    )
     by_hash = signature(SIGNER, content)
     by_hash[2] = SIGNER.hash()
-    one("signature-by-hash", "a digest is not the issuer's key, which must sign", manifest(LISTING, SECOND, signer_cert=[content, by_hash]), "SIGNATURE")
+    one(
+        "signature-by-hash", "a digest is not the issuer's key, which must sign",
+        manifest(LISTING, SECOND, signer_cert=[content, by_hash]), "SIGNATURE",
+    )
     hashed = cert(SIGNER.hash(), content[3][1], None)
     hash_signed = signature(SIGNER, hashed)
     hash_signed[2] = SIGNER.hash()
-    one("issuer-by-hash", "a digest cannot sign", manifest(LISTING, SECOND, signer_cert=[hashed, hash_signed]), "NOT_IMPLEMENTED")
+    one(
+        "issuer-by-hash", "a digest cannot sign", manifest(LISTING, SECOND, signer_cert=[hashed, hash_signed]),
+        "NOT_IMPLEMENTED",
+    )
     zero = signature(SIGNER, content)
     for name, value in (("flipped", bytes([zero[3][1][0] ^ 1]) + zero[3][1][1:]), ("short", zero[3][1][1:]), ("long", b"\0" + zero[3][1]), ("zero", bytes(128)), ("empty", b"")):
         wrong = [*zero[:3], [zero[3][0], value]]
-        one(f"signature-{name}", "a value that no key of the issuer made", manifest(LISTING, SECOND, signer_cert=[content, wrong]), "SIGNATURE")
-    one("signature-other-cert", "a signature over another certificate", manifest(LISTING, SECOND, signer_cert=[content, signature(SIGNER, cert(SIGNER, ALICE))]), "HASH_MISMATCH")
-    one("signature-stranger", "signed by another than the issuer", manifest(LISTING, SECOND, signer_cert=[content, signature(STRANGER, content)]), "SIGNATURE")
-    one("second-stranger", "the second certificate signed by another", manifest(LISTING, pairs(triple(STRANGER, cert(ROOT, SIGNER)))), "SIGNATURE")
+        one(
+            f"signature-{name}", "a value that no key of the issuer made",
+            manifest(LISTING, SECOND, signer_cert=[content, wrong]), "SIGNATURE",
+        )
+    one(
+        "signature-other-cert", "a signature over another certificate",
+        manifest(LISTING, SECOND, signer_cert=[content, signature(SIGNER, cert(SIGNER, ALICE))]), "HASH_MISMATCH",
+    )
+    one(
+        "signature-stranger", "signed by another than the issuer",
+        manifest(LISTING, SECOND, signer_cert=[content, signature(STRANGER, content)]), "SIGNATURE",
+    )
+    one(
+        "second-stranger", "the second certificate signed by another",
+        manifest(LISTING, pairs(triple(STRANGER, cert(ROOT, SIGNER)))), "SIGNATURE",
+    )
     third = [*SECOND, *pairs(triple(STRANGER, cert(ROOT, ALICE)))]
     one("third-stranger", "a third that nobody needs must hold too", manifest(LISTING, third), "SIGNATURE")
     for_key = cert(SIGNER, ALICE)
-    one("for-key", "the first certificate must be for a digest", manifest(LISTING, SECOND, signer_cert=[for_key, signature(SIGNER, for_key)]), "NOT_OBJECT_CERT")
+    one(
+        "for-key", "the first certificate must be for a digest",
+        manifest(LISTING, SECOND, signer_cert=[for_key, signature(SIGNER, for_key)]), "NOT_OBJECT_CERT",
+    )
     other = cert(SIGNER, sha256([b"x"]), None)
-    one("for-other", "a certificate for another content", manifest(LISTING, SECOND, signer_cert=[other, signature(SIGNER, other)]), "HASH_MATCH")
+    one(
+        "for-other", "a certificate for another content",
+        manifest(LISTING, SECOND, signer_cert=[other, signature(SIGNER, other)]), "HASH_MATCH",
+    )
     one("content-sha1", "the content named by SHA-1", manifest(LISTING, SECOND, hash_name="sha1"), "OK")
 
 
@@ -169,22 +213,43 @@ def _authority(book: Book) -> None:
 
     one("good", "signed by a key that the root certified", GOOD, "OK")
     one("one-certificate", "a second certificate must be there", manifest(LISTING, []), "PARSE_FILE")
-    one("self-trusted", "the signer itself is trusted, and says so", manifest(LISTING, pairs(issue(SIGNER, SIGNER))), "OK", entry(SIGNER))
-    one("self-made", "any key can certify itself", manifest(LISTING, pairs(issue(STRANGER, STRANGER)), key=STRANGER), "NOT_AUTHORIZED")
-    one("order", "the second certificate is for another key", manifest(LISTING, pairs(issue(ROOT, ALICE), issue(ROOT, SIGNER))), "SIGNING_CERT_ORDER")
+    one(
+        "self-trusted", "the signer itself is trusted, and says so", manifest(LISTING, pairs(issue(SIGNER, SIGNER))),
+        "OK", entry(SIGNER),
+    )
+    one(
+        "self-made", "any key can certify itself", manifest(LISTING, pairs(issue(STRANGER, STRANGER)), key=STRANGER),
+        "NOT_AUTHORIZED",
+    )
+    one(
+        "order", "the second certificate is for another key",
+        manifest(LISTING, pairs(issue(ROOT, ALICE), issue(ROOT, SIGNER))), "SIGNING_CERT_ORDER",
+    )
     middle = pairs(issue(ALICE, SIGNER), issue(ROOT, ALICE, propagate=True))
     one("three", "a chain of three", manifest(LISTING, middle), "OK")
     stopped = pairs(issue(ALICE, SIGNER), issue(ROOT, ALICE))
     one("three-no-propagate", "the third may not be passed on", manifest(LISTING, stopped), "NOT_AUTHORIZED")
     one("three-missing", "a link is missing", manifest(LISTING, pairs(issue(ALICE, SIGNER))), "NOT_AUTHORIZED")
-    one("entry-no-propagate", "signing passes on what was granted", GOOD, "NOT_AUTHORIZED", entry(ROOT, propagate=False))
+    one(
+        "entry-no-propagate", "signing passes on what was granted", GOOD, "NOT_AUTHORIZED",
+        entry(ROOT, propagate=False),
+    )
     one("other-root", "another root", GOOD, "NOT_AUTHORIZED", entry(STRANGER))
     one("wider-asked", "more is asked than the signer was granted", GOOD, "PACKAGE_NOT_GRANTED", tag="(install)")
     one("other-asked", "something else is asked", GOOD, "NOT_AUTHORIZED", tag="(remove)")
-    one("signer-narrows", "the signer itself signed for less", manifest(LISTING, SECOND, tag="(install (app calc) (beta))"), "PACKAGE_NOT_GRANTED")
-    one("signer-other", "the signer signed for something else", manifest(LISTING, SECOND, tag="(remove)"), "NOT_AUTHORIZED")
+    one(
+        "signer-narrows", "the signer itself signed for less",
+        manifest(LISTING, SECOND, tag="(install (app calc) (beta))"), "PACKAGE_NOT_GRANTED",
+    )
+    one(
+        "signer-other", "the signer signed for something else", manifest(LISTING, SECOND, tag="(remove)"),
+        "NOT_AUTHORIZED",
+    )
     for name, period, code in (("ended", PAST, "NOT_AUTHORIZED"), ("not-yet", FUTURE, "NOT_AUTHORIZED"), ("in-force", ALWAYS, "OK")):
-        one(f"second-{name}", "the certificate's period, by the time of signing", manifest(LISTING, pairs(issue(ROOT, SIGNER, period=period))), code)
+        one(
+            f"second-{name}", "the certificate's period, by the time of signing",
+            manifest(LISTING, pairs(issue(ROOT, SIGNER, period=period))), code,
+        )
         one(f"entry-{name}", "the entry's period, by the time of signing", GOOD, code, entry(ROOT, period=period))
     window = manifest(LISTING, pairs(issue(ROOT, SIGNER, period=("2020-01-01_00:00:00", "2020-12-31_23:59:59"))))
     one("asked-in-2020", "asked about a moment of the period", window, "OK", at="2020-07-01_00:00:00")
@@ -195,8 +260,14 @@ def _authority(book: Book) -> None:
     one("asked-after-end", "a second later", window, "NOT_AUTHORIZED", at="2021-01-01_00:00:00")
     nothing = {**store(book, GOOD)}
     del nothing["global/acl/e1.acl"]
-    book.case("manifests/no-store", "nothing is trusted", nothing, ask_manifest(), (library("FILE_NOT_FOUND"), command(2, "no-acl-store")))
-    book.case("manifests/acl-directory", "an entry of a directory that is trusted beside", {**nothing, "more/x.acl": book.object(entry(ROOT), "entry")}, ask_manifest(acl_directory="more"), YES)
+    book.case(
+        "manifests/no-store", "nothing is trusted", nothing, ask_manifest(),
+        (library("FILE_NOT_FOUND"), command(2, "no-acl-store")),
+    )
+    book.case(
+        "manifests/acl-directory", "an entry of a directory that is trusted beside",
+        {**nothing, "more/x.acl": book.object(entry(ROOT), "entry")}, ask_manifest(acl_directory="more"), YES,
+    )
 
 
 def make(book: Book) -> None:

@@ -8,12 +8,13 @@ from typing import Any, Optional
 from .book import YES, Book, ask_chain, ask_manifest, command, library, word
 from .chains import files as chain_files
 from .keys import ALICE, BOB, CAROL, ROOT, SIGNER, SOURCE, STRANGER
-from .lists import DUMMY, LEAF, REVOKED, TAG, store as list_store
+from .lists import DUMMY, REVOKED, TAG, store as list_store
 from .manifests import SECOND, store
-from .objects import PAST, body, cert, chain, dir_entry, entry, file_entry, issue, manifest, pairs, revocations, signature, threshold, triple
-from .sexp import Hinted, Raw, canonical
+from .objects import (
+    PAST, body, cert, chain, dir_entry, entry, file_entry, issue, manifest, revocations, threshold, triple,
+)  # fmt: skip
 from .thresholds import Other, hinted, padded
-from .trees import AS_SIGNED, LISTING, tree
+from .trees import LISTING, tree
 
 
 def refused(code: str, **more: Any) -> tuple[dict, dict]:
@@ -49,7 +50,10 @@ def _signers(book: Book) -> None:
     ]  # fmt: skip
     for name, why, sequence, entries, answers in rows:
         must = careful if answers is YES else None
-        book.case(f"named/{name}", why, chain_files(book, sequence, *entries), ask_chain(people=1), answers, caller_must=must)
+        book.case(
+            f"named/{name}", why, chain_files(book, sequence, *entries), ask_chain(people=1), answers,
+            caller_must=must,
+        )
 
 
 def _revoked(book: Book) -> None:
@@ -57,21 +61,39 @@ def _revoked(book: Book) -> None:
     key = revocations(SOURCE, TAG, DUMMY, ((SIGNER.hash(), "2025-01-01_00:00:00"),))
     cert_list = revocations(SOURCE, TAG, REVOKED)
     book.case("named/revoked-exits-0/key", "a revoked key is a no", list_store(book, key), ask_chain(people=1), no)
-    book.case("named/revoked-exits-0/certificate", "so is a revoked certificate", list_store(book, cert_list), ask_chain(people=1), no)
+    book.case(
+        "named/revoked-exits-0/certificate", "so is a revoked certificate", list_store(book, cert_list),
+        ask_chain(people=1), no,
+    )
     plain = issue(ROOT, SIGNER)
-    book.case("named/revoked-exits-0/no-source", "a revoked key is one where the certificate names no source", list_store(book, key, plain), ask_chain(people=1), no)
+    book.case(
+        "named/revoked-exits-0/no-source", "a revoked key is one where the certificate names no source",
+        list_store(book, key, plain), ask_chain(people=1), no,
+    )
     signed = manifest(LISTING, SECOND)
     named = {"app.manifest": book.object(signed, "manifest"), **tree()}
-    book.case("named/revoked-exits-0/manifest", "a manifest by a revoked key", list_store(book, key, plain, **named), ask_manifest(people=1), refused("SIGNING_CERT_ORDER"))
+    book.case(
+        "named/revoked-exits-0/manifest", "a manifest by a revoked key", list_store(book, key, plain, **named),
+        ask_manifest(people=1), refused("SIGNING_CERT_ORDER"),
+    )
     ended, unknown = revocations(SOURCE, TAG, DUMMY, period=PAST), refused("CRL_NOT_FOUND")
-    book.case("named/expired-list-as-coverage/chain", "a list that has ended tells nothing", list_store(book, ended), ask_chain(people=1), unknown)
+    book.case(
+        "named/expired-list-as-coverage/chain", "a list that has ended tells nothing", list_store(book, ended),
+        ask_chain(people=1), unknown,
+    )
     late = ask_chain(at=None, not_before="2030-01-01_00:00:00", people=1)
-    book.case("named/expired-list-as-coverage/open-end", "nor for a time that has no end", list_store(book, ended), late, unknown)
+    book.case(
+        "named/expired-list-as-coverage/open-end", "nor for a time that has no end", list_store(book, ended), late,
+        unknown,
+    )
     old = revocations(SOURCE, TAG, DUMMY, period=("2001-01-01_00:00:00", "3400-01-01_00:00:00"))
     before = [{"operation": "import-lists", "directory": "in"}]
     for name, stored in (("certificate", cert_list), ("key", revocations(SOURCE, TAG, DUMMY, ((SIGNER.hash(), "2025-01-01_00:00:00"),)))):
         files = list_store(book, stored, **{"in/old.crl": book.object(old, "list")})
-        book.case(f"named/rolled-back-list/{name}", "an older list that revokes less takes no effect", files, ask_chain(people=1), no, before=before)
+        book.case(
+            f"named/rolled-back-list/{name}", "an older list that revokes less takes no effect", files,
+            ask_chain(people=1), no, before=before,
+        )
 
 
 def _trees(book: Book) -> None:
@@ -83,7 +105,10 @@ def _trees(book: Book) -> None:
         book.case(f"named/{name}", why, store(book, what, tree=files), {**ask, **more}, answers, caller_must=must)
 
     one("empty-tree-accepted/nothing-there", "everything is missing", signed, empty, refused("HASH_MISMATCH"))
-    one("empty-tree-accepted/no-directory", "so it is where there is no directory", signed, {}, (library("HASH_MISMATCH"), command(2, "io", says="")))
+    one(
+        "empty-tree-accepted/no-directory", "so it is where there is no directory", signed, {},
+        (library("HASH_MISMATCH"), command(2, "io", says="")),
+    )
     nothing = manifest(body(), SECOND)
     one("empty-tree-accepted/nothing-listed", "a manifest that lists nothing, and a directory that is not there", nothing, {},
         (library("OK"), command(2, "io", says="")), "see that the directory exists, and that something is listed")  # fmt: skip
@@ -95,13 +120,28 @@ def _trees(book: Book) -> None:
         ("directory", dir_entry("..", file_entry("outside", b"x"))), ("slash", file_entry("/etc/hostname", b"x")), ("backslash", file_entry("..\\outside", b"x")),
     ):  # fmt: skip
         answers = refused("FILE_NOT_FOUND") if name == "backslash" else unreadable("PARSE_FILE")
-        one(f"path-climbs-out/{name}", "no name leads out of the tree", manifest(body(listed), SECOND), outside, answers)
-    book.case("named/success-on-failure/no", "a refusal is told as one", store(book, signed, tree=tree({"tree/a": b"X"})), ask, refused("HASH_MISMATCH"))
-    book.case("named/success-on-failure/usage", "a wrong usage is none", store(book, signed, tree=tree()), {**ask, "tag": "a)"}, unreadable("UNEXPECTED_CHAR", "unexpected-char"))
+        one(
+            f"path-climbs-out/{name}", "no name leads out of the tree", manifest(body(listed), SECOND), outside,
+            answers,
+        )
+    book.case(
+        "named/success-on-failure/no", "a refusal is told as one", store(book, signed, tree=tree({"tree/a": b"X"})),
+        ask, refused("HASH_MISMATCH"),
+    )
+    book.case(
+        "named/success-on-failure/usage", "a wrong usage is none", store(book, signed, tree=tree()),
+        {**ask, "tag": "a)"}, unreadable("UNEXPECTED_CHAR", "unexpected-char"),
+    )
     cut = book.cut(signed, "manifest", 700)
-    book.case("named/success-on-failure/trouble", "nor is a file that cannot be read", store(book, cut, tree=tree()), ask, unreadable("PARSE_FILE"))
+    book.case(
+        "named/success-on-failure/trouble", "nor is a file that cannot be read", store(book, cut, tree=tree()), ask,
+        unreadable("PARSE_FILE"),
+    )
     future = manifest(LISTING, SECOND, at="2990-01-01_00:00:00")
-    one("signed-in-the-future", "a time of signing that is yet to come", future, tree(), (library("OK"), command(1, "signed-in-future", says="no")), "compare the time of signing with the clock")
+    one(
+        "signed-in-the-future", "a time of signing that is yet to come", future, tree(),
+        (library("OK"), command(1, "signed-in-future", says="no")), "compare the time of signing with the clock",
+    )
 
 
 # Names, and how they must be shown.
@@ -132,13 +172,24 @@ def _escapes(book: Book) -> None:
             ("unlisted", {f"tree/sub/{raw}2": b""}, "EXTRA_FILES", "unlisted"),
         ):
             more = "2" if what == "unlisted" else ""
-            answers = library(code, **{member: [f"sub/{raw}{more}"]}), command(1, word(code), says="no", **{member: [f"sub/{shown}{more}"]})
+            answers = library(code, **{member: [f"sub/{raw}{more}"]}), command(
+                1, word(code), says="no", **{member: [f"sub/{shown}{more}"]},
+            )
             files = store(book, manifest(listing, SECOND), tree=tree(change, good))
-            book.case(f"named/escape-sequences/{what}-{name}", "a name that would drive a terminal", files, ask_manifest(refuse_unlisted=1, people=1), answers)
-        book.case(f"named/escape-sequences/text-{name}", "the same, by itself", {}, {"operation": "escape", "text": raw}, (library("OK", text=shown), None))
+            book.case(
+                f"named/escape-sequences/{what}-{name}", "a name that would drive a terminal", files,
+                ask_manifest(refuse_unlisted=1, people=1), answers,
+            )
+        book.case(
+            f"named/escape-sequences/text-{name}", "the same, by itself", {}, {"operation": "escape", "text": raw},
+            (library("OK", text=shown), None),
+        )
         owned = chain([*triple(ROOT, cert(ROOT, SIGNER, comment=raw))[:2], [b"owner", raw.encode("latin-1")]])
         question = {"operation": "read-chain", "file": "chain.cert", "people": 1}
-        book.case(f"named/escape-sequences/owner-{name}", "a text that anybody wrote", chain_files(book, owned), question, YES)
+        book.case(
+            f"named/escape-sequences/owner-{name}", "a text that anybody wrote", chain_files(book, owned), question,
+            YES,
+        )
 
 
 def make(book: Book) -> None:

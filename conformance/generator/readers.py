@@ -185,5 +185,8 @@ def make(book: Book) -> None:
     _read(book, "other-object", "an entry where a chain must be", {"content": "(5:entry)"}, "PARSE_FILE")
     where = {"operation": "read-chain", "file": "chain.cert"}
     book.case("read/absent", "no such file", {}, where, trouble("FILE_OPEN", "io"))
-    book.case("read/fifo", "a pipe is not opened, and nobody waits for it", {"chain.cert": {"fifo": 1}}, where, trouble("FILE_OPEN", "io"))
+    book.case(
+        "read/fifo", "a pipe is not opened, and nobody waits for it", {"chain.cert": {"fifo": 1}}, where,
+        trouble("FILE_OPEN", "io"),
+    )
     book.case("read/directory", "a directory is no file", {"chain.cert/": None}, where, trouble("FILE_OPEN", "io"))

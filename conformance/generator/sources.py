@@ -5,11 +5,10 @@ from __future__ import annotations
 
 from typing import Any, Optional
 
-from .book import YES, Book, ask_chain, command, library, no, trouble
-from .keys import ALICE, ROOT, SIGNER, SOURCE, STRANGER
-from .lists import DUMMY, LEAF, REVOKED, STORED, TAG, store
+from .book import YES, Book, ask_chain, command, library, no
+from .keys import ALICE, SOURCE, STRANGER
+from .lists import DUMMY, REVOKED, STORED, TAG, store
 from .objects import ALWAYS, FUTURE, LONG_AGO, MOMENT, PAST, cert, entry, revocations, signature
-from .sexp import tag_of
 
 GOOD = revocations(SOURCE, TAG, DUMMY)
 REPLACED = "compare what two lists revoke before offering one, and look what is stored afterwards"
@@ -88,22 +87,40 @@ def _imported(book: Book) -> None:
         must = REPLACED if answers is lax else None
         book.case(f"sources/import-{name}", why, files, ask_chain(), answers, before=before, caller_must=must)
     question = {"operation": "import-lists", "directory": "in"}
-    book.case("sources/import-nothing", "a directory without lists", store(book, **{"in/": None}), question, (library("CRL_NOT_FOUND"), command(2, "nothing")))
-    book.case("sources/import-broken", "a list that cannot be read", store(book, **{"in/x.crl": {"content": "none"}}), question, (library("CRL_NOT_FOUND"), command(2, "trouble")))
+    book.case(
+        "sources/import-nothing", "a directory without lists", store(book, **{"in/": None}), question,
+        (library("CRL_NOT_FOUND"), command(2, "nothing")),
+    )
+    book.case(
+        "sources/import-broken", "a list that cannot be read", store(book, **{"in/x.crl": {"content": "none"}}),
+        question, (library("CRL_NOT_FOUND"), command(2, "trouble")),
+    )
     told = library("OK"), command(1, "no")
     files = store(book, takes_back, **{"in/x.crl": book.object(revocations(STRANGER, TAG, DUMMY), "list")})
-    book.case("sources/import-says-yes", "the library reports success whatever was stored", files, question, told, caller_must="look what is stored afterwards")
+    book.case(
+        "sources/import-says-yes", "the library reports success whatever was stored", files, question, told,
+        caller_must="look what is stored afterwards",
+    )
 
 
 def _found(book: Book) -> None:
-    both = {STORED: book.object(GOOD, "list"), "global/cert/other (revoke all).crl": book.object(revocations(SOURCE, "other (revoke all)", DUMMY), "list")}
+    both = {
+        STORED: book.object(GOOD, "list"),
+        "global/cert/other (revoke all).crl": book.object(revocations(SOURCE, "other (revoke all)", DUMMY), "list"),
+    }
     for name, tag, code in (
         ("one", TAG, "OK"), ("other", "other (revoke all)", "OK"), ("none", "third (revoke all)", "ACL_ENTRY_NOT_FOUND"),
         ("shorter", "calc", "ACL_ENTRY_NOT_FOUND"), ("longer", TAG + " x", "ACL_ENTRY_NOT_FOUND"), ("case", "Calc (revoke all)", "ACL_ENTRY_NOT_FOUND"),
         ("open", "calc (revoke", "INVALID_S_EXPRESSION"), ("closed", "calc)", "UNEXPECTED_CHAR"),
     ):  # fmt: skip
-        book.case(f"sources/find-{name}", f"the stored list of {tag}", both, {"operation": "find-list", "tag": tag}, (library(code), None))
-    book.case("sources/find-empty", "an empty store", {"global/cert/": None}, {"operation": "find-list", "tag": TAG}, (library("CRL_NOT_FOUND"), None))
+        book.case(
+            f"sources/find-{name}", f"the stored list of {tag}", both, {"operation": "find-list", "tag": tag},
+            (library(code), None),
+        )
+    book.case(
+        "sources/find-empty", "an empty store", {"global/cert/": None}, {"operation": "find-list", "tag": TAG},
+        (library("CRL_NOT_FOUND"), None),
+    )
 
 
 def make(book: Book) -> None:

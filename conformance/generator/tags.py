@@ -64,7 +64,10 @@ def _matrix(book: Book) -> None:
             why = f"{request} under {grant}"
             if (code == "OK") != allows(asked, given):
                 why += ": it means no more, but by the rules it is not within"
-            files = {"global/acl/root.acl": book.object(entry(ROOT, grant), "entry"), "chain.cert": book.object(leaf, "chain")}
+            files = {
+                "global/acl/root.acl": book.object(entry(ROOT, grant), "entry"),
+                "chain.cert": book.object(leaf, "chain"),
+            }
             book.case(f"tags/{name}-{i}-under-{j}", why, files, ask_chain(request), (library(code), careful))
             if (i + j) % 3 == 0:
                 inside = within(asked, given)

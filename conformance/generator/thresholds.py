@@ -3,12 +3,12 @@
 
 from __future__ import annotations
 
-from typing import Any, Optional
+from typing import Any
 
 from .book import YES, Book, ask_chain, command, library, no
 from .chains import files
 from .keys import ALICE, BOB, CAROL, ROOT, SIGNER, STRANGER, Key, number
-from .objects import ALWAYS, FUTURE, MOMENT, PAST, cert, chain, entry, issue, threshold, triple
+from .objects import FUTURE, PAST, cert, chain, entry, issue, threshold, triple
 from .sexp import Hinted, Sexp
 
 
@@ -46,7 +46,9 @@ def _counts(book: Book) -> None:
             code = "OK" if votes in enough else "NOT_AUTHORIZED"
             asked = files(book, _votes(*(people[letter] for letter in votes)), entry(subject))
             why = f"{votes} where {k} of {members} must agree"
-            book.case(f"thresholds/{k}-of-{members}-{votes}", why, asked, ask_chain(), YES if code == "OK" else no(code))
+            book.case(
+                f"thresholds/{k}-of-{members}-{votes}", why, asked, ask_chain(), YES if code == "OK" else no(code),
+            )
 
 
 def _agreements(book: Book) -> None:
@@ -57,20 +59,44 @@ def _agreements(book: Book) -> None:
         book.case(f"thresholds/{name}", why, files(book, sequence, *(entries or (two,))), ask_chain(), answers)
 
     one("tags", "both allow what is asked", chain(issue(ALICE, SIGNER, "(install)"), issue(BOB, SIGNER)), YES)
-    one("other-tag", "one of them allows something else", chain(issue(ALICE, SIGNER), issue(BOB, SIGNER, "(remove)")), refused)
+    one(
+        "other-tag", "one of them allows something else",
+        chain(issue(ALICE, SIGNER), issue(BOB, SIGNER, "(remove)")), refused,
+    )
     one("ended", "one of them has ended", chain(issue(ALICE, SIGNER), issue(BOB, SIGNER, period=PAST)), refused)
     one("not-yet", "one of them has not begun", chain(issue(ALICE, SIGNER), issue(BOB, SIGNER, period=FUTURE)), refused)
     one("other-subject", "they speak of different keys", chain(issue(ALICE, SIGNER), issue(BOB, CAROL)), refused)
-    one("forged", "one signature is another's", chain(issue(ALICE, SIGNER), triple(ALICE, cert(BOB, SIGNER))), no("SIGNATURE"))
-    one("no-propagate", "they may not pass it on", _votes(ALICE, BOB), refused, entry(threshold(2, ALICE, BOB), propagate=False))
-    one("two-entries", "two entries of one member each do not add up", _votes(ALICE, BOB), refused, entry(threshold(2, ALICE, STRANGER)), entry(threshold(2, BOB, CAROL)))
+    one(
+        "forged", "one signature is another's", chain(issue(ALICE, SIGNER), triple(ALICE, cert(BOB, SIGNER))),
+        no("SIGNATURE"),
+    )
+    one(
+        "no-propagate", "they may not pass it on", _votes(ALICE, BOB), refused,
+        entry(threshold(2, ALICE, BOB), propagate=False),
+    )
+    one(
+        "two-entries", "two entries of one member each do not add up", _votes(ALICE, BOB), refused,
+        entry(threshold(2, ALICE, STRANGER)), entry(threshold(2, BOB, CAROL)),
+    )
     plain, counted = threshold(2, ALICE, BOB), threshold(2, ALICE, BOB)
     counted[1:3] = [Hinted(b"num", counted[1]), Hinted(b"num", counted[2])]
     votes = [issue(ALICE, SIGNER), issue(BOB, SIGNER)]
-    one("certified", "a certificate may want k of n, too", chain(*votes, issue(ROOT, counted, propagate=True)), YES, entry(ROOT))
-    one("certified-few", "and one of the two is not enough", chain(votes[0], issue(ROOT, counted, propagate=True)), refused, entry(ROOT))
-    one("certified-twice", "nor is the same one twice", chain(votes[0], votes[0], issue(ROOT, counted, propagate=True)), refused, entry(ROOT))
-    one("certified-plain", "counts that are read carry the hint num, and a signature covers hints", chain(*votes, issue(ROOT, plain, propagate=True)), no("HASH_MISMATCH"), entry(ROOT))
+    one(
+        "certified", "a certificate may want k of n, too", chain(*votes, issue(ROOT, counted, propagate=True)), YES,
+        entry(ROOT),
+    )
+    one(
+        "certified-few", "and one of the two is not enough", chain(votes[0], issue(ROOT, counted, propagate=True)),
+        refused, entry(ROOT),
+    )
+    one(
+        "certified-twice", "nor is the same one twice",
+        chain(votes[0], votes[0], issue(ROOT, counted, propagate=True)), refused, entry(ROOT),
+    )
+    one(
+        "certified-plain", "counts that are read carry the hint num, and a signature covers hints",
+        chain(*votes, issue(ROOT, plain, propagate=True)), no("HASH_MISMATCH"), entry(ROOT),
+    )
     leaf = library("SPKI_ERR_KEY_OR_HASH_EXPECTED"), command(2, "spki-err-key-or-hash-expected")
     one("leaf", "k of n cannot be whom a chain is for", chain(issue(ROOT, counted)), leaf, entry(ROOT))
     odd = library("SPKI_ERR_KOFN_SYNTAX"), command(2, "spki-err-kofn-syntax")  # nothing is answered with it there
@@ -129,11 +155,20 @@ def _times(book: Book) -> None:
             answers = no("NOT_AUTHORIZED") if granted is False else YES
             if name == "turned":
                 answers = answers[0], command(2, "usage")
-            book.case(f"times/{place}-{name}", why, asked, question, answers, caller_must=must if granted is None else None)
+            book.case(
+                f"times/{place}-{name}", why, asked, question, answers,
+                caller_must=must if granted is None else None,
+            )
     apart = chain(issue(ALICE, SIGNER, period=PAST), issue(ROOT, ALICE, propagate=True, period=FUTURE))
-    book.case("times/apart", "two certificates that are never in force together", files(book, apart), ask_chain(at=None), no("NOT_AUTHORIZED"))
+    book.case(
+        "times/apart", "two certificates that are never in force together", files(book, apart), ask_chain(at=None),
+        no("NOT_AUTHORIZED"),
+    )
     for name, stamps in (("start", (None, PAST[1])), ("end", (FUTURE[0], None))):
-        book.case(f"times/without-{name}", "a period that is open at one side", files(book, chain(issue(ROOT, SIGNER, period=stamps))), ask_chain(), no("NOT_AUTHORIZED"))
+        book.case(
+            f"times/without-{name}", "a period that is open at one side",
+            files(book, chain(issue(ROOT, SIGNER, period=stamps))), ask_chain(), no("NOT_AUTHORIZED"),
+        )
 
 
 def make(book: Book) -> None:

@@ -5,10 +5,10 @@ from __future__ import annotations
 
 from typing import Any, Optional
 
-from .book import CODES, YES, Book, ask_manifest, command, library, no, trouble, word
-from .keys import ALICE, STRANGER
+from .book import YES, Book, ask_manifest, command, library, no, trouble, word
+from .keys import STRANGER
 from .manifests import SECOND, store
-from .objects import body, cert, dir_entry, file_entry, issue, manifest, pairs, signature
+from .objects import body, dir_entry, file_entry, issue, manifest, pairs, signature
 from .sexp import canonical
 
 AS_SIGNED = {"tree/a": b"x", "tree/sub/b": b"y", "tree/sub/deep/c": b"z"}
@@ -69,22 +69,38 @@ def _unlisted(book: Book) -> None:
         files, found = tree({f"tree/{file}": b""}), {"changed": [], "missing": [], "unlisted": [file]}
         strict = library("EXTRA_FILES", **found), command(1, "extra-files", **found)
         _one(book, f"unlisted-{name}-refused", why + " that was not signed", files, strict, refuse_unlisted=1)
-        _one(book, f"unlisted-{name}", why + " that was not signed", files, (library("OK", **found), strict[1]), must=UNLISTED)
+        _one(
+            book, f"unlisted-{name}", why + " that was not signed", files, (library("OK", **found), strict[1]),
+            must=UNLISTED,
+        )
     for name, change in (("directory", {"tree/sub/z/": None}), ("full-directory", {"tree/sub/z/q": b""}), ("link", {"tree/sub/z": {"link": "/"}}), ("fifo", {"tree/sub/z": {"fifo": 1}})):
         _one(book, f"unlisted-{name}-refused", "it was not signed", tree(change), refused, refuse_unlisted=1)
         _one(book, f"unlisted-{name}", "it was not signed", tree(change), (library("OK"), refused[1]), must=UNLISTED)
     for name, change in (("file", {"tree/z": b""}), ("directory", {"tree/z/": None}), ("twin", {"tree/A": b"x"})):
-        _one(book, f"unlisted-top-{name}", "the library does not search the top directory", tree(change), (library("OK", unlisted=[]), refused[1]), must=UNLISTED, refuse_unlisted=1)
+        _one(
+            book, f"unlisted-top-{name}", "the library does not search the top directory", tree(change),
+            (library("OK", unlisted=[]), refused[1]), must=UNLISTED, refuse_unlisted=1,
+        )
 
 
 def _links(book: Book) -> None:
     out = {"outside": {"content": "x"}, "far/b": {"content": "y"}, "far/deep/c": {"content": "z"}}
     leaves = command(1, "link-leaves-tree")
     must = "refuse trees in which a listed entry is a link that leads out, or lies behind one"
-    _one(book, "link-out", "a link to the right contents, outside", {**tree({"tree/a": {"link": "../outside"}}), **out}, (library("OK"), leaves), must=must)
-    _one(book, "link-out-directory", "a directory that lies elsewhere", {**tree({"tree/sub": {"link": "../far"}, "tree/sub/b": None, "tree/sub/deep/c": None}), **out}, (library("OK"), leaves), must=must)
+    _one(
+        book, "link-out", "a link to the right contents, outside",
+        {**tree({"tree/a": {"link": "../outside"}}), **out}, (library("OK"), leaves), must=must,
+    )
+    _one(
+        book, "link-out-directory", "a directory that lies elsewhere",
+        {**tree({"tree/sub": {"link": "../far"}, "tree/sub/b": None, "tree/sub/deep/c": None}), **out},
+        (library("OK"), leaves), must=must,
+    )
     two = body(file_entry("a", b"x"), file_entry("d", b"x"))
-    _one(book, "link-inside", "a link to a file of the tree", tree({"tree/d": {"link": "a"}}, {"tree/a": b"x"}), YES, two)
+    _one(
+        book, "link-inside", "a link to a file of the tree", tree({"tree/d": {"link": "a"}}, {"tree/a": b"x"}), YES,
+        two,
+    )
 
 
 def _listings(book: Book) -> None:
@@ -119,7 +135,10 @@ def _ignored(book: Book) -> None:
     ]  # fmt: skip
     for name, change, names, code in rows:
         why = "an ignored name is not looked at" if code == "OK" else "a name is ignored only if it is that one"
-        _one(book, f"ignored-{name}", why, tree(change), YES if code == "OK" else no(code), must=must if code == "OK" else None, ignore=names)
+        _one(
+            book, f"ignored-{name}", why, tree(change), YES if code == "OK" else no(code),
+            must=must if code == "OK" else None, ignore=names,
+        )
 
 
 def _compared(book: Book) -> None:
@@ -145,7 +164,10 @@ def _compared(book: Book) -> None:
     for name, listing, answers, why in bodies:
         one(name, why, manifest(listing, SECOND), answers)
     stranger = manifest(LISTING, pairs(issue(STRANGER, STRANGER)), key=STRANGER)
-    one("stranger", "authority is not looked at", stranger, YES, "verify both manifests first: any key that anyone made passes here")
+    one(
+        "stranger", "authority is not looked at", stranger, YES,
+        "verify both manifests first: any key that anyone made passes here",
+    )
     content = base[3][2]
     forged = manifest(LISTING, SECOND, signer_cert=[content, signature(STRANGER, content)])
     one("forged", "signatures are proved", forged, no("SIGNATURE"))
