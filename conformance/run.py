@@ -12,6 +12,7 @@ import base64
 import calendar
 import json
 import os
+import select
 import shutil
 import subprocess
 import sys
@@ -23,6 +24,7 @@ from pathlib import Path
 from typing import Any, Iterator
 
 HERE = Path(__file__).resolve().parent
+PATIENCE = 120  # seconds; what waits for a pipe waits for ever
 PATHS = ("file", "other", "directory", "acl_directory")
 
 
@@ -94,9 +96,11 @@ class Implementation:
         self._asked += 1
         self._process.stdin.write(json.dumps({"id": self._asked, **what}) + "\n")
         self._process.stdin.flush()
-        line = self._process.stdout.readline()
+        answered = select.select([self._process.stdout], [], [], PATIENCE)[0]
+        line = self._process.stdout.readline() if answered else ""
         if not line:
-            raise SystemExit(f"run.py: the implementation ended at: {json.dumps(what)}")
+            self._process.kill()
+            raise SystemExit(f"run.py: no answer to: {json.dumps(what)}")
         answer: dict = json.loads(line)
         if answer.get("id") != self._asked:
             raise SystemExit(f"run.py: an answer to another question: {line.strip()}")
