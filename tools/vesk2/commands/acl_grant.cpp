@@ -1,13 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
 // acl_grant.cpp: vesk2 acl grant.
-#include <filesystem>
 #include <set>
 
 #include "tools/vesk2/commands/command.h"
 #include "tools/vesk2/commands/describe.h"
 #include "tools/vesk2/files/files.h"
+#include "tools/vesk2/keys/key_reference.h"
 #include "tools/vesk2/keys/key_source.h"
-#include "tools/vesk2/keys/keys.h"
 #include "tools/vesk2/objects/crl_file.h"
 #include "tools/vesk2/say/report.h"
 #include "tools/vesk2/stores/grant.h"
@@ -76,7 +75,7 @@ std::string EntryName(const Options& options) {
   }
   std::string name;
   for (const std::string& source : sources) {
-    name += (name.empty() ? "" : "-") + std::filesystem::path(source).stem().string();
+    name += (name.empty() ? "" : "-") + KeyNickname(source);
   }
   constexpr size_t kLongest = 100;
   if (name.size() > kLongest) throw Trouble("so many keys need a --name for the entry", "usage");

@@ -5,6 +5,7 @@
 
 #include "tools/vesk2/commands/command.h"
 #include "tools/vesk2/commands/describe.h"
+#include "tools/vesk2/keys/key_reference.h"
 #include "tools/vesk2/keys/key_source.h"
 #include "tools/vesk2/objects/crl_file.h"
 #include "tools/vesk2/say/report.h"
@@ -87,7 +88,7 @@ Signers OpenSigners(const SignerOptions& options) {
   for (size_t i = 0; i < options.keys.size(); ++i) {
     signers.push_back(OpenSigner(options, i));
     if (seen.insert(Fingerprint(*signers[i]->Public())).second) continue;
-    throw Trouble(Escape(options.keys[i]) + ": this key signs already", "usage");
+    throw Trouble(Escape(ShownKey(options.keys[i])) + ": this key signs already", "usage");
   }
   return signers;
 }

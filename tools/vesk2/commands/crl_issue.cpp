@@ -2,6 +2,7 @@
 // crl_issue.cpp: vesk2 crl issue.
 #include "tools/vesk2/commands/command.h"
 #include "tools/vesk2/files/files.h"
+#include "tools/vesk2/keys/key_reference.h"
 #include "tools/vesk2/keys/key_source.h"
 #include "tools/vesk2/objects/texts.h"
 #include "tools/vesk2/say/report.h"
@@ -138,7 +139,7 @@ ExitCode Run(const Options& options) {
     Check(CheckIssuerWord(*ReadCrl(temporary)), "checking the new list");
   };
   if (options.grant) {
-    TrustSource(*key->Public(), tag.get(), options.signer.keys[0], flags.dryRun);
+    TrustSource(*key->Public(), tag.get(), KeyNickname(options.signer.keys[0]), flags.dryRun);
   }
   const std::string items = "; revoked certificates: " + std::to_string(options.certs.size()) +
                             ", keys: " + std::to_string(options.keys.size());

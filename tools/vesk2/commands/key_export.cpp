@@ -1,11 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 // key_export.cpp: vesk2 key export.
-#include <openssl/evp.h>
 #include <unistd.h>
 
 #include "tools/vesk2/commands/command.h"
 #include "tools/vesk2/files/files.h"
-#include "tools/vesk2/keys/keys.h"
+#include "tools/vesk2/keys/key_reference.h"
 #include "tools/vesk2/say/report.h"
 
 namespace vesk2_command {
@@ -28,15 +27,6 @@ std::string Export(PublicKey& key, Exporter exporter) {
   const std::unique_ptr<unsigned char[]> owner(data);
   Check(code, "exporting the key");
   return {reinterpret_cast<char*>(data), length};
-}
-
-std::string Base64(const std::string& bytes) {
-  std::string out(4 * ((bytes.size() + 2) / 3) + 1, '\0');
-  const int length = EVP_EncodeBlock(reinterpret_cast<unsigned char*>(out.data()),
-                                     reinterpret_cast<const unsigned char*>(bytes.data()),
-                                     static_cast<int>(bytes.size()));
-  out.resize(static_cast<size_t>(length));
-  return out;
 }
 
 std::string Pem(const std::string& der) {
@@ -73,7 +63,9 @@ ExitCode Run(const Options& options) {
 
 Action DefineKeyExport(CLI::App& app) {
   auto options = std::make_shared<Options>();
-  app.add_option("file", options->file, "A key file: .pub, or PEM")->required();
+  app.add_option("file", options->file,
+                 "A key: a .pub or PEM file, pkcs11:URI, or ssh-agent:SHA256:FINGERPRINT")
+      ->required();
   app.add_option("--format", options->format,
                  "How: a line for SSH, an X.509 SubjectPublicKeyInfo in PEM, or our own form")
       ->check(CLI::IsMember({"ssh", "x509", "canonical"}))

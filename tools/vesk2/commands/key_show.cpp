@@ -2,7 +2,7 @@
 // key_show.cpp: vesk2 key show.
 #include "tools/vesk2/commands/command.h"
 #include "tools/vesk2/commands/describe.h"
-#include "tools/vesk2/keys/keys.h"
+#include "tools/vesk2/keys/key_reference.h"
 #include "tools/vesk2/say/report.h"
 
 namespace vesk2_command {
@@ -24,7 +24,9 @@ ExitCode Run(const Options& options) {
 
 Action DefineKeyShow(CLI::App& app) {
   auto options = std::make_shared<Options>();
-  app.add_option("file", options->file, "A key file: .pub, or PEM")->required();
+  app.add_option("file", options->file,
+                 "A key: a .pub or PEM file, pkcs11:URI, or ssh-agent:SHA256:FINGERPRINT")
+      ->required();
   AddPassphraseOptions(app, options->passphrase);
   return [options] { return Run(*options); };
 }

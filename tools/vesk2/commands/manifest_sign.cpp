@@ -5,6 +5,7 @@
 #include "tools/vesk2/commands/command.h"
 #include "tools/vesk2/files/files.h"
 #include "tools/vesk2/keys/issue.h"
+#include "tools/vesk2/keys/key_reference.h"
 #include "tools/vesk2/keys/key_source.h"
 #include "tools/vesk2/objects/crl_file.h"
 #include "tools/vesk2/objects/manifest_file.h"
@@ -204,7 +205,7 @@ void CheckWritten(const std::string& unnamed, const Options& options, const List
 void WriteGrant(const Options& options, const SigningKey& key) {
   const Ref<ZvVesk2::AclEntry> entry =
       MakeEntry({Ref<ZvVesk2::Subject>(key.Public().Release()), true, ParseTag(options.grant)});
-  const std::string name = std::filesystem::path(options.signer.keys[0]).stem().string();
+  const std::string name = KeyNickname(options.signer.keys[0]);
   GrantEntry(*entry, {FreeEntryName(*entry, name), {false, options.flags.dryRun}});
 }
 

@@ -8,7 +8,7 @@
 #include "tools/vesk2/commands/describe.h"
 #include "tools/vesk2/files/descriptor.h"
 #include "tools/vesk2/files/files.h"
-#include "tools/vesk2/keys/keys.h"
+#include "tools/vesk2/keys/key_reference.h"
 #include "tools/vesk2/objects/expression.h"
 
 #include <vesk2/acl_entry.h>

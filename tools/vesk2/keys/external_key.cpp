@@ -14,6 +14,7 @@
 #include <vector>
 
 #include "tools/vesk2/files/descriptor.h"
+#include "tools/vesk2/keys/key_reference.h"
 #include "tools/vesk2/say/report.h"
 
 namespace vesk2_command {
@@ -113,7 +114,8 @@ ExternalKey::ExternalKey(const std::string& command, const std::string& publicKe
 
 Ref<PublicKey> ExternalKey::Public() const { return Ref<PublicKey>::Share(key_.get()); }
 
-std::string ExternalKey::SignDigest(std::string_view digest, const std::string& algorithm) const {
+std::string ExternalKey::SignObject(SExpression& /*object*/, std::string_view digest,
+                                    const std::string& algorithm) const {
   return RunProgram(
       command_,
       Environment({

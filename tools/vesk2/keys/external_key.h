@@ -21,7 +21,8 @@ class ExternalKey : public SigningKey {
   Ref<PublicKey> Public() const override;
 
  private:
-  std::string SignDigest(std::string_view digest, const std::string& algorithm) const override;
+  std::string SignObject(SExpression& object, std::string_view digest,
+                         const std::string& algorithm) const override;
 
   std::string command_;
   std::string path_;

@@ -3,6 +3,7 @@
 #include "tools/vesk2/keys/issue.h"
 
 #include "tools/vesk2/keys/external_key.h"
+#include "tools/vesk2/keys/key_reference.h"
 #include "tools/vesk2/objects/tag_bounds.h"
 #include "tools/vesk2/say/report.h"
 
@@ -12,14 +13,16 @@ using ZvVesk2::Cert;
 
 void AddSignerOptions(CLI::App& app, SignerOptions& options, SignerCount count) {
   const bool several = count == SignerCount::kSeveral;
-  auto* key = app.add_option("--key", options.keys,
-                             several ? "The private key (PEM) that signs; several sign one each"
-                                     : "The private key (PEM) that signs");
+  const std::string about =
+      "The private key that signs: a PEM file, pkcs11:URI on a token, or "
+      "ssh-agent:SHA256:FINGERPRINT";
+  auto* key =
+      app.add_option("--key", options.keys, several ? about + "; several sign one each" : about);
   key->required()->allow_extra_args(false);
   if (!several) key->expected(1);
   app.add_option("--algorithm", options.algorithm, "How an RSA key signs, over SHA-256")
       ->check(CLI::IsMember({"rsa-pss", "rsa-1.5"}))
-      ->capture_default_str();
+      ->default_str("rsa-pss; of an ssh-agent rsa-1.5");
   app.add_option("--sign-with", options.program,
                  "Run this by /bin/sh to sign, --key being the public key: it reads the digest and "
                  "writes the signature, both raw");
@@ -29,7 +32,7 @@ void AddSignerOptions(CLI::App& app, SignerOptions& options, SignerCount count) 
 std::unique_ptr<SigningKey> OpenSigner(const SignerOptions& options, size_t index) {
   const std::string& path = options.keys[index];
   if (!options.program.empty()) return std::make_unique<ExternalKey>(options.program, path);
-  return std::make_unique<PrivateKey>(PrivateKey::Read(path, options.passphrase));
+  return OpenKey(path, options.passphrase);
 }
 
 SignedCert IssueCert(const SigningKey& key, const Grant& grant, const std::string& algorithm) {

@@ -20,8 +20,8 @@ namespace vesk2_command {
 // The keys that sign, and how.
 struct SignerOptions {
   std::vector<std::string> keys;
-  std::string algorithm = "rsa-pss";
-  std::string program;  // that has the private keys; `keys` are then the public ones
+  std::string algorithm;  // empty: what the key does unless told
+  std::string program;    // that has the private keys; `keys` are then the public ones
   PassphraseOptions passphrase;
 };
 enum class SignerCount { kOne, kSeveral };

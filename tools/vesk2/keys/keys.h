@@ -1,14 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
-// keys.h: key files, and what signs. The library never sees a private key: PEM files (PKCS#8,
-// optionally under a passphrase) are read, written and used here, over libcrypto.
+// keys.h: what signs. The library never sees a private key: PEM files (PKCS#8, optionally under a
+// passphrase) are read, written and used here, over libcrypto.
 #ifndef VESK2_TOOLS_KEYS_H
 #define VESK2_TOOLS_KEYS_H
-
-#include <openssl/evp.h>
 
 #include <memory>
 #include <string>
 
+#include "tools/vesk2/keys/crypto.h"
 #include "tools/vesk2/keys/passphrase.h"
 #include "tools/vesk2/objects/objects.h"
 
@@ -16,35 +15,26 @@
 
 namespace vesk2_command {
 
-// ReadPublicKey reads a public key file: our canonical form, or PEM.
-Ref<PublicKey> ReadPublicKey(const std::string& path);
-
-// Whether a file holds a private key in PEM.
-bool IsPrivatePem(const std::string& path);
-
-// The public half of any key file; of a private key in PEM too.
-struct PublicHalf {
-  Ref<PublicKey> key;
-  bool ofPrivate = false;
-};
-PublicHalf ReadPublicHalf(const std::string& path, const PassphraseOptions& options);
-
-// What can sign: a private key file, or a program that has the private key in its keeping.
+// What can sign: a private key file, or whatever has the private key in its keeping.
 class SigningKey {
  public:
   virtual ~SigningKey() = default;
   virtual Ref<PublicKey> Public() const = 0;
 
   // Sign makes the signature object over `object` and checks it with the library. `algorithm` is
-  // "rsa-pss" or "rsa-1.5" (over SHA-256); a DSA key signs "dsa-sha1" whatever it says.
+  // "rsa-pss" or "rsa-1.5" (over SHA-256), or empty for what this key does unless told; a DSA key
+  // signs "dsa-sha1" whatever it says.
   Ref<ZvVesk2::Signature> Sign(SExpression& object, const std::string& algorithm) const;
 
  protected:
-  // `source` names the signer in trouble, and `reason` is its word for machines.
+  // `source` names the signer in trouble, unescaped, and `reason` is its word for machines.
   SigningKey(std::string source, std::string reason)
       : source_(std::move(source)), reason_(std::move(reason)) {}
-  // A DSA signature is r and s in two equal halves.
-  virtual std::string SignDigest(std::string_view digest, const std::string& algorithm) const = 0;
+  virtual const char* UsualAlgorithm() const { return "rsa-pss"; }
+  // The raw signature over `digest`, which is that of the object. A DSA signature is r and s in two
+  // equal halves.
+  virtual std::string SignObject(SExpression& object, std::string_view digest,
+                                 const std::string& algorithm) const = 0;
 
   std::string source_;
   std::string reason_;
@@ -55,8 +45,9 @@ class PrivateKey : public SigningKey {
   // Trouble for sizes outside 2048 to 16384 bits.
   static void CheckBits(int bits);
   static PrivateKey Generate(int bits);  // RSA
-  static PrivateKey Read(const std::string& path, const PassphraseOptions& options);
-
+  // Adopt takes over a key that came from `path`.
+  static PrivateKey Adopt(CryptoKey key, const std::string& path);
+  // FromPem reads a private key of `path`, asking for its passphrase if it has one.
   static PrivateKey FromPem(const Secret& pem, const std::string& path,
                             const PassphraseOptions& options);
 
@@ -65,11 +56,11 @@ class PrivateKey : public SigningKey {
   Ref<PublicKey> Public() const override;
 
  private:
-  using Key = std::unique_ptr<EVP_PKEY, decltype(&EVP_PKEY_free)>;
-  PrivateKey(EVP_PKEY* key, const std::string& path);
-  std::string SignDigest(std::string_view digest, const std::string& algorithm) const override;
+  PrivateKey(CryptoKey key, const std::string& path);
+  std::string SignObject(SExpression& object, std::string_view digest,
+                         const std::string& algorithm) const override;
 
-  Key key_;
+  CryptoKey key_;
 };
 
 }  // namespace vesk2_command

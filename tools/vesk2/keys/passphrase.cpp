@@ -75,8 +75,10 @@ int FromOptions(char* out, int size, const PassphraseOptions& options) {
 }  // namespace
 
 void AddPassphraseOptions(CLI::App& app, PassphraseOptions& options) {
-  auto* file = app.add_option("--passphrase-file", options.file,
-                              "Take the passphrase of private keys from this file's first line");
+  auto* file =
+      app.add_option("--passphrase-file", options.file,
+                     "Take the passphrase of private keys, or the PIN of a token, from this file's "
+                     "first line");
   app.add_option("--passphrase-fd", options.descriptor,
                  "Take it from the first line of this open file descriptor")
       ->check(CLI::NonNegativeNumber)
@@ -102,9 +104,13 @@ int GivePassphrase(char* out, int size, int /*writing*/, void* user) {
   asking.asked = true;
   int length = -1;
   try {  // libcrypto calls this, and nothing may be thrown through it
-    length = asking.options.Named()
-                 ? FromOptions(out, size, asking.options)
-                 : AskTerminal(out, size, "Passphrase of " + Escape(asking.path) + ": ", false);
+    length =
+        asking.options.Named()
+            ? FromOptions(out, size, asking.options)
+            : AskTerminal(out, size, asking.what + (" of " + Escape(asking.path)) + ": ", false);
+    if (length >= 0) {
+      asking.used = std::make_shared<const Secret>(std::string(out, static_cast<size_t>(length)));
+    }
   } catch (...) {
     asking.problem = std::current_exception();
   }

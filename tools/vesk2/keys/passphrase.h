@@ -31,20 +31,23 @@ struct PassphraseOptions {
   // What came of either: a pipe gives it only once, and several keys may be under it.
   mutable std::shared_ptr<const Secret> given = nullptr;
 
-  bool Named() const { return !file.empty() || descriptor >= 0; }
+  bool Named() const { return given || !file.empty() || descriptor >= 0; }
 };
 void AddPassphraseOptions(CLI::App& app, PassphraseOptions& options);
 
 // A passphrase for new keys, typed twice unless the options name a source.
 std::shared_ptr<const Secret> NewPassphrase(const PassphraseOptions& options);
 
-// Asking is the user argument of GivePassphrase, libcrypto's callback for encrypted PEM.
+// Asking is the user argument of GivePassphrase, libcrypto's callback for encrypted keys and for
+// those of tokens.
 struct Asking {
   const PassphraseOptions& options;
   const std::string& path;
-  bool asked = false;                    // the key is encrypted
-  bool failed = false;                   // and no passphrase was to be had
-  std::exception_ptr problem = nullptr;  // because of this
+  const char* what = "Passphrase";               // or "PIN", in the question
+  bool asked = false;                            // the key is encrypted
+  std::shared_ptr<const Secret> used = nullptr;  // under this
+  bool failed = false;                           // or no passphrase was to be had
+  std::exception_ptr problem = nullptr;          // because of this
 };
 int GivePassphrase(char* out, int size, int writing, void* asking);
 

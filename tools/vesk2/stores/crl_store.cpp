@@ -37,9 +37,9 @@ std::string WhyKept(CrlSequence& list, CrlSequence& kept) {
 }
 
 // "carol-install-revoke-all": a name without anything that shells read.
-std::string SourceName(const std::string& keyPath, SExpression* tag) {
+std::string SourceName(const std::string& keyName, SExpression* tag) {
   constexpr size_t kLongest = 200;
-  std::string name = std::filesystem::path(keyPath).stem().string() + "-";
+  std::string name = keyName + "-";
   for (const char c : TagText(tag)) {
     const bool plain = std::isalnum(static_cast<unsigned char>(c)) != 0;
     if (plain) name += c;
@@ -166,7 +166,7 @@ std::string StoreCrl(CrlSequence& list, SExpression* acls, const std::string& pa
   return Canonical(*kept) == Canonical(list) ? "" : WhyKept(list, *kept);
 }
 
-void TrustSource(PublicKey& issuer, SExpression* tag, const std::string& keyPath, bool dryRun) {
+void TrustSource(PublicKey& issuer, SExpression* tag, const std::string& keyName, bool dryRun) {
   // The last entry of the tag decides whose lists count.
   for (const std::string& path : StoreFilesOf(AclDirectory(), ".acl")) {
     Ref<AclEntry> entry;
@@ -184,7 +184,7 @@ void TrustSource(PublicKey& issuer, SExpression* tag, const std::string& keyPath
   }
   const Ref<AclEntry> entry =
       MakeEntry({Ref<ZvVesk2::Subject>::Share(&issuer), false, Ref<SExpression>::Share(tag)});
-  GrantEntry(*entry, {FreeEntryName(*entry, SourceName(keyPath, tag)), {false, dryRun}});
+  GrantEntry(*entry, {FreeEntryName(*entry, SourceName(keyName, tag)), {false, dryRun}});
 }
 
 }  // namespace vesk2_command

@@ -61,7 +61,7 @@ std::string StoreCrl(CrlSequence& list, SExpression* acls, const std::string& pa
 
 // TrustSource makes this machine believe the issuer's lists of the source `tag`: it writes the ACL
 // entry that is missing. Trouble when another key is believed for that source, since one decides.
-void TrustSource(PublicKey& issuer, SExpression* tag, const std::string& keyPath, bool dryRun);
+void TrustSource(PublicKey& issuer, SExpression* tag, const std::string& keyName, bool dryRun);
 
 }  // namespace vesk2_command
 
