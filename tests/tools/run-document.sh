@@ -15,9 +15,9 @@ set -u
 document=$(realpath "$2") new=$(realpath -m "${3:-/dev/null}")
 build=$(realpath "$(dirname "$1")/..") bindings=$(realpath "$(dirname "$0")/../../bindings/python")
 work=$(mktemp -d) || exit 1
-trap 'rm -rf "$work"' EXIT
+trap '[ -z "${SSH_AGENT_PID-}" ] || ssh-agent -k >"$work/printed"; rm -rf "$work"' EXIT
 mkdir "$work/run" "$work/bin" && ln -s "$(realpath "$1")" "$work/bin/vesk2" && cd "$work/run" || exit 1
-unset VESK2_HOME VESK2_GLOBAL
+unset VESK2_HOME VESK2_GLOBAL SSH_AGENT_PID SSH_AUTH_SOCK
 export LC_ALL=C PATH=$work/bin:$PATH XDG_DATA_HOME=$work/data
 if [[ -e $build/cmake_install.cmake ]]; then
   DESTDIR=$work/installed cmake --install "$build" >"$work/printed" 2>&1 || { cat "$work/printed"; exit 1; }
@@ -28,7 +28,8 @@ fi
 failures=0 command='' ran=0 file=''
 
 masked() {
-  sed -E 's/(sha256:|KEY-OF-|grant-)[0-9a-f]{8,64}/FINGERPRINT/g
+  sed -E 's/SHA256:[A-Za-z0-9+/]{43}/FINGERPRINT/g
+          s/(sha256:|KEY-OF-|grant-)[0-9a-f]{8,64}/FINGERPRINT/g
           s/20[0-9]{2}-[0-9]{2}-[0-9]{2}_[0-9:]{8}/TIME/g'
 }
 

@@ -38,6 +38,7 @@ int RunCommand(int argc, const char* const* argv);
 
 Action DefineKeyNew(CLI::App& app);
 Action DefineKeyShow(CLI::App& app);
+Action DefineKeyImport(CLI::App& app);
 Action DefineKeyExport(CLI::App& app);
 Action DefineAclGrant(CLI::App& app);
 Action DefineAclList(CLI::App& app);

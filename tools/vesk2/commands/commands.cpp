@@ -10,6 +10,9 @@ constexpr Noun kNouns[] = {
      "Keys are the principals of the system: a grant names a key, and a key signs. The private "
      "half is a PEM file (PKCS#8), if you wish under a passphrase; the public half is what others "
      "need, a canonical S-expression.\n"
+     "Where a key is wanted, it may also be on a token, pkcs11:URI, or in an ssh-agent, "
+     "ssh-agent:SHA256:FINGERPRINT as ssh-add -l prints it. A token's PIN is asked for like a "
+     "passphrase, unless the URI says pin-source=FILE.\n"
      "A key is known by its fingerprint, the SHA-256 of its public half. File names and comments "
      "do not count."},
     {"acl", "Decide what this machine trusts",
@@ -55,6 +58,10 @@ constexpr Command kCommands[] = {
      "vesk2 key new vendor\nvesk2 key new --encrypt alice bob carol", DefineKeyNew},
     {"key", "show", "Show type, size and fingerprint of a key", "vesk2 key show vendor.pub",
      DefineKeyShow},
+    {"key", "import",
+     "Take a key that another program made: NAME.pub, and NAME.pem if it is private",
+     "vesk2 key import ~/.ssh/id_rsa -o me\nvesk2 key import server.crt -o server",
+     DefineKeyImport},
     {"key", "export", "Write a public key as other programs read it",
      "vesk2 key export vendor.pub --format x509\nvesk2 key export vendor.pem --format ssh -o v.ssh",
      DefineKeyExport},
