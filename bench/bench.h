@@ -40,6 +40,7 @@ struct Figure {
 };
 using Figures = std::vector<Figure>;
 Figures HashFigures();
+Figures ExpressionFigures();
 Figures TreeFigures();
 Figures StoreFigures();
 Figures ChainFigures();
