@@ -45,6 +45,7 @@ Figures TreeFigures();
 Figures StoreFigures();
 Figures ChainFigures();
 Figures CommandFigures();
+Figures SignatureFigures();
 
 // ---- Measuring ---------------------------------------------------------------------------------
 

@@ -133,6 +133,30 @@ Outcome ComputeHash(const Effort& effort, const std::string& text) {
       });
 }
 
+// A set of strings, none of which is in another set of another start, and in another order.
+std::string Set(size_t count, size_t first) {
+  std::string text = "(3:tag(1:*3:set";
+  for (size_t i = 0; i < count; ++i) text += vesk2test::Str("s" + std::to_string(first + i * 7));
+  return text + "))";
+}
+
+// What two sets have in common that share half of their strings.
+Outcome Intersection(const Effort& effort) {
+  constexpr size_t kMany = 4'000, kFew = 1'000;
+  const auto intersect = [](const Ref<SExpression>& a, const Ref<SExpression>& b, size_t times) {
+    bool right = true;
+    for (size_t i = 0; i < times; ++i) right = right && !a->IsSubset(b.get());
+    return right;
+  };
+  const auto sets = [](size_t count, size_t first) { return vesk2test::Parse(Set(count, first)); };
+  const Ref<SExpression> many[] = {sets(kMany, 0), sets(kMany, kMany / 2 * 7)};
+  const Ref<SExpression> few[] = {sets(kFew, 0), sets(kFew, kFew / 2 * 7)};
+  const size_t times = effort.Of(20, 5);
+  return Ratio(
+      effort, [&] { return intersect(many[0], many[1], times); },
+      [&] { return intersect(few[0], few[1], times); });
+}
+
 std::string ACertificate() {
   return vesk2test::Cert({.issuer = vesk2test::TestKey::Rsa(0).Public(),
                           .subject = vesk2test::TestKey::Rsa(1).Public(),
@@ -163,6 +187,7 @@ Figures ExpressionFigures() {
        [](const Effort& effort) { return Export(effort, kMiddle); }},
       {"P2c", "of 8 MiB", "the same", 0.40,
        [](const Effort& effort) { return Export(effort, kLarge); }},
+      {"I1", "two sets intersected, of 4,000 over 1,000", "ratio", 6, Intersection},
   };
 }
 

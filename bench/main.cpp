@@ -35,8 +35,8 @@ void Print(const Figure& figure, const Outcome& outcome) {
 bool PrintTable(const Effort& effort, const std::vector<std::string_view>& ids) {
   bool whole = true;
   std::printf("%-5s %-46s  %-42s  %7s  %6s\n", "", "figure", "yardstick", "ratio", "goal");
-  for (const auto& group :
-       {HashFigures, ExpressionFigures, TreeFigures, StoreFigures, ChainFigures, CommandFigures}) {
+  for (const auto& group : {HashFigures, ExpressionFigures, TreeFigures, StoreFigures, ChainFigures,
+                            SignatureFigures, CommandFigures}) {
     for (const Figure& figure : group()) {
       bool wanted = ids.empty();
       for (const std::string_view id : ids) wanted |= std::string_view(figure.id).starts_with(id);

@@ -45,7 +45,15 @@
 
 struct ZVCLMHashContextData;
 
+namespace ZVsysutil {
+class ZvDrops;
+}
+
 namespace ZvVesk2 {
+
+class AtomText;
+class ValueBlocks;
+class Walk;
 
 // Where an object is stored; the roots are those of VeskConf (vesk2/context.h). Fixed underlying
 // type: callers may pass other values, which mean the home store except where a function says
@@ -162,7 +170,16 @@ class VESK2_API DExpression {
   uint32_t CryptoHandle() const;
 
  private:
+  friend class AtomText;
+  friend class SExpression;
+  friend class ValueBlocks;
+  friend class Walk;
+
+  VESK2_LOCAL void Free(ZVsysutil::ZvDrops& drops);
+
   int32_t refCount = 1;
+  uint32_t place : 31 = 0;  // bytes behind the start of its block; 0 in memory of its own
+  uint32_t isList : 1 = 0;  // an SExpression
   Vesk2ContextStruct* context;
 };
 
@@ -259,6 +276,9 @@ class VESK2_API ByteString : public DExpression {
   unsigned char* data = nullptr;  // an array from new[], or `shortBytes`
 
  private:
+  friend class AtomText;
+  friend class ValueBlocks;
+
   // The bytes of a short string: keywords, names and times need no array of their own.
   static constexpr unsigned int kShort = 24;
   unsigned char shortBytes[kShort];
@@ -503,12 +523,17 @@ class VESK2_API SExpression : public DExpression {
   [[nodiscard]] VESK2_LOCAL int SetFilePath(const char* path);
 
  private:
+  friend class ValueBlocks;
+  friend class Walk;
+
   struct Node {
+    static constexpr uint32_t kAlone = 0, kOwn = 1;  // in memory of its own; in a list itself
     Node* next = nullptr;
     DExpression* value = nullptr;  // the list holds one reference
-    bool own = false;              // whether it stands in a list itself
+    uint32_t place = kAlone;       // else the bytes behind the start of its block
   };
-  VESK2_LOCAL static void DeleteNode(Node* node);
+  VESK2_LOCAL void Link(Node* node);
+  VESK2_LOCAL static void DeleteNode(Node* node, ZVsysutil::ZvDrops& drops);
 
   StorageType storageType = StorageHome;
   unsigned int ownUsed = 0;  // of ownNodes

@@ -12,17 +12,25 @@
 
 #include <vesk2/platform.h>
 
+struct evp_md_st;
 struct evp_md_ctx_st;
 
 // A running hash. Small updates are gathered in `block`, inline, so that libcrypto sees whole
-// blocks. A loop of them goes through a ZVCLMHashFeed. (Opaque to callers of the library.) `end` is
-// `block` when the hash is finished: there is no room then, and the quick road is closed without a
-// test of its own.
+// blocks, and what fits into one is hashed in one call. A loop of them goes through a
+// ZVCLMHashFeed. (Opaque to callers of the library.) `end` is `block` when the hash is finished:
+// there is no room then, and the quick road is closed without a test of its own.
 struct ZVCLMHashContextData {
   static constexpr size_t kBlock = 16384;
+
+  ZVCLMHashContextData() = default;
+  ~ZVCLMHashContextData();
+  ZVCLMHashContextData(const ZVCLMHashContextData&) = delete;
+  ZVCLMHashContextData& operator=(const ZVCLMHashContextData&) = delete;
+
   unsigned char* next = block;  // where the next byte goes
   unsigned char* end = block + kBlock;
-  evp_md_ctx_st* digest = nullptr;  // libcrypto's state
+  const evp_md_st* algorithm = nullptr;
+  evp_md_ctx_st* digest = nullptr;  // libcrypto's state, once a block was full
   unsigned char block[kBlock];
 };
 
@@ -52,13 +60,15 @@ extern "C" {
 // zvclm_HashAlloc starts a hash in *context, which must be null. 0, ZVCLM_ERR_NULL_PARAM,
 // ZVCLM_ERR_UNKNOWN_HASH for an id that is none of ZvclmHashID's, or ZVCLM_ERR_NO_MEM.
 [[nodiscard]] int zvclm_HashAlloc(ZVCLMHashContextData** context, ZvclmHashID id, uint32_t handle);
+// zvclm_HashStart is the same for a fresh context of the caller's, which may stand in a frame.
+[[nodiscard]] int zvclm_HashStart(ZVCLMHashContextData* context, ZvclmHashID id, uint32_t handle);
 // zvclm_HashRestart forgets what a context was fed and starts it again. 0, ZVCLM_ERR_NULL_PARAM or
 // ZVCLM_ERR_NO_MEM.
 [[nodiscard]] int zvclm_HashRestart(ZVCLMHashContextData* context, uint32_t handle);
 // zvclm_HashInfo tells the length of an algorithm's digests. 0, ZVCLM_ERR_NULL_PARAM,
 // ZVCLM_ERR_KEY_TYPE for a record of another size, or ZVCLM_ERR_UNKNOWN_HASH.
 [[nodiscard]] int zvclm_HashInfo(ZvclmHashID id, ZVCLMHashInfo* info);
-// Writes the digest; the context can then only be started again or freed.
+// Writes the digest; the context can then only be started again or freed. As zvclm_HashUpdate.
 [[nodiscard]] int zvclm_HashFinal(ZVCLMHashContextData* context, unsigned char* digest,
                                   uint32_t handle);
 // Frees a context, finished or not; null is allowed.
@@ -87,7 +97,8 @@ void zvclm_HashFree(ZVCLMHashContextData* context, uint32_t handle);
 
 }  // extern "C"
 
-// zvclm_HashUpdate feeds `length` bytes. 0, ZVCLM_ERR_NULL_PARAM or ZVCLM_ERR_FAILURE.
+// zvclm_HashUpdate feeds `length` bytes. 0, ZVCLM_ERR_NULL_PARAM, ZVCLM_ERR_NO_MEM or
+// ZVCLM_ERR_FAILURE.
 [[nodiscard]] inline int zvclm_HashUpdate(ZVCLMHashContextData* context, const unsigned char* data,
                                           size_t length, uint32_t /*handle*/) {
   if (context != nullptr && data != nullptr &&

@@ -1,8 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 // Hashes: a block in front of libcrypto, so that many small updates cost about as much as a few
-// large ones. Which algorithm is meant is in a table; libcrypto is asked by name, once for each
-// hash that is started.
+// large ones. Which algorithm is meant is in a table; libcrypto is asked by name, once a
+// process.
 #include <openssl/evp.h>
+#include <array>
+#include <atomic>
 #include <memory>
 #include <new>
 
@@ -33,12 +35,28 @@ const Algorithm* FindAlgorithm(int64_t id) {
   return nullptr;
 }
 
+// Starts libcrypto's state, again where there is one.
+[[nodiscard]] int Begin(ZVCLMHashContextData* context) {
+  if (context->digest == nullptr) context->digest = EVP_MD_CTX_new();
+  const bool begun = context->digest != nullptr &&
+                     EVP_DigestInit_ex2(context->digest, context->algorithm, nullptr) == 1;
+  return begun ? 0 : ZVCLM_ERR_NO_MEM;
+}
+
+size_t Gathered(const ZVCLMHashContextData* context) {
+  return static_cast<size_t>(context->next - context->block);
+}
+
 // Gives libcrypto the gathered bytes and empties the block. Emptied whether or not libcrypto took
 // it: after a failure the digest is never finished.
-bool Flush(ZVCLMHashContextData* context) {
-  const auto gathered = static_cast<size_t>(context->next - context->block);
+[[nodiscard]] int Flush(ZVCLMHashContextData* context) {
+  if (context->digest == nullptr) {
+    if (const int code = Begin(context)) return code;
+  }
+  const size_t gathered = Gathered(context);
   context->next = context->block;
-  return EVP_DigestUpdate(context->digest, context->block, gathered) == 1;
+  const bool fed = EVP_DigestUpdate(context->digest, context->block, gathered) == 1;
+  return fed ? 0 : ZVCLM_ERR_FAILURE;
 }
 
 bool Finished(const ZVCLMHashContextData* context) { return context->end == context->block; }
@@ -47,41 +65,55 @@ bool Finished(const ZVCLMHashContextData* context) { return context->end == cont
 
 namespace ZVsysutil {
 
-const char* HashName(int64_t id) {
-  const Algorithm* algorithm = FindAlgorithm(id);
-  return algorithm != nullptr ? algorithm->name : nullptr;
-}
-
 uint32_t HashLength(int64_t id) {
   const Algorithm* algorithm = FindAlgorithm(id);
   return algorithm != nullptr ? algorithm->length : 0;
 }
 
+// An algorithm is fetched once a process: that takes as long as hashing a short text. It is never
+// given back, since libcrypto may be gone when the process ends.
+const EVP_MD* HashAlgorithm(int64_t id) {
+  static std::array<std::atomic<EVP_MD*>, std::size(kAlgorithms)> fetched;
+  const Algorithm* const algorithm = FindAlgorithm(id);
+  if (algorithm == nullptr) return nullptr;
+  std::atomic<EVP_MD*>& kept = fetched[static_cast<size_t>(algorithm - kAlgorithms)];
+  if (const EVP_MD* known = kept.load(std::memory_order_acquire)) return known;
+  const ErrorMark mark;
+  Evp<EVP_MD, EVP_MD_free> found(EVP_MD_fetch(nullptr, algorithm->name, nullptr));
+  EVP_MD* other = nullptr;
+  if (found != nullptr && kept.compare_exchange_strong(other, found.get())) return found.release();
+  return other;  // another thread's, null without memory
+}
+
 }  // namespace ZVsysutil
 
-int zvclm_HashAlloc(ZVCLMHashContextData** context, ZvclmHashID id, uint32_t /*handle*/) {
+ZVCLMHashContextData::~ZVCLMHashContextData() { EVP_MD_CTX_free(digest); }
+
+int zvclm_HashAlloc(ZVCLMHashContextData** context, ZvclmHashID id, uint32_t handle) {
   if (context == nullptr || *context != nullptr) return ZVCLM_ERR_NULL_PARAM;
-  const ErrorMark mark;
-  const char* name = HashName(id);
-  if (name == nullptr) return ZVCLM_ERR_UNKNOWN_HASH;
+  if (FindAlgorithm(id) == nullptr) return ZVCLM_ERR_UNKNOWN_HASH;
+  std::unique_ptr<ZVCLMHashContextData> made(new (std::nothrow) ZVCLMHashContextData);
+  if (made == nullptr) return ZVCLM_ERR_NO_MEM;
+  if (const int code = zvclm_HashStart(made.get(), id, handle)) return code;
+  *context = made.release();
+  return 0;
+}
+
+int zvclm_HashStart(ZVCLMHashContextData* context, ZvclmHashID id, uint32_t /*handle*/) {
+  if (context == nullptr) return ZVCLM_ERR_NULL_PARAM;
+  if (FindAlgorithm(id) == nullptr) return ZVCLM_ERR_UNKNOWN_HASH;
   // libcrypto has every algorithm of the table, and never is another taken instead. One that it
   // does not come up with, or cannot start, is a lack of memory, though it may be called
   // unsupported.
-  const Evp<EVP_MD, EVP_MD_free> algorithm(EVP_MD_fetch(nullptr, name, nullptr));
-  Evp<EVP_MD_CTX, EVP_MD_CTX_free> digest(EVP_MD_CTX_new());
-  std::unique_ptr<ZVCLMHashContextData> made(new (std::nothrow) ZVCLMHashContextData);
-  if (algorithm == nullptr || digest == nullptr || made == nullptr) return ZVCLM_ERR_NO_MEM;
-  if (EVP_DigestInit_ex2(digest.get(), algorithm.get(), nullptr) != 1) return ZVCLM_ERR_NO_MEM;
-  made->digest = digest.release();
-  *context = made.release();
-  return 0;
+  context->algorithm = HashAlgorithm(id);
+  return context->algorithm != nullptr ? 0 : ZVCLM_ERR_NO_MEM;
 }
 
 // The context keeps its algorithm and its memory, which for small files cost more than the hashing.
 int zvclm_HashRestart(ZVCLMHashContextData* context, uint32_t /*handle*/) {
   if (context == nullptr) return ZVCLM_ERR_NULL_PARAM;
   const ErrorMark mark;
-  if (EVP_DigestInit_ex2(context->digest, nullptr, nullptr) != 1) return ZVCLM_ERR_NO_MEM;
+  if (const int code = Begin(context)) return code;
   context->next = context->block;
   context->end = context->block + ZVCLMHashContextData::kBlock;
   return 0;
@@ -108,7 +140,7 @@ int zvclm_HashUpdateSlow(ZVCLMHashContextData* context, const unsigned char* dat
     context->next += room;
     data += room;
     length -= room;
-    if (!Flush(context)) return ZVCLM_ERR_FAILURE;
+    if (const int code = Flush(context)) return code;
   }
   if (length >= ZVCLMHashContextData::kBlock) {
     return EVP_DigestUpdate(context->digest, data, length) == 1 ? 0 : ZVCLM_ERR_FAILURE;
@@ -123,14 +155,17 @@ int zvclm_HashFinal(ZVCLMHashContextData* context, unsigned char* digest, uint32
   if (context == nullptr || digest == nullptr) return ZVCLM_ERR_NULL_PARAM;
   if (Finished(context)) return ZVCLM_ERR_FAILURE;
   const ErrorMark mark;
-  const bool flushed = Flush(context);
   context->end = context->block;  // no room: every later update takes the slow road and fails
-  const bool done = flushed && EVP_DigestFinal_ex(context->digest, digest, nullptr) == 1;
-  return done ? 0 : ZVCLM_ERR_FAILURE;
+  if (context->digest == nullptr) {
+    const size_t gathered = Gathered(context);
+    context->next = context->block;
+    // Bytes at hand are hashed, unless there is no memory to do it in.
+    const EVP_MD* const algorithm = context->algorithm;
+    const int done = EVP_Digest(context->block, gathered, digest, nullptr, algorithm, nullptr);
+    return done == 1 ? 0 : ZVCLM_ERR_NO_MEM;
+  }
+  if (const int code = Flush(context)) return code;
+  return EVP_DigestFinal_ex(context->digest, digest, nullptr) == 1 ? 0 : ZVCLM_ERR_FAILURE;
 }
 
-void zvclm_HashFree(ZVCLMHashContextData* context, uint32_t /*handle*/) {
-  if (context == nullptr) return;
-  EVP_MD_CTX_free(context->digest);
-  delete context;
-}
+void zvclm_HashFree(ZVCLMHashContextData* context, uint32_t /*handle*/) { delete context; }

@@ -5,6 +5,7 @@
 #define VESK2_SRC_PLATFORM_OPENSSL_H
 
 #include <openssl/err.h>
+#include <openssl/types.h>
 
 #include <cstdint>
 #include <memory>
@@ -32,9 +33,10 @@ class ErrorMark {
   ErrorMark& operator=(const ErrorMark&) = delete;
 };
 
-// libcrypto's name of a ZvclmHashID, null for an unknown one, and the bytes of its digests, 0.
-const char* HashName(int64_t id);
+// The bytes of the digests of a ZvclmHashID, 0 for an unknown one.
 uint32_t HashLength(int64_t id);
+// libcrypto's algorithm, borrowed; null for an unknown one and without memory.
+const EVP_MD* HashAlgorithm(int64_t id);
 
 }  // namespace ZVsysutil
 

@@ -27,7 +27,6 @@ namespace Limits = ZvVesk2::Limits;
 namespace {
 
 using Bytes = std::span<const unsigned char>;
-using MdOwner = Evp<EVP_MD, EVP_MD_free>;
 using PkeyContext = Evp<EVP_PKEY_CTX, EVP_PKEY_CTX_free>;
 using Number = Evp<BIGNUM, BN_free>;
 
@@ -197,10 +196,10 @@ bool SetRsaScheme(EVP_PKEY_CTX* context, int scheme, const EVP_MD* hash) {
   const uint32_t hashId = parameters.words[3];
   if (!WithinRsaLimits(key) || digest.empty() || digest.size() != HashLength(hashId)) return 0;
   if (!FitsModulus(signature, key.number(kRsaN))) return 0;
-  const MdOwner hash(EVP_MD_fetch(nullptr, HashName(hashId), nullptr));
+  const EVP_MD* const hash = HashAlgorithm(hashId);
   const PkeyContext context = StartVerify(key);
   if (hash == nullptr || context == nullptr) return ZVCLM_ERR_NO_MEM;
-  if (!SetRsaScheme(context.get(), scheme, hash.get())) return ZVCLM_ERR_NO_MEM;
+  if (!SetRsaScheme(context.get(), scheme, hash)) return ZVCLM_ERR_NO_MEM;
   const int code = Ask(good, context.get(), digest, signature, Zero::kNeedsReason);
   const bool explained = code == 0 || scheme == ZVCLM_SCHEME_RSA_PSS;
   return explained ? code : ExplainPkcs1No(key, hashId, digest, signature);

@@ -7,11 +7,14 @@
 #include <memory>
 
 #include "src/frame/check.h"
-#include "src/frame/handles.h"
+#include "src/platform/blocks.h"
+#include "src/platform/crypto.h"
 #include "src/sexpr/same.h"
 #include "src/sexpr/walk.h"
 
 namespace ZvVesk2 {
+
+using ZVsysutil::ZvDrops;
 
 // What the classes have grown by since version 1.1.0, the most of any: a program that was compiled
 // with a smaller one asks for that much less than is needed.
@@ -32,7 +35,21 @@ DExpression::~DExpression() = default;
 void DExpression::IncrementRefCount() { ++refCount; }
 
 void DExpression::Free() {
-  if (--refCount <= 0) delete this;
+  ZvDrops drops;
+  Free(drops);
+}
+
+// What stands in a block is a ByteString or an SExpression, and nothing derived from them.
+void DExpression::Free(ZvDrops& drops) {
+  if (--refCount > 0) return;
+  if (place == 0) {
+    delete this;
+    return;
+  }
+  const uint32_t at = place;
+  const size_t size = isList != 0 ? sizeof(SExpression) : sizeof(ByteString);
+  this->~DExpression();
+  drops.Add(this, at, size);
 }
 
 bool DExpression::IsEqual(DExpression* other) {
@@ -78,17 +95,16 @@ int DExpression::ComputeHash(unsigned char*& digest, unsigned int& digestLength,
                              bool ignoreHints) {
   VESK2_REQUIRE(digest == nullptr, VESK2_ERR_INVALID_PARAM);
   const uint32_t handle = CryptoHandle();
-  ZVCLMHashContextData* started = nullptr;
-  VESK2_TRY(zvclm_HashAlloc(&started, id, handle));
-  const HashOwner hash(started, HashFree{handle});
-  VESK2_TRY(UpdateHash(hash.get(), ignoreHints));
+  ZVCLMHashContextData hash;  // a frame, not memory: most texts fit into its block
+  VESK2_TRY(zvclm_HashStart(&hash, id, handle));
+  VESK2_TRY(UpdateHash(&hash, ignoreHints));
 
   ZVCLMHashInfo info = {};
   info.size = sizeof info;
   VESK2_TRY(zvclm_HashInfo(id, &info));
   std::unique_ptr<unsigned char[]> bytes(TryNewArray<unsigned char>(info.digestLength));
   VESK2_REQUIRE(bytes != nullptr, VESK2_ERR_MEM_ALLOC);
-  VESK2_TRY(zvclm_HashFinal(hash.get(), bytes.get(), handle));
+  VESK2_TRY(zvclm_HashFinal(&hash, bytes.get(), handle));
   digestLength = info.digestLength;
   digest = bytes.release();
   return 0;

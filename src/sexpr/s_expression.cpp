@@ -8,10 +8,13 @@
 #include <utility>
 
 #include "src/frame/check.h"
+#include "src/platform/blocks.h"
 
 namespace ZvVesk2 {
 
-SExpression::SExpression(Vesk2ContextStruct* owner) : DExpression(owner) {}
+using ZVsysutil::ZvDrops;
+
+SExpression::SExpression(Vesk2ContextStruct* owner) : DExpression(owner) { isList = 1; }
 
 SExpression::~SExpression() {
   DeleteNodes();
@@ -24,8 +27,18 @@ const char* SExpression::ExtensionName() const { return ""; }
 
 bool SExpression::IsHash() const { return false; }
 
-void SExpression::DeleteNode(Node* node) {
-  if (!node->own) delete node;
+void SExpression::Link(Node* node) {
+  (first != nullptr ? last->next : first) = node;
+  last = node;
+}
+
+void SExpression::DeleteNode(Node* node, ZvDrops& drops) {
+  if (node->place == Node::kOwn) return;
+  if (node->place == Node::kAlone) {
+    delete node;
+  } else {
+    drops.Add(node, node->place, sizeof *node);
+  }
 }
 
 // ---- Building ----
@@ -60,9 +73,8 @@ int SExpression::Insert(DExpression* value) {
   const bool own = ownUsed < kOwnNodes;
   Node* node = own ? &ownNodes[ownUsed++] : TryNew<Node>();
   VESK2_REQUIRE(node != nullptr, VESK2_ERR_MEM_ALLOC);
-  *node = {nullptr, value, own};
-  (first != nullptr ? last->next : first) = node;
-  last = node;
+  *node = {nullptr, value, own ? Node::kOwn : Node::kAlone};
+  Link(node);
   return 0;
 }
 
@@ -84,7 +96,8 @@ int SExpression::Remove(DExpression* value) {
   VESK2_REQUIRE(node != nullptr, VESK2_ERR_NOT_IN_LIST);
   (previous != nullptr ? previous->next : first) = node->next;
   if (node == last) last = previous;
-  DeleteNode(node);
+  ZvDrops drops;
+  DeleteNode(node, drops);
   return 0;
 }
 
@@ -92,11 +105,12 @@ int SExpression::Remove(DExpression* value) {
 // destructor nests, however deeply the lists do. Its own node comes again behind them, since some
 // stand in the list.
 void SExpression::DeleteNodes() {
+  ZvDrops drops;
   Node* chain = std::exchange(first, nullptr);
   last = nullptr;
   while (chain != nullptr) {
     DExpression* value = chain->value;
-    if (value->IsSExpression() && value->GetRefCount() <= 1) {
+    if (value->isList && value->refCount <= 1) {
       auto* list = static_cast<SExpression*>(value);
       if (list->last != nullptr) {
         list->last->next = chain;
@@ -105,8 +119,8 @@ void SExpression::DeleteNodes() {
         continue;
       }
     }
-    DeleteNode(std::exchange(chain, chain->next));
-    value->Free();
+    DeleteNode(std::exchange(chain, chain->next), drops);
+    value->Free(drops);
   }
   ownUsed = 0;
 }

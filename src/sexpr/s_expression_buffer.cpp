@@ -7,56 +7,64 @@
 #include <vesk2/expression.h>
 #include <vesk2/ref.h>
 
+#include <utility>
+
 #include "src/frame/check.h"
 #include "src/frame/handles.h"
+#include "src/sexpr/value_blocks.h"
 
 namespace ZvVesk2 {
 namespace {
 
-[[nodiscard]] int ReadList(Ref<SExpression>& out, ZvBuffer* buffer, Vesk2ContextStruct* context,
-                           unsigned level);
+class BufferReader {
+ public:
+  BufferReader(ZvBuffer* buffer, Vesk2ContextStruct* context) : cursor_(buffer), values_(context) {}
 
-[[nodiscard]] int ReadString(Ref<DExpression>& out, ZvBuffer* buffer, Vesk2ContextStruct* context) {
-  Ref<ByteString> string(TryNew<ByteString>(context));
-  VESK2_REQUIRE(string, VESK2_ERR_MEM_ALLOC);
-  VESK2_TRY(string->Import(buffer));
-  out.Reset(string.Release());
-  return 0;
-}
-
-[[nodiscard]] int ReadElement(Ref<DExpression>& out, ZvBuffer* buffer, Vesk2ContextStruct* context,
-                              unsigned level) {
-  if (buffer->Peek() != '(') return ReadString(out, buffer, context);
-  Ref<SExpression> list;
-  VESK2_TRY(ReadList(list, buffer, context, level));
-  out.Reset(list.Release());
-  return 0;
-}
-
-// Reads a list of nesting `level`.
-[[nodiscard]] int ReadList(Ref<SExpression>& out, ZvBuffer* buffer, Vesk2ContextStruct* context,
-                           unsigned level) {
-  VESK2_REQUIRE(level <= Limits::kMaxDepth, VESK2_ERR_PARSE_FILE);
-  VESK2_TRY(buffer->Expect("("));
-  Ref<SExpression> list(TryNew<SExpression>(context));
-  VESK2_REQUIRE(list, VESK2_ERR_MEM_ALLOC);
-  for (int c = buffer->Peek(); c >= 0 && c != ')'; c = buffer->Peek()) {
-    Ref<DExpression> element;
-    VESK2_TRY(ReadElement(element, buffer, context, level + 1));
-    VESK2_TRY(list->Insert(element.get()));
-    (void)element.Release();
+  // Reads a list of nesting `level`.
+  [[nodiscard]] int ReadList(Ref<SExpression>& out, unsigned level) {
+    VESK2_REQUIRE(level <= Limits::kMaxDepth, VESK2_ERR_PARSE_FILE);
+    VESK2_REQUIRE(cursor_.Accept('('), VESK2_ERR_PARSE_FILE);
+    Ref<SExpression> list(values_.NewList());
+    VESK2_REQUIRE(list, VESK2_ERR_MEM_ALLOC);
+    for (int c = cursor_.Peek(); c >= 0 && c != ')'; c = cursor_.Peek()) {
+      VESK2_TRY(c == '(' ? AppendList(*list, level + 1) : AppendString(*list));
+    }
+    VESK2_REQUIRE(cursor_.Accept(')'), VESK2_ERR_PARSE_FILE);
+    out = std::move(list);
+    return 0;
   }
-  VESK2_TRY(buffer->Expect(")"));
-  out.Reset(list.Release());
-  return 0;
-}
+
+ private:
+  [[nodiscard]] int AppendList(SExpression& to, unsigned level) {
+    Ref<SExpression> list;
+    VESK2_TRY(ReadList(list, level));
+    return Append(to, std::move(list));
+  }
+
+  [[nodiscard]] int AppendString(SExpression& to) {
+    Ref<ByteString> string(values_.NewString());
+    VESK2_REQUIRE(string, VESK2_ERR_MEM_ALLOC);
+    VESK2_TRY(values_.Read(*string, cursor_));
+    return Append(to, std::move(string));
+  }
+
+  template <typename T>
+  [[nodiscard]] int Append(SExpression& to, Ref<T> value) {
+    VESK2_TRY(values_.Insert(to, value.get()));
+    (void)value.Release();  // the list's now
+    return 0;
+  }
+
+  ZvCursor cursor_;
+  ValueBlocks values_;
+};
 
 }  // namespace
 
 int SExpression::Import(SExpression*& out, ZvBuffer* buffer, Vesk2ContextStruct* context) {
   VESK2_REQUIRE(out == nullptr && buffer != nullptr, VESK2_ERR_INVALID_PARAM);
   Ref<SExpression> list;
-  VESK2_TRY(ReadList(list, buffer, context, 1));
+  VESK2_TRY(BufferReader(buffer, context).ReadList(list, 1));
   out = list.Release();
   return 0;
 }

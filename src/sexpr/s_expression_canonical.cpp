@@ -8,49 +8,124 @@
 #include "src/frame/check.h"
 #include "src/platform/crypto.h"
 #include "src/platform/file.h"
+#include "src/sexpr/atom_text.h"
 #include "src/sexpr/walk.h"
 
 namespace ZvVesk2 {
 namespace {
 
-using Step = Walk::Step;
+// Whose bytes behind those that are written are whose: an array that is filled up to its end may be
+// written ahead.
+enum class Behind { kOurs, kTheCallers };
 
-char Parenthesis(Step step) { return step == Step::Open ? '(' : ')'; }
+// The room that a byte string surely fits into with all that may stand before it.
+size_t SafeRoom(const ByteString& string) {
+  return AtomText::kMaxHint + AtomText::kMaxPrefix + AtomText::Room(string);
+}
 
 // Writes a list at `pos`. Each parenthesis needs `spare` further bytes of room for the outermost
 // list, one for lists within.
-[[nodiscard]] int WriteList(SExpression* list, unsigned char* buf, unsigned& pos, unsigned size,
-                            unsigned spare) {
-  Walk walk(list);
-  for (Step step = walk.Next(); step != Step::End; step = walk.Next()) {
-    VESK2_REQUIRE(step != Step::TooDeep, VESK2_ERR_BUFFER_OVERFLOW);
-    if (step == Step::Atom) {
-      // A string that does not fit is left out; only parentheses report a lack of room.
-      (void)walk.Value()->Export(buf, pos, size);
-      continue;
-    }
-    const unsigned needed = walk.Level() == 1 ? spare : 1;
+struct Writer {
+  [[nodiscard]] int Parenthesis(char which, unsigned level) {
+    const unsigned needed = level == 1 ? spare : 1;
     VESK2_REQUIRE(uint64_t{pos} + needed < size, VESK2_ERR_BUFFER_OVERFLOW);
-    buf[pos++] = static_cast<unsigned char>(Parenthesis(step));
+    buf[pos++] = static_cast<unsigned char>(which);
+    return 0;
   }
-  return 0;
-}
+  [[nodiscard]] int Atom(DExpression& value) {
+    if (behind == Behind::kOurs && AtomText::IsPlain(value)) {
+      const auto& string = static_cast<const ByteString&>(value);
+      if (SafeRoom(string) <= size - pos) {
+        pos = static_cast<unsigned>(AtomText::Write(buf + pos, string, true) - buf);
+        return 0;
+      }
+    }
+    // A string that does not fit is left out; only parentheses report a lack of room.
+    unsigned moved = pos;
+    (void)value.Export(buf, moved, size);
+    pos = moved;
+    return 0;
+  }
+
+  unsigned char* buf;
+  unsigned size;
+  unsigned spare;
+  Behind behind;
+  unsigned pos;
+};
+
+struct Measure {
+  [[nodiscard]] int Parenthesis(char /*which*/, unsigned /*level*/) {
+    ++length;
+    return 0;
+  }
+  [[nodiscard]] int Atom(DExpression& value) {
+    length += AtomText::IsPlain(value) ? AtomText::Size(static_cast<const ByteString&>(value))
+                                       : value.CanonicalLength();
+    return 0;
+  }
+
+  uint64_t length = 0;
+};
+
+struct Printer {
+  [[nodiscard]] int Parenthesis(char which, unsigned /*level*/) {
+    return ZVsysutil::zv_write(stream, &which, 1) == 1 ? 0 : VESK2_ERR_WRITE_FILE;
+  }
+  [[nodiscard]] int Atom(DExpression& value) { return value.PrintCanonical(stream); }
+
+  FILE* stream;
+};
+
+// Texts go straight into the block of the running hash as long as there is room.
+struct Feeder {
+  [[nodiscard]] int Parenthesis(char which, unsigned /*level*/) {
+    const auto byte = static_cast<unsigned char>(which);
+    if (at != end) {
+      *at++ = byte;
+      return 0;
+    }
+    hash->next = at;
+    return Follow(zvclm_HashUpdate(hash, &byte, 1, 0));
+  }
+  [[nodiscard]] int Atom(DExpression& value) {
+    if (AtomText::IsPlain(value)) {
+      const auto& string = static_cast<const ByteString&>(value);
+      if (SafeRoom(string) <= static_cast<size_t>(end - at)) {
+        at = AtomText::Write(at, string, ignoreHints);
+        return 0;
+      }
+    }
+    hash->next = at;
+    return Follow(value.UpdateHash(hash, ignoreHints));
+  }
+  // The hash moved on by itself.
+  [[nodiscard]] int Follow(int code) {
+    at = hash->next;
+    end = hash->end;
+    return code;
+  }
+
+  ZVCLMHashContextData* hash;
+  bool ignoreHints;
+  unsigned char* at;
+  unsigned char* end;
+};
 
 }  // namespace
 
 unsigned int SExpression::CanonicalLength() {
-  uint64_t length = 0;
-  Walk walk(this);
-  for (Step step = walk.Next(); step != Step::End; step = walk.Next()) {
-    if (step == Step::TooDeep) return UINT_MAX;
-    length += step == Step::Atom ? walk.Value()->CanonicalLength() : 1;
-  }
-  return length < UINT_MAX ? static_cast<unsigned>(length) : UINT_MAX;
+  Measure measure;
+  const int code = Walk::Through(this, measure);
+  return code == 0 && measure.length < UINT_MAX ? static_cast<unsigned>(measure.length) : UINT_MAX;
 }
 
 int SExpression::Export(unsigned char* buf, unsigned int& pos, unsigned int size) {
   VESK2_REQUIRE(buf != nullptr, VESK2_ERR_INVALID_PARAM);
-  return WriteList(this, buf, pos, size, 1);
+  Writer writer{buf, size, 1, Behind::kTheCallers, pos};
+  const int code = Walk::Through(this, writer);
+  pos = writer.pos;
+  return code;
 }
 
 int SExpression::Export(unsigned char*& out, unsigned int& length) {
@@ -59,41 +134,27 @@ int SExpression::Export(unsigned char*& out, unsigned int& length) {
   VESK2_REQUIRE(length <= Limits::kMaxExport, VESK2_ERR_BUFFER_OVERFLOW);
   std::unique_ptr<unsigned char[]> bytes(TryNewArray<unsigned char>(length));
   VESK2_REQUIRE(bytes != nullptr, VESK2_ERR_MEM_ALLOC);
-  unsigned int pos = 0;
-  VESK2_TRY(WriteList(this, bytes.get(), pos, length, 0));
+  Writer writer{bytes.get(), length, 0, Behind::kOurs, 0};
+  VESK2_TRY(Walk::Through(this, writer));
   out = bytes.release();
   return 0;
 }
 
 int SExpression::PrintCanonical(FILE* stream) {
   VESK2_REQUIRE(stream != nullptr, VESK2_ERR_INVALID_PARAM);
-  Walk walk(this);
-  for (Step step = walk.Next(); step != Step::End; step = walk.Next()) {
-    VESK2_REQUIRE(step != Step::TooDeep, VESK2_ERR_BUFFER_OVERFLOW);
-    if (step == Step::Atom) {
-      VESK2_TRY(walk.Value()->PrintCanonical(stream));
-      continue;
-    }
-    const char parenthesis = Parenthesis(step);
-    VESK2_REQUIRE(ZVsysutil::zv_write(stream, &parenthesis, 1) == 1, VESK2_ERR_WRITE_FILE);
-  }
+  Printer printer{stream};
+  VESK2_TRY(Walk::Through(this, printer));
   // Bytes that stay in the stream's buffer could still be lost without anybody being told.
   VESK2_REQUIRE(std::fflush(stream) == 0, VESK2_ERR_WRITE_FILE);
   return 0;
 }
 
 int SExpression::UpdateHash(ZVCLMHashContextData* hash, bool ignoreHints) {
-  Walk walk(this);
-  for (Step step = walk.Next(); step != Step::End; step = walk.Next()) {
-    VESK2_REQUIRE(step != Step::TooDeep, VESK2_ERR_BUFFER_OVERFLOW);
-    if (step == Step::Atom) {
-      VESK2_TRY(walk.Value()->UpdateHash(hash, ignoreHints));
-      continue;
-    }
-    const auto parenthesis = static_cast<unsigned char>(Parenthesis(step));
-    VESK2_TRY(zvclm_HashUpdate(hash, &parenthesis, 1, walk.Value()->CryptoHandle()));
-  }
-  return 0;
+  VESK2_REQUIRE(hash != nullptr, ZVCLM_ERR_NULL_PARAM);
+  Feeder feeder{hash, ignoreHints, hash->next, hash->end};
+  const int code = Walk::Through(this, feeder);
+  hash->next = feeder.at;
+  return code;
 }
 
 }  // namespace ZvVesk2

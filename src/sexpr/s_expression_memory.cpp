@@ -11,6 +11,7 @@
 
 #include "src/frame/check.h"
 #include "src/sexpr/chars.h"
+#include "src/sexpr/value_blocks.h"
 
 namespace ZvVesk2 {
 namespace {
@@ -31,14 +32,14 @@ class MemoryReader {
  public:
   MemoryReader(unsigned char* buf, unsigned size, unsigned& pos, Vesk2ContextStruct* context,
                Search* search)
-      : buf_(buf), size_(size), pos_(pos), context_(context), search_(search) {}
+      : buf_(buf), size_(size), pos_(pos), values_(context), search_(search) {}
 
   // Reads a list of nesting `level`.
   [[nodiscard]] int ReadList(Ref<DExpression>& out, unsigned level) {
     VESK2_REQUIRE(level <= Limits::kMaxDepth, VESK2_ERR_INVALID_S_EXPRESSION);
     SkipSpace();
-    VESK2_TRY(DExpression::Expect("(", buf_, size_, pos_));
-    Ref<SExpression> list(TryNew<SExpression>(context_));
+    VESK2_TRY(ExpectByte('(', buf_, size_, pos_));
+    Ref<SExpression> list(values_.NewList());
     VESK2_REQUIRE(list, VESK2_ERR_MEM_ALLOC);
     VESK2_TRY(Look());
     if (buf_[pos_] != ')') VESK2_TRY(ReadElements(*list, level));
@@ -58,33 +59,43 @@ class MemoryReader {
     return 0;
   }
 
-  [[nodiscard]] int ReadString(Ref<DExpression>& out) {
-    return ByteString::ParseCanonical(out.Out(), buf_, size_, pos_, context_);
+  [[nodiscard]] int AppendString(SExpression& list) {
+    unsigned length = 0;
+    VESK2_TRY(ReadMemoryLength(length, buf_, size_, pos_));
+    Ref<ByteString> string(values_.NewString());
+    VESK2_REQUIRE(string, VESK2_ERR_MEM_ALLOC);
+    VESK2_TRY(values_.Fill(*string, buf_ + pos_, length, size_ - pos_));
+    pos_ += length;
+    // A list that lost an element would be another one, and as a tag a wider one.
+    VESK2_TRY(values_.Insert(list, string.get()));
+    (void)string.Release();
+    return 0;
+  }
+
+  [[nodiscard]] int AppendList(SExpression& to, unsigned level) {
+    Ref<DExpression> list;
+    VESK2_TRY(ReadList(list, level));
+    VESK2_TRY(values_.Insert(to, list.get()));
+    if (search_ != nullptr) search_->Test(list.get());
+    (void)list.Release();
+    return 0;
   }
 
   // Reads the elements of a list that has some, and its ")".
   [[nodiscard]] int ReadElements(SExpression& list, unsigned level) {
-    Ref<DExpression> element;
-    VESK2_TRY(ReadString(element));
-    VESK2_TRY(list.Insert(element.get()));
-    (void)element.Release();
+    VESK2_TRY(AppendString(list));
     while (true) {
       SkipSpace();
       VESK2_TRY(Look());
-      if (buf_[pos_] == ')') return DExpression::Expect(")", buf_, size_, pos_);
-      const bool nested = buf_[pos_] == '(';
-      VESK2_TRY(nested ? ReadList(element, level + 1) : ReadString(element));
-      // A list that lost an element would be another one, and as a tag a wider one.
-      VESK2_TRY(list.Insert(element.get()));
-      if (nested && search_ != nullptr) search_->Test(element.get());
-      (void)element.Release();
+      if (buf_[pos_] == ')') return ExpectByte(')', buf_, size_, pos_);
+      VESK2_TRY(buf_[pos_] == '(' ? AppendList(list, level + 1) : AppendString(list));
     }
   }
 
   unsigned char* buf_;
   unsigned size_;
   unsigned& pos_;
-  Vesk2ContextStruct* context_;
+  ValueBlocks values_;
   Search* search_;
 };
 

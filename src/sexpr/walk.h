@@ -5,40 +5,101 @@
 #ifndef VESK2_SRC_SEXPR_WALK_H
 #define VESK2_SRC_SEXPR_WALK_H
 
+#include <utility>
+
 #include <vesk2/expression.h>
 
-#include <array>
+#include "src/frame/check.h"
 
 namespace ZvVesk2 {
 
 // Walks depth first, in reading order: Open and Close for each list, Atom for every other value.
-// Below Limits::kMaxDepth levels it stops with TooDeep.
+// Below Limits::kMaxDepth levels it gives TooDeep, and must not go on.
 class Walk {
  public:
   enum class Step { Open, Atom, Close, TooDeep, End };
 
-  explicit Walk(SExpression* root) : value_(root) {}
-  Step Next();
+  explicit Walk(SExpression* root) : root_(root) {}
+  Step Next() {
+    closed_ = 0;
+    if (rest_ != nullptr) {
+      isFirst_ = opened_;
+      return Enter(std::exchange(rest_, rest_->next)->value);
+    }
+    if (level_ != 0) return Leave();
+    return root_ != nullptr ? Enter(std::exchange(root_, nullptr)) : Step::End;
+  }
+
+  // Takes the same walk from end to end: `on` is told of each step by Parenthesis(character, level)
+  // and Atom(value), whose first code other than 0 ends it. VESK2_ERR_BUFFER_OVERFLOW for lists
+  // nested too deeply.
+  template <typename On>
+  [[nodiscard]] static int Through(const SExpression* root, On& on) {
+    const Node* behind[Limits::kMaxDepth + 1];  // what follows each open list
+    unsigned level = 1;
+    VESK2_TRY(on.Parenthesis('(', level));
+    for (const Node* node = root->first;;) {
+      while (node == nullptr) {
+        VESK2_TRY(on.Parenthesis(')', level));
+        if (--level == 0) return 0;
+        node = behind[level];
+      }
+      DExpression* const value = node->value;
+      node = node->next;
+      if (value->isList == 0) {
+        VESK2_TRY(on.Atom(*value));
+        continue;
+      }
+      VESK2_REQUIRE(level < Limits::kMaxDepth, VESK2_ERR_BUFFER_OVERFLOW);
+      behind[level++] = node;
+      VESK2_TRY(on.Parenthesis('(', level));
+      node = static_cast<SExpression*>(value)->first;
+    }
+  }
 
   // The list opened or closed, or the atom.
   DExpression* Value() const { return value_; }
   // Lists open, the step's own included: 1 at the root's parentheses.
-  unsigned Level() const { return level_; }
+  unsigned Level() const { return level_ + closed_; }
   // Whether what is opened, or the atom, is the first of its list.
   bool IsFirst() const { return isFirst_; }
 
  private:
-  Step Enter(DExpression* value);
+  using Node = SExpression::Node;
 
-  DExpression* value_;
-  Step step_ = Step::Open;
-  unsigned level_ = 0;
-  bool isFirst_ = true;
+  Step Enter(DExpression* value) {
+    value_ = value;
+    opened_ = false;
+    if (value->isList == 0) return Step::Atom;
+    if (level_ == Limits::kMaxDepth) return Step::TooDeep;
+    auto* const list = static_cast<SExpression*>(value);
+    open_[level_++] = {list, std::exchange(rest_, list->first)};
+    opened_ = true;
+    return Step::Open;
+  }
+
+  Step Leave() {
+    const Frame& frame = open_[--level_];
+    value_ = frame.list;
+    rest_ = frame.behind;
+    closed_ = 1;
+    opened_ = false;
+    return Step::Close;
+  }
+
   struct Frame {
-    DExpression* list = nullptr;
-    SExpression::Iterator rest{nullptr};
+    SExpression* list;
+    const Node* behind;  // what follows it in the list around it
   };
-  std::array<Frame, Limits::kMaxDepth> open_;
+
+  SExpression* root_;           // null once it was opened
+  const Node* rest_ = nullptr;  // of the list that was opened last
+  DExpression* value_ = nullptr;
+  unsigned level_ = 0;
+  unsigned closed_ = 0;
+  bool opened_ = false;
+  bool isFirst_ = true;
+  Frame open_[Limits::kMaxDepth];  // not cleared: only those of open lists are looked at
 };
 
 }  // namespace ZvVesk2

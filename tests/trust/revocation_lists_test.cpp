@@ -12,12 +12,12 @@
 // The linker leads the library's calls here (--wrap).
 static size_t proofs = 0, digests = 0;
 extern "C" {
-decltype(zvclm_HashAlloc) __real_zvclm_HashAlloc, __wrap_zvclm_HashAlloc;
+decltype(zvclm_HashStart) __real_zvclm_HashStart, __wrap_zvclm_HashStart;
 decltype(zvclm_PublicKeyVerifySignature) __real_zvclm_PublicKeyVerifySignature,
     __wrap_zvclm_PublicKeyVerifySignature;
-int __wrap_zvclm_HashAlloc(ZVCLMHashContextData** context, ZvclmHashID id, uint32_t handle) {
+int __wrap_zvclm_HashStart(ZVCLMHashContextData* context, ZvclmHashID id, uint32_t handle) {
   ++digests;
-  return __real_zvclm_HashAlloc(context, id, handle);
+  return __real_zvclm_HashStart(context, id, handle);
 }
 int __wrap_zvclm_PublicKeyVerifySignature(const ZVCLMPublicKeyData* key, int scheme,
                                           const void* parameters, const unsigned char* digest,
