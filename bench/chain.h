@@ -14,9 +14,10 @@ namespace bench {
 // install; each of the others trusts another key. The library is told that it is its store.
 void FillStore(const Place& place, size_t entries);
 // Writes a chain in which each key lets the next one install, and returns its path. The signatures
-// go to `made` if that is not null.
+// go to `made` if that is not null. `source` gives the tag of each certificate's revocation lists.
 std::string WriteChain(const Place& place, unsigned certificates,
-                       std::vector<floor::Signed>* made = nullptr);
+                       std::vector<floor::Signed>* made = nullptr,
+                       std::string (*source)(unsigned) = nullptr);
 
 }  // namespace bench
 

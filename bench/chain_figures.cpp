@@ -4,6 +4,7 @@
 #include <openssl/evp.h>
 #include <sys/stat.h>
 #include <vesk2.h>
+#include <vesk2/crl.h>
 
 #include "bench/chain.h"
 #include "tests/support/test_manifest.h"
@@ -53,6 +54,57 @@ Outcome VerifyChain(const Effort& effort, unsigned certificates) {
       });
 }
 
+std::string Source(unsigned number) {
+  return vesk2test::Tag("(revocations n" + std::to_string(number) + " (revoke all))");
+}
+
+// An empty list of that source, vouched for by the root.
+void WriteList(const Place& lists, unsigned number) {
+  using vesk2test::List;
+  const TestKey& root = TestKey::Rsa(0);
+  const std::string crl = List({"3:crl", "(7:version1:1)", "(5:list1)", "(5:list2)"});
+  const std::string cert = vesk2test::Cert({.issuer = root.Public(),
+                                            .subject = vesk2test::HashOf(crl),
+                                            .tag = Source(number),
+                                            .notAfter = "3001-01-01_00:00:00"});
+  lists.Write(std::to_string(number) + ".crl", List({"8:sequence", crl, cert, root.Sign(cert)}));
+}
+
+// Each certificate has a source of its own, which has an empty list.
+Outcome VerifyWithLists(const Effort& effort, unsigned certificates) {
+  const Place place("chain"), lists("lists"), theirs("x509");
+  FillStore(place, 10 - certificates);
+  std::vector<EVP_PKEY*> keys = {TestKey::Rsa(0).Pkey()};
+  for (unsigned i = 0; i < certificates; ++i) {
+    place.Write("acl/source" + std::to_string(i) + ".acl",
+                vesk2test::AclEntryText(TestKey::Rsa(0).Public(), Source(i)));
+    WriteList(lists, i);
+    keys.push_back(TestKey::Rsa(i + 1).Pkey());
+  }
+  if (ZvVesk2::CrlSequence::ImportDirAndStore(lists.Path().c_str(), nullptr) != 0) {
+    return Failed("lists that cannot be stored");
+  }
+  floor::WriteX509(theirs.Path(), keys);
+  const std::string chain = WriteChain(place, certificates, nullptr, Source);
+  const size_t times = effort.Of(400, 100);
+  return Ratio(
+      effort,
+      [&] {
+        bool right = true;
+        for (size_t i = 0; i < times; ++i) {
+          right = right && Vesk2CertVerifyFile(chain.c_str(), "(install)", 0, 0) == 0;
+        }
+        return right;
+      },
+      [&] {
+        bool right = true;
+        for (size_t i = 0; i < times; ++i) {
+          right = right && floor::VerifyX509(theirs.Path(), certificates);
+        }
+        return right;
+      });
+}
+
 }  // namespace
 
 void FillStore(const Place& place, size_t entries) {
@@ -69,15 +121,17 @@ void FillStore(const Place& place, size_t entries) {
   Vesk2GlobalDirectory(place.Path().c_str());
 }
 
-std::string WriteChain(const Place& place, unsigned certificates,
-                       std::vector<floor::Signed>* made) {
+std::string WriteChain(const Place& place, unsigned certificates, std::vector<floor::Signed>* made,
+                       std::string (*source)(unsigned)) {
   std::string text;
   for (unsigned i = certificates; i-- > 0;) {
     const TestKey& issuer = TestKey::Rsa(i);
-    const std::string cert = vesk2test::Cert({.issuer = issuer.Public(),
-                                              .subject = TestKey::Rsa(i + 1).Public(),
-                                              .tag = vesk2test::Tag("(install)"),
-                                              .propagate = true});
+    vesk2test::CertText parts{.issuer = issuer.Public(),
+                              .subject = TestKey::Rsa(i + 1).Public(),
+                              .tag = vesk2test::Tag("(install)"),
+                              .propagate = true};
+    if (source != nullptr) parts.revocation = source(i).replace(0, 6, "(10:revocation");
+    const std::string cert = vesk2test::Cert(parts);
     text += cert + issuer.Sign(cert) + "(7:comment)";
     const std::string digest = vesk2test::Digest(cert);
     if (made == nullptr) continue;
@@ -95,6 +149,13 @@ Figures ChainFigures() {
        [](const Effort& effort) { return VerifyChain(effort, 3); }},
       {"C1c", "of 5", "the same", 1.30,
        [](const Effort& effort) { return VerifyChain(effort, 5); }},
+      {"C2a", "chain of 2, a revocation list a certificate",
+       "X509_verify_cert, equal chain and lists", 0.45,
+       [](const Effort& effort) { return VerifyWithLists(effort, 2); }},
+      {"C2b", "of 3", "the same", 0.45,
+       [](const Effort& effort) { return VerifyWithLists(effort, 3); }},
+      {"C2c", "of 5", "the same", 0.45,
+       [](const Effort& effort) { return VerifyWithLists(effort, 5); }},
   };
 }
 

@@ -67,6 +67,13 @@ struct Signed {
 // Builds the key and checks the signature.
 bool CheckSignature(const Signed& by);
 
+// Writes certificates in X.509's form, each by the key before it, the first by itself, and an empty
+// revocation list of each key.
+void WriteX509(const std::string& directory, const std::vector<EVP_PKEY*>& keys);
+// Reads them, and has libcrypto verify the chain that ends `certificates` after the first, with the
+// lists.
+bool VerifyX509(const std::string& directory, size_t certificates);
+
 }  // namespace bench::floor
 
 #endif  // VESK2_BENCH_FLOOR_FLOOR_H
