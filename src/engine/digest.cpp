@@ -9,14 +9,10 @@
 
 namespace ZvVesk2::Engine {
 
-spki_digest::~spki_digest() {
-  if (context != nullptr) zvclm_HashFree(context, engine->hash_provider);
-}
-
 spki_status spki_digest_start(spki_engine* engine, spki_digest* digest, ZvclmHashID id) {
   digest->engine = engine;
   VESK2_TRY(spki_charge_units(engine, kUnitsPerHash));
-  return spki_map_crypto_status(zvclm_HashAlloc(&digest->context, id, engine->hash_provider));
+  return spki_map_crypto_status(zvclm_HashStart(&digest->context, id, engine->hash_provider));
 }
 
 spki_status spki_digest_update(spki_digest* digest, const void* data, size_t length) {
@@ -24,13 +20,13 @@ spki_status spki_digest_update(spki_digest* digest, const void* data, size_t len
   VESK2_TRY(spki_charge_hashed(digest->engine, length));
   const auto* bytes = static_cast<const unsigned char*>(data);
   return spki_map_crypto_status(
-      zvclm_HashUpdate(digest->context, bytes, length, digest->engine->hash_provider));
+      zvclm_HashUpdate(&digest->context, bytes, length, digest->engine->hash_provider));
 }
 
 spki_status spki_digest_finish(spki_digest* digest, unsigned char (&out)[kSpkiDigestSize]) {
   std::memset(out, 0, sizeof out);
   return spki_map_crypto_status(
-      zvclm_HashFinal(digest->context, out, digest->engine->hash_provider));
+      zvclm_HashFinal(&digest->context, out, digest->engine->hash_provider));
 }
 
 // The provider's results that are not listed are success: that is how callers of the engine have

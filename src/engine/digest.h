@@ -12,14 +12,10 @@ namespace ZvVesk2::Engine {
 // Digests are kept in 32 bytes; a shorter one is padded with zeros.
 inline constexpr size_t kSpkiDigestSize = 32;
 
+// It is large, and stands in a frame.
 struct spki_digest {
-  ZVCLMHashContextData* context = nullptr;
+  ZVCLMHashContextData context;
   spki_engine* engine = nullptr;
-
-  spki_digest() = default;
-  spki_digest(const spki_digest&) = delete;
-  spki_digest& operator=(const spki_digest&) = delete;
-  ~spki_digest();
 };
 
 // Starts a hash with the engine's provider, which it and its pieces are charged to; `digest` is

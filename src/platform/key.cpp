@@ -6,7 +6,10 @@
 
 #include <openssl/core_names.h>
 #include <openssl/crypto.h>
-#include <openssl/param_build.h>
+#include <openssl/params.h>
+#include <algorithm>
+#include <array>
+#include <memory>
 #include <new>
 #include <span>
 
@@ -72,18 +75,41 @@ ZVCLMBigInt* CopyNumber(const BIGNUM* number) {
   return copy->value != nullptr ? copy.release() : nullptr;
 }
 
-// In the order of ZVCLMPublicKeyData.
-bool PushNumbers(OSSL_PARAM_BLD* builder, const ZVCLMPublicKeyData& key) {
-  static constexpr const char* kRsaNames[] = {OSSL_PKEY_PARAM_RSA_N, OSSL_PKEY_PARAM_RSA_E};
-  static constexpr const char* kDsaNames[] = {OSSL_PKEY_PARAM_FFC_P, OSSL_PKEY_PARAM_FFC_Q,
-                                              OSSL_PKEY_PARAM_FFC_G, OSSL_PKEY_PARAM_PUB_KEY};
-  const std::span<const char* const> names =
-      key.type == ZVCLM_KEY_RSA ? std::span<const char* const>(kRsaNames) : kDsaNames;
-  for (size_t i = 0; i < names.size(); ++i) {
-    if (OSSL_PARAM_BLD_push_BN(builder, names[i], key.number(i)) != 1) return false;
+// A key's numbers in the order of ZVCLMPublicKeyData, as libcrypto takes them: each in the order of
+// the machine, one behind the other.
+class Parameters {
+ public:
+  // False without memory.
+  bool Set(const ZVCLMPublicKeyData& key) {
+    static constexpr const char* kRsaNames[] = {OSSL_PKEY_PARAM_RSA_N, OSSL_PKEY_PARAM_RSA_E};
+    static constexpr const char* kDsaNames[] = {OSSL_PKEY_PARAM_FFC_P, OSSL_PKEY_PARAM_FFC_Q,
+                                                OSSL_PKEY_PARAM_FFC_G, OSSL_PKEY_PARAM_PUB_KEY};
+    const std::span<const char* const> names =
+        key.type == ZVCLM_KEY_RSA ? std::span<const char* const>(kRsaNames) : kDsaNames;
+    size_t size = 0;
+    for (size_t i = 0; i < names.size(); ++i) size += SizeOf(key.number(i));
+    bytes_.reset(new (std::nothrow) unsigned char[size]);
+    if (bytes_ == nullptr) return false;
+    unsigned char* at = bytes_.get();
+    for (size_t i = 0; i < names.size(); ++i) {
+      const size_t length = SizeOf(key.number(i));
+      BN_bn2nativepad(key.number(i), at, static_cast<int>(length));
+      parameters_[i] = OSSL_PARAM_construct_BN(names[i], at, length);
+      at += length;
+    }
+    parameters_[names.size()] = OSSL_PARAM_construct_end();
+    return true;
   }
-  return true;
-}
+  OSSL_PARAM* get() { return parameters_.data(); }
+
+ private:
+  static size_t SizeOf(const BIGNUM* number) {  // 0 has a byte, too
+    return std::max<size_t>(1, static_cast<size_t>(BN_num_bytes(number)));
+  }
+
+  std::unique_ptr<unsigned char[]> bytes_;
+  std::array<OSSL_PARAM, ZVCLMPublicKeyData::kMaxNumbers + 1> parameters_;
+};
 
 }  // namespace
 
@@ -92,13 +118,12 @@ namespace ZVsysutil {
 // Made for each use and not kept: a key is verified with seldom, and held often. libcrypto takes
 // any numbers, so that null is a lack of memory.
 PkeyOwner MakePkey(const ZVCLMPublicKeyData& key) {
-  const Evp<OSSL_PARAM_BLD, OSSL_PARAM_BLD_free> builder(OSSL_PARAM_BLD_new());
-  if (builder == nullptr || !PushNumbers(builder.get(), key)) return nullptr;
-  const Evp<OSSL_PARAM, OSSL_PARAM_free> numbers(OSSL_PARAM_BLD_to_param(builder.get()));
+  Parameters numbers;
+  if (!numbers.Set(key)) return nullptr;
   const char* name = key.type == ZVCLM_KEY_RSA ? "RSA" : "DSA";
   const Evp<EVP_PKEY_CTX, EVP_PKEY_CTX_free> context(
       EVP_PKEY_CTX_new_from_name(nullptr, name, nullptr));
-  if (numbers == nullptr || context == nullptr) return nullptr;
+  if (context == nullptr) return nullptr;
   EVP_PKEY* made = nullptr;
   if (EVP_PKEY_fromdata_init(context.get()) != 1 ||
       EVP_PKEY_fromdata(context.get(), &made, EVP_PKEY_PUBLIC_KEY, numbers.get()) != 1) {
