@@ -55,14 +55,17 @@ Outcome VerifyChain(const Effort& effort, unsigned certificates) {
 }
 
 std::string Source(unsigned number) {
-  return vesk2test::Tag("(revocations n" + std::to_string(number) + " (revoke all))");
+  return vesk2test::Tag("source" + std::to_string(number) + " (revoke all)");
 }
 
-// An empty list of that source, vouched for by the root.
+// A list of that source that names one certificate, vouched for by the root.
 void WriteList(const Place& lists, unsigned number) {
   using vesk2test::List;
   const TestKey& root = TestKey::Rsa(0);
-  const std::string crl = List({"3:crl", "(7:version1:1)", "(5:list1)", "(5:list2)"});
+  const std::string crl = List(
+      {"3:crl", "(7:version1:1)",
+       List({"5:list1", List({"4:item", vesk2test::HashOf("another"), "19:2011-01-01_00:00:00"})}),
+       "(5:list2)"});
   const std::string cert = vesk2test::Cert({.issuer = root.Public(),
                                             .subject = vesk2test::HashOf(crl),
                                             .tag = Source(number),
@@ -70,7 +73,7 @@ void WriteList(const Place& lists, unsigned number) {
   lists.Write(std::to_string(number) + ".crl", List({"8:sequence", crl, cert, root.Sign(cert)}));
 }
 
-// Each certificate has a source of its own, which has an empty list.
+// Each certificate has a source of its own, and a list of it.
 Outcome VerifyWithLists(const Effort& effort, unsigned certificates) {
   const Place place("chain"), lists("lists"), theirs("x509");
   FillStore(place, 10 - certificates);

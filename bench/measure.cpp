@@ -39,7 +39,8 @@ double Take(double (*clock)(), const Way& way) {
 
 Outcome RatioBy(double (*clock)(), const Effort& effort, const Way& ours, const Way& yardstick) {
   // Both ways once before: caches are warm, and what is made on first use is there.
-  if (!ours() || !yardstick()) return Failed("a wrong result");
+  if (!ours()) return Failed("a wrong result");
+  if (!yardstick()) return Failed("a wrong result of the yardstick");
   std::vector<double> ratios;
   for (int round = 0; round < effort.rounds; ++round) {
     const bool oursFirst = round % 2 == 0;

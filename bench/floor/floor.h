@@ -67,7 +67,7 @@ struct Signed {
 // Builds the key and checks the signature.
 bool CheckSignature(const Signed& by);
 
-// Writes certificates in X.509's form, each by the key before it, the first by itself, and an empty
+// Writes certificates in X.509's form, each by the key before it, the first by itself, and a
 // revocation list of each key.
 void WriteX509(const std::string& directory, const std::vector<EVP_PKEY*>& keys);
 // Reads them, and has libcrypto verify the chain that ends `certificates` after the first, with the

@@ -61,6 +61,12 @@ std::string MakeList(EVP_PKEY* key, size_t issuer) {
   X509_CRL_set_issuer_name(list.get(), Name(issuer).get());
   X509_CRL_set1_lastUpdate(list.get(), from.get());
   X509_CRL_set1_nextUpdate(list.get(), until.get());
+  X509_REVOKED* const revoked = X509_REVOKED_new();
+  const Owned<ASN1_INTEGER, ASN1_INTEGER_free> another(ASN1_INTEGER_new());
+  ASN1_INTEGER_set(another.get(), 1'000'000);
+  X509_REVOKED_set_serialNumber(revoked, another.get());
+  X509_REVOKED_set_revocationDate(revoked, from.get());
+  X509_CRL_add0_revoked(list.get(), revoked);
   X509_CRL_sign(list.get(), key, EVP_sha256());
   std::string der(static_cast<size_t>(i2d_X509_CRL(list.get(), nullptr)), '\0');
   auto* at = reinterpret_cast<unsigned char*>(der.data());

@@ -6,12 +6,14 @@
 #include <vesk2/ref.h>
 
 #include <string>
+#include <thread>
 #include <tuple>
 #include <vector>
 
 #include <gtest/gtest.h>
 
 #include "tests/support/test_object.h"
+#include "tests/support/test_text.h"
 
 namespace ZvVesk2 {
 namespace {
@@ -144,6 +146,38 @@ TEST(Readers, EveryTruncationAndBitFlip) {
         EXPECT_EQ(Canonical(Parse(outcome)), outcome) << damaged;
       }
     }
+  }
+}
+
+// What is read together lies together, which nobody may notice: parts outlive the whole, go in any
+// order and in another thread, and lists are edited like those that were built.
+TEST(Readers, PartsLiveAsLongAsTheyAreHeld) {
+  std::string text = "(4:many";
+  for (int i = 0; i < 2000; ++i) text += "(1:a" + Str(std::string(i % 40, 'x')) + "(0:)1:b)";
+  text += ")";
+  for (const Reader read : {kMemory, kBuffer}) {
+    Ref<SExpression> list;
+    ASSERT_EQ(read(list, text), 0);
+    ASSERT_EQ(Canonical(list), text);
+    std::vector<Ref<DExpression>> even, odd;
+    int number = 0;
+    for (auto it = list->Begin(); it; it.Next()) {
+      (number++ % 2 == 0 ? even : odd).push_back(Ref<DExpression>::Share(it.Value()));
+    }
+    ASSERT_EQ(list->Remove(odd[7].get()), 0);
+    odd[7]->Free();  // the list's
+    ASSERT_EQ(list->Insert("new"), 0);
+    EXPECT_EQ(list->Count(), 2001u);
+    EXPECT_TRUE(static_cast<ByteString*>(list->Last())->IsEqual("new"));
+    list.Reset();
+    auto* const edited = static_cast<SExpression*>(odd[7].get());
+    ASSERT_EQ(edited->Insert("new"), 0);
+    EXPECT_EQ(Canonical(odd[7]), "(1:a" + Str(std::string(14, 'x')) + "(0:)1:b3:new)");
+    std::thread other([&even] { even.clear(); });
+    while (odd.size() > 8) odd.erase(odd.begin() + 8);
+    other.join();
+    EXPECT_EQ(odd[7]->GetRefCount(), 1);
+    EXPECT_EQ(Canonical(odd[0]), "(1:a0:(0:)1:b)");
   }
 }
 

@@ -159,6 +159,24 @@ TEST(SExpression, EqualityIsThatOfTheCanonicalTextWithoutHints) {
   EXPECT_FALSE(equal || list->IsEqual((DExpression*)nullptr)) << "null equals nothing";
 }
 
+// Whatever part of a text stands where a running hash's block ends.
+TEST(SExpression, DigestsOfTextsThatFillABlock) {
+  constexpr size_t kBlock = 16384;
+  const std::string tail = "[bin]5:bytes(" + Str(std::string(30, 'y')) + ")[utf-8]0:()";
+  for (size_t size = kBlock - tail.size() - 60; size < kBlock + 30; ++size) {
+    std::string text = "(" + Str(std::string(8000, 'x')) + Str(std::string(8000, 'y'));
+    text += Str(std::string(size - text.size() - 4, 'z')) + tail + ")";
+    const Ref<SExpression> list = Parse(text);
+    unsigned char* out = nullptr;
+    unsigned length = 0;
+    ASSERT_EQ(list->ComputeHash(out, length, ZVCLM_HASH_SHA256, false), 0);
+    EXPECT_EQ(Text(out, length), Digest(text)) << size;
+    out = nullptr;
+    ASSERT_EQ(list->Export(out, length), 0);
+    EXPECT_EQ(Canonical(Parse(Text(out, length))).size(), text.size() - 12) << size;
+  }
+}
+
 TEST(SExpression, NestingThatACallerBuildsIsRefusedNotFollowed) {
   const Ref<SExpression> flat = Parse("(1:x)");
   for (const int levels : {256, 257, 100000}) {

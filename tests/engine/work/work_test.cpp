@@ -49,6 +49,12 @@ int __wrap_EVP_DigestUpdate(EVP_MD_CTX* context, const void* data, size_t size) 
   if (counting) work.hashed += size;
   return __real_EVP_DigestUpdate(context, data, size);
 }
+decltype(EVP_Digest) __real_EVP_Digest, __wrap_EVP_Digest;
+int __wrap_EVP_Digest(const void* data, size_t size, unsigned char* digest, unsigned* length,
+                      const EVP_MD* algorithm, ENGINE* engine) {
+  if (counting) work.hashed += size;
+  return __real_EVP_Digest(data, size, digest, length, algorithm, engine);
+}
 
 }  // extern "C"
 
