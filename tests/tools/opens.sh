@@ -23,12 +23,12 @@ vesk2 manifest sign tree --key carol.pem -o stranger.m 2>/dev/null
 
 failures=0
 # opens ACL LIST FILE WORD...: runs the command, which may open each ACL file and each stored list
-# that often, and FILE once.
+# that often, and FILE once. O_PATH names a file and opens nothing.
 opens() {
   acl=$1 list=$2 file=$3
   shift 3
   strace -f -e trace=open,openat -o log vesk2 "$@" --explain >/dev/null 2>&1 || true
-  grep -v 'ENOENT\|O_DIRECTORY\|O_WRONLY\|O_RDWR' log | sed -n 's/.*"\([^"]*\)".*/\1/p' |
+  grep -v 'ENOENT\|O_DIRECTORY\|O_PATH\|O_WRONLY\|O_RDWR' log | sed -n 's/.*"\([^"]*\)".*/\1/p' |
     grep '\.acl$\|\.crl$\|\.m$\|\.cert$' | sort | uniq -c |
     while read -r count path; do
       case $path in *.acl) most=$acl ;; *.crl) most=$list ;; *) most=1 ;; esac

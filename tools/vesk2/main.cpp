@@ -6,6 +6,7 @@
 #include <csignal>
 
 #include "tools/vesk2/commands/command.h"
+#include "tools/vesk2/confine/confine.h"
 
 namespace {
 
@@ -22,5 +23,6 @@ void HoldStandardDescriptors() {
 int main(int argc, char** argv) {
   HoldStandardDescriptors();
   std::signal(SIGXFSZ, SIG_IGN);  // a file that grows too large is a failed write, cleaned up after
+  vesk2_command::AllowConfinement();
   return vesk2_command::RunCommand(argc, argv);
 }

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // cert_verify.cpp: vesk2 cert verify.
 #include "tools/vesk2/commands/command.h"
+#include "tools/vesk2/confine/confine.h"
 #include "tools/vesk2/explain/effort.h"
 #include "tools/vesk2/explain/explain.h"
 #include "tools/vesk2/objects/cert_chain.h"
@@ -80,6 +81,7 @@ ExitCode Run(const Options& options) {
     return verdict;
   }
   const ExitCode verdict = Yes(subject + " is granted " + tag);
+  if (options.explain) Note(Confinement());
   if (options.explain || GetStyle().json) ExplainGrant(question);
   return verdict;
 }

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // manifest_verify.cpp: vesk2 manifest verify.
 #include "tools/vesk2/commands/command.h"
+#include "tools/vesk2/confine/confine.h"
 #include "tools/vesk2/explain/effort.h"
 #include "tools/vesk2/explain/explain.h"
 #include "tools/vesk2/files/files.h"
@@ -204,6 +205,7 @@ class Answer {
                                  " by " + Fingerprint(*proved_.GetCert(0)->GetIssuer()) +
                                  (aboutSigning ? EndedSince(proved_) : ""));
     TellFindings(findings, AboutTree(options_), manifest_);
+    if (options_.explain) Note(Confinement());
     if (options_.explain || GetStyle().json) TellGrant();
     return verdict;
   }

@@ -3,10 +3,12 @@
 // place that turns failures into exit codes.
 #include <unistd.h>
 
+#include <algorithm>
 #include <cstdlib>
 #include <string>
 
 #include "tools/vesk2/commands/options.h"
+#include "tools/vesk2/confine/confine.h"
 #include "tools/vesk2/files/files.h"
 
 #include <vesk2.h>
@@ -117,6 +119,51 @@ void RefuseSharedInput(const CLI::App& app) {
   for (const CLI::App* verb : app.get_subcommands()) RefuseSharedInput(*verb);
 }
 
+// ---- What a command that only looks gives up ----
+
+bool OnlyLooks(const std::string& command) {
+  if (command.starts_with("key")) return false;  // keys are in programs and devices, too
+  return command.ends_with("verify") || command.ends_with("show");
+}
+
+std::string DirectoryOf(const std::string& path) {
+  const size_t slash = path.rfind('/');
+  return slash == std::string::npos ? "." : path.substr(0, slash + 1);
+}
+
+// Every path that the command line names.
+void AddNamedPaths(const CLI::App& app, Reach& reach) {
+  for (const CLI::Option* option : app.get_options()) {
+    if (!DescribeOption(*option).takesFile) continue;
+    const bool written = option->check_name("--output") || option->check_name("--floor");
+    for (const std::string& value : option->results()) {
+      if (written) reach.writable.push_back(DirectoryOf(value));
+      reach.readable.push_back(value);
+      const size_t colon = value.rfind(':');  // FILE:N
+      if (colon != std::string::npos) reach.readable.push_back(value.substr(0, colon));
+    }
+  }
+  for (const CLI::App* verb : app.get_subcommands()) AddNamedPaths(*verb, reach);
+}
+
+bool Asked(const CLI::App& app, const std::string& flag) {
+  const CLI::Option* option = app.get_option_no_throw(flag);
+  if (option != nullptr && option->count() > 0) return true;
+  return std::ranges::any_of(app.get_subcommands(),
+                             [&](const CLI::App* verb) { return Asked(*verb, flag); });
+}
+
+// The stores are written to by a verification whose manifest carries lists; a passphrase is asked
+// for on the terminal.
+void GiveUpTheRest(const CLI::App& app, const StoreOptions& stores) {
+  Reach reach;
+  reach.readable = {HomeRoot(stores).path, GlobalRoot(stores).path};
+  reach.writable = {HomeRoot(stores).path, GlobalRoot(stores).path, "/dev/tty"};
+  AddNamedPaths(app, reach);
+  if (Asked(app, "--allow-links")) reach.readable = {"/"};  // they may lead anywhere
+  Confine(reach);
+}
+
 bool TerminalTakesColor() {
   const char* noColor = std::getenv("NO_COLOR");
   if (noColor != nullptr && *noColor != '\0') return false;
@@ -155,6 +202,7 @@ ExitCode Run(int argc, const char* const* argv) {
   StartReport(choice.command, ResolveStyle(common));
   RefuseSharedInput(app);
   UseStores(common.stores);
+  if (OnlyLooks(choice.command)) GiveUpTheRest(app, common.stores);
   return FinishReport(choice.action());
 }
 
