@@ -8,6 +8,7 @@
 #include "tools/vesk2/keys/key_reference.h"
 #include "tools/vesk2/keys/key_source.h"
 #include "tools/vesk2/objects/crl_file.h"
+#include "tools/vesk2/objects/join.h"
 #include "tools/vesk2/say/report.h"
 #include "tools/vesk2/verify/self_check.h"
 
@@ -148,11 +149,7 @@ ExitCode Run(const Options& options) {
   }
   for (const CertChain& chain : chains) AppendChain(*sequence, *chain);
   WriteSequence(*sequence, options.output, options.flags);
-  if (signers.size() > 1 && !options.propagate) {
-    Note(
-        "note: without --propagate these certificates do not combine to a manifest's authority: "
-        "only the first of several may pass on to the content what it was granted");
-  }
+  NoteNotPassedOn(options.propagate ? 0 : signers.size());
   return kYes;
 }
 

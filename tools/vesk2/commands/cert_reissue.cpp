@@ -1,14 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
 // cert_reissue.cpp: vesk2 cert renew and vesk2 cert cosign: a certificate of a chain or manifest is
 // issued again, in its own place or beside it where several keys must agree.
-//
-// The certificates of a chain are signed one by one, and those of a manifest stand outside what its
-// digest covers: one of them can be changed, or added, without its neighbours.
 #include <algorithm>
 
 #include "tools/vesk2/commands/command.h"
 #include "tools/vesk2/files/files.h"
 #include "tools/vesk2/keys/key_source.h"
+#include "tools/vesk2/objects/splice.h"
 #include "tools/vesk2/say/report.h"
 
 namespace vesk2_command {
@@ -45,28 +43,14 @@ Work Open(const Options& options) {
   return work;
 }
 
-std::string Pair(const SignedCert& each) {
-  return Canonical(*each.cert) + Canonical(*each.signature);
-}
-
 // The file's text with `made` in the place of the certificate and its signature, or before them.
 std::string Splice(const Work& work, const SignedCert& made, bool beside) {
   const Buffer buffer = OpenBuffer(work.place.path);
   std::string text(reinterpret_cast<const char*>(buffer->Data()), buffer->Remaining());
-  size_t at = 0;
-  size_t length = 0;
-  for (size_t i = 0; i < work.place.number; ++i) {
-    const std::string old = Pair(work.certs[i]);
-    at = text.find(old, at + length);
-    if (at == std::string::npos) {
-      throw FileTrouble(work.place.path, "its certificates are not written canonically",
-                        "malformed");
-    }
-    length = old.size();
-  }
-  if (!beside) return text.replace(at, length, Pair(made));
+  const auto [at, length] = FindPair(text, work.certs, work.place.number, work.place.path);
+  if (!beside) return text.replace(at, length, PairText(made));
   const bool triple = !buffer->LooksAt("(8:manifest");
-  return text.insert(at, Pair(made) + (triple ? Canonical(*ListOf({}, "comment")) : ""));
+  return text.insert(at, PairText(made) + (triple ? Canonical(*ListOf({}, "comment")) : ""));
 }
 
 ExitCode Write(const Options& options, const Work& work, const Renewal& renewal, bool beside) {
@@ -105,7 +89,8 @@ ExitCode Cosign(const Options& options) {
   Work work = Open(options);
   ZvVesk2::Subject* const subject = work.old().GetSubject();
   if (subject->IsHash()) {
-    throw Trouble(Escape(options.place) + ": certifies a digest, which only its signer can");
+    throw Trouble(Escape(options.place) +
+                  ": certifies a digest; vesk2 manifest approve adds another key's word for it");
   }
   work.key = OpenSigner(options.signer);
   const Ref<PublicKey> issuer = work.key->Public();

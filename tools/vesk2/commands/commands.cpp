@@ -89,6 +89,8 @@ constexpr Command kCommands[] = {
      DefineCertRenew},
     {"cert", "cosign", "Certify the same as a certificate of a chain or manifest does",
      "vesk2 cert cosign signer.cert:2 --key bob.pem -o signer.cert --force", DefineCertCosign},
+    {"cert", "join", "Put chains for the same key together",
+     "vesk2 cert join by-alice.cert by-bob.cert -o signer.cert", DefineCertJoin},
     {"cert", "show", "Show the certificates of a chain", "vesk2 cert show signer.cert",
      DefineCertShow},
     {"cert", "verify", "Is the first subject of a chain authorized?",
@@ -109,6 +111,8 @@ constexpr Command kCommands[] = {
      "vesk2 manifest sign app --key signer.pem --cert signer.cert --tag '(install (app calc))' "
      "-o app.manifest",
      DefineManifestSign},
+    {"manifest", "approve", "Add a further key's word for what a manifest lists",
+     "vesk2 manifest approve app.manifest --key bob.pem --tree app", DefineManifestApprove},
     {"manifest", "verify", "Is a directory as signed, by someone authorized?",
      "vesk2 manifest verify app app.manifest --tag '(install (app calc))'", DefineManifestVerify},
     {"manifest", "show", "Show who signed a manifest, and what it lists",

@@ -3,6 +3,7 @@
 #include <filesystem>
 
 #include "tools/vesk2/commands/command.h"
+#include "tools/vesk2/commands/signer_chains.h"
 #include "tools/vesk2/files/files.h"
 #include "tools/vesk2/keys/issue.h"
 #include "tools/vesk2/keys/key_reference.h"
@@ -14,7 +15,6 @@
 #include "tools/vesk2/say/report.h"
 #include "tools/vesk2/stores/grant.h"
 #include "tools/vesk2/tree/tree.h"
-#include "tools/vesk2/verify/self_check.h"
 
 #include <vesk2/hash.h>
 
@@ -29,7 +29,7 @@ constexpr const char* kWriting = "writing the manifest";
 struct Options {
   std::string directory;
   SignerOptions signer;
-  std::string cert;
+  std::vector<std::string> certs;
   std::string tag;
   std::string at = "now";
   std::vector<std::string> ignored;
@@ -42,26 +42,15 @@ struct Options {
   WriteFlags flags;
 };
 
-// The certificates that speak for the signer: those of the --cert file, a chain or a manifest whose
-// first is for its content, or else one that the signer issues to itself, which is worth what the
-// ACL store grants its key.
+// The certificates that speak for the signer: those of the --cert files, or else one that the
+// signer issues to itself, which is worth what the ACL store grants its key.
 std::vector<SignedCert> SignersCerts(const Options& options, const SigningKey& key) {
   const Ref<PublicKey> signer = key.Public();
-  std::vector<SignedCert> certs;
-  if (options.cert.empty()) {
+  std::vector<SignedCert> certs = ReadSignerChains(options.certs, *signer);
+  if (certs.empty()) {
     certs.push_back(IssueCert(key, {signer.get(), true}, options.signer.algorithm));
-    return certs;
   }
-  const bool isManifest = OpenBuffer(options.cert)->LooksAt("(8:manifest");
-  if (!isManifest) RequireCertFor(ReadCertChain(options.cert), options.cert, *signer);
-  certs = ReadCerts(options.cert);
-  if (!isManifest) return certs;
-  RequireCert(certs, 2, options.cert);
-  certs.erase(certs.begin());
-  ZvVesk2::Subject& subject = *certs[0].cert->GetSubject();
-  if (subject.IsEqual(signer.get())) return certs;
-  throw Trouble(Escape(options.cert) + ": signed by " + Fingerprint(*certs[0].cert->GetSubject()) +
-                ", not by the signing key " + Fingerprint(*signer));
+  return certs;
 }
 
 // Warns of what nobody will believe: certificates that do not lead to the signer, or not to what is
@@ -72,14 +61,7 @@ void CheckAuthority(const Options& options, const SigningKey& key, SExpression* 
   if (at->IsAfter(ParseTime("now", false).get())) {
     check.Add("the time of signing, " + StampText(*at) + ", is yet to come");
   }
-  if (!options.cert.empty()) {
-    SelfCheck::Chain chain{options.cert, ReadCerts(options.cert)};
-    chain.signers.push_back(key.Public());
-    chain.tag = tag;
-    chain.at = at.get();
-    chain.passing = 1;  // the first may pass on to the content what it was granted
-    check.CheckChain(chain);
-  }
+  CheckSignerChains(check, options.certs, key.Public(), tag, at.get());
   check.Tell(options.strict);
 }
 
@@ -243,9 +225,10 @@ Action DefineManifestSign(CLI::App& app) {
   app.add_option("directory", options->directory, "The tree to sign")->required();
   AddSignerOptions(app, options->signer);
   app.add_option(
-      "--cert", options->cert,
-      "Certificate file of the signing key, or a manifest that it signed [none: the key speaks "
-      "for itself]");
+         "--cert", options->certs,
+         "Certificate file of the signing key, or a manifest that it signed; several are joined "
+         "[none: the key speaks for itself]")
+      ->allow_extra_args(false);
   app.add_option("--tag", options->tag, "Sign for this tag only [all that the signer is granted]");
   app.add_option("--at", options->at, "Time of signing, UTC")->capture_default_str();
   app.add_option("--ignore", options->ignored, "Leave this entry out (a path below the directory)")

@@ -17,7 +17,7 @@ constexpr struct {
   const char* options;  // and positionals
 } kValues[] = {
     {"COMMAND", " sign-with "},
-    {"DIR", " acl-dir global home "},
+    {"DIR", " acl-dir global home tree "},
     {"FILE", " cert chain crl items-of key output passphrase-file request revoke-key subject "},
     {"FILE[:N]", " issuer-of revoke-cert subject-of "},
     {"N", " bits jobs passphrase-fd threshold "},

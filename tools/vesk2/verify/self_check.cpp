@@ -60,6 +60,12 @@ bool Leads(const SelfCheck::Chain& chain, size_t index) {
          std::any_of(chain.certs.begin(), chain.certs.end(), issues);
 }
 
+// Whether a certificate is for the same content as a manifest's first.
+bool ApprovesContent(const SelfCheck::Chain& chain, size_t index) {
+  ZvVesk2::Subject& content = *chain.certs[0].cert->GetSubject();
+  return content.IsHash() && chain.certs[index].cert->GetSubject()->IsEqual(&content);
+}
+
 }  // namespace
 
 void AddStrictFlag(CLI::App& app, bool& strict) {
@@ -99,7 +105,7 @@ void SelfCheck::CheckChain(const Chain& chain) {
     if (!Leads(chain, i)) {
       Add(name + " is for " + SubjectText(*cert.GetSubject()) +
           ", which signs nothing of this chain");
-    } else if (i >= chain.passing && !cert.GetPropagate()) {
+    } else if (i >= chain.passing && !cert.GetPropagate() && !ApprovesContent(chain, i)) {
       Add(name + " does not let its subject pass it on (no --propagate)");
     }
   }
