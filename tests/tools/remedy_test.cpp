@@ -137,8 +137,11 @@ bool GrantedByWords(const Json& remedy, const Json& chain, const std::string& ta
     if (what == "crl import" || what == "manifest sign") return true;
     const auto named = std::find(words.begin(), words.end(), "--tag");
     if (named != words.end() && what != "crl issue" && IsWithin(tag, named[1])) return true;
-    if (words[1] != "cert") continue;
-    const Json& cert = chain[std::stoul(words[3].substr(words[3].rfind(':') + 1)) - 1];
+    // An approval is for what the signer signed for.
+    const bool approval = what == "manifest approve";
+    if (words[1] != "cert" && !approval) continue;
+    const size_t number = approval ? 1 : std::stoul(words[3].substr(words[3].rfind(':') + 1));
+    const Json& cert = chain[number - 1];
     // With a signature that does not hold the file had been refused whole.
     if (!cert["signature"]["holds"] || cert["tag"].is_null() || IsWithin(tag, cert["tag"])) {
       return true;

@@ -5,6 +5,7 @@
 #include <algorithm>
 #include <cctype>
 #include <filesystem>
+#include <set>
 
 #include "tools/vesk2/explain/mend_period.h"
 #include "tools/vesk2/files/stores.h"
@@ -74,6 +75,7 @@ void NoteName(Remedy& remedy, const std::string& path) {
 void Apply(const Edit& edit, Hypothesis& hypothesis) {
   if (edit.cert) hypothesis.certs[edit.index] = edit.cert.get();
   for (const auto& key : edit.coSigners) hypothesis.coSigners.emplace(edit.index, key.get());
+  for (const auto& key : edit.approvers) hypothesis.approvers.push_back(key.get());
   if (edit.entry) hypothesis.entries[edit.file] = edit.entry.get();
   if (edit.fresh) hypothesis.freshLists.push_back(edit.fresh.get());
 }
@@ -153,7 +155,11 @@ void EditMaker::Renew(std::vector<Edit>& edits, size_t index, Reach reach) const
 }
 
 void EditMaker::CoSign(std::vector<Edit>& edits) const {
-  for (const EntryEvidence& each : evidence_.entries) CoSign(edits, each.entry->GetSubject());
+  if (question_.manifest) {
+    for (const Approvals& each : FindApprovals(question_, evidence_)) Approve(edits, each);
+  } else {
+    for (const EntryEvidence& each : evidence_.entries) CoSign(edits, each.entry->GetSubject());
+  }
   for (const CertEvidence& each : evidence_.certs) CoSign(edits, each.cert->GetSubject());
 }
 
@@ -186,6 +192,31 @@ void EditMaker::CoSign(std::vector<Edit>& edits, ZvVesk2::Subject* subject) cons
     others.resize(several->GetK() - agreed);
     Add(edits, CoSignature(i, std::move(others)));
   }
+}
+
+void EditMaker::Approve(std::vector<Edit>& edits, const Approvals& approvals) const {
+  const size_t missing = approvals.Missing();
+  if (missing == 0 || approvals.awaited.size() < missing) return;
+  auto* several = dynamic_cast<ThresholdSubject*>(approvals.entry->entry->GetSubject());
+  const std::set<std::string> asked(
+      approvals.awaited.begin(), approvals.awaited.begin() + static_cast<std::ptrdiff_t>(missing));
+  Edit edit;
+  edit.target = "co-signers";
+  edit.cost = 10;  // behind renewals: the certificates are taken as they are then
+  edit.remedy = {"approve", "have another of the keys that must agree approve this manifest:"};
+  Ref<SExpression> members;
+  Check(several->GetSubjects(members.Out()), "reading a subject");
+  for (auto it = members->Begin(); it; it.Next()) {
+    auto* key = dynamic_cast<PublicKey*>(it.Value());
+    const std::string name = Fingerprint(*it.Value());
+    if (key == nullptr || asked.count(name) == 0) continue;
+    edit.remedy.text += " " + name;
+    edit.remedy.keys.push_back(name);
+    edit.remedy.commands.push_back(
+        {"vesk2", "manifest", "approve", PathWord(question_.file), "--key", KeyWord(*key)});
+    edit.approvers.push_back(Ref<PublicKey>::Share(key));
+  }
+  Add(edits, std::move(edit));
 }
 
 Edit EditMaker::CoSignature(size_t index, std::vector<Ref<PublicKey>> keys) const {

@@ -7,6 +7,7 @@
 #include <string>
 #include <vector>
 
+#include "tools/vesk2/explain/approvals.h"
 #include "tools/vesk2/explain/hypothesis.h"
 #include "tools/vesk2/explain/policy.h"
 #include "tools/vesk2/explain/remedy.h"
@@ -22,6 +23,7 @@ struct Edit {
   size_t index = 0;
   Ref<ZvVesk2::Cert> cert = {};
   std::vector<Ref<PublicKey>> coSigners = {};  // of the certificate at the index
+  std::vector<Ref<PublicKey>> approvers = {};  // of a manifest's content
   std::string file = {};                       // of the entry
   Ref<ZvVesk2::AclEntry> entry = {};
   Ref<SExpression> fresh = {};
@@ -39,7 +41,8 @@ class EditMaker {
   // whole period of that too.
   enum class Reach { kAsItIs, kAsked, kWholePeriod };
   void Renew(std::vector<Edit>& edits, size_t index, Reach reach) const;
-  // Has the keys that a k-of-n still wants certify what one of them did.
+  // Has the keys that a k-of-n still wants certify what one of them did: of a manifest its content,
+  // which gives nobody anything for another one.
   void CoSign(std::vector<Edit>& edits) const;
   // Widens an entry of the store, for the outermost issuer, in what it lacks.
   void Widen(std::vector<Edit>& edits, const EntryEvidence& entry) const;
@@ -55,6 +58,7 @@ class EditMaker {
   bool Covers(SExpression* tag) const;
   bool CanIssue() const;
   void CoSign(std::vector<Edit>& edits, ZvVesk2::Subject* subject) const;
+  void Approve(std::vector<Edit>& edits, const Approvals& approvals) const;
   Edit CoSignature(size_t index, std::vector<Ref<PublicKey>> keys) const;
   // Adds an edit whose words name the file that was asked about.
   void Add(std::vector<Edit>& edits, Edit edit) const;

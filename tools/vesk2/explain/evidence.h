@@ -21,10 +21,10 @@ namespace vesk2_command {
 // What was asked, of which file.
 struct Question {
   std::string file;
-  bool manifest = false;  // else a chain
-  const Request* request = nullptr;
-  Period period = {};        // none, about a manifest: the time of signing
-  std::string aclDirectory;  // entries beside the store's, or empty
+  bool manifest = false;             // else a chain
+  const Request* request = nullptr;  // null: none, as when a manifest is only shown
+  Period period = {};                // none, about a manifest: the time of signing
+  std::string aclDirectory;          // entries beside the store's, or empty
   // How to sign the manifest again: its directory, and options for what was left out of it.
   std::vector<std::string> signing = {};
   // What the verification that answered kept.

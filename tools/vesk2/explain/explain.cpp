@@ -6,6 +6,7 @@
 #include <ctime>
 #include <filesystem>
 
+#include "tools/vesk2/explain/approvals.h"
 #include "tools/vesk2/explain/effort.h"
 #include "tools/vesk2/explain/find_remedies.h"
 #include "tools/vesk2/explain/tell_remedies.h"
@@ -200,6 +201,16 @@ void TellLosses(const Question& question, int code) {
   RequireComplete(explanation);
 }
 
+// Where several keys must agree: who does.
+void TellApprovals(const Question& question, const Evidence& evidence, int code) {
+  Json& list = Result()["approvals"] = Json::array();
+  if (code != VESK2_ERR_NOT_AUTHORIZED && code != VESK2_ERR_PACKAGE_NOT_GRANTED) return;
+  for (const Approvals& each : FindApprovals(question, evidence)) {
+    list.push_back(ApprovalsJson(each));
+    if (each.Missing() > 0) Note(EntryName(*each.entry) + ": " + ApprovalsText(each));
+  }
+}
+
 // ---- The path of a yes ----
 
 Json EndWord(const Explanation& explanation) {
@@ -271,6 +282,7 @@ void ExplainRefusal(const Question& question, int code) {
     const Evidence evidence = GatherEvidence(question);
     TellFacts(evidence);
     TellLosses(question, code);
+    TellApprovals(question, evidence, code);
     TellRemedies(FindRemedies(question, evidence, code));
   });
 }
@@ -296,7 +308,8 @@ void ExplainTrouble(const Question& question, int code) {
 }
 
 void StartExplanation() {
-  for (const char* member : {"members", "chain", "acl", "lost", "remedies", "authority"}) {
+  for (const char* member :
+       {"members", "chain", "acl", "lost", "approvals", "remedies", "authority"}) {
     Result()[member] = Json();
   }
 }

@@ -15,7 +15,8 @@
 namespace vesk2_command {
 
 // ExplainRefusal tells of every certificate, where authority was lost, and of the smallest changes
-// that would turn the answer: "chain", "acl", "lost" and "remedies" of the result.
+// that would turn the answer: "chain", "acl", "lost", "approvals" and "remedies" of the
+// result.
 void ExplainRefusal(const Question& question, int code);
 // ExplainTree names what mends a tree that is not as its authorized signer signed it.
 void ExplainTree(const Question& question);

@@ -42,13 +42,13 @@ class World {
 
   void ChangeCerts() {
     if (hypothesis_.signedAgain.empty() && hypothesis_.certs.empty() &&
-        hypothesis_.coSigners.empty()) {
+        hypothesis_.coSigners.empty() && hypothesis_.approvers.empty()) {
       return;
     }
     changed_.RemoveCerts();
     for (Cert* cert : hypothesis_.signedAgain) Add(*cert, nullptr, 0);
-    if (!hypothesis_.signedAgain.empty()) return;
-    for (size_t i = 0; i < evidence_.certs.size(); ++i) {
+    const bool again = !hypothesis_.signedAgain.empty();
+    for (size_t i = 0; i < evidence_.certs.size() && !again; ++i) {
       const CertEvidence& each = evidence_.certs[i];
       const auto other = hypothesis_.certs.find(i);
       const bool replaced = other != hypothesis_.certs.end();
@@ -56,6 +56,17 @@ class World {
       if (replaced) Add(*other->second, nullptr, 0);
       if (!replaced) Add(*each.cert, each.signature.get(), each.code);
     }
+    for (PublicKey* key : hypothesis_.approvers) Add(*Approval(*key), nullptr, 0);
+  }
+
+  // As `manifest approve` writes it.
+  Ref<Cert> Approval(PublicKey& issuer) const {
+    const Cert& content = *evidence_.certs.at(0).cert;
+    Ref<Cert> cert(new Cert(nullptr));
+    Check(cert->Set(&issuer, content.GetSubject(), false, content.GetTag(), nullptr, nullptr,
+                    nullptr, nullptr),
+          "building a certificate");
+    return cert;
   }
 
   // Each stands before the one that was there, as `cert cosign` writes it.

@@ -17,9 +17,11 @@ struct Hypothesis {
   std::map<size_t, ZvVesk2::Cert*> certs;  // these instead, with good signatures
   std::multimap<size_t, ZvVesk2::PublicKey*>
       coSigners;                                      // who certify the same as these, beside them
+  std::vector<ZvVesk2::PublicKey*> approvers;         // who certify a manifest's content too
   std::map<std::string, ZvVesk2::AclEntry*> entries;  // these in the store, by file name
   std::vector<SExpression*> freshLists;  // sources with a current list that revokes no more
-  // Signed again: these two certificates alone, at this moment unless a period was asked about.
+  // Signed again: these certificates alone and those of the approvers, at this moment unless a
+  // period was asked about.
   std::vector<ZvVesk2::Cert*> signedAgain;
   TimeStamp* at = nullptr;
 };

@@ -34,6 +34,7 @@ bool Policy::StandsInTheWay(const Question& question, const EntryEvidence& each)
   if (several == nullptr || several->GetK() < 2) return false;
   if (each.relevant) return true;
   SExpression* tag = each.entry->GetTag();
+  if (question.request == nullptr) return false;
   const auto& members = question.request->members;
   return std::any_of(members.begin(), members.end(), [&](const Request::Member& member) {
     return member.tag->IsSubset(tag) || tag->IsSubset(member.tag.get());

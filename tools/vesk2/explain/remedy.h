@@ -9,10 +9,10 @@
 namespace vesk2_command {
 
 struct Remedy {
-  // A stable word: restore, revocation-list, co-sign, renew-certificate, sign-again, acl-entry;
-  // new-root when a key is to be trusted that nobody vouches for, whatever else is to be done;
-  // "several" when one of the others alone is not enough; new-key, for which there is no command
-  // line.
+  // A stable word: restore, revocation-list, approve, co-sign, renew-certificate, sign-again,
+  // acl-entry; new-root when a key is to be trusted that nobody vouches for, whatever else is to be
+  // done; "several" when one of the others alone is not enough; new-key, for which there is no
+  // command line.
   std::string kind;
   std::string text;
   // Command lines, to be run one after the other. "KEY-OF-" and the start of a fingerprint stands

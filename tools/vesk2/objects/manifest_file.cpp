@@ -7,8 +7,6 @@
 #include "tools/vesk2/files/files.h"
 #include "tools/vesk2/say/report.h"
 
-#include <vesk2/evidence.h>
-
 namespace vesk2_command {
 
 using ZvVesk2::Cert;
@@ -75,7 +73,8 @@ SignatureBlock ReadSignatureBlock(const std::string& path) {
   SignatureBlock block;
   block.owner = std::make_unique<Manifest>(nullptr);
   Manifest& manifest = *block.owner;
-  Evidence evidence(nullptr);
+  block.proved = std::make_unique<Evidence>(nullptr);
+  Evidence& evidence = *block.proved;
   Check(manifest.Initialize("", InputPath(path).c_str(), "none"), Escape(path));
   manifest.SetEvidence(&evidence);
   block.code = manifest.ReadManifest(false, 0, 0, nullptr);

@@ -13,6 +13,7 @@
 #include "tools/vesk2/objects/times.h"
 
 #include <vesk2/crl.h>
+#include <vesk2/evidence.h>
 #include <vesk2/manifest.h>
 #include <vesk2/manifest_body.h>
 
@@ -38,7 +39,8 @@ struct SignatureBlock {
   ZvVesk2::BodyDirectory* listing = nullptr;  // its root has no name; null: not a whole manifest
   size_t position = 0;  // the byte behind the manifest, or where it stops making sense
 
-  std::unique_ptr<ZvVesk2::Manifest> owner;  // of the listing
+  std::unique_ptr<ZvVesk2::Manifest> owner;   // of the listing
+  std::unique_ptr<ZvVesk2::Evidence> proved;  // what was read, without any store
 };
 // ReadSignatureBlock reads a manifest; Trouble when the file cannot be opened.
 SignatureBlock ReadSignatureBlock(const std::string& path);
