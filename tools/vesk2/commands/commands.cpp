@@ -39,6 +39,15 @@ constexpr Noun kNouns[] = {
      "The second is asked about the time of signing, which is the signer's word, with what is "
      "revoked by now: a lost key can date back, so revoke it with --revoke-key. --at signing takes "
      "the signer's word for revocation too; --at asks about another moment."},
+    {"floor", "Keep releases out that are older than what was accepted",
+     "A release that was signed properly, and has faults that a newer one mended, is an attack "
+     "when "
+     "somebody brings it back. A floor is the newest time of signing that was accepted for a tag: "
+     "manifest verify refuses what was signed before, and a yes raises the floor.\n"
+     "The time is the signer's word. A floor does not bind those who may sign; it keeps others "
+     "from "
+     "playing back what they signed once. It is never raised past the present, and by no answer "
+     "about another moment (--at)."},
     {"tag", "Compare tags",
      "A tag says what is granted, or asked. A longer list is narrower: who was granted (install) "
      "may also (install (app calc)), not the other way round."},
@@ -119,6 +128,12 @@ constexpr Command kCommands[] = {
      "vesk2 manifest show app.manifest --files", DefineManifestShow},
     {"manifest", "compare", "Do two manifests list the same?",
      "vesk2 manifest compare old.manifest new.manifest", DefineManifestCompare},
+    {"floor", "show", "Show the newest times of signing that were accepted",
+     "vesk2 floor show --tag '(install (app calc))'", DefineFloorShow},
+    {"floor", "set", "Refuse what was signed before a time",
+     "vesk2 floor set --tag '(install (app calc))' 2026-11-23", DefineFloorSet},
+    {"floor", "reset", "Forget a floor", "vesk2 floor reset --tag '(install (app calc))'",
+     DefineFloorReset},
     {"tag", "check", "Does a tag lie within another, and where not?",
      "vesk2 tag check '(install (app calc))' '(install)'", DefineTagCheck},
     {"show", "", "Show any object: a key, a certificate, a list, a manifest, a tag",

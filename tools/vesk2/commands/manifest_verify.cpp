@@ -13,6 +13,7 @@
 #include "tools/vesk2/tree/threads.h"
 #include "tools/vesk2/tree/tree.h"
 #include "tools/vesk2/tree/tree_findings.h"
+#include "tools/vesk2/verify/keep_floor.h"
 #include "tools/vesk2/verify/keep_lists.h"
 #include "tools/vesk2/verify/store_check.h"
 #include "tools/vesk2/verify/today.h"
@@ -40,6 +41,7 @@ struct Options {
   bool all = false;
   unsigned jobs = 0;
   StoreCheck stores;
+  FloorOptions floor;
 };
 
 constexpr const char* kSigning = "signing";
@@ -103,7 +105,7 @@ std::vector<std::string> SigningWords(const Options& options) {
 // A program finds every member in every answer.
 void StartResult() {
   for (const char* member : {"tag", "signer", "signed_at", "counts", "changed", "missing",
-                             "links_out", "unlisted", "ignored"}) {
+                             "links_out", "unlisted", "ignored", "floor"}) {
     Result()[member] = Json();
   }
   StartExplanation();
@@ -124,6 +126,8 @@ class Answer {
     Configure(manifest_, options, request_.members[0].text, AboutTree(options).ignored);
     manifest_.SetEvidence(&proved_);
     Result()["tag"] = TagText(request_.tag.get());
+    const bool raises = IsAboutToday(options) && !options.noStoreUpdate;
+    floor_.emplace(options.floor, *request_.tag, raises);
   }
 
   ExitCode Give() {
@@ -195,10 +199,16 @@ class Answer {
       return No("signed-in-future", "the manifest says it was signed at " + signedAt +
                                         ", which is yet to come (--at tells when to judge it)");
     }
+    if (const auto older = floor_->Refuse(*proved_.GetSigningTime())) {
+      Keep(false);
+      return *older;
+    }
     const std::vector<Finding> findings = FindInTree(manifest_, AboutTree(options_));
     const std::string summary = Summary(findings);
-    Keep(code_ == 0 && summary.empty());
-    if (code_ != 0 || !summary.empty()) return RefuseTree(findings, summary);
+    const bool asSigned = code_ == 0 && summary.empty();
+    Keep(asSigned);
+    if (!asSigned) return RefuseTree(findings, summary);
+    if (const auto older = floor_->Raise(*proved_.GetSigningTime())) return *older;
     const bool aboutSigning = today_ || options_.at == kSigning;
     const ExitCode verdict = Yes(std::to_string(CountFiles(manifest_.GetValid())) + " files of " +
                                  Escape(options_.directory) + " are as signed at " + signedAt +
@@ -233,6 +243,7 @@ class Answer {
   ZvVesk2::Evidence proved_{nullptr};
   Manifest manifest_;
   std::optional<Today> today_;
+  std::optional<KeepFloor> floor_;
   std::set<std::string> broken_;  // sources whose stored list does not count
   int code_ = 0;
   bool byToday_ = false;  // refused by what is known now, not by what was at the time of signing
@@ -257,6 +268,7 @@ Action DefineManifestVerify(CLI::App& app) {
   app.add_flag("--allow-links", options->allowLinks, "Accept links that lead out of the tree");
   app.add_flag("--no-store-update", options->noStoreUpdate,
                "Write nothing: do not keep the revocation lists that the manifest carries");
+  AddFloorOptions(app, options->floor);
   app.add_option("--acl-dir", options->aclDirectory, "Trust the entries of this directory too");
   app.add_option("--ignore", options->ignored, "Leave this entry out (a path below the directory)")
       ->allow_extra_args(false);

@@ -18,13 +18,14 @@ constexpr struct {
 } kValues[] = {
     {"COMMAND", " sign-with "},
     {"DIR", " acl-dir global home tree "},
-    {"FILE", " cert chain crl items-of key output passphrase-file request revoke-key subject "},
+    {"FILE",
+     " cert chain crl floor items-of key output passphrase-file request revoke-key subject "},
     {"FILE[:N]", " issuer-of revoke-cert subject-of "},
     {"N", " bits jobs passphrase-fd threshold "},
     {"NAME", " name names "},
     {"PATH", " ignore "},
     {"TAG", " asked grant granted revocation tag "},
-    {"TIME", " at date not-after not-before "},
+    {"TIME", " at date not-after not-before time "},
 };
 
 void AddCommonOptions(CLI::App& app, Common& common) {
