@@ -38,7 +38,16 @@ constexpr Noun kNouns[] = {
      "things: is the directory as listed, and was the signer authorized?\n"
      "The second is asked about the time of signing, which is the signer's word, with what is "
      "revoked by now: a lost key can date back, so revoke it with --revoke-key. --at signing takes "
-     "the signer's word for revocation too; --at asks about another moment."},
+     "the signer's word for revocation too; --at asks about another moment.\n"
+     "Patterns of what is left out are a part of those of .gitignore: * and ? stand for bytes of "
+     "one "
+     "name, ** as a whole name for any number of directories, \\ takes the next byte as it is. "
+     "With "
+     "/ before its end a pattern is about paths from the top, without one about names in every "
+     "directory; / at the end means directories only, ! at the beginning what stays after all. The "
+     "last pattern that matches decides, and nothing comes back of a directory that is left out. "
+     "Files of patterns have one a line, # begins a comment, and they must not lie in the tree. "
+     "[...] is refused."},
     {"floor", "Keep releases out that are older than what was accepted",
      "A release that was signed properly, and has faults that a newer one mended, is an attack "
      "when "

@@ -32,7 +32,7 @@ struct Options {
   std::vector<std::string> certs;
   std::string tag;
   std::string at = "now";
-  std::vector<std::string> ignored;
+  IgnoreOptions ignore;
   bool allowLinks = false;
   std::vector<std::string> crls;
   bool allowEmpty = false;
@@ -65,21 +65,15 @@ void CheckAuthority(const Options& options, const SigningKey& key, SExpression* 
   check.Tell(options.strict);
 }
 
-std::set<std::string> Ignored(const Options& options) {
-  std::set<std::string> ignored;
-  for (const std::string& name : options.ignored) ignored.insert(PlainRelative(name));
-  return ignored;
-}
-
-ListingOptions HowToList(const Options& options) {
+ListingOptions HowToList(const Options& options, const IgnoreRules& rules) {
   const std::string output = options.output == kStandard ? "" : options.output;
-  return {Ignored(options), options.allowLinks, output};
+  return {rules, options.allowLinks, output};
 }
 
 // Lists the tree, with everything that is to be said of it before it is signed.
-Listing ListOrExplain(const Options& options, ManifestWriter& writer) {
+Listing ListOrExplain(const Options& options, const IgnoreRules& rules, ManifestWriter& writer) {
   const ProgressLine progress("hashing");
-  ListingOptions how = HowToList(options);
+  ListingOptions how = HowToList(options, rules);
   how.callbacks = progress.Callbacks();
   Listing listing = ListTree(options.directory, how, writer);
   for (const std::string& problem : listing.problems) Note(problem);
@@ -90,9 +84,7 @@ Listing ListOrExplain(const Options& options, ManifestWriter& writer) {
                   "tree-unverifiable");
   }
   NoteRemarks(listing.remarks);
-  for (const std::string& name : how.ignored) {
-    if (listing.ignored.count(name) == 0) Note("warning: --ignore " + Escape(name) + ": not there");
-  }
+  NoteUnused(rules);
   if (listing.files == 0 && !options.allowEmpty) {
     const char* why = listing.ignored.empty() ? "holds no file" : "holds no file but ignored ones";
     throw FileTrouble(options.directory, std::string(why) + " (--allow-empty signs it)",
@@ -142,7 +134,9 @@ void ShowListing(const Listing& listing) {
 }
 
 std::string Totals(const Listing& listing) {
-  return std::to_string(listing.files) + " files, " + std::to_string(listing.bytes) + " bytes";
+  const size_t ignored = listing.ignored.size();
+  return std::to_string(listing.files) + " files, " + std::to_string(listing.bytes) + " bytes" +
+         (ignored > 0 ? ", ignored: " + std::to_string(ignored) : "");
 }
 
 // All that goes into the manifest beside the tree; read before the tree, which may take long.
@@ -174,9 +168,10 @@ std::string MakeManifest(ManifestWriter& writer, const Parts& parts, const Signi
 }
 
 // What cannot be verified is not handed out.
-void CheckWritten(const std::string& unnamed, const Options& options, const Listing& listing) {
+void CheckWritten(const std::string& unnamed, const Options& options, const IgnoreRules& rules,
+                  const Listing& listing) {
   CheckSigned(unnamed, options.directory);
-  const auto changed = ChangedSince(options.directory, listing, HowToList(options));
+  const auto changed = ChangedSince(options.directory, listing, HowToList(options, rules));
   for (const std::string& path : changed) Note("changed meanwhile: " + Escape(path));
   if (changed.empty()) return;
   throw FileTrouble(options.directory, "changed while it was signed; nothing was signed",
@@ -200,11 +195,14 @@ ExitCode Run(const Options& options) {
   ManifestWriter writer(nullptr);
   const Parts parts = Prepare(options, key, writer);
   CheckAuthority(options, key, parts.tag.get());
-  const Listing listing = ListOrExplain(options, writer);
+  const IgnoreRules rules(options.ignore, options.directory);
+  const Listing listing = ListOrExplain(options, rules, writer);
   if (options.flags.dryRun) ShowListing(listing);
 
   const std::string manifest = MakeManifest(writer, parts, key, options.signer.algorithm);
-  const auto check = [&](const std::string& unnamed) { CheckWritten(unnamed, options, listing); };
+  const auto check = [&](const std::string& unnamed) {
+    CheckWritten(unnamed, options, rules, listing);
+  };
   const std::string signer = Fingerprint(*key.Public());
   const std::string said = ": " + Totals(listing) + ", signed by " + signer;
   if (!WriteFile(options.output, manifest, {options.flags, check, said})) {
@@ -213,6 +211,7 @@ ExitCode Run(const Options& options) {
   if (!parts.tag) Note("note: signed without --tag: good for all that its signer was granted");
   Result()["files"] = listing.files;
   Result()["bytes"] = listing.bytes;
+  Result()["ignored"] = IgnoredJson(listing.ignored);
   Result()["signer"] = signer;
   if (!options.grant.empty()) WriteGrant(options, key);
   return kYes;
@@ -231,8 +230,7 @@ Action DefineManifestSign(CLI::App& app) {
       ->allow_extra_args(false);
   app.add_option("--tag", options->tag, "Sign for this tag only [all that the signer is granted]");
   app.add_option("--at", options->at, "Time of signing, UTC")->capture_default_str();
-  app.add_option("--ignore", options->ignored, "Leave this entry out (a path below the directory)")
-      ->allow_extra_args(false);
+  AddIgnoreOptions(app, options->ignore);
   app.add_flag("--allow-links", options->allowLinks, "Follow links that lead out of the tree");
   app.add_option("--crl", options->crls, "Carry this revocation list (may be repeated)")
       ->allow_extra_args(false);

@@ -1,5 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // manifest_verify.cpp: vesk2 manifest verify.
+#include <algorithm>
+
 #include "tools/vesk2/commands/command.h"
 #include "tools/vesk2/confine/confine.h"
 #include "tools/vesk2/explain/effort.h"
@@ -10,6 +12,7 @@
 #include "tools/vesk2/say/progress.h"
 #include "tools/vesk2/say/report.h"
 #include "tools/vesk2/stores/acl_store.h"
+#include "tools/vesk2/tree/ignored_listing.h"
 #include "tools/vesk2/tree/threads.h"
 #include "tools/vesk2/tree/tree.h"
 #include "tools/vesk2/tree/tree_findings.h"
@@ -36,7 +39,8 @@ struct Options {
   bool allowLinks = false;
   bool noStoreUpdate = false;
   std::string aclDirectory;
-  std::vector<std::string> ignored;
+  IgnoreOptions ignore;
+  bool allowEmpty = false;
   bool explain = false;
   bool all = false;
   unsigned jobs = 0;
@@ -57,21 +61,14 @@ bool IsAboutToday(const Options& options) {
   return options.at.empty() && options.period.notBefore.empty() && options.period.notAfter.empty();
 }
 
-TreeQuestion AboutTree(const Options& options) {
-  TreeQuestion tree{options.directory,  options.manifest,   {},
-                    options.allowExtra, options.allowLinks, options.all};
-  for (const std::string& name : options.ignored) tree.ignored.insert(PlainRelative(name));
-  return tree;
-}
-
 void Configure(Manifest& manifest, const Options& options, const std::string& tag,
-               const std::set<std::string>& ignored) {
-  Check(manifest.Initialize(options.directory.c_str(), options.manifest.c_str(), tag.c_str()),
+               const IgnoredListing& bytes) {
+  Check(manifest.Initialize(options.directory.c_str(), bytes.path().c_str(), tag.c_str()),
         "preparing");
   manifest.SetFailOnExtraEntries(!options.allowExtra);
   manifest.SetStoreUpdate(false);  // the answer decides what is kept
   if (!options.aclDirectory.empty()) manifest.SetExtraAclDirectory(NewText(options.aclDirectory));
-  IgnoreEntries(manifest, ignored);
+  IgnoreEntries(manifest, bytes.ignored());
 }
 
 bool JudgedTree(const Manifest& manifest, int code) {
@@ -91,13 +88,13 @@ int VerifyFiles(Manifest& manifest, const Options& options, const Period& period
   return code;
 }
 
-// How to sign the tree again as it was asked about.
+// How to sign the tree again as it was asked about; empty when that is not to be had again.
 std::vector<std::string> SigningWords(const Options& options) {
+  const std::vector<std::string>& files = options.ignore.files;
+  if (std::find(files.begin(), files.end(), kStandard) != files.end()) return {};
   std::vector<std::string> words = {options.directory};
-  for (const std::string& name : options.ignored) {
-    words.push_back("--ignore");
-    words.push_back(name);
-  }
+  const std::vector<std::string> ignore = IgnoreWords(options.ignore);
+  words.insert(words.end(), ignore.begin(), ignore.end());
   if (options.allowLinks) words.push_back("--allow-links");
   return words;
 }
@@ -105,7 +102,7 @@ std::vector<std::string> SigningWords(const Options& options) {
 // A program finds every member in every answer.
 void StartResult() {
   for (const char* member : {"tag", "signer", "signed_at", "counts", "changed", "missing",
-                             "links_out", "unlisted", "ignored", "floor"}) {
+                             "links_out", "unlisted", "ignored", "ignored_nothing", "floor"}) {
     Result()[member] = Json();
   }
   StartExplanation();
@@ -115,7 +112,13 @@ void StartResult() {
 class Answer {
  public:
   explicit Answer(const Options& options)
-      : options_(options), request_(ParseRequest(options.tag)), manifest_(nullptr) {
+      : options_(options),
+        request_(ParseRequest(options.tag)),
+        rules_(options.ignore, options.directory),
+        bytes_(options.manifest, rules_, options.directory),
+        tree_{options.directory,  options.manifest,   bytes_.ignored(),
+              options.allowExtra, options.allowLinks, options.all},
+        manifest_(nullptr) {
     question_.file = options.manifest;
     question_.manifest = true;
     question_.request = &request_;
@@ -123,7 +126,7 @@ class Answer {
     question_.aclDirectory = options.aclDirectory;
     question_.signing = SigningWords(options);
     question_.proved = &proved_;
-    Configure(manifest_, options, request_.members[0].text, AboutTree(options).ignored);
+    Configure(manifest_, options, request_.members[0].text, bytes_);
     manifest_.SetEvidence(&proved_);
     Result()["tag"] = TagText(request_.tag.get());
     const bool raises = IsAboutToday(options) && !options.noStoreUpdate;
@@ -203,21 +206,29 @@ class Answer {
       Keep(false);
       return *older;
     }
-    const std::vector<Finding> findings = FindInTree(manifest_, AboutTree(options_));
+    const std::vector<Finding> findings = FindInTree(manifest_, tree_);
     const std::string summary = Summary(findings);
     const bool asSigned = code_ == 0 && summary.empty();
-    Keep(asSigned);
+    const size_t checked = CountFiles(manifest_.GetValid());
+    const bool empty = checked == 0 && !options_.allowEmpty;
+    Keep(asSigned && !empty);
     if (!asSigned) return RefuseTree(findings, summary);
+    if (empty) return RefuseEmpty(findings);
     if (const auto older = floor_->Raise(*proved_.GetSigningTime())) return *older;
     const bool aboutSigning = today_ || options_.at == kSigning;
-    const ExitCode verdict = Yes(std::to_string(CountFiles(manifest_.GetValid())) + " files of " +
-                                 Escape(options_.directory) + " are as signed at " + signedAt +
-                                 " by " + Fingerprint(*proved_.GetCert(0)->GetIssuer()) +
-                                 (aboutSigning ? EndedSince(proved_) : ""));
-    TellFindings(findings, AboutTree(options_), manifest_);
+    const ExitCode verdict = Yes(
+        std::to_string(checked) + " files of " + Escape(options_.directory) + " are as signed at " +
+        signedAt + " by " + Fingerprint(*proved_.GetCert(0)->GetIssuer()) +
+        (aboutSigning ? EndedSince(proved_) : "") + IgnoredText(tree_.ignored.size()));
+    TellTree(findings);
     if (options_.explain) Note(Confinement());
     if (options_.explain || GetStyle().json) TellGrant();
     return verdict;
+  }
+
+  void TellTree(const std::vector<Finding>& findings) const {
+    TellFindings(findings, tree_, manifest_);
+    NoteUnused(rules_);
   }
 
   // Explains by what is known today, where that is what was asked.
@@ -227,11 +238,22 @@ class Answer {
     question_.proved = &proved_;
   }
 
+  // Nothing would pass for something.
+  ExitCode RefuseEmpty(const std::vector<Finding>& findings) {
+    const ExitCode verdict =
+        No("nothing-checked", "0 files of " + Escape(options_.directory) +
+                                  " were checked (--allow-empty accepts that)" +
+                                  IgnoredText(tree_.ignored.size()));
+    TellTree(findings);
+    return verdict;
+  }
+
   ExitCode RefuseTree(const std::vector<Finding>& findings, const std::string& summary) {
     int code = code_;
     if (code == 0 && Found(findings, kUnlisted)) code = VESK2_ERR_EXTRA_FILES;
-    const ExitCode verdict = code != 0 ? No(code, summary) : No("link-leaves-tree", summary);
-    TellFindings(findings, AboutTree(options_), manifest_);
+    const std::string text = summary + IgnoredText(tree_.ignored.size());
+    const ExitCode verdict = code != 0 ? No(code, text) : No("link-leaves-tree", text);
+    TellTree(findings);
     if (GetStyle().json) TellGrant();
     if (code != 0) ExplainTree(question_);
     return verdict;
@@ -239,6 +261,9 @@ class Answer {
 
   const Options& options_;
   Request request_;
+  IgnoreRules rules_;
+  IgnoredListing bytes_;
+  TreeQuestion tree_;
   Question question_;
   ZvVesk2::Evidence proved_{nullptr};
   Manifest manifest_;
@@ -270,8 +295,8 @@ Action DefineManifestVerify(CLI::App& app) {
                "Write nothing: do not keep the revocation lists that the manifest carries");
   AddFloorOptions(app, options->floor);
   app.add_option("--acl-dir", options->aclDirectory, "Trust the entries of this directory too");
-  app.add_option("--ignore", options->ignored, "Leave this entry out (a path below the directory)")
-      ->allow_extra_args(false);
+  AddIgnoreOptions(app, options->ignore);
+  app.add_flag("--allow-empty", options->allowEmpty, "Accept an answer about no file at all");
   AddStoreCheckOptions(app, options->stores);
   app.add_flag("--explain", options->explain, "Tell why also when the answer is yes");
   LentThreads::AddOption(app, options->jobs);

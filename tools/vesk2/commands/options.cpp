@@ -19,11 +19,13 @@ constexpr struct {
     {"COMMAND", " sign-with "},
     {"DIR", " acl-dir global home tree "},
     {"FILE",
-     " cert chain crl floor items-of key output passphrase-file request revoke-key subject "},
+     " cert chain crl floor ignore-from items-of key output passphrase-file request revoke-key "
+     "subject "},
     {"FILE[:N]", " issuer-of revoke-cert subject-of "},
     {"N", " bits jobs passphrase-fd threshold "},
     {"NAME", " name names "},
     {"PATH", " ignore "},
+    {"PATTERN", " ignore-pattern "},
     {"TAG", " asked grant granted revocation tag "},
     {"TIME", " at date not-after not-before time "},
 };
@@ -95,7 +97,8 @@ OptionText DescribeOption(const CLI::Option& option) {
   if (option.get_expected_min() == 0) return text;  // a flag
   text.choices = ChoicesOf(option);
   text.value = text.choices.empty() ? ValueOf(option) : Join(text.choices, "|");
-  constexpr std::string_view kNoFiles[] = {"TAG", "TIME", "TEXT", "NAME", "N", "COMMAND"};
+  constexpr std::string_view kNoFiles[] = {"TAG", "TIME",    "TEXT",   "NAME",
+                                           "N",   "COMMAND", "PATTERN"};
   text.takesFile =
       text.choices.empty() && std::ranges::find(kNoFiles, text.value) == std::ranges::end(kNoFiles);
   return text;

@@ -47,8 +47,9 @@ class Comparer {
                  const std::vector<std::string>& listed) const {
     std::vector<Name> names;
     if (!ReadNames(path, names)) return false;
-    std::erase_if(
-        names, [&](const Name& name) { return options_.ignored.count(relative + name.text) != 0; });
+    std::erase_if(names, [&](const Name& name) {
+      return IgnoresEntry(options_.ignore, Join(path, name.text), relative + name.text);
+    });
     return std::ranges::equal(names, listed, {}, &Name::text);
   }
 

@@ -64,7 +64,9 @@ class Lister {
     }
     const Identity identity(status.st_dev, status.st_ino);
     if (!open_.insert(identity).second) return Problem(path, "a link to a directory around it");
-    std::erase_if(names, [&](const Name& name) { return IsIgnored(Join(relative, name.text)); });
+    std::erase_if(names, [&](const Name& name) {
+      return IsIgnored(Join(path, name.text), Join(relative, name.text));
+    });
     RemarkOnNames(relative, names, listing_.remarks);
     for (const Name& name : names) {
       Entry(Join(path, name.text), name, Join(relative, name.text), depth);
@@ -77,8 +79,8 @@ class Lister {
  private:
   using Identity = std::pair<dev_t, ino_t>;
 
-  bool IsIgnored(const std::string& relative) {
-    if (options_.ignored.count(relative) == 0) return false;
+  bool IsIgnored(const std::string& path, const std::string& relative) {
+    if (!IgnoresEntry(options_.ignore, path, relative)) return false;
     listing_.ignored.insert(relative);
     return true;
   }
@@ -215,12 +217,6 @@ bool LeavesTree(const std::string& path, const std::string& realRoot) {
   if (!IsLink(path)) return false;
   const std::string target = RealPath(path);
   return target != realRoot && !target.starts_with(Join(realRoot, ""));
-}
-
-std::string PlainRelative(std::string name) {
-  while (name.starts_with("./")) name.erase(0, 2);
-  while (name.size() > 1 && name.ends_with('/')) name.pop_back();
-  return name;
 }
 
 Listing ListTree(const std::string& directory, const ListingOptions& options,

@@ -11,6 +11,7 @@
 #include <string>
 #include <vector>
 
+#include "tools/vesk2/tree/ignore.h"
 #include "tools/vesk2/tree/portable.h"
 
 #include <vesk2/manifest_body.h>
@@ -26,9 +27,9 @@ std::string RealDirectory(const std::string& directory);
 bool LeavesTree(const std::string& path, const std::string& realRoot);
 
 struct ListingOptions {
-  std::set<std::string> ignored;  // paths relative to the root, without "./" and closing "/"
-  bool allowLinks = false;        // list what links outside the tree lead to
-  std::string output;             // a file that is not listed although it may lie in the root
+  const IgnoreRules& ignore;
+  bool allowLinks = false;  // list what links outside the tree lead to
+  std::string output;       // a file that is not listed although it may lie in the root
   const Vesk2FileCallbacks* callbacks = nullptr;  // told about the files, or null
 };
 
@@ -73,9 +74,6 @@ Listing ListTree(const std::string& directory, const ListingOptions& options,
 // before the listing that its stamp may not show another change.
 std::vector<std::string> ChangedSince(const std::string& directory, const Listing& listing,
                                       const ListingOptions& options);
-
-// An ignore name as the library compares it.
-std::string PlainRelative(std::string name);
 
 // What the library's verdict does not speak of, for a tree that it compared with `body`.
 struct TreeNotes {

@@ -155,8 +155,7 @@ void TellFindings(const std::vector<Finding>& findings, const TreeQuestion& ques
     if (!GetStyle().json) Print(finding, brief ? kTold : finding.entries.size());
   }
   counts["ignored"] = question.ignored.size();
-  Json& ignored = result["ignored"] = Json::array();
-  for (const std::string& name : question.ignored) ignored.push_back(Escape(name));
+  result["ignored"] = IgnoredJson(question.ignored);
   result["counts"] = counts;
 }
 
