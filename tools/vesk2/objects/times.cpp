@@ -9,10 +9,25 @@
 
 namespace vesk2_command {
 
+namespace {
+
+// A moment as most other programs write it: 2027-06-30T12:00:00Z. Without the Z it would be about
+// the time of some place, which is not known here.
+std::string AsStamp(std::string text) {
+  constexpr size_t kDay = 10;
+  if (text.size() > kDay && text[kDay] == 'T' && text.ends_with('Z')) {
+    text[kDay] = '_';
+    text.pop_back();
+  }
+  return text;
+}
+
+}  // namespace
+
 Ref<TimeStamp> ParseTime(const std::string& text, bool endOfPeriod) {
   Ref<TimeStamp> stamp(new TimeStamp(nullptr));
   const int code = text == "now" ? stamp->Set(static_cast<long>(std::time(nullptr)))
-                                 : stamp->Set(text.c_str(), endOfPeriod);
+                                 : stamp->Set(AsStamp(text).c_str(), endOfPeriod);
   if (code != 0) {
     throw Trouble("time \"" + Escape(text) +
                       "\": not \"now\", a year from 1970 on, or more of YYYY-MM-DD_hh:mm:ss",

@@ -15,7 +15,8 @@ using ZvVesk2::Ref;
 using ZvVesk2::TimeStamp;
 
 // ParseTime reads "now" or a stamp that may stop after any whole field (2026, 2026-11, ...,
-// 2026-11-22_18:30:00, UTC): the first second of what it names, or with `endOfPeriod` the last.
+// 2026-11-22_18:30:00, 2026-11-22T18:30:00Z, UTC): the first second of what it names, or with
+// `endOfPeriod` the last.
 Ref<TimeStamp> ParseTime(const std::string& text, bool endOfPeriod);
 
 struct PeriodOptions {
