@@ -70,16 +70,28 @@ uint32_t HashLength(int64_t id) {
   return algorithm != nullptr ? algorithm->length : 0;
 }
 
-// An algorithm is fetched once a process: that takes as long as hashing a short text. It is never
-// given back, since libcrypto may be gone when the process ends.
+// An algorithm is fetched once a process: that takes as long as hashing a short text. It is given
+// back when libcrypto ends, which is before its own memory goes.
+namespace {
+
+std::array<std::atomic<EVP_MD*>, std::size(kAlgorithms)> fetched;
+
+void GiveBack() {
+  for (std::atomic<EVP_MD*>& kept : fetched) EVP_MD_free(kept.exchange(nullptr));
+}
+
+}  // namespace
+
 const EVP_MD* HashAlgorithm(int64_t id) {
-  static std::array<std::atomic<EVP_MD*>, std::size(kAlgorithms)> fetched;
+  static std::atomic_flag ends;  // set when libcrypto will tell its end
   const Algorithm* const algorithm = FindAlgorithm(id);
   if (algorithm == nullptr) return nullptr;
   std::atomic<EVP_MD*>& kept = fetched[static_cast<size_t>(algorithm - kAlgorithms)];
   if (const EVP_MD* known = kept.load(std::memory_order_acquire)) return known;
   const ErrorMark mark;
   Evp<EVP_MD, EVP_MD_free> found(EVP_MD_fetch(nullptr, algorithm->name, nullptr));
+  // Without the room for that word it stays until the process is gone.
+  if (found != nullptr && !ends.test_and_set() && OPENSSL_atexit(GiveBack) != 1) ends.clear();
   EVP_MD* other = nullptr;
   if (found != nullptr && kept.compare_exchange_strong(other, found.get())) return found.release();
   return other;  // another thread's, null without memory
