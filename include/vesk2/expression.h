@@ -178,8 +178,8 @@ class VESK2_API DExpression {
   VESK2_LOCAL void Free(ZVsysutil::ZvDrops& drops);
 
   int32_t refCount = 1;
-  uint32_t place : 31 = 0;  // bytes behind the start of its block; 0 in memory of its own
-  uint32_t isList : 1 = 0;  // an SExpression
+  uint32_t place : 31;  // bytes behind the start of its block; 0 in memory of its own
+  uint32_t isList : 1;  // an SExpression
   Vesk2ContextStruct* context;
 };
 

@@ -28,7 +28,7 @@ void* DExpression::operator new(size_t size, const std::nothrow_t& nothrow) noex
 
 void DExpression::operator delete(void* object) { ::operator delete(object); }
 
-DExpression::DExpression(Vesk2ContextStruct* owner) : context(owner) {}
+DExpression::DExpression(Vesk2ContextStruct* owner) : place(0), isList(0), context(owner) {}
 
 DExpression::~DExpression() = default;
 
