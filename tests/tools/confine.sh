@@ -6,7 +6,7 @@ set -eu
 here=$(cd "$(dirname "$0")" && pwd)
 work=$(mktemp -d)
 trap 'rm -rf "$work"' EXIT
-mkdir "$work/bin" "$work/run" "$work/away" && ln -s "$(realpath "$1")" "$work/bin/vesk2"
+mkdir "$work/bin" "$work/run" "$work/away" "$work/home" && ln -s "$(realpath "$1")" "$work/bin/vesk2"
 trespass=$(realpath "$2")
 cd "$work/run"
 export VESK2_HOME="$work/home" VESK2_GLOBAL="$work/global" LC_ALL=C PATH="$work/bin:$PATH"

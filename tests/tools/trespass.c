@@ -2,7 +2,6 @@
  * trespass.c: preloaded into the command; at its end, when it has read what strangers wrote, tries
  * what code of theirs would try, and tells what it got. */
 #define _GNU_SOURCE
-#include <arpa/inet.h>
 #include <errno.h>
 #include <fcntl.h>
 #include <stdio.h>

@@ -157,7 +157,9 @@ bool Asked(const CLI::App& app, const std::string& flag) {
 // for on the terminal.
 void GiveUpTheRest(const CLI::App& app, const StoreOptions& stores) {
   Reach reach;
-  reach.readable = {HomeRoot(stores).path, GlobalRoot(stores).path};
+  for (const std::string& root : {HomeRoot(stores).path, GlobalRoot(stores).path}) {
+    for (const char* below : {"", "/acl", "/cert"}) reach.readable.push_back(root + below);
+  }
   reach.writable = {HomeRoot(stores).path, GlobalRoot(stores).path, "/dev/tty"};
   AddNamedPaths(app, reach);
   if (Asked(app, "--allow-links")) reach.readable = {"/"};  // they may lead anywhere
