@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 // An option with an empty value is not one that was left out, whichever option it is.
-#include "tools/vesk2/commands/options.h"
+#include "tools/vesk2/commands/parse.h"
 
 #include <gtest/gtest.h>
 
@@ -25,10 +25,11 @@ TEST(Options, AnEmptyValueIsAnError) {
   for (const Command& command : Commands()) {
     Words begin = {"vesk2", command.noun};
     if (*command.verb != '\0') begin.push_back(command.verb);
-    for (const OptionText& option : DescribeOptions(command)) {
-      if (option.value.empty()) continue;  // a flag
+    for (const Option& option : DescribeOptions(command)) {
+      if (option.IsFlag()) continue;  // a flag
       std::vector<Words> ways = {{""}};
-      if (!option.names.empty()) ways = {{option.names.back(), ""}, {option.names.back() + "="}};
+      const std::string name = option.LongName();
+      if (!option.IsOperand()) ways = {{name, ""}, {name + "="}};
       for (const Words& way : ways) {
         Words words = begin;
         words.insert(words.end(), way.begin(), way.end());
@@ -36,8 +37,8 @@ TEST(Options, AnEmptyValueIsAnError) {
         const std::string error = ErrorOf(words);
         EXPECT_NE(error.find("value is empty"), std::string::npos)
             << CommandName(command) << " " << way[0] << ": " << error;
-        if (option.names.empty()) continue;
-        EXPECT_NE(error.find(option.names.back() + ":"), std::string::npos) << error;
+        if (option.IsOperand()) continue;
+        EXPECT_NE(error.find(name + ":"), std::string::npos) << error;
         ++tried;
       }
     }

@@ -102,29 +102,28 @@ ExitCode Run(const Options& options) {
 
 }  // namespace
 
-Action DefineAclGrant(CLI::App& app) {
+Action DefineAclGrant(OptionList& list) {
   auto options = std::make_shared<Options>();
-  auto* subject = app.add_option("--subject", options->subjects,
-                                 "The public key that is trusted; several, with --threshold");
-  auto* issuer = app.add_option("--issuer-of", options->issuerOf,
-                                "Or the issuer in a chain, manifest or revocation list: FILE, or "
-                                "FILE:N for the N-th certificate [the last]");
-  auto* other =
-      app.add_option("--subject-of", options->subjectOf,
-                     "Or the subject in a chain or manifest: FILE, or FILE:N [the first]");
-  subject->allow_extra_args(false)->excludes(issuer)->excludes(other);
-  issuer->excludes(other);
-  app.add_option("--threshold", options->threshold,
-                 "How many of the keys must agree: each certifies whom they mean to let")
-      ->check(CLI::PositiveNumber);
-  app.add_option("--tag", options->tag, "What for: \"(install (app calc))\"")->required();
-  app.add_flag("--propagate", options->propagate,
-               "The key may pass the grant on: it can certify others and sign manifests");
-  AddPeriodOptions(app, options->period);
-  app.add_option("--comment", options->comment, "A text for people");
-  app.add_option("--name", options->name, "Name of the entry [the file's name, or the files']");
-  AddStrictFlag(app, options->strict);
-  AddWriteFlags(app, options->flags);
+  Option& subject = list.Add("--subject", options->subjects,
+                             "The public key that is trusted; several, with --threshold");
+  Option& issuer = list.Add("--issuer-of", options->issuerOf,
+                            "Or the issuer in a chain, manifest or revocation list: FILE, or "
+                            "FILE:N for the N-th certificate [the last]");
+  Option& other = list.Add("--subject-of", options->subjectOf,
+                           "Or the subject in a chain or manifest: FILE, or FILE:N [the first]");
+  subject.Excludes(issuer).Excludes(other);
+  issuer.Excludes(other);
+  list.Add("--threshold", options->threshold,
+           "How many of the keys must agree: each certifies whom they mean to let")
+      .Range(1);
+  list.Add("--tag", options->tag, "What for: \"(install (app calc))\"").Required();
+  list.Add("--propagate", options->propagate,
+           "The key may pass the grant on: it can certify others and sign manifests");
+  AddPeriodOptions(list, options->period);
+  list.Add("--comment", options->comment, "A text for people");
+  list.Add("--name", options->name, "Name of the entry [the file's name, or the files']");
+  AddStrictFlag(list, options->strict);
+  AddWriteFlags(list, options->flags);
   return [options] { return Run(*options); };
 }
 

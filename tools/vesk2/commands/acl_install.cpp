@@ -49,13 +49,11 @@ ExitCode Run(const Options& options) {
 
 }  // namespace
 
-Action DefineAclInstall(CLI::App& app) {
+Action DefineAclInstall(OptionList& list) {
   auto options = std::make_shared<Options>();
-  app.add_option("files", options->files, "Entry files (.acl) that this machine is to trust")
-      ->required();
-  app.add_option("--name", options->name,
-                 "Name of the entry, where there is one [the file's name]");
-  AddWriteFlags(app, options->flags);
+  list.Add("files", options->files, "Entry files (.acl) that this machine is to trust").Required();
+  list.Add("--name", options->name, "Name of the entry, where there is one [the file's name]");
+  AddWriteFlags(list, options->flags);
   return [options] { return Run(*options); };
 }
 

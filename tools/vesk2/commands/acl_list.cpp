@@ -38,6 +38,6 @@ ExitCode Run() {
 
 }  // namespace
 
-Action DefineAclList(CLI::App&) { return Run; }
+Action DefineAclList(OptionList&) { return Run; }
 
 }  // namespace vesk2_command

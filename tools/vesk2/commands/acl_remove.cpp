@@ -41,10 +41,10 @@ ExitCode Run(const Options& options) {
 
 }  // namespace
 
-Action DefineAclRemove(CLI::App& app) {
+Action DefineAclRemove(OptionList& list) {
   auto options = std::make_shared<Options>();
-  app.add_option("names", options->names, "Entries, by the names that acl list shows")->required();
-  app.add_flag("-n,--dry-run", options->dryRun, "Say what would be removed, and remove nothing");
+  list.Add("names", options->names, "Entries, by the names that acl list shows").Required();
+  list.Add("-n,--dry-run", options->dryRun, "Say what would be removed, and remove nothing");
   return [options] { return Run(*options); };
 }
 

@@ -36,10 +36,9 @@ ExitCode Run(const Options& options) {
 
 }  // namespace
 
-Action DefineCertFind(CLI::App& app) {
+Action DefineCertFind(OptionList& list) {
   auto options = std::make_shared<Options>();
-  app.add_option("--tag", options->tag, "What the first certificate of a chain must cover")
-      ->required();
+  list.Add("--tag", options->tag, "What the first certificate of a chain must cover").Required();
   return [options] { return Run(*options); };
 }
 

@@ -155,32 +155,28 @@ ExitCode Run(const Options& options) {
 
 }  // namespace
 
-Action DefineCertIssue(CLI::App& app) {
+Action DefineCertIssue(OptionList& list) {
   auto options = std::make_shared<Options>();
-  AddSignerOptions(app, options->signer, SignerCount::kSeveral);
-  auto* subject = app.add_option("--subject", options->subject, "The public key that is certified");
-  app.add_option("--request", options->request,
-                 "Or the key that made this request, for what it asks")
-      ->excludes(subject);
-  app.add_option("--tag", options->tag,
-                 "What for: \"(install (app calc))\"; of a request, less than it asks");
-  app.add_flag(
-      "--propagate", options->propagate,
-      "The subject may certify further keys; signing manifests needs it only where several "
-      "issuers must agree");
-  AddPeriodOptions(app, options->period);
-  app.add_option("--comment", options->comment, "A text for people, signed");
-  app.add_option("--owner", options->owner, "Whose certificate this is; travels along unsigned");
-  app.add_option("--chain", options->chains,
-                 "Certificate file of a signing key, whose chain is appended")
-      ->allow_extra_args(false);
-  app.add_option(
-      "--revocation", options->revocation,
-      "Valid only while a current list of this source does not revoke it: \"calc (revoke "
-      "all)\"");
-  app.add_option("-o,--output", options->output, "The certificate file")->required();
-  AddStrictFlag(app, options->strict);
-  AddWriteFlags(app, options->flags);
+  AddSignerOptions(list, options->signer, SignerCount::kSeveral);
+  Option& subject = list.Add("--subject", options->subject, "The public key that is certified");
+  list.Add("--request", options->request, "Or the key that made this request, for what it asks")
+      .Excludes(subject);
+  list.Add("--tag", options->tag,
+           "What for: \"(install (app calc))\"; of a request, less than it asks");
+  list.Add("--propagate", options->propagate,
+           "The subject may certify further keys; signing manifests needs it only where several "
+           "issuers must agree");
+  AddPeriodOptions(list, options->period);
+  list.Add("--comment", options->comment, "A text for people, signed");
+  list.Add("--owner", options->owner, "Whose certificate this is; travels along unsigned");
+  list.Add("--chain", options->chains,
+           "Certificate file of a signing key, whose chain is appended");
+  list.Add("--revocation", options->revocation,
+           "Valid only while a current list of this source does not revoke it: \"calc (revoke "
+           "all)\"");
+  list.Add("-o,--output", options->output, "The certificate file").Required();
+  AddStrictFlag(list, options->strict);
+  AddWriteFlags(list, options->flags);
   return [options] { return Run(*options); };
 }
 

@@ -33,13 +33,12 @@ ExitCode Run(const Options& options) {
 
 }  // namespace
 
-Action DefineCertJoin(CLI::App& app) {
+Action DefineCertJoin(OptionList& list) {
   auto options = std::make_shared<Options>();
-  app.add_option("files", options->files, "Certificate files for the same key")->required();
-  app.add_option("-o,--output", options->output, "The certificate file with all of them")
-      ->required();
-  AddWriteFlags(app, options->flags);
-  app.footer(
+  list.Add("files", options->files, "Certificate files for the same key").Required();
+  list.Add("-o,--output", options->output, "The certificate file with all of them").Required();
+  AddWriteFlags(list, options->flags);
+  list.Footer(
       "Every signature must hold. What several files have is written once, and the certificates "
       "for\nthe key come first.");
   return [options] { return Run(*options); };

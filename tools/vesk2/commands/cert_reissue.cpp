@@ -105,40 +105,41 @@ ExitCode Cosign(const Options& options) {
   return Write(options, work, {}, true);
 }
 
-void AddPlace(CLI::App& app, Options& options) {
-  app.add_option("place", options.place,
-                 "FILE or FILE:N: the certificate of a chain or manifest [the first]")
-      ->required();
-  AddSignerOptions(app, options.signer);
+void AddPlace(OptionList& list, Options& options) {
+  list.Add("place", options.place,
+           "FILE or FILE:N: the certificate of a chain or manifest [the first]")
+      .Required();
+  AddSignerOptions(list, options.signer);
 }
 
-void AddOutput(CLI::App& app, Options& options) {
-  app.add_option("-o,--output", options.output, "The new file, its other certificates as they are")
-      ->required();
-  AddWriteFlags(app, options.flags);
+void AddOutput(OptionList& list, Options& options) {
+  list.Add("-o,--output", options.output, "The new file, its other certificates as they are")
+      .Required();
+  AddWriteFlags(list, options.flags);
 }
 
 }  // namespace
 
-Action DefineCertRenew(CLI::App& app) {
+Action DefineCertRenew(OptionList& list) {
   auto options = std::make_shared<Options>();
-  AddPlace(app, *options);
-  app.add_option("--tag", options->tag, "Another tag [the old one]");
-  app.add_flag("--propagate", options->propagate, "The subject may pass it on from now on");
-  AddPeriodOptions(app, options->period);
-  app.add_option("--comment", options->comment, "Another text for people");
-  AddOutput(app, *options);
-  app.footer(
+  AddPlace(list, *options);
+  list.Add("--tag", options->tag, "Another tag [the old one]");
+  list.Add("--propagate", options->propagate, "The subject may pass it on from now on");
+  AddPeriodOptions(list, options->period);
+  list.Add("--comment", options->comment, "Another text for people");
+  AddOutput(list, *options);
+  list.Footer(
       "--not-before and --not-after replace the old period whole. What else is not given is "
       "as it was.");
   return [options] { return Renew(*options); };
 }
 
-Action DefineCertCosign(CLI::App& app) {
+Action DefineCertCosign(OptionList& list) {
   auto options = std::make_shared<Options>();
-  AddPlace(app, *options);
-  AddOutput(app, *options);
-  app.footer("The new certificate says the same, by the signing key, and stands before the other.");
+  AddPlace(list, *options);
+  AddOutput(list, *options);
+  list.Footer(
+      "The new certificate says the same, by the signing key, and stands before the other.");
   return [options] { return Cosign(*options); };
 }
 

@@ -34,15 +34,14 @@ ExitCode Run(const Options& options) {
 
 }  // namespace
 
-Action DefineCertRequest(CLI::App& app) {
+Action DefineCertRequest(OptionList& list) {
   auto options = std::make_shared<Options>();
-  AddSignerOptions(app, options->signer);
-  app.add_option("--tag", options->tag, "What the key asks for: \"(install (app calc))\"")
-      ->required();
-  app.add_option("--comment", options->comment, "A text for the issuer, signed");
-  app.add_option("--owner", options->owner, "Whose key this is; goes into the certificate file");
-  app.add_option("-o,--output", options->output, "The request file, .req")->required();
-  AddWriteFlags(app, options->flags);
+  AddSignerOptions(list, options->signer);
+  list.Add("--tag", options->tag, "What the key asks for: \"(install (app calc))\"").Required();
+  list.Add("--comment", options->comment, "A text for the issuer, signed");
+  list.Add("--owner", options->owner, "Whose key this is; goes into the certificate file");
+  list.Add("-o,--output", options->output, "The request file, .req").Required();
+  AddWriteFlags(list, options->flags);
   return [options] { return Run(*options); };
 }
 

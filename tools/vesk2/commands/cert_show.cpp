@@ -14,9 +14,9 @@ ExitCode Run(const std::string& file) {
 
 }  // namespace
 
-Action DefineCertShow(CLI::App& app) {
+Action DefineCertShow(OptionList& list) {
   auto file = std::make_shared<std::string>();
-  app.add_option("file", *file, "A certificate file")->required();
+  list.Add("file", *file, "A certificate file").Required();
   return [file] { return Run(*file); };
 }
 

@@ -88,18 +88,18 @@ ExitCode Run(const Options& options) {
 
 }  // namespace
 
-Action DefineCertVerify(CLI::App& app) {
+Action DefineCertVerify(OptionList& list) {
   auto options = std::make_shared<Options>();
-  app.add_option("file", options->file, "The certificate file: a chain")->required();
-  app.add_option("--tag", options->tag,
-                 "What its first subject must be authorized for; of a set, every member")
-      ->required();
-  AddPeriodOptions(app, options->period);
-  app.add_option("--at", options->at, "Authorized at this moment [now]")
-      ->excludes("--not-before")
-      ->excludes("--not-after");
-  AddStoreCheckOptions(app, options->stores);
-  app.add_flag("--explain", options->explain, "Tell why also when the answer is yes");
+  list.Add("file", options->file, "The certificate file: a chain").Required();
+  list.Add("--tag", options->tag,
+           "What its first subject must be authorized for; of a set, every member")
+      .Required();
+  AddPeriodOptions(list, options->period);
+  list.Add("--at", options->at, "Authorized at this moment [now]")
+      .Excludes("--not-before")
+      .Excludes("--not-after");
+  AddStoreCheckOptions(list, options->stores);
+  list.Add("--explain", options->explain, "Tell why also when the answer is yes");
   return [options] { return Run(*options); };
 }
 

@@ -5,11 +5,11 @@
 #ifndef VESK2_TOOLS_COMMAND_H
 #define VESK2_TOOLS_COMMAND_H
 
-#include <CLI/CLI.hpp>
 #include <functional>
 #include <memory>
 #include <span>
 
+#include "tools/vesk2/options/options.h"
 #include "tools/vesk2/say/report.h"
 
 namespace vesk2_command {
@@ -23,7 +23,7 @@ struct Command {
   const char* verb;      // empty for a noun that is a command itself
   const char* about;     // one line
   const char* examples;  // a command line a line
-  Action (*define)(CLI::App& app);
+  Action (*define)(OptionList& list);
 };
 struct Noun {
   const char* name;
@@ -36,40 +36,40 @@ std::span<const Noun> Nouns();
 // Runs one command line, argv[0] included, and returns its exit status. Nothing throws.
 int RunCommand(int argc, const char* const* argv);
 
-Action DefineKeyNew(CLI::App& app);
-Action DefineKeyShow(CLI::App& app);
-Action DefineKeyImport(CLI::App& app);
-Action DefineKeyExport(CLI::App& app);
-Action DefineAclGrant(CLI::App& app);
-Action DefineAclList(CLI::App& app);
-Action DefineAclInstall(CLI::App& app);
-Action DefineAclRemove(CLI::App& app);
-Action DefineCertRequest(CLI::App& app);
-Action DefineCertIssue(CLI::App& app);
-Action DefineCertRenew(CLI::App& app);
-Action DefineCertCosign(CLI::App& app);
-Action DefineCertJoin(CLI::App& app);
-Action DefineCertShow(CLI::App& app);
-Action DefineCertVerify(CLI::App& app);
-Action DefineCertFind(CLI::App& app);
-Action DefineCrlIssue(CLI::App& app);
-Action DefineCrlImport(CLI::App& app);
-Action DefineCrlShow(CLI::App& app);
-Action DefineCrlVerify(CLI::App& app);
-Action DefineManifestSign(CLI::App& app);
-Action DefineManifestApprove(CLI::App& app);
-Action DefineManifestVerify(CLI::App& app);
-Action DefineManifestShow(CLI::App& app);
-Action DefineManifestCompare(CLI::App& app);
-Action DefineFloorShow(CLI::App& app);
-Action DefineFloorSet(CLI::App& app);
-Action DefineFloorReset(CLI::App& app);
-Action DefineTagCheck(CLI::App& app);
-Action DefineShow(CLI::App& app);
-Action DefineStoreShow(CLI::App& app);
-Action DefineVersion(CLI::App& app);
-Action DefineCompletion(CLI::App& app);
-Action DefineManual(CLI::App& app);
+Action DefineKeyNew(OptionList& list);
+Action DefineKeyShow(OptionList& list);
+Action DefineKeyImport(OptionList& list);
+Action DefineKeyExport(OptionList& list);
+Action DefineAclGrant(OptionList& list);
+Action DefineAclList(OptionList& list);
+Action DefineAclInstall(OptionList& list);
+Action DefineAclRemove(OptionList& list);
+Action DefineCertRequest(OptionList& list);
+Action DefineCertIssue(OptionList& list);
+Action DefineCertRenew(OptionList& list);
+Action DefineCertCosign(OptionList& list);
+Action DefineCertJoin(OptionList& list);
+Action DefineCertShow(OptionList& list);
+Action DefineCertVerify(OptionList& list);
+Action DefineCertFind(OptionList& list);
+Action DefineCrlIssue(OptionList& list);
+Action DefineCrlImport(OptionList& list);
+Action DefineCrlShow(OptionList& list);
+Action DefineCrlVerify(OptionList& list);
+Action DefineManifestSign(OptionList& list);
+Action DefineManifestApprove(OptionList& list);
+Action DefineManifestVerify(OptionList& list);
+Action DefineManifestShow(OptionList& list);
+Action DefineManifestCompare(OptionList& list);
+Action DefineFloorShow(OptionList& list);
+Action DefineFloorSet(OptionList& list);
+Action DefineFloorReset(OptionList& list);
+Action DefineTagCheck(OptionList& list);
+Action DefineShow(OptionList& list);
+Action DefineStoreShow(OptionList& list);
+Action DefineVersion(OptionList& list);
+Action DefineCompletion(OptionList& list);
+Action DefineManual(OptionList& list);
 
 }  // namespace vesk2_command
 

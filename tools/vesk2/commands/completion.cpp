@@ -4,7 +4,7 @@
 #include <map>
 #include <sstream>
 
-#include "tools/vesk2/commands/options.h"
+#include "tools/vesk2/commands/parse.h"
 
 namespace vesk2_command {
 namespace {
@@ -35,7 +35,7 @@ std::string Verbs(const Noun& noun) {
   return Join(names, " ");
 }
 
-bool IsDirectory(const OptionText& option) { return option.value.starts_with("DIR"); }
+bool IsDirectory(const Option& option) { return option.ValueName().starts_with("DIR"); }
 
 // What a shell's `case` compares "NOUN WORD" with.
 std::string Pattern(const Command& command) {
@@ -46,9 +46,9 @@ std::string Pattern(const Command& command) {
 // ---- bash ----
 
 // What completes the value of an option: arguments of compgen.
-std::string BashValues(const OptionText& option) {
-  if (!option.choices.empty()) return "-W " + Quoted(Join(option.choices, " "));
-  if (!option.takesFile) return "-W ''";
+std::string BashValues(const Option& option) {
+  if (!option.choices().empty()) return "-W " + Quoted(Join(option.choices(), " "));
+  if (option.Opens() == Access::kNone) return "-W ''";
   return IsDirectory(option) ? "-d" : "-f";
 }
 
@@ -56,12 +56,13 @@ void BashCommand(const Command& command, std::ostream& out) {
   std::map<std::string, std::vector<std::string>> values;  // by what completes them
   std::string words;
   std::string operands = "-W ''";
-  for (const OptionText& option : DescribeOptions(command)) {
-    for (const std::string& name : option.names) words += name + " ";
-    if (option.names.empty()) operands = BashValues(option);
-    if (option.names.empty() || option.value.empty()) continue;
+  for (const Option& option : DescribeOptions(command)) {
+    for (const std::string& name : option.Names()) words += name + " ";
+    if (option.IsOperand()) operands = BashValues(option);
+    if (option.IsOperand() || option.IsFlag()) continue;
     std::vector<std::string>& names = values[BashValues(option)];
-    names.insert(names.end(), option.names.begin(), option.names.end());
+    const std::vector<std::string> own = option.Names();
+    names.insert(names.end(), own.begin(), own.end());
   }
   out << "    " << Pattern(command) << ")\n      case $previous in\n";
   for (const auto& [how, names] : values) {
@@ -101,10 +102,10 @@ _vesk2() {
 
 // ---- zsh ----
 
-std::string ZshValues(const OptionText& option) {
-  const std::string text = ":" + (option.choices.empty() ? option.value : "choice");
-  if (!option.choices.empty()) return text + ":(" + Join(option.choices, " ") + ")";
-  if (!option.takesFile) return text + ": ";
+std::string ZshValues(const Option& option) {
+  const std::string text = ":" + (option.choices().empty() ? option.ValueName() : "choice");
+  if (!option.choices().empty()) return text + ":(" + Join(option.choices(), " ") + ")";
+  if (option.Opens() == Access::kNone) return text + ": ";
   return text + (IsDirectory(option) ? ":_files -/" : ":_files");
 }
 
@@ -121,18 +122,18 @@ std::string ZshText(const std::string& text) {
 void ZshCommand(const Command& command, std::ostream& out) {
   out << "    " << Pattern(command) << ")\n      shift " << (*command.verb == '\0' ? 1 : 2)
       << " words; (( CURRENT -= " << (*command.verb == '\0' ? 1 : 2) << " ))\n      _arguments -s";
-  for (const OptionText& option : DescribeOptions(command)) {
+  for (const Option& option : DescribeOptions(command)) {
     out << " \\\n        ";
-    const std::string values = option.value.empty() ? "" : ZshValues(option);
-    if (option.names.empty()) {
-      out << Quoted((option.repeats ? "*" : option.required ? "" : ":") + values);
+    const std::string values = option.IsFlag() ? "" : ZshValues(option);
+    if (option.IsOperand()) {
+      out << Quoted((option.Repeats() ? "*" : option.required() ? "" : ":") + values);
       continue;
     }
-    const std::string once = option.repeats ? "*" : "(" + Join(option.names, " ") + ")";
-    const std::string about = Quoted("[" + ZshText(option.about) + "]" + values);
-    if (option.names.size() == 1) out << Quoted(once + option.names[0]) << about;
-    if (option.names.size() > 1)
-      out << Quoted(once) << "{" << Join(option.names, ",") << "}" << about;
+    const std::vector<std::string> names = option.Names();
+    const std::string once = option.Repeats() ? "*" : "(" + Join(names, " ") + ")";
+    const std::string about = Quoted("[" + ZshText(option.Description()) + "]" + values);
+    if (names.size() == 1) out << Quoted(once + names[0]) << about;
+    if (names.size() > 1) out << Quoted(once) << "{" << Join(names, ",") << "}" << about;
   }
   out << " ;;\n";
 }
@@ -159,20 +160,20 @@ void Zsh(std::ostream& out) {
 
 // ---- fish ----
 
-void FishOption(const OptionText& option, const std::string& head, std::ostream& out) {
+void FishOption(const Option& option, const std::string& head, std::ostream& out) {
   out << head;
-  for (const std::string& name : option.names) {
+  for (const std::string& name : option.Names()) {
     out << (name.starts_with("--") ? " -l " + name.substr(2) : " -s " + name.substr(1));
   }
-  if (!option.choices.empty()) {
-    out << " -x -a " << Quoted(Join(option.choices, " "));
-  } else if (!option.value.empty() && !option.names.empty()) {
-    out << (!option.takesFile     ? " -x"
-            : IsDirectory(option) ? " -x -a '(__fish_complete_directories)'"
-                                  : " -r -F");
+  if (!option.choices().empty()) {
+    out << " -x -a " << Quoted(Join(option.choices(), " "));
+  } else if (!option.IsFlag() && !option.IsOperand()) {
+    out << (option.Opens() == Access::kNone ? " -x"
+            : IsDirectory(option)           ? " -x -a '(__fish_complete_directories)'"
+                                            : " -r -F");
   }
-  if (option.names.empty() && option.takesFile) out << " -F";
-  out << " -d " << Quoted(option.about) << "\n";
+  if (option.IsOperand() && option.Opens() != Access::kNone) out << " -F";
+  out << " -d " << Quoted(option.Description()) << "\n";
 }
 
 void Fish(std::ostream& out) {
@@ -196,7 +197,7 @@ complete -c vesk2 -f
             << " -d " << Quoted(command.about) << "\n";
       }
       const std::string head = "complete -c vesk2 -n '__vesk2_in " + CommandName(command) + "'";
-      for (const OptionText& option : DescribeOptions(command)) FishOption(option, head, out);
+      for (const Option& option : DescribeOptions(command)) FishOption(option, head, out);
     });
   }
 }
@@ -215,11 +216,11 @@ ExitCode Run(const std::string& shell) {
 
 }  // namespace
 
-Action DefineCompletion(CLI::App& app) {
+Action DefineCompletion(OptionList& list) {
   auto shell = std::make_shared<std::string>();
-  app.add_option("shell", *shell, "The shell whose language is wanted")
-      ->check(CLI::IsMember({"bash", "zsh", "fish"}))
-      ->required();
+  list.Add("shell", *shell, "The shell whose language is wanted")
+      .Choices({"bash", "zsh", "fish"})
+      .Required();
   return [shell] { return Run(*shell); };
 }
 

@@ -112,14 +112,14 @@ ExitCode Run(const Options& options) {
 
 }  // namespace
 
-Action DefineCrlImport(CLI::App& app) {
+Action DefineCrlImport(OptionList& list) {
   auto options = std::make_shared<Options>();
-  app.add_option("source", options->source, "A revocation list, or a directory of them (*.crl)")
-      ->required();
-  app.add_flag("-f,--force", options->force,
-               "Store a list also where it revokes less than the stored one of the same end, or "
-               "where that one cannot be read");
-  app.footer(
+  list.Add("source", options->source, "A revocation list, or a directory of them (*.crl)")
+      .Required();
+  list.Add("-f,--force", options->force,
+           "Store a list also where it revokes less than the stored one of the same end, or "
+           "where that one cannot be read");
+  list.Footer(
       "Exit status: 0 when every list is in the store now, 1 when one was refused, 2 when one "
       "could\nnot be read or written.");
   return [options] { return Run(*options); };

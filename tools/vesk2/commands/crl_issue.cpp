@@ -156,38 +156,33 @@ ExitCode Run(const Options& options) {
 
 }  // namespace
 
-Action DefineCrlIssue(CLI::App& app) {
+Action DefineCrlIssue(OptionList& list) {
   auto options = std::make_shared<Options>();
-  AddSignerOptions(app, options->signer);
-  app.add_option("--tag", options->tag, "The source of the list: \"calc (revoke all)\"")
-      ->required();
-  app.add_option("--revoke-cert", options->certs,
-                 "A certificate that is revoked: FILE, or FILE:N for the N-th of a chain. Whoever "
-                 "has its key can sign with an earlier date: for a leaked key, --revoke-key")
-      ->allow_extra_args(false);
-  app.add_option("--revoke-key", options->keys,
-                 "A public key that is revoked, whatever the date: one that leaked")
-      ->allow_extra_args(false);
-  app.add_option("--items-of", options->itemsOf,
-                 "Revoke what this list revokes, too: the one that is replaced");
-  app.add_option("--drop", options->drops,
-                 "Let this go, which the list before revokes (that of --items-of, and the stored "
-                 "one): a digest as crl show writes it, or \"all\"")
-      ->allow_extra_args(false);
-  app.add_option("--date", options->date, "From when on the certificates are revoked")
-      ->capture_default_str();
-  AddPeriodOptions(app, options->period);
+  AddSignerOptions(list, options->signer);
+  list.Add("--tag", options->tag, "The source of the list: \"calc (revoke all)\"").Required();
+  list.Add("--revoke-cert", options->certs,
+           "A certificate that is revoked: FILE, or FILE:N for the N-th of a chain. Whoever "
+           "has its key can sign with an earlier date: for a leaked key, --revoke-key");
+  list.Add("--revoke-key", options->keys,
+           "A public key that is revoked, whatever the date: one that leaked");
+  list.Add("--items-of", options->itemsOf,
+           "Revoke what this list revokes, too: the one that is replaced");
+  list.Add("--drop", options->drops,
+           "Let this go, which the list before revokes (that of --items-of, and the stored "
+           "one): a digest as crl show writes it, or \"all\"");
+  list.Add("--date", options->date, "From when on the certificates are revoked").ShowPreset();
+  AddPeriodOptions(list, options->period);
   // A list without an end answers nothing and replaces nothing.
-  app.get_option("--not-after")->required();
-  app.add_option("--hash", options->hash, "How the list and what it names are hashed")
-      ->check(CLI::IsMember({"sha256", "sha1"}))
-      ->capture_default_str();
-  app.add_option("-o,--output", options->output, "The revocation list file, .crl");
-  app.add_flag("--import", options->import, "Put the list into this machine's store");
-  app.add_flag("--grant", options->grant,
-               "Let this machine believe the key's lists of this source: writes the ACL entry");
-  AddWriteFlags(app, options->flags);
-  app.footer(
+  list.Get("--not-after").Required();
+  list.Add("--hash", options->hash, "How the list and what it names are hashed")
+      .Choices({"sha256", "sha1"})
+      .ShowPreset();
+  list.Add("-o,--output", options->output, "The revocation list file, .crl");
+  list.Add("--import", options->import, "Put the list into this machine's store");
+  list.Add("--grant", options->grant,
+           "Let this machine believe the key's lists of this source: writes the ACL entry");
+  AddWriteFlags(list, options->flags);
+  list.Footer(
       "A list that revokes no certificate holds one dummy item, a digest of zeros: without any "
       "item\nit would count as absent.");
   return [options] { return Run(*options); };

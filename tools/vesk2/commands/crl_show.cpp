@@ -5,9 +5,9 @@
 
 namespace vesk2_command {
 
-Action DefineCrlShow(CLI::App& app) {
+Action DefineCrlShow(OptionList& list) {
   auto file = std::make_shared<std::string>();
-  app.add_option("file", *file, "A revocation list file")->required();
+  list.Add("file", *file, "A revocation list file").Required();
   return [file] {
     Present(DescribeCrl(*ReadCrl(*file)));
     return kYes;

@@ -49,11 +49,11 @@ ExitCode Run(const Options& options) {
 
 }  // namespace
 
-Action DefineCrlVerify(CLI::App& app) {
+Action DefineCrlVerify(OptionList& list) {
   auto options = std::make_shared<Options>();
-  app.add_option("file", options->file, "The revocation list file")->required();
-  app.add_option("--tag", options->tag, "The source that it must be of");
-  app.add_option("--at", options->at, "Valid at this moment")->capture_default_str();
+  list.Add("file", options->file, "The revocation list file").Required();
+  list.Add("--tag", options->tag, "The source that it must be of");
+  list.Add("--at", options->at, "Valid at this moment").ShowPreset();
   return [options] { return Run(*options); };
 }
 

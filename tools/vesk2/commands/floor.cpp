@@ -99,31 +99,30 @@ ExitCode Reset(const Options& options) {
   return NoFloor(path);
 }
 
-std::shared_ptr<Options> AddWhich(CLI::App& app, bool tagRequired) {
+std::shared_ptr<Options> AddWhich(OptionList& list, bool tagRequired) {
   auto options = std::make_shared<Options>();
-  app.add_option("--tag", options->tag, "The tag, as it is asked for")->required(tagRequired);
-  app.add_option("--floor", options->file, "This file [the floor that --remember keeps]");
+  list.Add("--tag", options->tag, "The tag, as it is asked for").Required(tagRequired);
+  list.Add("--floor", options->file, "This file [the floor that --remember keeps]");
   return options;
 }
 
 }  // namespace
 
-Action DefineFloorShow(CLI::App& app) {
-  const auto options = AddWhich(app, false);
-  app.footer("Without --tag and --floor all that --remember keeps.");
+Action DefineFloorShow(OptionList& list) {
+  const auto options = AddWhich(list, false);
+  list.Footer("Without --tag and --floor all that --remember keeps.");
   return [options] { return Show(*options); };
 }
 
-Action DefineFloorSet(CLI::App& app) {
-  const auto options = AddWhich(app, true);
-  app.add_option("time", options->time, "What was signed before is refused; UTC, or \"now\"")
-      ->required();
-  app.add_flag("-f,--force", options->force, "Lower it, or replace a file that is none");
+Action DefineFloorSet(OptionList& list) {
+  const auto options = AddWhich(list, true);
+  list.Add("time", options->time, "What was signed before is refused; UTC, or \"now\"").Required();
+  list.Add("-f,--force", options->force, "Lower it, or replace a file that is none");
   return [options] { return Set(*options); };
 }
 
-Action DefineFloorReset(CLI::App& app) {
-  const auto options = AddWhich(app, false);
+Action DefineFloorReset(OptionList& list) {
+  const auto options = AddWhich(list, false);
   return [options] { return Reset(*options); };
 }
 

@@ -61,19 +61,19 @@ ExitCode Run(const Options& options) {
 
 }  // namespace
 
-Action DefineKeyExport(CLI::App& app) {
+Action DefineKeyExport(OptionList& list) {
   auto options = std::make_shared<Options>();
-  app.add_option("file", options->file,
-                 "A key: a .pub or PEM file, pkcs11:URI, or ssh-agent:SHA256:FINGERPRINT")
-      ->required();
-  app.add_option("--format", options->format,
-                 "How: a line for SSH, an X.509 SubjectPublicKeyInfo in PEM, or our own form")
-      ->check(CLI::IsMember({"ssh", "x509", "canonical"}))
-      ->required();
-  app.add_option("-o,--output", options->output, "The file to write, or - for standard output")
-      ->capture_default_str();
-  AddPassphraseOptions(app, options->passphrase);
-  AddWriteFlags(app, options->flags);
+  list.Add("file", options->file,
+           "A key: a .pub or PEM file, pkcs11:URI, or ssh-agent:SHA256:FINGERPRINT")
+      .Required();
+  list.Add("--format", options->format,
+           "How: a line for SSH, an X.509 SubjectPublicKeyInfo in PEM, or our own form")
+      .Choices({"ssh", "x509", "canonical"})
+      .Required();
+  list.Add("-o,--output", options->output, "The file to write, or - for standard output")
+      .ShowPreset();
+  AddPassphraseOptions(list, options->passphrase);
+  AddWriteFlags(list, options->flags);
   return [options] { return Run(*options); };
 }
 

@@ -56,17 +56,16 @@ ExitCode Run(const Options& options) {
 
 }  // namespace
 
-Action DefineKeyImport(CLI::App& app) {
+Action DefineKeyImport(OptionList& list) {
   auto options = std::make_shared<Options>();
-  app.add_option("file", options->file,
-                 "An RSA or DSA key: X.509 certificate, PKCS#8, PKCS#1 (PEM or DER), or OpenSSH")
-      ->required();
-  app.add_option("-o,--output", options->output, "NAME of the key's files, without extension")
-      ->required();
-  app.add_flag("--encrypt", options->encrypt,
-               "Protect a private key that has no passphrase yet; ask for one");
-  AddPassphraseOptions(app, options->passphrase);
-  AddWriteFlags(app, options->flags);
+  list.Add("file", options->file,
+           "An RSA or DSA key: X.509 certificate, PKCS#8, PKCS#1 (PEM or DER), or OpenSSH")
+      .Required();
+  list.Add("-o,--output", options->output, "NAME of the key's files, without extension").Required();
+  list.Add("--encrypt", options->encrypt,
+           "Protect a private key that has no passphrase yet; ask for one");
+  AddPassphraseOptions(list, options->passphrase);
+  AddWriteFlags(list, options->flags);
   return [options] { return Run(*options); };
 }
 

@@ -72,17 +72,15 @@ ExitCode Run(const Options& options) {
 
 }  // namespace
 
-Action DefineKeyNew(CLI::App& app) {
+Action DefineKeyNew(OptionList& list) {
   auto options = std::make_shared<Options>();
-  app.add_option("names", options->names, "NAME of each key's two files, without extension");
-  app.add_option("-o,--output", options->output, "The same, for one key");
-  app.add_option("--type", options->type, "Kind of key")
-      ->check(CLI::IsMember({"rsa"}))
-      ->capture_default_str();
-  app.add_option("--bits", options->bits, "Size of the modulus")->capture_default_str();
-  app.add_flag("--encrypt", options->encrypt, "Protect the private keys; ask for a passphrase");
-  AddPassphraseOptions(app, options->passphrase);
-  AddWriteFlags(app, options->flags);
+  list.Add("names", options->names, "NAME of each key's two files, without extension");
+  list.Add("-o,--output", options->output, "The same, for one key");
+  list.Add("--type", options->type, "Kind of key").Choices({"rsa"}).ShowPreset();
+  list.Add("--bits", options->bits, "Size of the modulus").ShowPreset();
+  list.Add("--encrypt", options->encrypt, "Protect the private keys; ask for a passphrase");
+  AddPassphraseOptions(list, options->passphrase);
+  AddWriteFlags(list, options->flags);
   return [options] { return Run(*options); };
 }
 

@@ -22,12 +22,12 @@ ExitCode Run(const Options& options) {
 
 }  // namespace
 
-Action DefineKeyShow(CLI::App& app) {
+Action DefineKeyShow(OptionList& list) {
   auto options = std::make_shared<Options>();
-  app.add_option("file", options->file,
-                 "A key: a .pub or PEM file, pkcs11:URI, or ssh-agent:SHA256:FINGERPRINT")
-      ->required();
-  AddPassphraseOptions(app, options->passphrase);
+  list.Add("file", options->file,
+           "A key: a .pub or PEM file, pkcs11:URI, or ssh-agent:SHA256:FINGERPRINT")
+      .Required();
+  AddPassphraseOptions(list, options->passphrase);
   return [options] { return Run(*options); };
 }
 

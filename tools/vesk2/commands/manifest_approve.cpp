@@ -123,20 +123,19 @@ ExitCode Run(const Options& options) {
 
 }  // namespace
 
-Action DefineManifestApprove(CLI::App& app) {
+Action DefineManifestApprove(OptionList& list) {
   auto options = std::make_shared<Options>();
-  app.add_option("manifest", options->manifest, "The manifest file")->required();
-  AddSignerOptions(app, options->signer);
-  app.add_option("--cert", options->certs,
-                 "Certificate file of the approving key; several are joined [none: the key speaks "
-                 "for itself]")
-      ->allow_extra_args(false);
-  app.add_option("--tag", options->tag, "Approve for this tag only [as it is signed]");
-  app.add_option("--tree", options->tree, "Approve only if this tree is as the manifest lists it");
-  app.add_option("-o,--output", options->output, "The approved manifest [in place of the other]");
-  AddStrictFlag(app, options->strict);
-  AddWriteFlags(app, options->flags);
-  app.footer(
+  list.Add("manifest", options->manifest, "The manifest file").Required();
+  AddSignerOptions(list, options->signer);
+  list.Add("--cert", options->certs,
+           "Certificate file of the approving key; several are joined [none: the key speaks "
+           "for itself]");
+  list.Add("--tag", options->tag, "Approve for this tag only [as it is signed]");
+  list.Add("--tree", options->tree, "Approve only if this tree is as the manifest lists it");
+  list.Add("-o,--output", options->output, "The approved manifest [in place of the other]");
+  AddStrictFlag(list, options->strict);
+  AddWriteFlags(list, options->flags);
+  list.Footer(
       "The approval is for this content and no other. It is worth what its key may pass on, alone "
       "or as\none of several that must agree.");
   return [options] { return Run(*options); };

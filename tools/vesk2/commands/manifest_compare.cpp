@@ -61,10 +61,10 @@ ExitCode Run(const Options& options) {
 
 }  // namespace
 
-Action DefineManifestCompare(CLI::App& app) {
+Action DefineManifestCompare(OptionList& list) {
   auto options = std::make_shared<Options>();
-  app.add_option("from", options->from, "A manifest file")->required();
-  app.add_option("to", options->to, "The manifest that it is compared with")->required();
+  list.Add("from", options->from, "A manifest file").Required();
+  list.Add("to", options->to, "The manifest that it is compared with").Required();
   return [options] { return Run(*options); };
 }
 

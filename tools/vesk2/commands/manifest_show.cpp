@@ -41,7 +41,9 @@ void AddEntries(Sheet& sheet, BodyDirectory& directory) {
     Sheet entry("directory");
     entry.AddMember("path", path);
     constexpr size_t kDigits = 64;
-    sheet.AddPart("entries", std::string(kDigits, '-') + "  " + path + "/", std::move(entry));
+    std::string row(kDigits, '-');
+    row += "  " + path + "/";
+    sheet.AddPart("entries", row, std::move(entry));
     AddEntries(sheet, subdirectory);
   }
 }
@@ -114,10 +116,10 @@ ExitCode Run(const Options& options) {
 
 }  // namespace
 
-Action DefineManifestShow(CLI::App& app) {
+Action DefineManifestShow(OptionList& list) {
   auto options = std::make_shared<Options>();
-  app.add_option("file", options->file, "A manifest file")->required();
-  app.add_flag("--files", options->entries, "List the entries, files with their SHA-256");
+  list.Add("file", options->file, "A manifest file").Required();
+  list.Add("--files", options->entries, "List the entries, files with their SHA-256");
   return [options] { return Run(*options); };
 }
 

@@ -118,11 +118,12 @@ void RefuseInside(const std::string& output, const std::string& directory) {
 }
 
 void ShowListing(const Listing& listing) {
+  const std::string noDigest(64, '-');
   Json entries = Json::array();
   for (const ListedEntry& entry : listing.entries) {
     const std::string path = Escape(entry.path);
     if (entry.digest.empty()) {
-      Say(std::string(64, '-') + "  -  " + path);
+      Say(noDigest + "  -  " + path);
       entries.push_back({{"path", path}, {"kind", "directory"}});
       continue;
     }
@@ -219,27 +220,24 @@ ExitCode Run(const Options& options) {
 
 }  // namespace
 
-Action DefineManifestSign(CLI::App& app) {
+Action DefineManifestSign(OptionList& list) {
   auto options = std::make_shared<Options>();
-  app.add_option("directory", options->directory, "The tree to sign")->required();
-  AddSignerOptions(app, options->signer);
-  app.add_option(
-         "--cert", options->certs,
-         "Certificate file of the signing key, or a manifest that it signed; several are joined "
-         "[none: the key speaks for itself]")
-      ->allow_extra_args(false);
-  app.add_option("--tag", options->tag, "Sign for this tag only [all that the signer is granted]");
-  app.add_option("--at", options->at, "Time of signing, UTC")->capture_default_str();
-  AddIgnoreOptions(app, options->ignore);
-  app.add_flag("--allow-links", options->allowLinks, "Follow links that lead out of the tree");
-  app.add_option("--crl", options->crls, "Carry this revocation list (may be repeated)")
-      ->allow_extra_args(false);
-  app.add_flag("--allow-empty", options->allowEmpty, "Sign a tree without files");
-  app.add_option("--grant", options->grant,
-                 "Trust the signing key for this tag on this machine, as acl grant --propagate");
-  app.add_option("-o,--output", options->output, "The manifest file")->required();
-  AddStrictFlag(app, options->strict);
-  AddWriteFlags(app, options->flags, "Show what would be signed; write nothing");
+  list.Add("directory", options->directory, "The tree to sign").Required();
+  AddSignerOptions(list, options->signer);
+  list.Add("--cert", options->certs,
+           "Certificate file of the signing key, or a manifest that it signed; several are joined "
+           "[none: the key speaks for itself]");
+  list.Add("--tag", options->tag, "Sign for this tag only [all that the signer is granted]");
+  list.Add("--at", options->at, "Time of signing, UTC").ShowPreset();
+  AddIgnoreOptions(list, options->ignore);
+  list.Add("--allow-links", options->allowLinks, "Follow links that lead out of the tree");
+  list.Add("--crl", options->crls, "Carry this revocation list (may be repeated)");
+  list.Add("--allow-empty", options->allowEmpty, "Sign a tree without files");
+  list.Add("--grant", options->grant,
+           "Trust the signing key for this tag on this machine, as acl grant --propagate");
+  list.Add("-o,--output", options->output, "The manifest file").Required();
+  AddStrictFlag(list, options->strict);
+  AddWriteFlags(list, options->flags, "Show what would be signed; write nothing");
   return [options] { return Run(*options); };
 }
 

@@ -276,31 +276,30 @@ class Answer {
 
 }  // namespace
 
-Action DefineManifestVerify(CLI::App& app) {
+Action DefineManifestVerify(OptionList& list) {
   auto options = std::make_shared<Options>();
-  app.add_option("directory", options->directory, "The tree to check")->required();
-  app.add_option("manifest", options->manifest, "The manifest file")->required();
-  app.add_option("--tag", options->tag,
-                 "What the signer must be authorized for; of a set, every member")
-      ->required();
-  AddPeriodOptions(app, options->period);
-  app.add_option("--at", options->at,
-                 "Authorized, and not revoked, at this moment; \"signing\" for the time of signing "
-                 "[authorized at the time of signing, not revoked now]")
-      ->excludes("--not-before")
-      ->excludes("--not-after");
-  app.add_flag("--allow-extra", options->allowExtra, "Accept entries that are not listed");
-  app.add_flag("--allow-links", options->allowLinks, "Accept links that lead out of the tree");
-  app.add_flag("--no-store-update", options->noStoreUpdate,
-               "Write nothing: do not keep the revocation lists that the manifest carries");
-  AddFloorOptions(app, options->floor);
-  app.add_option("--acl-dir", options->aclDirectory, "Trust the entries of this directory too");
-  AddIgnoreOptions(app, options->ignore);
-  app.add_flag("--allow-empty", options->allowEmpty, "Accept an answer about no file at all");
-  AddStoreCheckOptions(app, options->stores);
-  app.add_flag("--explain", options->explain, "Tell why also when the answer is yes");
-  LentThreads::AddOption(app, options->jobs);
-  app.add_flag("--all", options->all, "Tell every finding, on a terminal too");
+  list.Add("directory", options->directory, "The tree to check").Required();
+  list.Add("manifest", options->manifest, "The manifest file").Required();
+  list.Add("--tag", options->tag, "What the signer must be authorized for; of a set, every member")
+      .Required();
+  AddPeriodOptions(list, options->period);
+  list.Add("--at", options->at,
+           "Authorized, and not revoked, at this moment; \"signing\" for the time of signing "
+           "[authorized at the time of signing, not revoked now]")
+      .Excludes("--not-before")
+      .Excludes("--not-after");
+  list.Add("--allow-extra", options->allowExtra, "Accept entries that are not listed");
+  list.Add("--allow-links", options->allowLinks, "Accept links that lead out of the tree");
+  list.Add("--no-store-update", options->noStoreUpdate,
+           "Write nothing: do not keep the revocation lists that the manifest carries");
+  AddFloorOptions(list, options->floor);
+  list.Add("--acl-dir", options->aclDirectory, "Trust the entries of this directory too");
+  AddIgnoreOptions(list, options->ignore);
+  list.Add("--allow-empty", options->allowEmpty, "Accept an answer about no file at all");
+  AddStoreCheckOptions(list, options->stores);
+  list.Add("--explain", options->explain, "Tell why also when the answer is yes");
+  LentThreads::AddOption(list, options->jobs);
+  list.Add("--all", options->all, "Tell every finding, on a terminal too");
   return [options] {
     StartResult();
     RealDirectory(options->directory);

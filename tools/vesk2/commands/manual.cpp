@@ -3,7 +3,7 @@
 // of them declares. docs/man/ holds what this writes.
 #include <sstream>
 
-#include "tools/vesk2/commands/options.h"
+#include "tools/vesk2/commands/parse.h"
 
 namespace vesk2_command {
 namespace {
@@ -110,22 +110,22 @@ void Head(const std::string& page, std::string about, std::ostream& out) {
 void CommandLine(const Command& command, std::ostream& out) {
   out << ".HP\n.B vesk2 " << CommandName(command) << "\n";
   for (const bool positional : {false, true}) {
-    for (const OptionText& option : DescribeOptions(command)) {
-      if (option.names.empty() == positional && !option.common)
-        out << Roff(Synopsis(option)) << "\n";
+    for (const Option& option : DescribeOptions(command)) {
+      if (option.IsOperand() == positional && !option.common())
+        out << Roff(option.Synopsis()) << "\n";
     }
   }
 }
 
-void Option(const OptionText& option, std::ostream& out) {
-  out << ".TP\n.B " << Roff(Join(option.names, ", "));
-  if (!option.value.empty()) out << (option.names.empty() ? "" : " ") << Roff(option.value);
-  out << "\n" << Roff(option.about) << "\n";
+void TellOption(const Option& option, std::ostream& out) {
+  out << ".TP\n.B " << Roff(Join(option.Names(), ", "));
+  if (!option.IsFlag()) out << (option.IsOperand() ? "" : " ") << Roff(option.ValueName());
+  out << "\n" << Roff(option.Description()) << "\n";
 }
 
-void Options(const Command& command, bool common, std::ostream& out) {
-  for (const OptionText& option : DescribeOptions(command)) {
-    if (option.common == common) Option(option, out);
+void TellOptions(const Command& command, bool common, std::ostream& out) {
+  for (const Option& option : DescribeOptions(command)) {
+    if (option.common() == common) TellOption(option, out);
   }
 }
 
@@ -160,7 +160,7 @@ void CommandPage(std::ostream& out) {
     out << ".TP\n.B " << CommandName(*command) << "\n" << Sentence(command->about);
   }
   out << ".SH OPTIONS OF EVERY COMMAND\n";
-  Options(*all.front(), true, out);
+  TellOptions(*all.front(), true, out);
   out << ".TP\n.B \\-\\-\nWhat follows is no option.\n" << kExitStatus << kEnvironment;
   Examples(all, out);
   SeeAlso("vesk2", out);
@@ -177,7 +177,7 @@ void NounPage(const Noun& noun, std::ostream& out) {
   out << ".SH COMMANDS\n";
   for (const Command* command : own) {
     out << ".SS vesk2 " << CommandName(*command) << "\n" << Sentence(command->about);
-    Options(*command, false, out);
+    TellOptions(*command, false, out);
   }
   out << ".PP\nOptions that every command takes are in\n.BR vesk2 (1).\n"
       << kExitStatus << kEnvironment;
@@ -201,9 +201,9 @@ ExitCode Run(const std::string& group) {
 
 }  // namespace
 
-Action DefineManual(CLI::App& app) {
+Action DefineManual(OptionList& list) {
   auto group = std::make_shared<std::string>();
-  app.add_option("group", *group, "Of these commands [of all]");
+  list.Add("group", *group, "Of these commands [of all]");
   return [group] { return Run(*group); };
 }
 

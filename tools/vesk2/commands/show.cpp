@@ -266,18 +266,16 @@ ExitCode Run(const Options& options) {
 
 }  // namespace
 
-Action DefineShow(CLI::App& app) {
+Action DefineShow(OptionList& list) {
   auto options = std::make_shared<Options>();
-  app.add_option("file", options->file, "A file of objects, in canonical or advanced form")
-      ->required();
-  auto* raw = app.add_flag("--raw", options->raw, "Show the S-expression, whatever it stands for");
-  auto* canonical = app.add_flag("--canonical", options->canonical, "Write the canonical bytes");
-  auto* advanced = app.add_flag("--advanced", options->advanced, "Write the advanced text");
-  raw->excludes(canonical)->excludes(advanced);
-  canonical->excludes(advanced);
-  app.add_option("-o,--output", options->output, "Where --canonical and --advanced write")
-      ->capture_default_str();
-  AddWriteFlags(app, options->flags);
+  list.Add("file", options->file, "A file of objects, in canonical or advanced form").Required();
+  Option& raw = list.Add("--raw", options->raw, "Show the S-expression, whatever it stands for");
+  Option& canonical = list.Add("--canonical", options->canonical, "Write the canonical bytes");
+  Option& advanced = list.Add("--advanced", options->advanced, "Write the advanced text");
+  raw.Excludes(canonical).Excludes(advanced);
+  canonical.Excludes(advanced);
+  list.Add("-o,--output", options->output, "Where --canonical and --advanced write").ShowPreset();
+  AddWriteFlags(list, options->flags);
   return [options] { return Run(*options); };
 }
 

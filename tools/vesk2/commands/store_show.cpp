@@ -97,6 +97,6 @@ ExitCode Run() {
 
 }  // namespace
 
-Action DefineStoreShow(CLI::App&) { return Run; }
+Action DefineStoreShow(OptionList&) { return Run; }
 
 }  // namespace vesk2_command

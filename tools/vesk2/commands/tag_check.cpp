@@ -31,10 +31,10 @@ ExitCode Run(const Options& options) {
 
 }  // namespace
 
-Action DefineTagCheck(CLI::App& app) {
+Action DefineTagCheck(OptionList& list) {
   auto options = std::make_shared<Options>();
-  app.add_option("asked", options->asked, "The tag that must not reach further")->required();
-  app.add_option("granted", options->granted, "The tag that it must lie within")->required();
+  list.Add("asked", options->asked, "The tag that must not reach further").Required();
+  list.Add("granted", options->granted, "The tag that it must lie within").Required();
   return [options] { return Run(*options); };
 }
 

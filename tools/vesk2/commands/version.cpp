@@ -7,7 +7,7 @@
 
 namespace vesk2_command {
 
-Action DefineVersion(CLI::App&) {
+Action DefineVersion(OptionList&) {
   return [] {
     const std::string build = Vesk2VersionExtra();
     Say("vesk2 " + LibraryVersion() + " (" + Escape(build) + ")");

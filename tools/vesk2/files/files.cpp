@@ -264,9 +264,9 @@ bool WriteFile(const std::string& path, std::string_view bytes, const WriteOptio
   return !options.flags.dryRun;
 }
 
-void AddWriteFlags(CLI::App& app, WriteFlags& flags, const std::string& dryRun) {
-  app.add_flag("-f,--force", flags.force, "Replace what is there");
-  app.add_flag("-n,--dry-run", flags.dryRun, dryRun);
+void AddWriteFlags(OptionList& list, WriteFlags& flags, const std::string& dryRun) {
+  list.Add("-f,--force", flags.force, "Replace what is there");
+  list.Add("-n,--dry-run", flags.dryRun, dryRun);
 }
 
 }  // namespace vesk2_command

@@ -5,11 +5,11 @@
 
 #include <sys/types.h>
 
-#include <CLI/CLI.hpp>
 #include <functional>
 #include <string>
 #include <string_view>
 
+#include "tools/vesk2/options/options.h"
 #include "tools/vesk2/say/report.h"
 
 namespace vesk2_command {
@@ -42,7 +42,7 @@ struct WriteFlags {
   bool force = false;   // replace what is there
   bool dryRun = false;  // check only, and note what would be written
 };
-void AddWriteFlags(CLI::App& app, WriteFlags& flags,
+void AddWriteFlags(OptionList& list, WriteFlags& flags,
                    const std::string& dryRun = "Say what would be written, and write nothing");
 
 struct WriteOptions {

@@ -41,10 +41,10 @@ StoreRoot Root(const StoreRoot& flag, const char* variable, const std::string& s
 
 }  // namespace
 
-void AddStoreOptions(CLI::App& app, StoreOptions& options) {
-  app.add_option("--home", options.home, "Root of the user's store [VESK2_HOME]");
-  app.add_option("--global", options.global,
-                 "Root of the machine's store, whose acl/ holds what is trusted [VESK2_GLOBAL]");
+void AddStoreOptions(OptionList& list, StoreOptions& options) {
+  list.Add("--home", options.home, "Root of the user's store [VESK2_HOME]");
+  list.Add("--global", options.global,
+           "Root of the machine's store, whose acl/ holds what is trusted [VESK2_GLOBAL]");
 }
 
 StoreRoot HomeRoot(const StoreOptions& options) {

@@ -4,9 +4,10 @@
 #ifndef VESK2_TOOLS_STORES_H
 #define VESK2_TOOLS_STORES_H
 
-#include <CLI/CLI.hpp>
 #include <string>
 #include <vector>
+
+#include "tools/vesk2/options/options.h"
 
 namespace vesk2_command {
 
@@ -14,7 +15,7 @@ struct StoreOptions {
   std::string home;
   std::string global;
 };
-void AddStoreOptions(CLI::App& app, StoreOptions& options);
+void AddStoreOptions(OptionList& list, StoreOptions& options);
 
 // A store's root, and who named it: "--home", "VESK2_HOME" or "default".
 struct StoreRoot {

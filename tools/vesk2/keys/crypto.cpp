@@ -119,7 +119,7 @@ Ref<PublicKey> MakePublicKey(const EVP_PKEY* key, const std::string& source) {
 
 Ref<PublicKey> MakePublicKey(bool rsa, const std::vector<std::string>& numbers,
                              const std::string& source) {
-  std::string text = std::string("(10:public-key(3:") + (rsa ? "rsa" : "dsa");
+  std::string text = rsa ? "(10:public-key(3:rsa" : "(10:public-key(3:dsa";
   for (size_t i = 0; i < numbers.size(); ++i) {
     text += "(" + Atom(Fields(rsa)[i].name) + Atom(numbers[i]) + ")";
   }

@@ -11,22 +11,22 @@ namespace vesk2_command {
 
 using ZvVesk2::Cert;
 
-void AddSignerOptions(CLI::App& app, SignerOptions& options, SignerCount count) {
+void AddSignerOptions(OptionList& list, SignerOptions& options, SignerCount count) {
   const bool several = count == SignerCount::kSeveral;
   const std::string about =
       "The private key that signs: a PEM file, pkcs11:URI on a token, or "
       "ssh-agent:SHA256:FINGERPRINT";
-  auto* key =
-      app.add_option("--key", options.keys, several ? about + "; several sign one each" : about);
-  key->required()->allow_extra_args(false);
-  if (!several) key->expected(1);
-  app.add_option("--algorithm", options.algorithm, "How an RSA key signs, over SHA-256")
-      ->check(CLI::IsMember({"rsa-pss", "rsa-1.5"}))
-      ->default_str("rsa-pss; of an ssh-agent rsa-1.5");
-  app.add_option("--sign-with", options.program,
-                 "Run this by /bin/sh to sign, --key being the public key: it reads the digest and "
-                 "writes the signature, both raw");
-  AddPassphraseOptions(app, options.passphrase);
+  Option& key =
+      list.Add("--key", options.keys, several ? about + "; several sign one each" : about);
+  key.Required();
+  if (!several) key.Once();
+  list.Add("--algorithm", options.algorithm, "How an RSA key signs, over SHA-256")
+      .Choices({"rsa-pss", "rsa-1.5"})
+      .Preset("rsa-pss; of an ssh-agent rsa-1.5");
+  list.Add("--sign-with", options.program,
+           "Run this by /bin/sh to sign, --key being the public key: it reads the digest and "
+           "writes the signature, both raw");
+  AddPassphraseOptions(list, options.passphrase);
 }
 
 std::unique_ptr<SigningKey> OpenSigner(const SignerOptions& options, size_t index) {

@@ -4,7 +4,6 @@
 #ifndef VESK2_TOOLS_ISSUE_H
 #define VESK2_TOOLS_ISSUE_H
 
-#include <CLI/CLI.hpp>
 #include <memory>
 #include <string>
 #include <vector>
@@ -12,6 +11,7 @@
 #include "tools/vesk2/keys/keys.h"
 #include "tools/vesk2/objects/cert_chain.h"
 #include "tools/vesk2/objects/grant_terms.h"
+#include "tools/vesk2/options/options.h"
 
 #include <vesk2/cert.h>
 
@@ -25,7 +25,8 @@ struct SignerOptions {
   PassphraseOptions passphrase;
 };
 enum class SignerCount { kOne, kSeveral };
-void AddSignerOptions(CLI::App& app, SignerOptions& options, SignerCount count = SignerCount::kOne);
+void AddSignerOptions(OptionList& list, SignerOptions& options,
+                      SignerCount count = SignerCount::kOne);
 // OpenSigner returns the signer of one of the keys, by default the only one.
 std::unique_ptr<SigningKey> OpenSigner(const SignerOptions& options, size_t index = 0);
 

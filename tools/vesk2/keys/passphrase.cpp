@@ -74,15 +74,15 @@ int FromOptions(char* out, int size, const PassphraseOptions& options) {
 
 }  // namespace
 
-void AddPassphraseOptions(CLI::App& app, PassphraseOptions& options) {
-  auto* file =
-      app.add_option("--passphrase-file", options.file,
-                     "Take the passphrase of private keys, or the PIN of a token, from this file's "
-                     "first line");
-  app.add_option("--passphrase-fd", options.descriptor,
-                 "Take it from the first line of this open file descriptor")
-      ->check(CLI::NonNegativeNumber)
-      ->excludes(file);
+void AddPassphraseOptions(OptionList& list, PassphraseOptions& options) {
+  Option& file =
+      list.Add("--passphrase-file", options.file,
+               "Take the passphrase of private keys, or the PIN of a token, from this file's "
+               "first line");
+  list.Add("--passphrase-fd", options.descriptor,
+           "Take it from the first line of this open file descriptor")
+      .Range(0)
+      .Excludes(file);
 }
 
 Secret::~Secret() { OPENSSL_cleanse(text_.data(), text_.size()); }

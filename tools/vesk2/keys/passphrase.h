@@ -5,10 +5,11 @@
 #ifndef VESK2_TOOLS_PASSPHRASE_H
 #define VESK2_TOOLS_PASSPHRASE_H
 
-#include <CLI/CLI.hpp>
 #include <exception>
 #include <memory>
 #include <string>
+
+#include "tools/vesk2/options/options.h"
 
 namespace vesk2_command {
 
@@ -33,7 +34,7 @@ struct PassphraseOptions {
 
   bool Named() const { return given || !file.empty() || descriptor >= 0; }
 };
-void AddPassphraseOptions(CLI::App& app, PassphraseOptions& options);
+void AddPassphraseOptions(OptionList& list, PassphraseOptions& options);
 
 // A passphrase for new keys, typed twice unless the options name a source.
 std::shared_ptr<const Secret> NewPassphrase(const PassphraseOptions& options);

@@ -36,9 +36,9 @@ Ref<TimeStamp> ParseTime(const std::string& text, bool endOfPeriod) {
   return stamp;
 }
 
-void AddPeriodOptions(CLI::App& app, PeriodOptions& options) {
-  app.add_option("--not-before", options.notBefore, "First moment (UTC): 2026, 2026-11-22_18, now");
-  app.add_option("--not-after", options.notAfter, "Last moment; 2026 is the end of that year");
+void AddPeriodOptions(OptionList& list, PeriodOptions& options) {
+  list.Add("--not-before", options.notBefore, "First moment (UTC): 2026, 2026-11-22_18, now");
+  list.Add("--not-after", options.notAfter, "Last moment; 2026 is the end of that year");
 }
 
 Period ParsePeriod(const PeriodOptions& options) {

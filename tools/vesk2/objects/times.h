@@ -3,8 +3,9 @@
 #ifndef VESK2_TOOLS_TIMES_H
 #define VESK2_TOOLS_TIMES_H
 
-#include <CLI/CLI.hpp>
 #include <string>
+
+#include "tools/vesk2/options/options.h"
 
 #include <vesk2/ref.h>
 #include <vesk2/time_stamp.h>
@@ -23,7 +24,7 @@ struct PeriodOptions {
   std::string notBefore;
   std::string notAfter;
 };
-void AddPeriodOptions(CLI::App& app, PeriodOptions& options);
+void AddPeriodOptions(OptionList& list, PeriodOptions& options);
 
 // Null where nothing was given.
 struct Period {

@@ -26,15 +26,12 @@ std::string PlainRelative(std::string name) {
 
 }  // namespace
 
-void AddIgnoreOptions(CLI::App& app, IgnoreOptions& options) {
-  app.add_option("--ignore", options.names, "Leave this entry out (a path below the directory)")
-      ->allow_extra_args(false);
-  app.add_option("--ignore-pattern", options.patterns,
-                 "Leave out what matches: *, ?, **/, a leading or closing /, and ! for what stays")
-      ->allow_extra_args(false);
-  app.add_option("--ignore-from", options.files,
-                 "Take such patterns from this file, one a line; the last that matches decides")
-      ->allow_extra_args(false);
+void AddIgnoreOptions(OptionList& list, IgnoreOptions& options) {
+  list.Add("--ignore", options.names, "Leave this entry out (a path below the directory)");
+  list.Add("--ignore-pattern", options.patterns,
+           "Leave out what matches: *, ?, **/, a leading or closing /, and ! for what stays");
+  list.Add("--ignore-from", options.files,
+           "Take such patterns from this file, one a line; the last that matches decides");
 }
 
 std::vector<std::string> IgnoreWords(const IgnoreOptions& options) {

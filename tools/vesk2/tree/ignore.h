@@ -4,11 +4,11 @@
 #ifndef VESK2_TOOLS_IGNORE_H
 #define VESK2_TOOLS_IGNORE_H
 
-#include <CLI/CLI.hpp>
 #include <set>
 #include <string>
 #include <vector>
 
+#include "tools/vesk2/options/options.h"
 #include "tools/vesk2/say/report.h"
 #include "tools/vesk2/tree/ignore_pattern.h"
 
@@ -19,7 +19,7 @@ struct IgnoreOptions {
   std::vector<std::string> files;     // --ignore-from
   std::vector<std::string> patterns;  // --ignore-pattern
 };
-void AddIgnoreOptions(CLI::App& app, IgnoreOptions& options);
+void AddIgnoreOptions(OptionList& list, IgnoreOptions& options);
 // The same options as words, to be given again.
 std::vector<std::string> IgnoreWords(const IgnoreOptions& options);
 

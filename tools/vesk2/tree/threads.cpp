@@ -24,10 +24,10 @@ unsigned OwnChoice(const std::string& path) {
 
 }  // namespace
 
-void LentThreads::AddOption(CLI::App& app, unsigned& jobs) {
-  app.add_option("--jobs", jobs,
-                 "Hash files on this many threads [one; for long manifests the cores, up to 8]")
-      ->check(CLI::Range(1U, kMostJobs));
+void LentThreads::AddOption(OptionList& list, unsigned& jobs) {
+  list.Add("--jobs", jobs,
+           "Hash files on this many threads [one; for long manifests the cores, up to 8]")
+      .Range(1, kMostJobs);
 }
 
 LentThreads::LentThreads(unsigned jobs, const std::string& path)

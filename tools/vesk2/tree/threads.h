@@ -3,8 +3,9 @@
 #ifndef VESK2_TOOLS_THREADS_H
 #define VESK2_TOOLS_THREADS_H
 
-#include <CLI/CLI.hpp>
 #include <string>
+
+#include "tools/vesk2/options/options.h"
 
 #include <vesk2/manifest.h>
 
@@ -13,7 +14,7 @@ namespace vesk2_command {
 class LentThreads {
  public:
   // --jobs; 0 until it is given.
-  static void AddOption(CLI::App& app, unsigned& jobs);
+  static void AddOption(OptionList& list, unsigned& jobs);
 
   // Lends `jobs` threads; if that is 0, as many as there are cores, up to 8, to a verification of
   // the manifest file `path` if it is long enough for them to pay, else none.

@@ -6,13 +6,11 @@
 
 namespace vesk2_command {
 
-void AddFloorOptions(CLI::App& app, FloorOptions& options) {
-  auto* file =
-      app.add_option("--floor", options.file,
-                     "Refuse what was signed before the time in this file; a yes raises it");
-  app.add_flag("--remember", options.remember,
-               "The same, with the floor kept for the tag in --home")
-      ->excludes(file);
+void AddFloorOptions(OptionList& list, FloorOptions& options) {
+  Option& file = list.Add("--floor", options.file,
+                          "Refuse what was signed before the time in this file; a yes raises it");
+  list.Add("--remember", options.remember, "The same, with the floor kept for the tag in --home")
+      .Excludes(file);
 }
 
 KeepFloor::KeepFloor(const FloorOptions& options, SExpression& tag, bool raises)

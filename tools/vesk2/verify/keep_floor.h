@@ -6,10 +6,10 @@
 #ifndef VESK2_TOOLS_KEEP_FLOOR_H
 #define VESK2_TOOLS_KEEP_FLOOR_H
 
-#include <CLI/CLI.hpp>
 #include <optional>
 #include <string>
 
+#include "tools/vesk2/options/options.h"
 #include "tools/vesk2/say/report.h"
 #include "tools/vesk2/stores/floor.h"
 
@@ -19,7 +19,7 @@ struct FloorOptions {
   std::string file;
   bool remember = false;
 };
-void AddFloorOptions(CLI::App& app, FloorOptions& options);
+void AddFloorOptions(OptionList& list, FloorOptions& options);
 
 class KeepFloor {
  public:

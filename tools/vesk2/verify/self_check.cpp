@@ -68,8 +68,8 @@ bool ApprovesContent(const SelfCheck::Chain& chain, size_t index) {
 
 }  // namespace
 
-void AddStrictFlag(CLI::App& app, bool& strict) {
-  app.add_flag("--strict", strict, "Write nothing that this command warns of");
+void AddStrictFlag(OptionList& list, bool& strict) {
+  list.Add("--strict", strict, "Write nothing that this command warns of");
 }
 
 SelfCheck::SelfCheck() : now_(ParseTime("now", false)) {}

@@ -8,12 +8,13 @@
 #include <vector>
 
 #include "tools/vesk2/keys/issue.h"
+#include "tools/vesk2/options/options.h"
 
 #include <vesk2/acl_entry.h>
 
 namespace vesk2_command {
 
-void AddStrictFlag(CLI::App& app, bool& strict);
+void AddStrictFlag(OptionList& list, bool& strict);
 
 class SelfCheck {
  public:

@@ -90,11 +90,11 @@ std::string WhyBroken(CrlSequence* list, const std::string& path, SExpression* e
 
 }  // namespace
 
-void AddStoreCheckOptions(CLI::App& app, StoreCheck& check) {
-  app.add_flag("--ignore-broken-entries", check.ignoreEntries,
-               "Answer also when an ACL entry cannot be read");
-  app.add_flag("--ignore-broken-lists", check.ignoreLists,
-               "Answer also when a stored revocation list cannot be read or does not verify");
+void AddStoreCheckOptions(OptionList& list, StoreCheck& check) {
+  list.Add("--ignore-broken-entries", check.ignoreEntries,
+           "Answer also when an ACL entry cannot be read");
+  list.Add("--ignore-broken-lists", check.ignoreLists,
+           "Answer also when a stored revocation list cannot be read or does not verify");
 }
 
 std::set<std::string> CheckStores(const Question& question, const StoreCheck& check) {

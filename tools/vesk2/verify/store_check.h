@@ -6,11 +6,11 @@
 #ifndef VESK2_TOOLS_STORE_CHECK_H
 #define VESK2_TOOLS_STORE_CHECK_H
 
-#include <CLI/CLI.hpp>
 #include <set>
 #include <string>
 
 #include "tools/vesk2/explain/evidence.h"
+#include "tools/vesk2/options/options.h"
 
 namespace vesk2_command {
 
@@ -18,7 +18,7 @@ struct StoreCheck {
   bool ignoreEntries = false;
   bool ignoreLists = false;
 };
-void AddStoreCheckOptions(CLI::App& app, StoreCheck& check);
+void AddStoreCheckOptions(OptionList& list, StoreCheck& check);
 
 // CheckStores throws the Trouble for an entry that cannot be read, and for the stored list of a
 // source that an entry in force names when it cannot be read or does not verify; notes instead for
