@@ -3,6 +3,7 @@
 #include "src/engine/tag.h"
 
 #include "src/engine/budget.h"
+#include "src/engine/set_index.h"
 #include "src/engine/tag_forms.h"
 
 namespace ZvVesk2::Engine {
@@ -136,8 +137,9 @@ spki_relation spki_set_overlaps(spki_engine* engine, const spki_elem* set, const
   const spki_tag_class set_class = spki_classify(set);
   if (set_class == SPKI_TAG_ALL) return SPKI_REL_WIDER;
   if (set_class != SPKI_TAG_SET) return SPKI_REL_DISJOINT;
+  SetIndex index(engine, other, set);
   for (const spki_elem* m = spki_form_arguments(set); m != nullptr; m = m->next) {
-    if (Within(spki_cmp_elem(engine, m, other))) return SPKI_REL_OVERLAP;
+    if (Within(index.Relation(m))) return SPKI_REL_OVERLAP;
   }
   return SPKI_REL_DISJOINT;
 }

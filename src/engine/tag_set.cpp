@@ -3,14 +3,17 @@
 #include <utility>
 
 #include "src/engine/budget.h"
+#include "src/engine/chain.h"
+#include "src/engine/set_index.h"
 #include "src/engine/tag_forms.h"
 
 namespace ZvVesk2::Engine {
 namespace {
 
-// What one member and the other tag have in common; null for nothing.
-spki_elem_owner InCommon(spki_engine* engine, spki_elem* member, spki_elem* other) {
-  switch (spki_cmp_elem(engine, member, other)) {
+// What one member and the other tag, which is `relation` to it, have in common; null for nothing.
+spki_elem_owner InCommon(spki_engine* engine, spki_elem* member, spki_relation relation,
+                         spki_elem* other) {
+  switch (relation) {
     case SPKI_REL_EQUAL:
     case SPKI_REL_NARROWER:
       return spki_copy(engine, member);
@@ -28,15 +31,13 @@ spki_elem_owner InCommon(spki_engine* engine, spki_elem* member, spki_elem* othe
 class Members {
  public:
   explicit Members(spki_engine* engine)
-      : engine_(engine), first_(Own(engine, static_cast<spki_elem*>(nullptr))) {}
+      : engine_(engine), strings_(engine), first_(Own(engine, static_cast<spki_elem*>(nullptr))) {}
 
   // A set is taken apart, what is there already is dropped. False when there is no room or memory.
   bool Add(spki_elem_owner found) {
     if (found == nullptr) return engine_->budget.spent == 0;
     if (spki_classify(found.get()) == SPKI_TAG_SET) return AddMembersOf(found.get());
-    for (const spki_elem* present = first_.get(); present != nullptr; present = present->next) {
-      if (spki_cmp_elem(engine_, found.get(), present) == SPKI_REL_EQUAL) return true;
-    }
+    if (IsPresent(found.get())) return engine_->budget.spent == 0;
     if (count_ == Limits::kMaxSetMembers) engine_->budget.spent = SPKI_ERR_NO_MEM;
     if (engine_->budget.spent != 0) return false;
     ++count_;
@@ -56,6 +57,24 @@ class Members {
   }
 
  private:
+  // No string equals what is none: strings need be looked for among strings only.
+  bool IsPresent(const spki_elem* found) {
+    if (StringOf(found) != nullptr && count_ >= kPlainMembers) return !Enter(found);
+    for (const spki_elem* present = first_.get(); present != nullptr; present = present->next) {
+      if (spki_cmp_elem(engine_, found, present) == SPKI_REL_EQUAL) return true;
+    }
+    return false;
+  }
+  // Whether a string is new to the table, which is made of what is there when it is first needed.
+  bool Enter(const spki_elem* found) {
+    if (!tabled_) {
+      for (const spki_elem* present = first_.get(); present != nullptr; present = present->next) {
+        if (StringOf(present) != nullptr) strings_.Enter(StringOf(present));
+      }
+      tabled_ = true;
+    }
+    return strings_.Enter(StringOf(found));
+  }
   bool AddMembersOf(const spki_elem* set) {
     for (const spki_elem* m = spki_form_arguments(set); m != nullptr; m = m->next) {
       if (spki_charge_step(engine_) != 0 || !Add(spki_copy(engine_, m))) return false;
@@ -64,6 +83,8 @@ class Members {
   }
 
   spki_engine* engine_;
+  StringTable strings_;
+  bool tabled_ = false;
   spki_elem_owner first_;
   uint32_t count_ = 0;
 };
@@ -73,9 +94,10 @@ class Members {
 spki_elem* spki_intersect_set(spki_engine* engine, spki_elem* set, spki_elem* other) {
   if (spki_classify(set) != SPKI_TAG_SET) return nullptr;
   Members members(engine);
+  SetIndex index(engine, other, set);
   const spki_elem* head = spki_form_head(set);
   for (spki_elem* m = head->next->next; m != nullptr; m = m->next) {
-    if (!members.Add(InCommon(engine, m, other))) return nullptr;
+    if (!members.Add(InCommon(engine, m, index.Relation(m), other))) return nullptr;
   }
   return members.Finish();
 }

@@ -72,6 +72,19 @@ spki_status spki_definition_value(spki_engine* engine, const Digest& name,
   return spki_digest_finish(&sink.digest, out);
 }
 
+spki_status spki_string_value(spki_engine* engine, const spki_atom* string, Digest& out) {
+  size_t end = string->length;
+  if (const void* zero = end == 0 ? nullptr : std::memchr(string->data, 0, end)) {
+    end = static_cast<size_t>(static_cast<const unsigned char*>(zero) - string->data);
+  }
+  spki_digest_sink sink;
+  VESK2_TRY(spki_digest_start(engine, &sink.digest, ZVCLM_HASH_SHA256));
+  VESK2_TRY(sink.Put(&string->hint_length, sizeof string->hint_length));
+  VESK2_TRY(sink.Put(string->hint, string->hint_length));
+  VESK2_TRY(sink.Put(string->data, end));
+  return spki_digest_finish(&sink.digest, out);
+}
+
 spki_status spki_tuple_value(spki_engine* engine, const spki_tuple* tuple, Digest& out) {
   const Identity identity = {tuple->issuer, tuple->subject, tuple->threshold, tuple->member,
                              (tuple->reaches ? 2u : 0u) | (tuple->propagate ? 1u : 0u)};

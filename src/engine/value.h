@@ -17,6 +17,10 @@ namespace ZvVesk2::Engine {
 // That of a name (its value) as defined for a subject.
 [[nodiscard]] spki_status spki_definition_value(spki_engine* engine, const Digest& name,
                                                 const spki_principal* subject, Digest& out);
+// Strings are equal by spki_atom_equal when their values are: by the hint, and the bytes up to the
+// first 0.
+[[nodiscard]] spki_status spki_string_value(spki_engine* engine, const spki_atom* string,
+                                            Digest& out);
 // Tuples are equal when their values are: the principals and the threshold are the same, and the
 // canonical bytes of the lists and strings. By pointer or by the relation of their tags, delegation
 // in a circle would never end.

@@ -94,6 +94,10 @@ WorstLists ManyMembers(size_t bytes) {
   return Subset(Form("set", Fill(bytes / 2, "1:a")), Form("set", Fill(bytes / 2, "1:b")));
 }
 
+WorstLists ManyListsAsMembers(size_t bytes) {
+  return Subset(Form("set", Fill(bytes / 2, "(1:a)")), Form("set", Fill(bytes / 2, "(1:b)")));
+}
+
 WorstLists SetsOfLists(size_t bytes) {
   const auto list = [](const std::string& end) {
     return "(1:x" + Fill(300, "(1:y)") + Str(end) + ")";
@@ -301,7 +305,8 @@ constexpr WorstInput kInputs[] = {
     {"long prefixes against ranges", kSubset, LongPrefixes, 608},
     {"prefixes against bounds", kSubset, PrefixesAgainstBounds, 697},
     {"long strings", kSubset, LongStrings, 1},
-    {"many members", kSubset, ManyMembers, 3000},
+    {"many members", kSubset, ManyMembers, 470},
+    {"many lists as members", kSubset, ManyListsAsMembers, 3000},
     {"sets of lists", kSubset, SetsOfLists, 134},
     {"sets in sets", kSubset, SetsInSets, 4},
     {"overlapping lists", kSubset, OverlappingLists, 3000},
