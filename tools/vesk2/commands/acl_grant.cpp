@@ -86,7 +86,7 @@ ExitCode Run(const Options& options) {
   const std::string name = EntryName(options);
   const Ref<AclEntry> entry =
       MakeEntry({MakeSubject(ReadKeys(options), options.threshold), options.propagate,
-                 ParseTag(options.tag), ParsePeriod(options.period), options.comment});
+                 ParseTypedTag(options.tag), ParsePeriod(options.period), options.comment});
   const bool issuer = !options.issuerOf.empty();
   CheckGrant(*entry, issuer ? options.issuerOf : options.subjectOf, issuer, options.strict);
   GrantEntry(*entry, {name, options.flags});
@@ -111,7 +111,7 @@ Action DefineAclGrant(OptionList& list) {
                             "FILE:N for the N-th certificate [the last]");
   Option& other = list.Add("--subject-of", options->subjectOf,
                            "Or the subject in a chain or manifest: FILE, or FILE:N [the first]");
-  subject.Excludes(issuer).Excludes(other);
+  subject.Several().Excludes(issuer).Excludes(other);
   issuer.Excludes(other);
   list.Add("--threshold", options->threshold,
            "How many of the keys must agree: each certifies whom they mean to let")

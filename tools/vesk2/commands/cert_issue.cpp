@@ -65,7 +65,7 @@ Wish ReadRequest(const Options& options) {
     if (!wish.tag) throw FileTrouble(path, "asks for everything: --tag says how much", "usage");
     return wish;
   }
-  Ref<SExpression> tag = ParseTag(options.tag);
+  Ref<SExpression> tag = ParseTypedTag(options.tag);
   if (wish.tag && !tag->IsSubset(wish.tag.get())) {
     throw Trouble(
         "--tag " + TagText(tag.get()) + " is more than was requested, " + TagText(wish.tag.get()),
@@ -79,8 +79,8 @@ Wish ReadWish(const Options& options) {
   if (!options.request.empty()) return ReadRequest(options);
   if (options.subject.empty()) throw Trouble("nobody to certify: --subject or --request", "usage");
   if (options.tag.empty()) throw Trouble("--tag is required", "usage");
-  return {Ref<ZvVesk2::Subject>(ReadPublicKey(options.subject).Release()), ParseTag(options.tag),
-          ""};
+  return {Ref<ZvVesk2::Subject>(ReadPublicKey(options.subject).Release()),
+          ParseTypedTag(options.tag), ""};
 }
 
 Signers OpenSigners(const SignerOptions& options) {

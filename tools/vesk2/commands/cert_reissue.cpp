@@ -71,7 +71,7 @@ ExitCode Write(const Options& options, const Work& work, const Renewal& renewal,
 ExitCode Renew(const Options& options) {
   Work work = Open(options);
   Renewal renewal;
-  if (!options.tag.empty()) renewal.tag = ParseTag(options.tag);
+  if (!options.tag.empty()) renewal.tag = ParseTypedTag(options.tag);
   renewal.propagate = options.propagate;
   renewal.period = ParsePeriod(options.period);
   renewal.newPeriod = renewal.period.notBefore || renewal.period.notAfter;

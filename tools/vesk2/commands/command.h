@@ -25,6 +25,9 @@ struct Command {
   const char* examples;  // a command line a line
   Action (*define)(OptionList& list);
 };
+// "key new", or the noun alone.
+std::string CommandName(const Command& command);
+
 struct Noun {
   const char* name;
   const char* about;

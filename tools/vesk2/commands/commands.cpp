@@ -162,4 +162,8 @@ constexpr Command kCommands[] = {
 std::span<const Command> Commands() { return kCommands; }
 std::span<const Noun> Nouns() { return kNouns; }
 
+std::string CommandName(const Command& command) {
+  return *command.verb == '\0' ? command.noun : std::string(command.noun) + " " + command.verb;
+}
+
 }  // namespace vesk2_command

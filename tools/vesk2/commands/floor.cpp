@@ -42,7 +42,7 @@ std::string PathOf(const Options& options, const Ref<SExpression>& tag) {
 }
 
 Ref<SExpression> TagOf(const Options& options) {
-  return options.tag.empty() ? Ref<SExpression>() : ParseTag(options.tag);
+  return options.tag.empty() ? Ref<SExpression>() : ParseTypedTag(options.tag);
 }
 
 ExitCode Show(const Options& options) {
@@ -75,7 +75,7 @@ void RefuseLower(const Options& options, const std::string& path, SExpression& t
 }
 
 ExitCode Set(const Options& options) {
-  const Ref<SExpression> tag = ParseTag(options.tag);
+  const Ref<SExpression> tag = ParseTypedTag(options.tag);
   const Ref<TimeStamp> time = ParseTime(options.time, false);
   if (time->IsAfter(ParseTime("now", false).get())) {
     throw Trouble(StampText(*time) + " is yet to come: no floor lies past the present", "usage");

@@ -71,7 +71,7 @@ std::vector<SignedCert> Additions(const Options& options, const SignatureBlock& 
   const Ref<PublicKey> approver = key.Public();
   const ZvVesk2::Cert& content = *block.certs.front().cert;
   const Ref<SExpression> tag =
-      options.tag.empty() ? Ref<SExpression>::Share(content.GetTag()) : ParseTag(options.tag);
+      options.tag.empty() ? Ref<SExpression>::Share(content.GetTag()) : ParseTypedTag(options.tag);
   std::vector<SignedCert> added;
   added.push_back(
       IssueCert(key, {content.GetSubject(), false, tag.get()}, options.signer.algorithm));

@@ -35,7 +35,7 @@ ExitCode Answer(const Manifest& manifest, int code) {
   }
   const size_t same = CountFiles(manifest.GetValid());
   Result()["same_files"] = same;
-  if (code == 0) return Yes("both list the same, " + std::to_string(same) + " files");
+  if (code == 0) return Yes("both list the same, " + Plural(same, "file"));
   const ExitCode verdict = No(code, summary);
   for (const auto& [kind, names] : differences) {
     for (const std::string& name : names) Say(kind + ": " + Escape(name));

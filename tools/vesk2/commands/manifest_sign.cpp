@@ -136,7 +136,7 @@ void ShowListing(const Listing& listing) {
 
 std::string Totals(const Listing& listing) {
   const size_t ignored = listing.ignored.size();
-  return std::to_string(listing.files) + " files, " + std::to_string(listing.bytes) + " bytes" +
+  return Plural(listing.files, "file") + ", " + Plural(listing.bytes, "byte") +
          (ignored > 0 ? ", ignored: " + std::to_string(ignored) : "");
 }
 
@@ -150,7 +150,7 @@ Parts Prepare(const Options& options, const SigningKey& key, ManifestWriter& wri
   if (!options.grant.empty()) RequirePlainBounds(ParseTag(options.grant).get());
   const std::string creator = "libvesk2 " + LibraryVersion();
   Check(writer.SetHead(creator.c_str(), ParseTime(options.at, false).get()), kWriting);
-  Parts parts{options.tag.empty() ? Ref<SExpression>() : ParseTag(options.tag),
+  Parts parts{options.tag.empty() ? Ref<SExpression>() : ParseTypedTag(options.tag),
               SignersCerts(options, key)};
   AddLists(options, writer);
   return parts;

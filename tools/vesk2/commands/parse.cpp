@@ -4,7 +4,9 @@
 #include "tools/vesk2/commands/parse.h"
 
 #include <CLI/CLI.hpp>
-#include <algorithm>
+#include <charconv>
+
+#include "tools/vesk2/commands/words.h"
 
 #include <vesk2.h>
 
@@ -29,6 +31,22 @@ void AddCommonOptions(OptionList& list, Common& common) {
 
 // ---- From the list of options to the parser's ----
 
+CLI::Validator WithinLimits(const Option& option) {
+  const int lowest = option.lowest(), highest = option.highest();
+  std::string limits = "of at least " + std::to_string(lowest);
+  if (highest != std::numeric_limits<int>::max()) {
+    limits = "from " + std::to_string(lowest) + " to " + std::to_string(highest);
+  }
+  const auto refuse = [=](const std::string& value) {
+    int number = 0;
+    const auto [end, error] = std::from_chars(value.data(), value.data() + value.size(), number);
+    const bool read = error == std::errc() && end == value.data() + value.size();
+    return read && number >= lowest && number <= highest ? ""
+                                                         : value + " is not a number " + limits;
+  };
+  return {refuse, ""};
+}
+
 void AddToParser(CLI::App& app, const Option& option) {
   if (option.names() == kHelp) {
     app.set_help_flag(kHelp, option.about())->group(kCommonGroup);
@@ -43,9 +61,9 @@ void AddToParser(CLI::App& app, const Option& option) {
         }
       },
       option.target());
-  if (!option.IsOperand() && !option.IsFlag()) added->allow_extra_args(false);
+  if (!option.IsOperand() && !option.IsFlag()) added->allow_extra_args(option.several());
   if (!option.IsFlag() && !option.Repeats()) added->expected(1);
-  if (option.limited()) added->check(CLI::Range(option.lowest(), option.highest()));
+  if (option.limited()) added->check(WithinLimits(option));
   if (!option.choices().empty()) added->check(CLI::IsMember(option.choices()));
   if (!option.IsFlag()) {
     // A script whose variable is unset hands over an empty word. Taken for "not given", it would
@@ -114,18 +132,9 @@ class HelpText : public CLI::Formatter {
 
 // ---- The command line ----
 
-// The options of a command are defined when its words were met: those of the others take longer
-// than a small verification.
-void DefineCommand(CLI::App& app, const Command& command, CommandLine& line) {
-  app.preparse_callback([&](size_t) {
-    if (!line.command.empty()) return;
-    line.command = CommandName(command);
-    line.action = DefineOptions(command, line.options, line.common);
-    AddAllToParser(app, line.options);
-  });
-}
-
-void Define(CLI::App& app, CommandLine& line) {
+// The options of the chosen command only: defining those of the others takes longer than a small
+// verification.
+void Define(CLI::App& app, const Command* chosen, CommandLine& line) {
   app.formatter(std::make_shared<HelpText>(line.options));
   app.set_help_flag(kHelp, "Show this help");
   app.set_version_flag("--version", "vesk2 " + LibraryVersion() + " (" + Vesk2VersionExtra() + ")",
@@ -137,8 +146,8 @@ void Define(CLI::App& app, CommandLine& line) {
       if (std::string_view(command.noun) != noun.name) continue;
       const bool lone = *command.verb == '\0';
       if (!lone) group->require_subcommand(1);
-      DefineCommand(lone ? *group : *group->add_subcommand(command.verb, command.about), command,
-                    line);
+      CLI::App* own = lone ? group : group->add_subcommand(command.verb, command.about);
+      if (&command == chosen) AddAllToParser(*own, line.options);
     }
   }
   app.footer(
@@ -146,13 +155,12 @@ void Define(CLI::App& app, CommandLine& line) {
       "everything else on standard error.\n");
 }
 
-// The words behind the command's name, last first, as the parser takes them. It would read the word
-// behind "--option=" as the value: that value is empty.
-std::vector<std::string> ParserWords(int argc, const char* const* argv) {
+// The words, last first, as the parser takes them. It would read the word behind "--option=" as the
+// value: that value is empty.
+std::vector<std::string> ParserWords(const std::vector<std::string>& arranged) {
   std::vector<std::string> words;
   bool options = true;
-  for (int i = 1; i < argc; ++i) {
-    const std::string word = argv[i];
+  for (const std::string& word : arranged) {
     options = options && word != "--";
     const bool empty = options && word.starts_with("--") && word.find('=') + 1 == word.size();
     words.push_back(empty ? word.substr(0, word.size() - 1) : word);
@@ -188,10 +196,19 @@ std::vector<Option> DescribeOptions(const Command& command) {
 
 std::unique_ptr<CommandLine> ParseCommandLine(int argc, const char* const* argv) {
   auto line = std::make_unique<CommandLine>();
+  OptionList common;
+  AddCommonOptions(common, line->common);
+  const std::vector<std::string> words = ArrangeWords(argc, argv, common);
+  const Command* command = FindCommand(words);
+  if (command != nullptr) {
+    line->command = CommandName(*command);
+    line->action = DefineOptions(*command, line->options, line->common);
+    RequireKnownOptions(words, line->options);
+  }
   CLI::App app{"Signed manifests and SPKI certificates, checked offline.", "vesk2"};
   try {
-    Define(app, *line);
-    app.parse(ParserWords(argc, argv));
+    Define(app, command, *line);
+    app.parse(ParserWords(words));
   } catch (const CLI::ParseError& error) {
     if (error.get_exit_code() != 0) throw Trouble(Escape(error.what()), "usage");
     app.exit(error);  // --help and --version end the parsing, too
@@ -200,10 +217,6 @@ std::unique_ptr<CommandLine> ParseCommandLine(int argc, const char* const* argv)
   }
   CollectGiven(app, *line);
   return line;
-}
-
-std::string CommandName(const Command& command) {
-  return *command.verb == '\0' ? command.noun : std::string(command.noun) + " " + command.verb;
 }
 
 }  // namespace vesk2_command

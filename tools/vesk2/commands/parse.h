@@ -45,9 +45,6 @@ struct CommandLine {
 // Throws Trouble for what is no command line.
 std::unique_ptr<CommandLine> ParseCommandLine(int argc, const char* const* argv);
 
-// "key new", or the noun alone.
-std::string CommandName(const Command& command);
-
 }  // namespace vesk2_command
 
 #endif  // VESK2_TOOLS_PARSE_H

@@ -99,7 +99,7 @@ ExitCode Run(int argc, const char* const* argv) {
   } catch (const Trouble& trouble) {
     StartReport("", {.json = WantsJson(argc, argv)});
     const ExitCode code = FinishReport(trouble);
-    if (!GetStyle().json) Note("vesk2: --help after any subcommand shows its options");
+    if (!GetStyle().json) Note("vesk2: --help after any command shows its options");
     return code;
   }
   if (line->command.empty()) {

@@ -29,6 +29,34 @@ bool HasEmptyWord(const SExpression& list) {
   return false;
 }
 
+std::string WordAt(const SExpression::Iterator& it) {
+  const auto* word = it ? dynamic_cast<const ByteString*>(it.Value()) : nullptr;
+  if (word == nullptr) return "";
+  return {reinterpret_cast<const char*>(word->GetData()), word->GetLength()};
+}
+
+// What in a typed tag is likely to be meant otherwise; empty for nothing.
+std::string LikelyMistake(const SExpression& list) {
+  auto it = list.Begin();
+  const bool star = WordAt(it) == "*";
+  if (it) it.Next();
+  const std::string form = WordAt(it);
+  if (star && it && form != "set" && form != "prefix" && form != "range") {
+    return "(* " + (form.empty() ? "(" : Escape(form)) +
+           " ...) is none of (*), (* set ...), (* prefix ...), (* range ...)";
+  }
+  for (it = list.Begin(); it; it.Next()) {
+    const std::string word = WordAt(it);
+    if (word.starts_with('"') || word.starts_with('\'')) {
+      return "quotes would belong to the words; leave them out";
+    }
+    const auto* part = dynamic_cast<SExpression*>(it.Value());
+    const std::string inside = part == nullptr ? "" : LikelyMistake(*part);
+    if (!inside.empty()) return inside;
+  }
+  return "";
+}
+
 }  // namespace
 
 Buffer OpenBuffer(const std::string& path) {
@@ -140,6 +168,13 @@ Ref<SExpression> ParseTag(const std::string& text, const char* keyword) {
   Ref<SExpression> again;
   const Buffer buffer = WrapBytes(Canonical(*tag));
   Check(SExpression::Import(again.Out(), buffer.get(), nullptr), what);
+  return tag;
+}
+
+Ref<SExpression> ParseTypedTag(const std::string& text) {
+  Ref<SExpression> tag = ParseTag(text);
+  const std::string mistake = text == "*" ? "everything is \"(*)\"" : LikelyMistake(*tag);
+  if (!mistake.empty()) throw Trouble("tag \"" + Escape(text) + "\": " + mistake, "usage");
   return tag;
 }
 

@@ -78,6 +78,9 @@ std::string TagText(SExpression* tag);
 // for an empty tag, and for empty words: the reduction cannot read those, and one such entry in the
 // ACL store would stop every verification. The result is headed by `keyword`.
 Ref<SExpression> ParseTag(const std::string& text, const char* keyword = "tag");
+// The same of a tag that a person typed, where what is well-formed is likely to be meant otherwise:
+// quotes (the advanced form has none), a bare "*" and unknown forms of it.
+Ref<SExpression> ParseTypedTag(const std::string& text);
 // A byte string, null for an empty text.
 Ref<ByteString> MakeText(const std::string& text);
 

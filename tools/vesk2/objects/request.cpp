@@ -96,7 +96,7 @@ std::string ReadableTag(SExpression* tag) {
   const Text text(tag->ExportTag("tag"));
   if (!text) return "";
   try {
-    return ParseTag(text.get())->IsEqual(tag) ? text.get() : "";
+    return ParseTypedTag(text.get())->IsEqual(tag) ? text.get() : "";
   } catch (const Trouble&) {
     return "";
   }

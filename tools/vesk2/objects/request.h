@@ -30,8 +30,8 @@ Request ParseRequest(const std::string& text);
 // TellMember says the answer about one of several members, and adds it to "members" of the result.
 void TellMember(const Request& request, size_t index, int code);
 
-// The body of a tag as text that ParseTag reads back; empty when there is none, since the advanced
-// form has no quoting.
+// The body of a tag as text that ParseTypedTag reads back, for commands that are told to people;
+// empty when there is none, since the advanced form has no quoting.
 std::string ReadableTag(SExpression* tag);
 
 }  // namespace vesk2_command

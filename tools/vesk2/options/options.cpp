@@ -65,6 +65,11 @@ Option& Option::Once() {
   return *this;
 }
 
+Option& Option::Several() {
+  several_ = true;
+  return *this;
+}
+
 Option& Option::Choices(std::vector<std::string> choices) {
   choices_ = std::move(choices);
   return *this;

@@ -31,7 +31,8 @@ class Option {
       : names_(names), target_(target), about_(about) {}
 
   Option& Required(bool required = true);
-  Option& Once();  // of a list: a second mention is refused
+  Option& Once();     // of a list: a second mention is refused
+  Option& Several();  // of a list: a mention takes all words up to the next option
   Option& Choices(std::vector<std::string> choices);
   Option& Range(int lowest, int highest = std::numeric_limits<int>::max());
   // Preset says what holds unless the option is given; ShowPreset takes it from the target.
@@ -46,6 +47,7 @@ class Option {
   const std::vector<std::string>& choices() const { return choices_; }
   const std::string& preset() const { return preset_; }
   const std::vector<std::string>& excluded() const { return excluded_; }
+  bool several() const { return several_; }
   bool required() const { return required_; }
   bool common() const { return common_; }
   bool limited() const { return lowest_ <= highest_; }
@@ -80,6 +82,7 @@ class Option {
   std::vector<std::string> excluded_;
   bool required_ = false;
   bool once_ = false;
+  bool several_ = false;
   bool common_ = false;
   int lowest_ = 0;
   int highest_ = -1;

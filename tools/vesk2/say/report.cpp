@@ -154,6 +154,10 @@ std::string LibraryVersion() {
          std::to_string(number % 100);
 }
 
+std::string Plural(size_t count, const std::string& what) {
+  return std::to_string(count) + " " + what + (count == 1 ? "" : "s");
+}
+
 std::string CodeName(int code) {
   const char* name = ZvVesk2::V2CodeName(code);
   return name != nullptr ? name : "code " + std::to_string(code);

@@ -97,6 +97,9 @@ std::string Reason(int code);
 // The library's version, "1.1.0".
 std::string LibraryVersion();
 
+// "1 file", "2 files".
+std::string Plural(size_t count, const std::string& what);
+
 // Hexadecimal digits of `bytes`.
 std::string Hex(std::string_view bytes);
 
