@@ -1,5 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 // ByteString, an atom: bytes with a display hint, and the rule by which its array is reused.
+//
+// `data` is null until there were any bytes, the object's own `shortBytes` for up to kShort of
+// them, or an array from new[] that the object owns. `length` is what counts, not the array's size:
+// an array that was kept for a shorter string is larger, and only its beginning is the string.
 #include <vesk2/expression.h>
 
 #include <cstring>
@@ -17,6 +21,8 @@ namespace {
 // gets values of nearly the same length.
 constexpr unsigned kReuseSlack = 8;
 
+// Judges by the length that the string had, since the array's own size is not kept. So an array is
+// never reused for a longer string, not even one that would fit.
 bool IsReusable(const unsigned char* data, unsigned length, unsigned wanted) {
   return data != nullptr && length >= wanted && length - wanted < kReuseSlack;
 }
@@ -34,7 +40,8 @@ ByteString::~ByteString() { Clear(); }
 int ByteString::Set(const unsigned char* bytes, unsigned int size, BsType hint) {
   VESK2_REQUIRE(bytes != nullptr && size != 0, VESK2_ERR_INVALID_PARAM);
   VESK2_REQUIRE(size <= Limits::kMaxByteString, VESK2_ERR_MAX_BYTE_STRING);
-  // `bytes` may lie within the array that is replaced, so that one outlives the copy.
+  // `bytes` may lie within the array that is replaced, so that one outlives the copy. Within
+  // `shortBytes` they stay where they are, and may overlap with their new place.
   std::unique_ptr<unsigned char[]> replaced;
   if (data != shortBytes && !IsReusable(data, length, size)) {
     replaced.reset(std::exchange(data, nullptr));
@@ -52,6 +59,8 @@ int ByteString::Set(const char* text, BsType hint) {
   return Set(reinterpret_cast<const unsigned char*>(text), static_cast<unsigned>(size), hint);
 }
 
+// After success `data` is not null, also for 0 bytes; the hint is as it was. After a failure the
+// string is empty, never one with a length and no bytes.
 int ByteString::Reserve(unsigned int size) {
   if (!IsReusable(data, length, size)) {
     Clear();
@@ -68,12 +77,14 @@ void ByteString::Clear() {
   length = 0;
 }
 
+// The test of keywords. A string with a 0 byte in it equals no text, since a text ends there.
 bool ByteString::IsEqual(const char* text) const {
   if (text == nullptr) return false;
   const std::string_view wanted(text);
   return wanted.size() == length && (length == 0 || std::memcmp(wanted.data(), data, length) == 0);
 }
 
+// A string that never had bytes has null data, which the copy would take for a missing text.
 char* ByteString::ToString() {
   return ZVsysutil::zv_atof_copy_n(data != nullptr ? static_cast<const void*>(data) : "", length);
 }

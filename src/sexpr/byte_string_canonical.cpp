@@ -3,6 +3,9 @@
 //
 //   <length in decimal> ":" <bytes>                 in memory and in lengths
 //   ["[bin]" | "[utf-8]" | "[num]"] <the same>      in files and in digests that count hints
+//
+// 4:calc and [utf-8]4:calc are one string to every comparison, and two to a signature: what is
+// signed is the form with hints, and a key is named by the digest of the form without.
 #include <vesk2/expression.h>
 #include <vesk2/ref.h>
 
@@ -32,6 +35,7 @@ class Prefix {
   unsigned size_;
 };
 
+// Compares what is left with what is wanted: `pos + wanted` could wrap.
 bool Fits(unsigned pos, unsigned wanted, unsigned size) {
   return pos <= size && wanted <= size - pos;
 }
@@ -43,6 +47,8 @@ bool Fits(unsigned pos, unsigned wanted, unsigned size) {
 
 }  // namespace
 
+// Collects the hint with its brackets, as the table of hints has it, up to Limits::kMaxHint bytes
+// between them: the end of the input and a byte too many are the same error.
 int ReadHint(ZvCursor& cursor, ByteString::BsType& type) {
   VESK2_REQUIRE(cursor.Accept('['), VESK2_ERR_PARSE_FILE);
   char text[Limits::kMaxHint + 2] = "[";
@@ -61,6 +67,8 @@ int ReadHint(ZvCursor& cursor, ByteString::BsType& type) {
   return VESK2_ERR_PARSE_FILE;
 }
 
+// Reads over what the object held. Its array is reused where it fits, so the old bytes are gone
+// before it is known whether the new ones are good: after a failure the string is empty.
 int ByteString::Import(ZvBuffer* buffer) {
   VESK2_REQUIRE(buffer != nullptr, VESK2_ERR_PARAM_NULL);
   ZvCursor cursor(buffer);
@@ -88,8 +96,11 @@ int ByteString::ParseCanonical(DExpression*& out, unsigned char* buf, unsigned i
   return 0;
 }
 
+// Without the hint, as Export writes it. The length of a string near 4 GiB would wrap here; whoever
+// sums over a list counts in 64 bits.
 unsigned int ByteString::CanonicalLength() { return AtomText::PrefixSize(length) + length; }
 
+// Where the prefix fits and the bytes do not, the prefix is written and `pos` is behind it.
 int ByteString::Export(unsigned char* buf, unsigned int& pos, unsigned int size) {
   VESK2_REQUIRE(buf != nullptr, VESK2_ERR_INVALID_PARAM);
   const Prefix prefix(length);

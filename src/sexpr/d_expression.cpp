@@ -1,6 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 // What byte strings and lists have in common: counting, equality, digests, and the literal match of
 // the memory readers.
+//
+// A value lies either in memory of its own (place 0) or in a block that a reader cut it from; Free
+// gives the memory back accordingly. Counts are plain integers: a value belongs to one thread, and
+// so does every value that it shares with another.
 #include <vesk2/expression.h>
 
 #include <cstring>
@@ -39,7 +43,9 @@ void DExpression::Free() {
   Free(drops);
 }
 
-// What stands in a block is a ByteString or an SExpression, and nothing derived from them.
+// What stands in a block is a ByteString or an SExpression, and nothing derived from them: their
+// sizes are known without asking. `drops` gathers the memory of one block, so that many values that
+// go together cost one atomic operation. Place and kind are read before the destructor ends them.
 void DExpression::Free(ZvDrops& drops) {
   if (--refCount > 0) return;
   if (place == 0) {
@@ -59,6 +65,7 @@ bool DExpression::IsEqual(DExpression* other) {
 
 namespace {
 
+// Hints do not count: they say how a string is shown, not which it is.
 bool SameBytes(const DExpression* a, const DExpression* b) {
   const auto* first = static_cast<const ByteString*>(a);
   const auto* second = static_cast<const ByteString*>(b);
@@ -70,7 +77,8 @@ bool SameBytes(const DExpression* a, const DExpression* b) {
 }  // namespace
 
 // Equal structure and equal encoding without hints are one: every length is written before its
-// bytes. So both are walked in step, up to the first difference.
+// bytes. So both are walked in step, up to the first difference, at no cost of digests or memory.
+// Where both are nested too deeply at the same place, nothing says that they go on alike.
 int CompareValues(bool& equal, DExpression* a, DExpression* b) {
   equal = false;
   if (a == nullptr || b == nullptr || a->IsSExpression() != b->IsSExpression()) return 0;
@@ -91,6 +99,7 @@ int CompareValues(bool& equal, DExpression* a, DExpression* b) {
   return 0;
 }
 
+// Both results are set at the very end, after all that can fail.
 int DExpression::ComputeHash(unsigned char*& digest, unsigned int& digestLength, ZvclmHashID id,
                              bool ignoreHints) {
   VESK2_REQUIRE(digest == nullptr, VESK2_ERR_INVALID_PARAM);
@@ -115,7 +124,8 @@ int DExpression::Expect(const char* text, const unsigned char* buf, unsigned int
   VESK2_REQUIRE(text != nullptr && buf != nullptr, VESK2_ERR_INVALID_PARAM);
   const size_t length = std::strlen(text);
   // The index starts at `pos`, not at 0: stored texts that only this rule accepts must stay
-  // readable.
+  // readable. Where `pos` is at or behind the end of `text`, nothing is compared. Both terms of
+  // pos + i are bounded first, so nothing outside of `buf` is read.
   for (size_t i = pos; i < length; ++i) {
     VESK2_REQUIRE(i < size && pos < size - i, VESK2_ERR_BUFFER_OVERFLOW);
     VESK2_REQUIRE(static_cast<unsigned char>(text[i]) == buf[pos + i], VESK2_ERR_UNEXPECTED_CHAR);

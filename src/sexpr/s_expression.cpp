@@ -1,6 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 // SExpression as a list: nodes, and who owns the elements. A list takes over the reference of what
 // is inserted and hands it back with what is removed.
+//
+// Nodes are linked forward only: lists are built once and read many times, and removal, which has
+// to search, is rare. A node lies in one of three places, which its `place` tells: in the list
+// itself (kOwn), in memory of its own (kAlone), or in a reader's block. An own node that was given
+// out is not used again before the list is emptied.
 #include <vesk2/expression.h>
 #include <vesk2/ref.h>
 
@@ -32,6 +37,7 @@ void SExpression::Link(Node* node) {
   last = node;
 }
 
+// Gives back a node's memory, not its element. Those of one block go together when `drops` ends.
 void SExpression::DeleteNode(Node* node, ZvDrops& drops) {
   if (node->place == Node::kOwn) return;
   if (node->place == Node::kAlone) {
@@ -43,6 +49,7 @@ void SExpression::DeleteNode(Node* node, ZvDrops& drops) {
 
 // ---- Building ----
 
+// The value is inserted last, so a failure leaves its reference with the caller.
 int SExpression::Create(SExpression*& out, const char* tag, ByteString* value,
                         Vesk2ContextStruct* context) {
   out = nullptr;
@@ -103,7 +110,13 @@ int SExpression::Remove(DExpression* value) {
 
 // The nodes of a list that only its parent holds go into the chain before it is freed, so that no
 // destructor nests, however deeply the lists do. Its own node comes again behind them, since some
-// stand in the list.
+// stand in the list. For (a (b c) d):
+//
+//   chain at the inner list:   (b c) -> d
+//   spliced in front:          b -> c -> (b c), now empty -> d
+//
+// Each node is met at most twice, so the cost is linear. A list that others hold too keeps its
+// elements and only loses this reference.
 void SExpression::DeleteNodes() {
   ZvDrops drops;
   Node* chain = std::exchange(first, nullptr);
@@ -137,6 +150,7 @@ unsigned int SExpression::Count() const {
   return count;
 }
 
+// Linear: each call makes a list of all that remains. A walk of a list goes by its iterator.
 SExpression* SExpression::Rest() {
   Ref<SExpression> rest(TryNew<SExpression>(GetContext()));
   if (!rest || first == nullptr) return rest.Release();

@@ -5,6 +5,9 @@
 //
 // A token may be empty, and the first element always is one, so "()" holds an empty byte string and
 // so does "((a) b)", in first place.
+//
+// The form has no quoting. A byte string that holds a blank or a parenthesis is written as it is,
+// and is read back as something else; the canonical form is the one that decides and is stored.
 #include <vesk2/expression.h>
 #include <vesk2/ref.h>
 
@@ -26,7 +29,8 @@ using Step = Walk::Step;
 [[nodiscard]] int ReadList(Ref<DExpression>& out, const char* text, unsigned& pos,
                            Vesk2ContextStruct* context, unsigned level);
 
-// Reads a token, or a list of nesting `level`, and appends it.
+// Reads a token, or a list of nesting `level`, and appends it. `pos` is at its first byte, which is
+// no white space. The recursion over lists is as deep as Limits::kMaxDepth allows.
 [[nodiscard]] int ReadElement(SExpression& list, const char* text, unsigned& pos,
                               Vesk2ContextStruct* context, unsigned level) {
   Ref<DExpression> element;
@@ -37,6 +41,7 @@ using Step = Walk::Step;
   return 0;
 }
 
+// A list cannot be empty after this reader: its head is a token whatever stands there.
 [[nodiscard]] int ReadList(Ref<DExpression>& out, const char* text, unsigned& pos,
                            Vesk2ContextStruct* context, unsigned level) {
   VESK2_REQUIRE(level <= Limits::kMaxDepth, VESK2_ERR_INVALID_S_EXPRESSION);
@@ -57,7 +62,7 @@ using Step = Walk::Step;
   return 0;
 }
 
-// Positions are 32 bits wide.
+// Positions are 32 bits wide: in a longer text they would wrap, and the readers never end.
 bool IsTooLong(const char* text) { return std::strlen(text) >= Limits::kMaxExport; }
 
 // The part of "(tag body)" that is `body`; for an empty tag, what is between the parentheses. Null
@@ -81,6 +86,8 @@ int SExpression::ParseAdvanced(DExpression*& out, const char* text, unsigned int
   return 0;
 }
 
+// The whole text is one list: what follows it is an error, not ignored as in the other readers,
+// since a person who typed more meant it.
 int SExpression::ParseAdvanced(SExpression*& out, const char* text, Vesk2ContextStruct* context) {
   VESK2_REQUIRE(out == nullptr && text != nullptr, VESK2_ERR_INVALID_PARAM);
   VESK2_REQUIRE(!IsTooLong(text), VESK2_ERR_INVALID_S_EXPRESSION);
@@ -109,6 +116,8 @@ int SExpression::ParseTagAdvanced(SExpression*& out, const char* text, const cha
   return 0;
 }
 
+// Counts three for each list, its parentheses and a terminator, and for each string one more than
+// its bytes: larger than the text, as ExportAdvanced's strict bounds need it.
 unsigned int SExpression::AdvancedLength() {
   uint64_t length = 0;
   Walk walk(this);
@@ -121,6 +130,7 @@ unsigned int SExpression::AdvancedLength() {
   return length < UINT_MAX ? static_cast<unsigned>(length) : UINT_MAX;
 }
 
+// "(" needs a byte behind it and ")" two, of which one takes the final 0.
 int SExpression::ExportAdvanced(unsigned char* buf, unsigned int& pos, unsigned int size) {
   VESK2_REQUIRE(buf != nullptr, VESK2_ERR_INVALID_PARAM);
   Walk walk(this);
@@ -142,6 +152,8 @@ int SExpression::ExportAdvanced(unsigned char* buf, unsigned int& pos, unsigned 
   return 0;
 }
 
+// Each level counts one up from `depth`, and parentheses are written where the count is above 0: at
+// depth 0 (a (b c)) prints as "a (b c)". 64 bits, since callers may pass the largest int.
 int SExpression::PrintAdvanced(int (*write)(const char* text, unsigned int length, void* user),
                                void* user, int depth) {
   if (write == nullptr) return 0;
@@ -158,6 +170,9 @@ int SExpression::PrintAdvanced(int (*write)(const char* text, unsigned int lengt
   return 0;
 }
 
+// The body is moved to the front of the array that holds the whole text, so one array serves both.
+// The head is compared as text, so a keyword "tag x" with a blank in it passes for the keyword
+// "tag": a text says less than the tag does, and what must be exact compares tags.
 char* SExpression::ExportTag(const char* tag) {
   const unsigned int size = AdvancedLength();
   if (size > Limits::kMaxExport) return nullptr;

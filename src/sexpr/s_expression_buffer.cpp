@@ -4,6 +4,10 @@
 //   "(" { <byte string, hint allowed> | <list> } ")"
 //
 // without white space. Empty lists and lists in first place are fine here.
+//
+// This is the reader of files and of all that was signed. Of the three readers it is the strict
+// one: it compares every byte, and keeps hints, which signatures cover. What follows the list stays
+// in the buffer for the caller to judge.
 #include <vesk2/expression.h>
 #include <vesk2/ref.h>
 
@@ -16,11 +20,14 @@
 namespace ZvVesk2 {
 namespace {
 
+// Holds the buffer's position until it is destroyed; after a failure the buffer stands where the
+// text stopped making sense.
 class BufferReader {
  public:
   BufferReader(ZvBuffer* buffer, Vesk2ContextStruct* context) : cursor_(buffer), values_(context) {}
 
-  // Reads a list of nesting `level`.
+  // Reads a list of nesting `level`. The end of the input is no ")", so it ends the loop and is an
+  // error behind it. `out` is set on success only.
   [[nodiscard]] int ReadList(Ref<SExpression>& out, unsigned level) {
     VESK2_REQUIRE(level <= Limits::kMaxDepth, VESK2_ERR_PARSE_FILE);
     VESK2_REQUIRE(cursor_.Accept('('), VESK2_ERR_PARSE_FILE);
@@ -48,6 +55,7 @@ class BufferReader {
     return Append(to, std::move(string));
   }
 
+  // Takes the reference over even where it fails: it is the reader's own.
   template <typename T>
   [[nodiscard]] int Append(SExpression& to, Ref<T> value) {
     VESK2_TRY(values_.Insert(to, value.get()));

@@ -1,5 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 // Lists in canonical form, "(" elements ")", written, measured and hashed.
+//
+// Four visitors of one walk (Walk::Through): Writer and Measure leave hints out, Printer puts them
+// in, Feeder is told. One walk for all means that the length, the bytes and the digest of a list
+// cannot disagree about its order. Derived strings are asked by their virtual functions.
 #include <vesk2/expression.h>
 
 #include <climits>
@@ -14,17 +18,20 @@
 namespace ZvVesk2 {
 namespace {
 
-// Whose bytes behind those that are written are whose: an array that is filled up to its end may be
-// written ahead.
+// Whose the bytes behind the written ones are. In an array of our own, which is filled to its end,
+// a short string may be copied with what is behind it; a caller's bytes beyond `pos` must stay.
 enum class Behind { kOurs, kTheCallers };
 
-// The room that a byte string surely fits into with all that may stand before it.
+// The room that a byte string surely fits into with all that may stand before it, and that
+// AtomText::Write may touch.
 size_t SafeRoom(const ByteString& string) {
   return AtomText::kMaxHint + AtomText::kMaxPrefix + AtomText::Room(string);
 }
 
 // Writes a list at `pos`. Each parenthesis needs `spare` further bytes of room for the outermost
-// list, one for lists within.
+// list, one for lists within. In a caller's array that is one byte beyond the last ")", as programs
+// have always had to give it. An array of exactly CanonicalLength() bytes has none to spare; there
+// the lists within find theirs in the ")" that is still to come.
 struct Writer {
   [[nodiscard]] int Parenthesis(char which, unsigned level) {
     const unsigned needed = level == 1 ? spare : 1;
@@ -54,6 +61,7 @@ struct Writer {
   unsigned pos;
 };
 
+// Counts in 64 bits: elements that are shared can sum to more than any array holds.
 struct Measure {
   [[nodiscard]] int Parenthesis(char /*which*/, unsigned /*level*/) {
     ++length;
@@ -68,6 +76,7 @@ struct Measure {
   uint64_t length = 0;
 };
 
+// The form of files: hints are written, by the strings themselves.
 struct Printer {
   [[nodiscard]] int Parenthesis(char which, unsigned /*level*/) {
     return ZVsysutil::zv_write(stream, &which, 1) == 1 ? 0 : VESK2_ERR_WRITE_FILE;
@@ -77,7 +86,10 @@ struct Printer {
   FILE* stream;
 };
 
-// Texts go straight into the block of the running hash as long as there is room.
+// Texts go straight into the block of the running hash as long as there is room. `at` and `end` are
+// the hash's own `next` and `end`, held here for the loop; they are handed back before the hash is
+// called and read again after it. Write may scribble behind a short string's end: that is the
+// block's free part.
 struct Feeder {
   [[nodiscard]] int Parenthesis(char which, unsigned /*level*/) {
     const auto byte = static_cast<unsigned char>(which);
@@ -149,6 +161,7 @@ int SExpression::PrintCanonical(FILE* stream) {
   return 0;
 }
 
+// The hash gets its position back in any case: after a failure it holds what came before.
 int SExpression::UpdateHash(ZVCLMHashContextData* hash, bool ignoreHints) {
   VESK2_REQUIRE(hash != nullptr, ZVCLM_ERR_NULL_PARAM);
   Feeder feeder{hash, ignoreHints, hash->next, hash->end};

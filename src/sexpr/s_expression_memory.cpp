@@ -5,7 +5,13 @@
 //
 // with white space also before the "(". The first element is always read as a byte string: a "(" in
 // its place is taken for the separator of an empty one. An empty list ends before its ")".
-// Both are kept because texts in stores read so.
+//
+//   ((1:a))    a list of "" and "a"; the last ")" is left unread
+//   (1:a())    a list of "a" and (); the last ")" is left unread
+//   (3;abc)    like (3:abc): separators behind position 0 are not compared (DExpression::Expect)
+//
+// Programs hold texts that read in no other way, so each of these stays. Whoever wants to know that
+// a text is whole asks whether `pos` is at its end.
 #include <vesk2/expression.h>
 #include <vesk2/ref.h>
 
@@ -17,6 +23,8 @@ namespace ZvVesk2 {
 namespace {
 
 // Looks for the last list, in the order in which they close, that is headed by `tag`.
+// The innermost of two that nest closes first, so the outer one wins; of two beside one another the
+// later one does. The list that is read as a whole is never tested.
 struct Search {
   const char* tag;
   SExpression* found = nullptr;
@@ -28,13 +36,15 @@ struct Search {
   }
 };
 
+// Every read is bounded by `size_`: lengths that lead beyond it are VESK2_ERR_BUFFER_OVERFLOW.
 class MemoryReader {
  public:
   MemoryReader(unsigned char* buf, unsigned size, unsigned& pos, Vesk2ContextStruct* context,
                Search* search)
       : buf_(buf), size_(size), pos_(pos), values_(context), search_(search) {}
 
-  // Reads a list of nesting `level`.
+  // Reads a list of nesting `level`. It returns before the ")" of an empty list: within another
+  // list, that ")" then ends the outer one.
   [[nodiscard]] int ReadList(Ref<DExpression>& out, unsigned level) {
     VESK2_REQUIRE(level <= Limits::kMaxDepth, VESK2_ERR_INVALID_S_EXPRESSION);
     SkipSpace();
@@ -52,7 +62,8 @@ class MemoryReader {
     while (pos_ < size_ && IsSpace(buf_[pos_])) ++pos_;
   }
 
-  // Whether there is a byte that an element or a ")" can begin with.
+  // Whether there is a byte that an element or a ")" can begin with. A 0 byte is none, so that a
+  // text that ends in one before its time is malformed rather than a list of empty strings.
   [[nodiscard]] int Look() const {
     VESK2_REQUIRE(pos_ < size_, VESK2_ERR_BUFFER_OVERFLOW);
     VESK2_REQUIRE(buf_[pos_] != '\0', VESK2_ERR_INVALID_S_EXPRESSION);

@@ -10,7 +10,8 @@ namespace ZvVesk2 {
 // CompareValues is DExpression::IsEqual, but says when it cannot tell: where "not equal" would mean
 // "not revoked", that must not pass for it. It allocates nothing and stops at the first difference;
 // values that are the same down to lists nested too deeply give VESK2_ERR_BUFFER_OVERFLOW. Null
-// equals nothing.
+// equals nothing, not even null. Display hints do not count: adding one to a key must not make it
+// another key that no list revokes. `equal` is false after a failure.
 [[nodiscard]] int CompareValues(bool& equal, DExpression* a, DExpression* b);
 
 }  // namespace ZvVesk2

@@ -4,7 +4,12 @@
 //   <root>/<directory>/<base name><extension>    in a store
 //   <name><extension>                            as a path of its own
 //
-// The extension is appended unless the name ends in it already.
+// The extension is appended unless the name ends in it already. So in the home store /h an entry
+// "x/y/root" lies at /h/acl/root.acl, and "root.txt" at /h/acl/root.txt.acl.
+//
+// The rule for names is the store's guard: inside a store only the last component of a name counts,
+// so that no name, whoever chose it, leads to another directory. A name without one is refused, and
+// so is a path that would have to be cut.
 #include <vesk2/context.h>
 #include <vesk2/expression.h>
 
@@ -27,6 +32,7 @@ bool IsEmpty(const char* text) {
   return text == nullptr || ZVsysutil::zv_filenamecmp(text, "") == 0;
 }
 
+// Every type but the global one means the home store: callers pass numbers that are none.
 const char* Root(StorageType type) {
   return type == StorageGlobal ? VeskConf::GetGlobalDirectory() : VeskConf::GetHomeDirectory();
 }
@@ -46,6 +52,8 @@ bool IsFileName(const char* name) {
   return true;
 }
 
+// A class without a directory of its own (keys, requests) lies where its name says, whatever its
+// storage type.
 bool HasStore(const char* dirName, StorageType type) {
   return type != StoragePath && !IsEmpty(dirName);
 }
@@ -85,6 +93,7 @@ int FilePath(std::unique_ptr<char[]>& out, const char* dirName, const char* exte
   const bool whole = HasStore(dirName, type) ? StorePath(path, dirName, name, type)
                                              : ZVsysutil::zv_fstrcpy(path, sizeof path, name);
   VESK2_REQUIRE(whole, VESK2_ERR_FILE_OPEN);
+  // Only this very extension counts: "a.txt" becomes "a.txt.acl".
   const char* present = ZVsysutil::zv_extname(path);
   const bool extended = present != nullptr && ZVsysutil::zv_filenamecmp(present, extension) == 0;
   out.reset(extended ? ZVsysutil::zv_fstrdup(path) : ZVsysutil::zv_concat_string(path, extension));
@@ -96,6 +105,8 @@ char* SExpression::CalcDir(const char* dirName, StorageType type) {
   return StoreDirectory(directory, dirName, type) == 0 ? directory.release() : nullptr;
 }
 
+// Computing a path makes its directory, unlike FilePath: programs compute the path of a new object
+// and write there.
 char* SExpression::CalcPath(const char* dirName, const char* extension, const char* name,
                             StorageType type) {
   std::unique_ptr<char[]> path;
@@ -118,6 +129,7 @@ int SExpression::SetFileName(const char* name) {
   return fileName != nullptr ? 0 : VESK2_ERR_MEM_ALLOC;
 }
 
+// For a path that was computed already, or that the caller gave as it is to be used.
 int SExpression::SetFilePath(const char* path) {
   VESK2_REQUIRE(path != nullptr, VESK2_ERR_INVALID_PARAM);
   const std::unique_ptr<char[]> replaced(fileName);
@@ -134,6 +146,9 @@ int SExpression::CreateFileDirectory() {
   return MakeDirectory(directory.get(), storageType);
 }
 
+// A store's file is opened so that no link is followed: others may write beside it, and an object
+// must not overwrite what a link of theirs points at. A path of its own is the caller's choice, so
+// a link there is meant. The first failure is returned, and the file is closed in any case.
 int SExpression::Export(const char* name) {
   VESK2_TRY(CreateFileDirectory());
   if (name != nullptr) VESK2_TRY(SetFileName(name));
@@ -142,6 +157,7 @@ int SExpression::Export(const char* name) {
       storageType == StorageGlobal ? ZVsysutil::ZV_WRITE_SHARED : ZVsysutil::ZV_WRITE_STORE;
   ZVsysutil::ZvFileOwner file;
   const int opened = ZVsysutil::zv_open(file, fileName, isOwnPath ? ZVsysutil::ZV_WRITE : stored);
+  // Whatever stops the opening is one code, but not a lack of memory: it is no fault of the path.
   VESK2_REQUIRE(opened != VESK2_ERR_MEM_ALLOC, VESK2_ERR_MEM_ALLOC);
   VESK2_REQUIRE(opened == 0, VESK2_ERR_FILE_OPEN);
   const int printed = PrintCanonical(ZVsysutil::zv_stream(file.get()));

@@ -11,6 +11,9 @@
 
 namespace ZvVesk2 {
 
+// Why there is none matters: a store that is not configured has nothing in it, but one whose path
+// could not be allocated may hold the revocation that decides.
+
 // StoreDirectory is CalcDir. VESK2_ERR_FIND_DIR when the root is not set or the path is too long,
 // VESK2_ERR_MEM_ALLOC.
 [[nodiscard]] int StoreDirectory(std::unique_ptr<char[]>& out, const char* dirName,

@@ -1,6 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 // Values and nodes for readers of whole expressions, which make them by the thousand: cut from
 // blocks. To whoever holds one it is a value like any other.
+//
+// Where a value lies is known by its `place`, the distance to its block's start, 0 for memory of
+// its own; DExpression::Free and SExpression::DeleteNode give it back accordingly. The blocks
+// outlive this object as long as anything in them does. Only ByteString and SExpression themselves
+// are made here, never a class derived from them: Free and AtomText::IsPlain rest on that.
 #ifndef VESK2_SRC_SEXPR_VALUE_BLOCKS_H
 #define VESK2_SRC_SEXPR_VALUE_BLOCKS_H
 
@@ -19,18 +24,22 @@ class ValueBlocks {
  public:
   explicit ValueBlocks(Vesk2ContextStruct* context) : context_(context) {}
 
-  // Null without memory.
+  // Null without memory; else a value with one reference, the caller's, released by Free like all
+  // others.
   ByteString* NewString() { return New<ByteString>(); }
   SExpression* NewList() { return New<SExpression>(); }
 
-  // Reads into a new string, which nobody else knows yet: ByteString::Import.
+  // Reads into a new string, which nobody else knows yet: ByteString::Import, but after a failure
+  // the string may hold anything, and is only to be freed.
   [[nodiscard]] static int Read(ByteString& string, ZvCursor& cursor) {
     const auto keep = [&](const unsigned char* bytes, unsigned size) {
       return Fill(string, bytes, size, cursor.Remaining());
     };
     return ReadAtom(cursor, string.type, keep);
   }
-  // Makes a new string hold `size` bytes, of `available` that may be read. Null are no bytes yet.
+  // Makes a new string hold `size` bytes, of `available` that may be read. Null `bytes` only make
+  // the room: the length was stated, but the input ends before it. The string must be new, since
+  // the short form drops its array without releasing it.
   [[nodiscard]] static int Fill(ByteString& string, const unsigned char* bytes, unsigned size,
                                 size_t available) {
     if (size > ByteString::kShort || available < ByteString::kShort || bytes == nullptr) {
@@ -38,14 +47,15 @@ class ValueBlocks {
       if (bytes != nullptr) std::memcpy(string.data, bytes, size);
       return 0;
     }
-    // A copy of a fixed size is three instructions; what it brings too much nobody sees.
+    // A copy of a fixed size is three instructions. What is behind `size` are the input's next
+    // bytes, within `available`; nobody reads them, since `length` bounds every reader.
     std::memcpy(string.shortBytes, bytes, ByteString::kShort);
     string.data = string.shortBytes;
     string.length = size;
     return 0;
   }
 
-  // SExpression::Insert.
+  // SExpression::Insert, with the node cut from a block once the list's own nodes are used up.
   [[nodiscard]] int Insert(SExpression& list, DExpression* value) {
     SExpression::Node* node = nullptr;
     if (list.ownUsed < SExpression::kOwnNodes) {
@@ -68,7 +78,7 @@ class ValueBlocks {
     void* const memory = blocks_.Cut(sizeof(T), place);
     if (memory == nullptr) return nullptr;
     T* const made = ::new (memory) T(context_);
-    made->place = place & 0x7fffffff;
+    made->place = place & 0x7fffffff;  // blocks are far smaller than 2 GiB: no bit is lost
     return made;
   }
 
