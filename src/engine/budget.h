@@ -36,8 +36,9 @@ inline constexpr size_t kSingleBytesPerUnit = 8;
 inline constexpr size_t kHashedBytesPerUnit = 8;
 inline constexpr size_t kUnitsPerHash = 64;
 
-// Adds `amount` to one of the budget's counters. 0, or the code that the reduction must end with:
-// `code` when this was too much, or whatever was spent before.
+// Adds `amount` to one of the budget's counters, which never exceed their limits. 0, or the code
+// that the reduction must end with: `code` when this was too much, or whatever was spent before. A
+// budget that is spent stays spent, so a caller that overlooks one failure is stopped by the next.
 [[nodiscard]] inline spki_status spki_charge(spki_engine* engine, uint32_t spki_budget::*counter,
                                              size_t amount, uint32_t limit,
                                              spki_status code = SPKI_ERR_NO_MEM) {
@@ -52,7 +53,7 @@ inline constexpr size_t kUnitsPerHash = 64;
   return spki_charge(engine, &spki_budget::comparisons, units, Limits::kMaxComparisons, code);
 }
 
-// One step.
+// One step. Short strings that it leads to are paid with it.
 [[nodiscard]] inline spki_status spki_charge_step(spki_engine* engine,
                                                   spki_status code = SPKI_ERR_NO_MEM) {
   return spki_charge_units(engine, 1, code);

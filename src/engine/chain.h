@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// Reading chains: what stands at an element, null or -1 when it is something else.
+// Reading chains: what stands at an element, null or -1 when it is something else. Null is allowed
+// everywhere, so that a reader asks for a field of a field without a test between.
 #ifndef VESK2_SRC_ENGINE_CHAIN_H
 #define VESK2_SRC_ENGINE_CHAIN_H
 

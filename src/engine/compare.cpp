@@ -2,7 +2,8 @@
 // Order of byte strings, and equality of atoms.
 //
 // The order sees a 0 byte as the end: a string with an embedded 0 equals its beginning. Stored
-// grants are judged by it, so whoever issues a tag keeps 0 bytes out of it.
+// grants are judged by it, so whoever issues a tag keeps 0 bytes out of it. Bytes compare as
+// unsigned, and a shorter string as if 0 bytes followed.
 #include <algorithm>
 #include <cstring>
 
@@ -52,6 +53,7 @@ int spki_cmp_bytes(const unsigned char* a, size_t a_length, const unsigned char*
   return OrderOf((end < a_length ? a[end] : 0) - (end < b_length ? b[end] : 0));
 }
 
+// The longer string gives up what it has in front; where that is no padding, it is the greater.
 int spki_cmp_padded(const unsigned char* a, size_t a_length, const unsigned char* b,
                     size_t b_length, unsigned char pad) {
   if (a == nullptr || b == nullptr) return SPKI_ORDER_NONE;

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // A running hash that canonical text is fed to piece by piece: principals and names are known by
-// the digests of their canonical forms.
+// the digests of their canonical forms. No text is put together in memory for it: a derived tag,
+// which shares its parts, would be far larger than the engine's memory.
 #ifndef VESK2_SRC_ENGINE_DIGEST_H
 #define VESK2_SRC_ENGINE_DIGEST_H
 
@@ -18,8 +19,8 @@ struct spki_digest {
   spki_engine* engine = nullptr;
 };
 
-// Starts a hash with the engine's provider, which it and its pieces are charged to; `digest` is
-// fresh.
+// Starts a hash with the engine's provider; it and its pieces are charged to the engine, before the
+// work is done. `digest` is fresh, and ends with its frame.
 [[nodiscard]] spki_status spki_digest_start(spki_engine* engine, spki_digest* digest,
                                             ZvclmHashID id);
 // Feeds one piece; a null one and an empty one are skipped.

@@ -3,6 +3,9 @@
 //
 //   (acl (entry (subject <key>) [(propagate)] (tag ...)
 //               [(valid [(not-before d)] [(not-after d)])])...)
+//
+// <key> is the (public-key ...) list, or the (hash ...) of a key that no list held. The order is
+// part of the answer: of several grants, callers decide by the first.
 #include "src/engine/reduction.h"
 #include "src/engine/tag.h"
 #include "src/frame/check.h"
@@ -34,7 +37,7 @@ void FillEntry(spki_engine* engine, spki_elem* entry, const spki_tuple* tuple) {
   if (!tuple->propagate) spki_elem_assign(engine, &subject->next, tag);
 }
 
-// Appends the entry of a tuple behind `last`.
+// Appends the entry of a tuple behind *last, which moves on to it.
 [[nodiscard]] spki_status EmitEntry(spki_engine* engine, const spki_tuple* tuple,
                                     spki_elem** last) {
   spki_elem* list = nullptr;

@@ -10,7 +10,8 @@
 //         / (valid [(not-before d)] [(not-after d)])
 //   key   = (public-key ...) / (hash algorithm value)
 //
-// in any order; other fields say nothing here.
+// in any order, except that a subject name without a key comes behind the issuer; other fields say
+// nothing here. A field is a list, and bare words between them are passed over.
 #include "src/engine/fields.h"
 
 #include "src/engine/chain.h"
@@ -25,6 +26,8 @@ bool IsKey(const spki_elem* list) {
   return keyword == SPKI_KW_HASH || keyword == SPKI_KW_PUBLIC_KEY;
 }
 
+// Two of one kind are refused, here as for tags, issuers and subjects: whichever a reader took, the
+// issuer may have meant the other.
 [[nodiscard]] spki_status ReadPropagate(spki_engine* /*engine*/, spki_tuple* tuple,
                                         spki_elem* /*list*/) {
   VESK2_REQUIRE(!tuple->propagate, SPKI_ERR_TOO_MANY_PROPAGATE);
@@ -32,6 +35,7 @@ bool IsKey(const spki_elem* list) {
   return 0;
 }
 
+// The whole (tag ...) list, its head included: tags are compared and written out so.
 [[nodiscard]] spki_status ReadTag(spki_engine* engine, spki_tuple* tuple, spki_elem* list) {
   VESK2_REQUIRE(tuple->tag == nullptr, SPKI_ERR_TOO_MANY_TAGS);
   spki_elem_assign(engine, &tuple->tag, list);
@@ -57,6 +61,7 @@ bool IsKey(const spki_elem* list) {
   return 0;
 }
 
+// An entry of the ACL that named an issuer would be granted on somebody else's word.
 [[nodiscard]] spki_status ReadIssuer(spki_engine* engine, spki_tuple* tuple, spki_elem* list) {
   VESK2_REQUIRE(tuple->member != kSpkiAclEntry, SPKI_ERR_ACL_HAS_ISSUER);
   VESK2_REQUIRE(tuple->issuer == nullptr, SPKI_ERR_TOO_MANY_ISSUERS);
@@ -72,7 +77,8 @@ bool IsKey(const spki_elem* list) {
   return spki_resolve_principal(engine, key, &tuple->issuer);
 }
 
-// The names from `name` on.
+// The names from `name` on: K's N1's N2. Definitions can feed themselves, so the number of names
+// that are still to be resolved is bounded.
 [[nodiscard]] spki_status ReadNames(spki_engine* engine, spki_tuple* tuple, const spki_elem* name) {
   VESK2_REQUIRE(StringOf(name) != nullptr, SPKI_ERR_SUBJECT_SYNTAX);
   uint32_t count = 0;

@@ -3,7 +3,12 @@
 //
 // A grant from I to S is combined with what I received (someone grants to I, I grants to S) once it
 // reaches the requester, and with what S issued. Only grants that reach the requester are second in
-// a combination, so every derived one leads to it.
+// a combination, so every derived one leads to it: chains are built backwards from the requester,
+// and what leads elsewhere is filed and passed over.
+//
+// A tuple is filed before it is combined, so of each pair the later one finds the earlier. Where
+// both find each other, the second result equals the first and is not filed again; by that rule
+// delegation in a circle ends, too.
 #include "src/engine/budget.h"
 #include "src/engine/reduction.h"
 #include "src/frame/check.h"
@@ -13,6 +18,8 @@ namespace {
 
 [[nodiscard]] spki_status Begin(spki_reduction* run, spki_work* work, spki_tuple** made);
 
+// Puts an insertion on top. It takes a reference, and counts against the budget of tuples: of all
+// that are made, not of those that are kept.
 [[nodiscard]] spki_status Push(spki_reduction* run, spki_tuple* tuple) {
   spki_engine* engine = run->engine;
   VESK2_TRY(spki_charge(engine, &spki_budget::tuples, 1, Limits::kMaxTuples));
@@ -80,6 +87,8 @@ void Pop(spki_reduction* run) {
   return 0;
 }
 
+// Files a grant with its issuer. Where an equal one is filed this one ends: it would find nothing
+// that the other does not.
 [[nodiscard]] spki_status Issue(spki_reduction* run, spki_work* work) {
   spki_tuple* tuple = work->tuple;
   spki_entry** list = tuple->issuer == nullptr ? &run->engine->acl_tuples : &tuple->issuer->issued;

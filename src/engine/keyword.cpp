@@ -10,6 +10,7 @@
 namespace ZvVesk2::Engine {
 namespace {
 
+// A name that has no room for its final 0 does not compile.
 template <size_t Size>
 consteval spki_keyword_entry Row(const char (&name)[Size]) {
   static_assert(Size <= sizeof(spki_keyword_entry::name));
@@ -177,7 +178,7 @@ consteval KnownWord Word(const char (&name)[Size]) {
   return {name, IdOf(name)};
 }
 
-// In ascending order; the search starts in the middle, at "name".
+// In ascending order of bytes, which the search rests on; it starts in the middle, at "name".
 constexpr KnownWord kWords[] = {
     Word("*"),
     Word("a"),

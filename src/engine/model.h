@@ -22,14 +22,16 @@ namespace ZvVesk2::Engine {
 
 using spki_status = int;
 
-// The allocator that a caller hands to spki_engine_start.
+// The allocator that a caller hands to spki_engine_start. The pool keeps its address, so it has to
+// outlive the engine. `allocate` returns memory that is aligned for any record, or null.
 struct spki_allocator {
   void* (*allocate)(size_t size, void* user);
   void (*release)(void* memory, void* user);
   void* user;
 };
 
-// One byte string.
+// One byte string. Its bytes lie in the input, which has no 0 behind them; only what the engine
+// made up itself (the end of a prefix) belongs to the atom.
 struct spki_atom {
   spki_atom* link;    // next in the free list while released
   uint32_t refcount;  // saturating: a count that reaches the top stays there
@@ -41,6 +43,8 @@ struct spki_atom {
   const unsigned char* data;
 };
 
+// The first element of a list is of one of the first two kinds, every later one of the last two. A
+// head that is a keyword keeps no atom, and is written back as its keyword's row.
 enum spki_elem_kind : int32_t {
   SPKI_ELEM_KEYWORD = 1,  // a head that is a keyword
   SPKI_ELEM_HEAD = 2,     // a head that is not
@@ -48,7 +52,13 @@ enum spki_elem_kind : int32_t {
   SPKI_ELEM_LIST = 4,     // a nested list
 };
 
-// One element of a list; a list is the chain of its elements and known by its head.
+// One element of a list; a list is the chain of its elements and known by its head. Derived tags
+// share tails and nested lists with the tags that they come from, so a chain is not changed any
+// more once it is stored where others can find it. (3:tag(7:install3:app)) is
+//
+//   KEYWORD tag -> LIST
+//                   |
+//                  HEAD "install" -> STRING "app"
 struct spki_elem {
   spki_elem* link;
   uint32_t refcount;
@@ -115,25 +125,35 @@ struct spki_engine {
 // What spki_engine_start returns when the allocator yields nothing; the one positive failure.
 inline constexpr spki_status kSpkiNoPool = 16386;
 
+// Makes an empty engine with a pool of its own. 0, SPKI_ERR_NULL_PARAM, kSpkiNoPool, or
+// SPKI_ERR_NO_MEM; after a failure there is nothing to stop.
 [[nodiscard]] spki_status spki_engine_start(spki_engine* engine, const spki_allocator* allocator);
+// Gives all of the pool's memory back to the same allocator, whatever still points at it, and
+// leaves the engine empty. Export buffers are no part of the pool: spki_list_dispose comes first.
 void spki_engine_stop(spki_engine* engine, const spki_allocator* allocator);
 
-// Allocation from the engine's pool, counted against the budget of live records; null when there is
-// none or the budget is spent.
+// Allocation from the engine's pool, zero-filled, counted against the budget of live records; null
+// when there is none or the budget is spent, and then budget.spent is set: whoever goes on without
+// the memory cannot have the reduction succeed.
 void* spki_allocate(spki_engine* engine, size_t size);
+// Gives back what spki_allocate gave, and its part of the budget. Null is allowed.
 void spki_free(spki_engine* engine, void* memory);
-// The same for a record of at most 255 bytes that stays with the engine until it stops: parsing
-// takes hundreds of them, so they are cut from larger blocks.
+// The same for a record that stays with the engine until it stops: parsing takes hundreds of them,
+// so they are cut from larger blocks. One slab serves records of one size. They go to free lists,
+// never to spki_free.
 void* spki_allocate_record(spki_engine* engine, spki_slab* slab, size_t size);
 
 // ---- Records ----
 
+// Each has one reference, all else zero; null without memory.
 spki_elem* spki_elem_new(spki_engine* engine);
 spki_atom* spki_atom_new(spki_engine* engine);
-// Null is allowed.
+// Takes one reference away; with the last, what the record refers to is released too, an element's
+// `next` included. Null is allowed.
 void spki_elem_release(spki_engine* engine, spki_elem* elem);
 void spki_atom_release(spki_engine* engine, spki_atom* atom);
-// Counted store; a null slot releases the record given.
+// Counted store; a null slot releases the record given. The new reference is taken before the old
+// one is released, so a slot may be given what hangs from the very record that it holds.
 void spki_elem_assign(spki_engine* engine, spki_elem** slot, spki_elem* elem);
 void spki_atom_assign(spki_engine* engine, spki_atom** slot, spki_atom* atom);
 // Frees the export buffer at the list's `text` (delete[]) and releases the list. For the outermost
@@ -181,7 +201,10 @@ struct spki_keyword_entry {
   char name[24];
 };
 
+// The id of a word, -1 for any other. A word that goes on behind a 0 byte is the one before it.
 int32_t spki_keyword_id(const unsigned char* data, size_t length);
+// Never null: "???" for an id without a row. So a list headed by "sha256" is written back with
+// another head; the word is meant to stand behind "hash", where it keeps its own bytes.
 const spki_keyword_entry* spki_keyword_row(int32_t id);
 
 // ---- Comparison of byte strings ----
@@ -196,26 +219,35 @@ enum spki_order : int {
   SPKI_ORDER_NONE = 3
 };
 
+// A 0 byte is the end of its string, and a string is less than one that it begins.
 [[nodiscard]] int spki_cmp_cstr(const unsigned char* data, size_t length, const char* text);
 [[nodiscard]] int spki_cmp_bytes(const unsigned char* a, size_t a_length, const unsigned char* b,
                                  size_t b_length);
+// As numbers: leading `pad` bytes of the longer one do not count, any other byte there decides.
 [[nodiscard]] int spki_cmp_padded(const unsigned char* a, size_t a_length, const unsigned char* b,
                                   size_t b_length, unsigned char pad);
-// Same hint and equal by spki_cmp_bytes. Null equals null only.
+// Same hint and equal by spki_cmp_bytes. Null equals null only. False when the budget is spent.
 bool spki_atom_equal(spki_engine* engine, const spki_atom* a, const spki_atom* b);
-// Whether the first comes behind the second by spki_cmp_bytes.
+// Whether the first comes behind the second by spki_cmp_bytes; hints do not count. Neither is null.
+// False when the budget is spent.
 bool spki_atom_later(spki_engine* engine, const spki_atom* a, const spki_atom* b);
 
 // ---- Canonical text ----
 
+// A cursor. `position` moves with what was read, and stands at the fault after a failure.
 struct spki_input {
   const unsigned char* start;
   const unsigned char* position;
   const unsigned char* end;
 };
 
+// Reads a list at its "(". *slot gets the one reference, and is null after a failure. Strings are
+// not copied: the input outlives the list. Nested at most Limits::kMaxDepth levels.
 [[nodiscard]] spki_status spki_parse_list(spki_engine* engine, spki_elem** slot, spki_input* input);
+// Reads "[4:hint]3:abc" or "3:abc" into a slot (counted store).
 [[nodiscard]] spki_status spki_parse_atom(spki_engine* engine, spki_atom** slot, spki_input* input);
+// Reads "3:". From 1 on, without leading zeros: each text has one encoding, so that equal digests
+// mean equal lists.
 [[nodiscard]] spki_status spki_parse_length(uint32_t* length, spki_input* input);
 
 // Folds a crypto result into an engine code; every unlisted value is success, deliberately.

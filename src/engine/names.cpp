@@ -1,6 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 // Names: (issuer (name K N)) defines what N means below K, (subject (name K N N2...)) uses it.
-// Definitions and uses wait for each other under the digest of K and N, whichever comes first.
+// Definitions and uses wait for each other under the digest of K and N, whichever comes first: each
+// is filed in its table before it looks for the other kind, so every pair meets.
+//
+//   (issuer (name K sales)) (subject A)       K's "sales" is A
+//   (subject (name K sales boss))             resolves to (subject (name A boss)), and waits there
 #include "src/engine/budget.h"
 #include "src/engine/chain.h"
 #include "src/engine/reduction.h"
@@ -12,7 +16,7 @@ namespace ZvVesk2::Engine {
 namespace {
 
 // The use with its first name replaced by what the definition says; none when they are never valid
-// together.
+// together. The grant stays the use's: a definition has no tag, and cannot widen one.
 [[nodiscard]] spki_status Resolve(spki_engine* engine, const spki_tuple* use,
                                   const spki_tuple* definition, spki_tuple** made) {
   VESK2_TRY(spki_charge_combination(engine));
@@ -65,7 +69,7 @@ spki_status spki_name_define(spki_reduction* run, spki_work* work) {
   spki_engine* engine = run->engine;
   spki_tuple* tuple = work->tuple;
   work->step = nullptr;
-  // A name for any k of n subjects is none that a single one of them has.
+  // A definition whose subject is a k-of-n defines nothing: no single member has the name.
   if (tuple->member > 0) return 0;
   Digest name;
   VESK2_TRY(spki_name_value(engine, tuple->issuer, tuple->issuer_name, name));

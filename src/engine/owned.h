@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-// References to engine records that are held for a scope. `release()` of one moves the reference
-// into a slot.
+// References to engine records that are held for a scope, so that no error path releases by hand.
+// `release()` hands the reference on: to a slot that was empty, or to the caller. A slot that holds
+// something takes its reference by spki_*_assign instead, and the owner releases its own.
 #ifndef VESK2_SRC_ENGINE_OWNED_H
 #define VESK2_SRC_ENGINE_OWNED_H
 

@@ -7,6 +7,11 @@
 //
 // An atom points into the input. Zero lengths, blanks and lists without a head atom are refused;
 // what follows the outermost ")" is the caller's business.
+//
+// This is no second opinion on what a stranger wrote: the objects' readers have been there, and
+// what arrives is their canonical text. It is strict all the same, since one list has to have one
+// text: principals and tuples are told apart by digests of it. An empty byte string, which objects
+// may hold, ends the whole reduction here.
 #include <cstring>
 
 #include "src/engine/owned.h"
@@ -16,7 +21,8 @@
 namespace ZvVesk2::Engine {
 namespace {
 
-// A length may have one more digit as long as it is not above this.
+// A length may have one more digit as long as it is not above this: 2147483649 is the greatest.
+// Whether the input holds as much is asked of what remains, never by adding to a pointer.
 constexpr uint32_t kLengthBeforeLastDigit = 0x0CCCCCCC;
 
 size_t Remaining(const spki_input* input) {
@@ -47,6 +53,7 @@ size_t Remaining(const spki_input* input) {
   return closed ? 0 : SPKI_ERR_DISP_HINT_NOT_CLOSED;
 }
 
+// Nothing is copied: the input outlives the atom.
 [[nodiscard]] spki_status ParseString(spki_atom* atom, spki_input* input) {
   VESK2_TRY(spki_parse_length(&atom->length, input));
   VESK2_REQUIRE(atom->length <= Remaining(input), SPKI_ERR_STRING_TOO_LONG);
@@ -55,6 +62,7 @@ size_t Remaining(const spki_input* input) {
   return 0;
 }
 
+// A keyword with a display hint is no keyword: its atom's id is -1, so it stays an atom.
 [[nodiscard]] spki_status ParseHead(spki_engine* engine, spki_elem* head, spki_input* input) {
   spki_atom* slot = nullptr;
   VESK2_TRY(spki_parse_atom(engine, &slot, input));
@@ -87,6 +95,7 @@ size_t Remaining(const spki_input* input) {
 
 [[nodiscard]] spki_status ParseList(spki_engine* engine, spki_elem** slot, spki_input* input,
                                     unsigned depth) {
+  // The recursion here bounds every other one in the engine: they follow the lists that it made.
   VESK2_REQUIRE(depth <= Limits::kMaxDepth, SPKI_ERR_BAD_SEXP);
   const unsigned char* start = input->position;
   VESK2_REQUIRE(Next(input) == '(', SPKI_ERR_BAD_SEXP_START);
@@ -151,7 +160,8 @@ spki_status spki_parse_list(spki_engine* engine, spki_elem** slot, spki_input* i
   return ParseList(engine, slot, input, 1);
 }
 
-// A list made from a template never owns its text, so it must not look like one that does.
+// A list made from a template never owns its text, so it must not look like one that does:
+// spki_list_dispose would delete a constant.
 spki_status spki_parse_template(spki_engine* engine, spki_elem** slot, const char* text) {
   VESK2_REQUIRE(slot != nullptr && text != nullptr, SPKI_ERR_NULL_PARAM);
   const auto* start = reinterpret_cast<const unsigned char*>(text);

@@ -1,5 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 // The pool: blocks of the caller's allocator on a ring, and the state's start and stop.
+//
+//   anchor <-> newest <-> ... <-> oldest <-> anchor        (spki_pool::ring is the anchor)
+//
+// Every block has a header in front of it with its links and its cost, so destroying the pool needs
+// to know nothing about what the blocks hold.
 #include "src/engine/pool.h"
 
 #include <cstring>
@@ -20,6 +25,7 @@ struct Header {
   size_t cost;
 };
 
+// Zero-filled, so that a record that was not finished can be released like any other.
 void* Allocate(size_t size, void* pool) {
   auto* self = static_cast<spki_pool*>(pool);
   if (size > SIZE_MAX - sizeof(Header)) return nullptr;
@@ -57,7 +63,8 @@ void Destroy(void* pool) {
   }
 }
 
-// Whether the slab has a record left, if need be after a new block.
+// Whether the slab has a record left, if need be after a new block. The block itself costs nothing:
+// each record is paid for when it is cut.
 bool Fill(spki_engine* engine, spki_slab* slab, size_t size) {
   if (slab->left > 0) return true;
   slab->next =

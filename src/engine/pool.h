@@ -9,7 +9,8 @@
 
 namespace ZvVesk2::Engine {
 
-// Links of a ring of blocks. The pool's record is the ring's anchor.
+// Links of a ring of blocks. The pool's record is the ring's anchor: a ring needs no test for its
+// ends, and any block can leave it in constant time.
 struct spki_block {
   spki_block* next;
   spki_block* previous;
@@ -23,7 +24,9 @@ struct spki_pool {
 inline constexpr size_t kSpkiPoolRecord = 24;
 static_assert(sizeof(spki_pool) == kSpkiPoolRecord);
 
-// The memory callbacks, fixed at build time.
+// The memory callbacks, fixed at build time. `free` takes what `allocate` of the same pool gave,
+// never null. `create` makes a pool in a record of kSpkiPoolRecord bytes; `destroy` frees all the
+// blocks and leaves the record to whoever gave it.
 struct spki_memory_ops {
   void* (*allocate)(size_t size, void* pool);  // zero-filled, or null
   void (*free)(void* memory, void* pool);
@@ -32,7 +35,8 @@ struct spki_memory_ops {
 };
 extern const spki_memory_ops kSpkiMemoryOps;
 
-// What a block of this size costs of the budget of live records.
+// What a block of this size costs of the budget of live records: never 0, so that empty blocks have
+// a price too.
 size_t spki_block_cost(size_t size);
 
 }  // namespace ZvVesk2::Engine

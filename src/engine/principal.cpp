@@ -75,7 +75,8 @@ bool MayBeSha1(const Digest& digest) {
   return std::all_of(digest + kSha1Size, std::end(digest), [](unsigned char c) { return c == 0; });
 }
 
-// The digest that (hash <algorithm> <value>) holds, zero-padded.
+// The digest that (hash <algorithm> <value>) holds, zero-padded. The length must be that of the
+// algorithm: a short one would be padded into a digest that nobody computed.
 [[nodiscard]] spki_status ReadHash(const spki_elem* hash, Digest& digest) {
   VESK2_REQUIRE(HeadKeyword(hash) == SPKI_KW_HASH, SPKI_ERR_NOT_HASH_SEXP);
   const spki_atom* algorithm = StringOf(hash->next);
@@ -92,6 +93,7 @@ bool MayBeSha1(const Digest& digest) {
 
 }  // namespace
 
+// The recursion is as deep as lists nest. A key within a key is registered too.
 spki_status spki_register_keys(spki_engine* engine, spki_elem* list) {
   if (HeadKeyword(list) == SPKI_KW_PUBLIC_KEY) {
     spki_principal* principal = nullptr;

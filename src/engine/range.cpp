@@ -15,6 +15,7 @@ spki_relation RelationOf(spki_engine* engine, spki_range_bounds* bounds) {
 
 }  // namespace
 
+// An order that could not be told (SPKI_ORDER_NONE) satisfies no operator.
 bool spki_bound_holds(spki_engine* engine, const spki_atom* value, const spki_elem* bound,
                       int32_t ordering) {
   if (spki_charge_step(engine) != 0) return false;
@@ -36,6 +37,7 @@ bool spki_bound_holds(spki_engine* engine, const spki_atom* value, const spki_el
   }
 }
 
+// A range without bounds holds every valid value of its ordering; one without an ordering none.
 bool spki_in_range(spki_engine* engine, const spki_elem* string, const spki_elem* range) {
   const spki_atom* value = StringOf(string);
   if (value == nullptr) return false;
@@ -52,6 +54,8 @@ bool spki_in_range(spki_engine* engine, const spki_elem* string, const spki_elem
   return true;
 }
 
+// The range comes first: of equal bounds the first stay. A prefix is a range of "alpha", so it is
+// disjoint from those of all other orderings.
 spki_relation spki_prefix_to_range(spki_engine* engine, const spki_elem* prefix,
                                    const spki_elem* range) {
   spki_range_bounds bounds;

@@ -1,6 +1,16 @@
 // SPDX-License-Identifier: Apache-2.0
 // The bounds that two ranges, or a range and a prefix, leave: the tightest of both, each with the
 // input that it came from.
+//
+//   input 1             input 2              low       high      relation
+//   (ge 5) (le 7)       (ge 1) (le 9)        5 of 1    7 of 1    narrower
+//   (ge 1) (le 9)       (ge 5) (le 7)        5 of 2    7 of 2    wider
+//   (ge 1) (le 7)       (ge 5) (le 9)        5 of 2    7 of 1    overlap
+//   (ge 5) (le 5)       (ge 1)               5 of 1    5 of 1    overlap: a single point
+//   (g 5) (le 5)        any                                      disjoint
+//
+// Equal ranges are narrower: the second has nothing to tighten. That a point overlaps with what it
+// lies in keeps it from being found within anything but itself: that grants less, not more.
 #include <algorithm>
 
 #include "src/engine/budget.h"
@@ -34,7 +44,8 @@ struct End {
   int32_t exclusive;
 };
 
-// False when the values cannot be compared.
+// Takes the value when it is the first or tighter than the one that is there; of two equal ones the
+// operator that leaves the value itself out. False when the values cannot be compared.
 bool Tighten(spki_engine* engine, const End& end, spki_atom* value, int32_t op, int32_t ordering,
              int32_t source) {
   const int order =
@@ -51,6 +62,7 @@ bool Tighten(spki_engine* engine, const End& end, spki_atom* value, int32_t op, 
   return true;
 }
 
+// The value is valid before it is compared: the orders take their texts for well-formed.
 bool AddBound(spki_engine* engine, spki_range_bounds* bounds, spki_atom* value, int32_t op,
               int32_t source) {
   if (spki_charge_step(engine) != 0) return false;
@@ -79,7 +91,9 @@ const unsigned char* CopyBytes(spki_engine* engine, const unsigned char* data, s
   return copy;
 }
 
-// The first `length` bytes of a string with 1 added to the last of them; the hint stays.
+// The first `length` bytes of a string with 1 added to the last of them, which is below 255; the
+// hint stays, since values with another one do not compare. The bytes are the new atom's own. Null
+// without memory.
 spki_atom_owner Successor(spki_engine* engine, const spki_atom* string, uint32_t length) {
   if (spki_charge_strings(engine, string) != 0)
     return Own(engine, static_cast<spki_atom*>(nullptr));
@@ -131,7 +145,8 @@ void spki_range_add_tag(spki_engine* engine, spki_range_bounds* bounds, const sp
 }
 
 // A prefix is the range from its string up to, and without, the first string behind all that begin
-// with it. Nothing is behind a prefix of 255s.
+// with it: "ab" is (ge ab) (l ac), and "a" with a 255 behind it ends before "b". Nothing is behind
+// a prefix of 255s.
 void spki_range_add_prefix(spki_engine* engine, spki_range_bounds* bounds, const spki_elem* prefix,
                            int32_t source) {
   const spki_elem* elem = spki_prefix_string(prefix);

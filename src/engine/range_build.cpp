@@ -1,5 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-// A new (* range ordering (operator value)...) from the bounds that are left.
+// A new (* range ordering (operator value)...) from the bounds that are left: the lower one first,
+// each only where there is one. It is built link by link behind the words that all ranges begin
+// with, so that after a failure one owner releases whatever there is.
 #include "src/engine/tag_forms.h"
 
 namespace ZvVesk2::Engine {
@@ -14,6 +16,8 @@ spki_elem_owner NewBound(spki_engine* engine, int32_t op, spki_atom* value) {
   return spki_new_list(engine, head.get());
 }
 
+// The word is printed from the table of keywords, which outlives every atom. All five orderings
+// have rows.
 spki_elem_owner NewOrdering(spki_engine* engine, int32_t ordering) {
   const spki_atom_owner atom = Own(engine, spki_atom_new(engine));
   if (atom == nullptr) return Own(engine, static_cast<spki_elem*>(nullptr));

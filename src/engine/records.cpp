@@ -1,5 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 // Atoms and elements: made, counted, stored, and returned to their free lists.
+//
+// A reduction makes and drops the same few thousand records over and over; the free lists keep that
+// away from the allocator. A released record is zeroed before it goes there, so that a pointer that
+// was kept too long finds nothing rather than another list's contents.
 #include <cstring>
 
 #include "src/engine/owned.h"
@@ -24,6 +28,7 @@ Record* Take(spki_engine* engine, Record** free_list, spki_slab* slab) {
   return record;
 }
 
+// The other way. The budget is not given back: the record stays with the engine.
 template <typename Record>
 void Return(Record* record, Record** free_list) {
   *record = {};
@@ -37,7 +42,8 @@ void Share(Record* record) {
   if (record != nullptr && record->refcount != kSaturated) ++record->refcount;
 }
 
-// Whether that was the last reference. A new chain may have a count of 0 already.
+// Whether that was the last reference. A new chain may have a count of 0 already: intersections
+// hand theirs out so, and the slot that takes it counts the first.
 template <typename Record>
 bool Drop(Record* record) {
   if (record->refcount == kSaturated) return false;

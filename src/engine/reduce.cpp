@@ -22,7 +22,9 @@ struct Kind {
 constexpr Kind kAcl = {SPKI_KW_ACL, SPKI_KW_ENTRY};
 constexpr Kind kSequence = {SPKI_KW_SEQUENCE, SPKI_KW_CERT};
 
-// Gives the tuple the tag that the credential grants of what is requested; false for nothing.
+// Gives the tuple the tag that the credential grants of what is requested; false for nothing, and
+// when the budget is spent. A credential that grants none of it is then out of the way before it is
+// combined with anything.
 bool ApplyRequest(spki_reduction* run, spki_tuple* tuple) {
   spki_elem* requested = run->requested_tag;
   if (tuple->tag != nullptr && requested != nullptr) {
@@ -37,6 +39,8 @@ bool ApplyRequest(spki_reduction* run, spki_tuple* tuple) {
   return true;
 }
 
+// An error in a credential stops the whole reduction: not to be readable is something else than to
+// say nothing.
 [[nodiscard]] spki_status spki_credential_to_tuple(spki_reduction* run,
                                                    const spki_elem* credential) {
   spki_engine* engine = run->engine;
@@ -71,6 +75,8 @@ bool ApplyRequest(spki_reduction* run, spki_tuple* tuple) {
   return 0;
 }
 
+// An engine may be used for several reductions; each starts with empty tables. What they held was
+// released at the end of the one before.
 void ForgetTables(spki_engine* engine) {
   for (spki_table* table :
        {&engine->principals, &engine->name_definitions, &engine->name_users, &engine->filed}) {

@@ -1,6 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
 // Tuple reduction: ACL entries and certificates become 5-tuples (issuer, subject, propagate, tag,
 // validity), which are combined until it is known which grants of the ACL reach the requester.
+//
+//   the ACL grants A, who may delegate, (tag (install))             ( -, A, yes, (tag (install)))
+//   A certifies B for (tag (install (app calc)))                    (A, B, no, ...)
+//   together                                                        ( -, B, no, (tag (install
+//                                                                                (app calc))))
+//
+// The engine does not look at signatures and revocation: it takes every certificate for genuine.
 #ifndef VESK2_SRC_ENGINE_REDUCE_H
 #define VESK2_SRC_ENGINE_REDUCE_H
 

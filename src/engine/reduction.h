@@ -15,7 +15,7 @@ struct spki_reduction;
 struct spki_work;
 
 // Goes on with an insertion. Sets *made to a tuple (one reference) that must be inserted first, or
-// moves work->step on; a null step is the end of it.
+// moves work->step on; a null step is the end of it. Between calls all that it knows is in `work`.
 using spki_step = spki_status (*)(spki_reduction* run, spki_work* work, spki_tuple** made);
 
 // One insertion, and how far it got.
@@ -49,13 +49,16 @@ struct spki_reduction {
 };
 
 // The next tuple at an insertion's cursor, which moves on; null at the end, and when the budget is
-// spent.
+// spent, which whoever runs the steps asks for. Tuples that are added meanwhile stand in front of
+// the cursor: they look for this one themselves.
 const spki_tuple* spki_next_tuple(spki_reduction* run, spki_work* work);
 
-// Inserts the tuple of a credential and all that follow from it.
+// Inserts the tuple of a credential and all that follow from it. After a failure the end of the
+// reduction releases the insertions that are left on the stack.
 [[nodiscard]] spki_status spki_tuple_insert(spki_reduction* run, spki_tuple* tuple);
-// Marks a tuple that no other was derived from, when its subject is the requester. Without a
-// requester every such tuple is.
+// Marks a tuple of a credential, or a member of its k-of-n, when its subject is the requester.
+// Without a requester every such tuple is marked. One whose subject is still a name is not: the
+// definition says whether it reaches.
 void spki_mark_reach(const spki_reduction* run, spki_tuple* tuple);
 
 // Beginnings of insertions, by what the tuple's subject is; each sets work->step.

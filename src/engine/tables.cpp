@@ -27,7 +27,8 @@ unsigned FirstDifference(const Digest& a, const Digest& b) {
 }
 
 // Goes down to where `digest` is, or would be below `bit`: *end is the node that the way leads to,
-// and the result the one that it leads from. Null when the budget is spent.
+// and the result the one that it leads from. A branch to a node with no greater bit leads back up,
+// and ends the way. Null when the budget is spent.
 spki_node* Descend(spki_engine* engine, spki_node* from, const Digest& digest, unsigned bit,
                    spki_node** end) {
   spki_node* node = from;
@@ -40,6 +41,7 @@ spki_node* Descend(spki_engine* engine, spki_node* from, const Digest& digest, u
   return node;
 }
 
+// Greater than any bit: only a branch that leads up ends the way.
 constexpr unsigned kToTheEnd = 8 * kSpkiDigestSize + 1;
 
 spki_node* NewNode(spki_engine* engine, spki_table* table, const Digest& digest) {
@@ -52,7 +54,10 @@ spki_node* NewNode(spki_engine* engine, spki_table* table, const Digest& digest)
   return node;
 }
 
-// Hangs a new node into the way of its digest, above `nearest`, which shares most of its bits.
+// Hangs a new node into the way of its digest, where its bit has its place among the growing ones.
+// `nearest` is what the search for the digest ended at: no other shares more of its first bits, so
+// the first in which the two differ is the node's. One of its branches is itself, the other what
+// stood there. Nothing else in the table moves.
 [[nodiscard]] spki_status Hang(spki_engine* engine, spki_table* table, spki_node* node,
                                const spki_node* nearest) {
   node->bit = FirstDifference(node->digest, nearest->digest);

@@ -11,7 +11,7 @@ namespace ZvVesk2::Engine {
 using Digest = unsigned char[kSpkiDigestSize];
 
 // One link of a list of tuples. Lists grow at the front, so that whoever walks one may go on while
-// others add to it.
+// others add to it; nothing leaves a list before the reduction ends.
 struct spki_entry {
   spki_entry* next;
   spki_tuple* tuple;  // counted
@@ -26,6 +26,14 @@ void spki_entries_clear(spki_engine* engine, spki_entry** list);
 // `bit` is the first in which two below it differ, counted from 1, and grows on the way down; a
 // branch that leads back up ends at the only digest that may be the one looked for. Strangers
 // choose digests, and no choice of theirs makes a way longer than 256 nodes.
+//
+// With the digests 00.., 01.. and 1.. (in bits), entered in this order:
+//
+//   00.. (bit 0) -> 1.. (bit 1): 0 -> 01.. (bit 2): 0 -> back to 00..
+//                                                   1 -> itself
+//                                1 -> itself
+//
+// A way down tests single bits and compares one whole digest at its end.
 struct spki_node {
   spki_node* below[2];
   spki_node* older;  // the node made before this one
@@ -35,10 +43,11 @@ struct spki_node {
   spki_entry* tuples;  // newest first
 };
 
-// *slot is the node of a digest, null when there is none.
+// *slot is the node of a digest, borrowed from the table; null when there is none, and when the
+// budget is spent, which is the code then.
 [[nodiscard]] spki_status spki_table_find(spki_engine* engine, const spki_table& table,
                                           const Digest& digest, spki_node** slot);
-// The same, made when there is none; `*made` tells.
+// The same, made when there is none; `*made` tells. A new node knows nothing but its digest.
 [[nodiscard]] spki_status spki_table_enter(spki_engine* engine, spki_table* table,
                                            const Digest& digest, spki_node** slot, bool* made);
 // Releases the nodes and the lists of tuples in them.

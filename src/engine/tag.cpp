@@ -1,5 +1,14 @@
 // SPDX-License-Identifier: Apache-2.0
 // The relation of two tags, element by element and list by list.
+//
+//   first \ second   string      list          prefix     range      set          (*)
+//   string           =           -             in it      in it      in it        narrower
+//   list             -           lists' own    -          -          in it        narrower
+//   prefix           has it      -             prefixes   bounds     overlaps     narrower
+//   range            in it       -             bounds     bounds     overlaps     narrower
+//   set              in it       in it         overlaps   overlaps   overlaps     narrower
+//
+// A head equals a head of its own kind; strings, prefixes and ranges say nothing about heads.
 #include "src/engine/tag.h"
 
 #include "src/engine/budget.h"
@@ -9,6 +18,7 @@
 namespace ZvVesk2::Engine {
 namespace {
 
+// What the second is to the first.
 spki_relation Exchanged(spki_relation relation) {
   if (relation == SPKI_REL_NARROWER) return SPKI_REL_WIDER;
   return relation == SPKI_REL_WIDER ? SPKI_REL_NARROWER : relation;
@@ -22,7 +32,7 @@ bool IsPlain(spki_tag_class tag_class) {
   return tag_class >= SPKI_TAG_KEYWORD_HEAD && tag_class <= SPKI_TAG_LIST;
 }
 
-// The elements that `within` asks about: equal to it or narrower.
+// Whether the first lies within the second.
 bool Within(spki_relation relation) {
   return relation == SPKI_REL_EQUAL || relation == SPKI_REL_NARROWER;
 }
@@ -41,7 +51,8 @@ spki_relation StringTo(spki_engine* engine, const spki_elem* a, const spki_elem*
   }
 }
 
-// Equal prefixes count as narrower.
+// Equal prefixes count as narrower, which is within as much as equal is: an intersection then takes
+// the first.
 spki_relation PrefixToPrefix(spki_engine* engine, const spki_elem* a, const spki_elem* b) {
   if (spki_has_prefix(engine, spki_prefix_string(a), b)) return SPKI_REL_NARROWER;
   return When(spki_has_prefix(engine, spki_prefix_string(b), a), SPKI_REL_WIDER);
@@ -114,7 +125,8 @@ spki_relation ByClass(spki_engine* engine, const spki_elem* a, spki_tag_class a_
   }
 }
 
-// What two lists are to each other when they were `so_far` up to an element that is `next`.
+// What two lists are to each other when they were `so_far` up to an element that is `next`. Lists
+// of which each is narrower in some place overlap.
 spki_relation Combined(spki_relation so_far, spki_relation next) {
   if (next == SPKI_REL_EQUAL || so_far == next) return so_far;
   return so_far == SPKI_REL_EQUAL ? next : SPKI_REL_OVERLAP;
@@ -158,7 +170,8 @@ spki_relation spki_cmp_elem(spki_engine* engine, const spki_elem* a, const spki_
   return ByClass(engine, a, a_class, b, b_class);
 }
 
-// The shorter list is the wider tag: what a list has beyond the other narrows it.
+// The shorter list is the wider tag: what a list has beyond the other narrows it. The first pair
+// with nothing in common ends the walk, and so does a tail that both lists share.
 spki_relation spki_cmp_chain(spki_engine* engine, const spki_elem* a, const spki_elem* b) {
   if (engine->budget.spent != 0) return SPKI_REL_DISJOINT;
   spki_relation relation = SPKI_REL_EQUAL;

@@ -49,12 +49,15 @@ spki_tag_class spki_classify(const spki_elem* elem) {
   }
 }
 
+// A prefix with more or less behind it than one string has no members: it is not a plain list, so
+// it is not compared word by word either.
 const spki_elem* spki_prefix_string(const spki_elem* elem) {
   if (spki_classify(elem) != SPKI_TAG_PREFIX) return nullptr;
   const spki_elem* string = spki_form_arguments(elem);
   return StringOf(string) != nullptr && string->next == nullptr ? string : nullptr;
 }
 
+// Bytes are compared to the end, 0 bytes included, unlike in the orders of strings.
 bool spki_has_prefix(spki_engine* engine, const spki_elem* string, const spki_elem* prefix) {
   const spki_atom* s = StringOf(string);
   const spki_atom* p = StringOf(spki_prefix_string(prefix));

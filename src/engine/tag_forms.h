@@ -13,12 +13,14 @@ namespace ZvVesk2::Engine {
 // The head of the list that an element stands for: a nested list's head, or the element itself when
 // it is a keyword head. Null for any other.
 const spki_elem* spki_form_head(const spki_elem* elem);
-// What follows the second word of a set, prefix or range; null when nothing does.
+// What follows the second word of a set, prefix or range; null when nothing does. Only for an
+// element that spki_classify says to be one of these: it has two words.
 const spki_elem* spki_form_arguments(const spki_elem* form);
 // The string of (* prefix string); null unless the element is exactly that.
 const spki_elem* spki_prefix_string(const spki_elem* elem);
 
-// An (operator value) list with a keyword head and a string behind it.
+// An (operator value) list with a keyword head and a string behind it. A bound that is not exact
+// holds for no string, but counts where ranges are compared; see tag.h.
 struct spki_bound {
   int32_t op = -1;
   spki_atom* value = nullptr;  // borrowed; null when the element is not a bound
@@ -39,11 +41,12 @@ spki_relation spki_prefix_to_range(spki_engine* engine, const spki_elem* prefix,
 // The relation of two ranges.
 spki_relation spki_range_to_range(spki_engine* engine, const spki_elem* a, const spki_elem* b);
 
-// New elements; null without memory.
+// New elements with one reference, which take references of their own; null without memory.
 spki_elem_owner spki_new_string(spki_engine* engine, spki_atom* atom);
 spki_elem_owner spki_new_keyword(spki_engine* engine, int32_t keyword);
 spki_elem_owner spki_new_list(spki_engine* engine, spki_elem* list);
-// A new element with the same value and nothing behind it.
+// A new element with the same value and nothing behind it: results are linked anew, while the
+// originals stay in their lists.
 spki_elem_owner spki_copy(spki_engine* engine, const spki_elem* elem);
 
 }  // namespace ZvVesk2::Engine

@@ -1,5 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
 // Intersection of lists and elements.
+//
+// Where one of two tags lies within the other, it is the result as it stands, and nothing is made.
+// Only where they overlap is a new chain made, element by element:
+//
+//   (tag (* set read write) /etc)  and  (tag read)   give   (tag read /etc)
+//
+// The first elements with something in common are new; the tail is shared with the list that has
+// it.
 #include "src/engine/chain.h"
 #include "src/engine/tag_forms.h"
 
@@ -18,7 +26,8 @@ spki_elem* Narrower(spki_engine* engine, spki_elem* a, spki_elem* b, bool* overl
 }
 
 // One new element for each pair, until what is left of the two lists is one of them as it stands. A
-// loop, since lists are as long as their writers like.
+// loop, since lists are as long as their writers like. Each round asks for the relation of the
+// rests, so the cost is the square of the length of what overlaps; the budget pays for it.
 spki_elem* IntersectElements(spki_engine* engine, spki_elem* a, spki_elem* b) {
   spki_elem_owner first = Own(engine, spki_intersect_elem(engine, a, b));
   spki_elem* last = first.get();
@@ -68,7 +77,8 @@ spki_elem* IntersectPrefixes(spki_engine* engine, const spki_elem* a, const spki
   return nullptr;
 }
 
-// Two lists of which at least one is headed by "*".
+// Two lists of which at least one is headed by "*". A malformed form has something in common with
+// "(*)" and with sets only, not even with itself: that grants less.
 spki_elem* IntersectForms(spki_engine* engine, spki_elem* a, spki_elem* b) {
   const spki_tag_class a_class = spki_classify(a);
   const spki_tag_class b_class = spki_classify(b);

@@ -1,5 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
 // Intersection of a set with anything: what each member has in common with it.
+//
+//   (* set a b c) and (* set c b)   (* set c b): b is found first, c is put in front of it
+//   (* set a b) and a               a: one member is no set
+//   (* set (* prefix ab)) and abc   abc
+//
+// Members that are sets are taken apart, so a result is never a set of sets. The cost is the
+// product of both sizes, and for each result a comparison with those before it: the budget pays for
+// all of them, and Limits::kMaxSetMembers bounds the result.
 #include <utility>
 
 #include "src/engine/budget.h"
@@ -10,7 +18,8 @@
 namespace ZvVesk2::Engine {
 namespace {
 
-// What one member and the other tag, which is `relation` to it, have in common; null for nothing.
+// What one member and the other tag, which is `relation` to it, have in common; null for nothing,
+// and without memory.
 spki_elem_owner InCommon(spki_engine* engine, spki_elem* member, spki_relation relation,
                          spki_elem* other) {
   switch (relation) {
@@ -33,7 +42,8 @@ class Members {
   explicit Members(spki_engine* engine)
       : engine_(engine), strings_(engine), first_(Own(engine, static_cast<spki_elem*>(nullptr))) {}
 
-  // A set is taken apart, what is there already is dropped. False when there is no room or memory.
+  // A set is taken apart, what is there already is dropped. False when there is no room or memory:
+  // a set with a member too few is narrower, but no longer what both allow, so there is none then.
   bool Add(spki_elem_owner found) {
     if (found == nullptr) return engine_->budget.spent == 0;
     if (spki_classify(found.get()) == SPKI_TAG_SET) return AddMembersOf(found.get());

@@ -17,7 +17,7 @@
 namespace ZvVesk2::Engine {
 namespace {
 
-// A count of `elem`; 0 for anything that is none.
+// A count of `elem`; 0 for anything that is none. Bytes, not digits: "2" would be fifty.
 uint32_t ReadCount(const spki_elem* elem) {
   const spki_atom* atom = StringOf(elem);
   if (atom == nullptr || atom->hint_length > 0 || atom->length > 3) return 0;
@@ -57,7 +57,7 @@ const spki_elem* ThresholdList(const spki_elem* subject) {
   return 0;
 }
 
-// The tuple of the next subject.
+// The tuple of the next subject: the carrier's grant, at one more position.
 [[nodiscard]] spki_status NextMember(spki_reduction* run, spki_work* work, spki_tuple** made) {
   if (work->member == nullptr) {
     work->step = nullptr;
@@ -97,6 +97,8 @@ spki_status spki_threshold_expand(spki_reduction* run, spki_work* work) {
   return 0;
 }
 
+// A tuple that was collected before has been searched with, too: the insertion ends. That is what
+// ends delegation in a circle among members.
 spki_status spki_threshold_collect(spki_reduction* run, spki_work* work, spki_step next,
                                    spki_tuple** made) {
   spki_tuple* tuple = work->tuple;

@@ -1,5 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 // k-of-n subjects: a grant that k of n subjects must pass on to the same principal.
+//
+// Of (entry (subject (k-of-n 2 3 A B C)) (propagate) (tag t)), with certificates A -> P and C -> P,
+// the member tuples of positions 1 and 3 get to P by combination. With the second of them two
+// positions have, and the search makes the grant to P as if the entry had named it.
 #ifndef VESK2_SRC_ENGINE_THRESHOLD_H
 #define VESK2_SRC_ENGINE_THRESHOLD_H
 

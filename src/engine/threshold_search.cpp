@@ -2,6 +2,11 @@
 // The choice of k members. Positions are taken in increasing order and every choice is cut off as
 // soon as its tags or periods have nothing in common; what is left may still be exponential, so it
 // is bounded, and a search that is too long is an error of its own.
+//
+// A depth-first search with one Choice for each member chosen so far. `sum` of each is what it and
+// all before it grant in common; a choice extends the last sum, and going back drops it. Every
+// choice has the arriving tuple in it: those without were searched when their last tuple arrived.
+// The first k that agree end the search, whatever others would grant.
 #include <algorithm>
 #include <utility>
 
@@ -29,10 +34,12 @@ class Search {
 
   // Finds the candidates: for each position with a tuple to the subject, the first of them.
   [[nodiscard]] spki_status Prepare();
+  // *made is the sum of the first complete choice; null when there is none.
   [[nodiscard]] spki_status Run(spki_tuple** made);
 
  private:
   const spki_entry* Fitting(const spki_entry* entry);
+  // At depth d the member d + 1 of k is chosen.
   void Start(uint32_t depth);
   bool Move(uint32_t depth);
   [[nodiscard]] spki_status Join(uint32_t depth, bool* agree);
@@ -94,7 +101,8 @@ void Search::Start(uint32_t depth) {
   choices_[depth].entry = nullptr;
 }
 
-// Moves a choice to the next tuple that may stand there; false at the end.
+// Moves a choice to the next tuple that may stand there: first the others of its position, then the
+// following positions, but past the arriving tuple's only once that is chosen. False at the end.
 bool Search::Move(uint32_t depth) {
   Choice& choice = choices_[depth];
   if (choice.entry != nullptr) choice.entry = Fitting(choice.entry->next);
@@ -107,6 +115,7 @@ bool Search::Move(uint32_t depth) {
   return true;
 }
 
+// Makes the sum of a choice. It may be delegated on only where all members allow it.
 spki_status Search::Join(uint32_t depth, bool* agree) {
   Choice& choice = choices_[depth];
   VESK2_TRY(spki_charge_combination(engine_, SPKI_ERR_THRESHOLD));

@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// Tuples: made, counted, filed and combined.
+// Tuples: made, counted, filed and combined. Only what hangs from a tuple is counted there; its
+// principals and its threshold belong to the reduction.
 #include "src/engine/tuple.h"
 
 #include "src/engine/budget.h"
@@ -82,7 +83,9 @@ bool spki_tuple_narrow(spki_engine* engine, spki_tuple* tuple, const spki_tuple*
   return tuple->tag != nullptr && spki_validity_meet(engine, tuple, first);
 }
 
-// The result is what `second` grants, under the issuer of `first`.
+// The result is what `second` grants, under the issuer of `first`: I -> S and S -> P give I -> P.
+// Whether P may delegate, and whether it leads to the requester, is what `second` says; at which
+// position of a k-of-n it counts, what `first` says.
 spki_status spki_tuple_combine(spki_engine* engine, const spki_tuple* first,
                                const spki_tuple* second, spki_tuple** made) {
   VESK2_TRY(spki_charge_combination(engine));

@@ -46,15 +46,16 @@ struct spki_tuple_releaser {
 using spki_tuple_owner = std::unique_ptr<spki_tuple, spki_tuple_releaser>;
 inline spki_tuple_owner Own(spki_engine* engine, spki_tuple* tuple) { return {tuple, {engine}}; }
 
-// Puts a tuple in front of a list.
+// Puts a tuple in front of a list, which takes a reference of its own.
 [[nodiscard]] spki_status spki_tuple_push(spki_engine* engine, spki_entry** list,
                                           spki_tuple* tuple);
 // The same unless an equal tuple was filed before; `*filed` tells. Equal tuples belong in one list.
 [[nodiscard]] spki_status spki_tuple_file(spki_engine* engine, spki_entry** list, spki_tuple* tuple,
                                           bool* filed);
 
-// Narrows a tuple to what `first` allows as well. Whether anything is left; the tag is null when
-// not. Nothing is when the budget is spent.
+// Narrows a tuple to what `first` allows as well. Whether anything is left: a tag in common (two
+// absent ones are none) and a period. Nothing is when the budget is spent. After false the tuple is
+// only to be released.
 bool spki_tuple_narrow(spki_engine* engine, spki_tuple* tuple, const spki_tuple* first);
 // What `first`, whose subject issued `second`, grants to the subject of `second`, in *made; null
 // when that is nothing.

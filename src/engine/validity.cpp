@@ -11,6 +11,7 @@
 namespace ZvVesk2::Engine {
 namespace {
 
+// Each takes the narrower of two bounds; a null date is none.
 void Raise(spki_engine* engine, spki_tuple* tuple, spki_atom* date) {
   if (date == nullptr) return;
   if (tuple->not_before == nullptr || spki_atom_later(engine, date, tuple->not_before)) {
@@ -33,6 +34,8 @@ bool IsEmpty(spki_engine* engine, const spki_tuple* tuple) {
 [[nodiscard]] spki_status Apply(spki_engine* engine, spki_tuple* tuple,
                                 const spki_elem* constraint);
 
+// A bare date is an instant: it narrows from both sides, so a period that it is outside of ends up
+// empty, and one that it lies in as that instant.
 [[nodiscard]] spki_status ApplyParts(spki_engine* engine, spki_tuple* tuple,
                                      const spki_elem* part) {
   for (; part != nullptr; part = part->next) {
@@ -61,6 +64,7 @@ bool IsEmpty(spki_engine* engine, const spki_tuple* tuple) {
 
 }  // namespace
 
+// A comparison that was not paid for answers "not later", which must not pass for a period.
 bool spki_validity_meet(spki_engine* engine, spki_tuple* tuple, const spki_tuple* other) {
   Raise(engine, tuple, other->not_before);
   Lower(engine, tuple, other->not_after);

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // Periods of validity. Dates are compared as byte strings: "####-##-##_##:##:##" orders by time,
-// anything else as it happens to.
+// anything else as it happens to. A bound that is absent bounds nothing, and both bounds belong to
+// the period: one that begins and ends in the same second is not empty.
 #ifndef VESK2_SRC_ENGINE_VALIDITY_H
 #define VESK2_SRC_ENGINE_VALIDITY_H
 

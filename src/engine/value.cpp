@@ -11,6 +11,7 @@
 namespace ZvVesk2::Engine {
 namespace {
 
+// Without the cache: the digest of every byte of the chain, paid by the piece.
 [[nodiscard]] spki_status DigestChain(spki_engine* engine, const spki_elem* chain, Digest& out) {
   spki_digest_sink sink;
   VESK2_TRY(spki_digest_start(engine, &sink.digest, ZVCLM_HASH_SHA256));
@@ -30,7 +31,8 @@ namespace {
   return sink->Put(value, sizeof value);
 }
 
-// What of a tuple is no text. Principals and thresholds are told apart by where they are.
+// What of a tuple is no text. Principals and thresholds are told apart by where they are: both live
+// as long as the table of values, so no address comes twice.
 struct Identity {
   const void* issuer;
   const void* subject;
@@ -52,6 +54,8 @@ spki_status spki_chain_value(spki_engine* engine, spki_elem* chain, Digest& out)
   return 0;
 }
 
+// The principal's digest has a fixed size, so the name behind it needs no mark of its own: no two
+// pairs have the same text.
 spki_status spki_name_value(spki_engine* engine, const spki_principal* principal,
                             const spki_atom* name, Digest& out) {
   spki_digest_sink sink;
@@ -85,6 +89,8 @@ spki_status spki_string_value(spki_engine* engine, const spki_atom* string, Dige
   return spki_digest_finish(&sink.digest, out);
 }
 
+// Every field takes part, in a fixed order, and none can be taken for its neighbour: a null is "-",
+// a string begins with a digit or "[", a list's digest with "+".
 spki_status spki_tuple_value(spki_engine* engine, const spki_tuple* tuple, Digest& out) {
   const Identity identity = {tuple->issuer, tuple->subject, tuple->threshold, tuple->member,
                              (tuple->reaches ? 2u : 0u) | (tuple->propagate ? 1u : 0u)};

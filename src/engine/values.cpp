@@ -4,6 +4,12 @@
 //   time = hh [ ":" mm [ ":" ss ] ]
 //   date = YYYY [ "-" MM [ "-" DD [ "_" hh [ ":" mm [ ":" ss ] ] ] ] ]
 //   numeric = [ "+" / "-" ] digits, without leading zeros
+//
+//   alpha   any string, byte by byte
+//   binary  any string, as a big-endian number: leading zero bytes do not count
+//
+// Dates and times are written so that they order as strings. 2009 is a date, and comes before
+// 2009-01: a shorter one stands for its own beginning.
 #include <algorithm>
 #include <string_view>
 
@@ -23,7 +29,8 @@ std::string_view Text(const spki_atom* atom) {
 
 bool IsDigit(char c) { return c >= '0' && c <= '9'; }
 
-// Whether the value begins the template ("#" a digit) and ends where one of its fields does.
+// Whether the value begins the template ("#" a digit) and ends where one of its fields does: 12:30
+// is a time, 12:3 and "12:" are none.
 bool Matches(const spki_atom* value, std::string_view shape) {
   const std::string_view text = Text(value);
   if (value->hint_length > 0 || text.size() > shape.size()) return false;
@@ -55,7 +62,7 @@ bool Matches(const spki_atom* value, std::string_view shape) {
   }
 }
 
-// A sign and the digits behind it.
+// A sign and the digits behind it, of which there may be none.
 struct Number {
   bool negative;
   std::string_view digits;
@@ -73,7 +80,8 @@ Number ReadNumber(const spki_atom* value) {
                          reinterpret_cast<const unsigned char*>(b.data()), b.size(), pad);
 }
 
-// By the signs first, so that minus zero is less than zero.
+// By the signs first, so that minus zero is less than zero. Numbers of any length are compared as
+// text, without a value that could overflow; of two negative ones the larger text is the lesser.
 [[nodiscard]] int CompareNumbers(const spki_atom* a, const spki_atom* b) {
   const Number left = ReadNumber(a);
   const Number right = ReadNumber(b);
@@ -105,6 +113,8 @@ bool spki_valid_time(const spki_atom* value) {
   return field[0] < 24 && field[1] <= 59 && field[2] <= 59;
 }
 
+// A year alone is a date whatever it is; behind it, month and day must be those of a calendar (with
+// the one exception in MonthLength).
 bool spki_valid_date(const spki_atom* value) {
   if (!Matches(value, kDateTemplate)) return false;
   int field[6] = {};
@@ -142,6 +152,8 @@ bool spki_valid_value(spki_engine* engine, const spki_atom* value, int32_t order
   }
 }
 
+// Strings with different hints are not comparable in any ordering: a bound with a hint says nothing
+// about a value without one.
 int spki_cmp_ordered(spki_engine* engine, const spki_atom* a, const spki_atom* b,
                      int32_t ordering) {
   if (a == nullptr || b == nullptr) return SPKI_ORDER_NONE;

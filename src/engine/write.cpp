@@ -4,7 +4,8 @@
 //   list = "(" 1*( atom / list ) ")"
 //   atom = [ "[" length ":" hint "]" ] length ":" bytes
 //
-// A keyword is written as its row's name; one without a row of its own as "???".
+// A keyword is written as its row's name; one without a row of its own as "???". Every other piece
+// is written as it was read, so what was not derived comes out byte for byte.
 #include "src/engine/write.h"
 
 #include <charconv>

@@ -9,7 +9,8 @@
 
 namespace ZvVesk2::Engine {
 
-// Takes one piece; empty pieces are never given. The first failure ends the walk.
+// Takes one piece, which is borrowed for the call; empty pieces are never given. The first failure
+// ends the walk: a sink that has had enough answers with one.
 struct spki_sink {
   [[nodiscard]] virtual spki_status Put(const void* data, size_t length) = 0;
 
@@ -26,6 +27,8 @@ struct spki_digest_sink final : spki_sink {
   }
 };
 
+// The list that `chain` is the head of, parentheses included. Code of the sink. What is written is
+// not bounded here: shared parts come as often as they stand.
 [[nodiscard]] spki_status spki_write_pieces(const spki_elem* chain, spki_sink* sink);
 // One byte string with its display hint, as it stands in a list.
 [[nodiscard]] spki_status spki_write_atom(const spki_atom* atom, spki_sink* sink);

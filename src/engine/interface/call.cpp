@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// Start and end of an engine call, and the way of objects into the engine.
+// Start and end of an engine call, and the way of objects into the engine. Each call has an engine
+// of its own in its frame: calls in different threads share nothing, and nothing survives one.
 #include <new>
 
 #include <vesk2/verify.h>
@@ -62,6 +63,8 @@ constexpr uint64_t kStepsPerCombination = 16;
 
 }  // namespace
 
+// The lists go first: they own export buffers, which are no part of the engine's pool. Work counts
+// whatever the call answered.
 EngineCall::~EngineCall() {
   workDone += engine_.budget.comparisons + kStepsPerCombination * engine_.budget.combinations;
   for (spki_elem* list : lists_) spki_list_dispose(&engine_, list);

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // The only door between the object model and the reduction engine. What goes in is an object's
-// canonical bytes, without display hints; what comes out are canonical bytes again.
+// canonical bytes, without display hints; what comes out are canonical bytes again. So two keys
+// that differ in hints are one principal, and neither side holds a pointer into the other.
 #ifndef VESK2_SRC_ENGINE_INTERFACE_INTERFACE_H
 #define VESK2_SRC_ENGINE_INTERFACE_INTERFACE_H
 
@@ -27,7 +28,8 @@ uint64_t spki_canonical_length(const spki_elem* chain);
 // Writes the canonical form, of that length, and moves the cursor behind it.
 void spki_write_chain(const spki_elem* chain, unsigned char** cursor);
 
-// An engine for one call. Its end disposes of the imported lists and stops the engine.
+// An engine for one call. Its end disposes of the imported lists and stops the engine. Nothing that
+// the engine made may be used behind it: results are written to bytes before.
 class EngineCall {
  public:
   EngineCall() = default;
@@ -35,6 +37,7 @@ class EngineCall {
   EngineCall& operator=(const EngineCall&) = delete;
   ~EngineCall();
 
+  // Before all else, once. Codes of spki_engine_start; after a failure the call is only to end.
   [[nodiscard]] int Start(const Vesk2ContextStruct* ctx);
   // Imports an object; a null one is the null list. At most kLists of them.
   [[nodiscard]] int Import(SExpression* expression, spki_elem** list);

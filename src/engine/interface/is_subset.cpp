@@ -1,5 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // Whether one tag lies within another: whether intersecting the two leaves the first unchanged.
+// Every failure reads as "no": the question is asked in order to grant. Equal objects need no
+// engine, and are the one way for a set to lie within a set.
 #include <vesk2/expression.h>
 
 #include "src/engine/interface/interface.h"

@@ -34,6 +34,7 @@ struct Granted {
   unsigned int length = 0;
 };
 
+// Measured first: the result may share its parts and be longer than all that went in.
 [[nodiscard]] int WriteResult(const Engine::spki_elem* result, Granted& granted) {
   const uint64_t length = Engine::spki_canonical_length(result);
   VESK2_REQUIRE(length <= Limits::kMaxResult, SPKI_ERR_NO_MEM);
@@ -45,6 +46,7 @@ struct Granted {
   return 0;
 }
 
+// ReductA compares the first entry alone, and is not to fail for the size of others.
 enum class Entries { All, First };
 
 // The result still points into the imported bytes, so it is written while they are there.
@@ -97,6 +99,8 @@ int ReductA(Vesk2ContextStruct* ctx, SExpression* acl, SExpression* sequence, SE
   return requestedTag->IsSubset(tag.get()) ? 0 : VESK2_ERR_PACKAGE_NOT_GRANTED;
 }
 
+// The search takes the last of each, so of several grants the outputs may come from different ones;
+// in "(3:acl)" it finds nothing, which is no error.
 int ReductB(Vesk2ContextStruct* ctx, SExpression* acl, SExpression* sequence, SExpression* third,
             SExpression*& tag, SExpression*& notBefore, SExpression*& notAfter) {
   VESK2_REQUIRE(acl != nullptr && sequence != nullptr && third != nullptr, VESK2_ERR_INVALID_PARAM);

@@ -20,6 +20,7 @@ struct LengthSink final : spki_sink {
   }
 };
 
+// Takes every piece: the room was measured by the same walk.
 struct MemorySink final : spki_sink {
   unsigned char* cursor;
 
