@@ -53,8 +53,8 @@ struct DsaForm {
   }
 };
 
-// A record whose numbers are wiped when it goes.
-// Numbers of public keys are no secret; they are freed with the record on every path.
+// A record whose numbers are wiped and freed when it goes, on every path. Numbers of public keys
+// are no secret; wiping is how records give them back.
 template <typename Form>
 class KeyRecord {
  public:

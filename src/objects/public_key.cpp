@@ -135,7 +135,6 @@ ZVCLMPublicKeyData* PublicKey::GetKey() const { return key; }
 template <typename Form>
 int PublicKey::SetNumbers(ZVCLMPublicKeyData* newKey) {
   VESK2_REQUIRE(newKey != nullptr && IsEmpty(), VESK2_ERR_INVALID_PARAM);
-  // From here on it is this object's, also when the rest fails.
   key = newKey;
   KeyRecord<Form> record;
   VESK2_TRY(record.Init());

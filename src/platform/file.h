@@ -62,7 +62,7 @@ inline constexpr mode_t kZvSharedFile = 0644;
 inline constexpr mode_t kZvSharedDirectory = 0755;
 
 // zv_error_code is the code of a system call that failed with `error`: VESK2_ERR_MEM_ALLOC where a
-// resource ran out, else `otherwise`. No other place reads errno.
+// resource ran out, else `otherwise`. No other place makes a code of errno.
 [[nodiscard]] int zv_error_code(int error, int otherwise);
 
 // zv_close closes, flushing first. 0, or VESK2_ERR_WRITE_FILE when written bytes could not be kept.

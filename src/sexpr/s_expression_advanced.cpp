@@ -117,7 +117,8 @@ int SExpression::ParseTagAdvanced(SExpression*& out, const char* text, const cha
 }
 
 // Counts three for each list, its parentheses and a terminator, and for each string one more than
-// its bytes: larger than the text, as ExportAdvanced's strict bounds need it.
+// its bytes: larger than the text, as ExportAdvanced's strict bounds need it. An empty list by
+// itself needs one byte more than this.
 unsigned int SExpression::AdvancedLength() {
   uint64_t length = 0;
   Walk walk(this);
