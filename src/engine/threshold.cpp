@@ -49,6 +49,7 @@ const spki_elem* ThresholdList(const spki_elem* subject) {
   *threshold = {run->thresholds,    k,      n, carrier->member, carrier->issuer,
                 carrier->threshold, nullptr};
   run->thresholds = threshold;
+  // NOLINTNEXTLINE(bugprone-sizeof-expression): an array of pointers
   const size_t size = (size_t{n} + 1) * sizeof(spki_entry*);
   threshold->chains = static_cast<spki_entry**>(spki_allocate(engine, size));
   VESK2_REQUIRE(threshold->chains != nullptr, SPKI_ERR_NO_MEM);

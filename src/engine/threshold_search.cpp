@@ -77,6 +77,7 @@ const spki_entry* Search::Fitting(const spki_entry* entry) {
 spki_status Search::Prepare() {
   // Each position is looked at, whether or not anything is there.
   VESK2_TRY(spki_charge_units(engine_, threshold_->n, SPKI_ERR_THRESHOLD));
+  // NOLINTNEXTLINE(bugprone-sizeof-expression): an array of pointers
   const size_t size = threshold_->n * sizeof(spki_entry*);
   candidates_ = static_cast<const spki_entry**>(spki_allocate(engine_, size));
   VESK2_REQUIRE(candidates_ != nullptr, SPKI_ERR_NO_MEM);

@@ -61,6 +61,7 @@ int ZvListing::Next(const char** name, ZvKind* kind) {
   const dirent* entry;
   do {
     errno = 0;
+    // NOLINTNEXTLINE(clang-analyzer-core.NonNullParamChecker): Open answered 0
     entry = readdir(static_cast<DIR*>(stream_));
   } while (entry != nullptr && IsDots(entry->d_name));
   *name = entry != nullptr ? entry->d_name : nullptr;

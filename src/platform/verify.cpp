@@ -230,8 +230,8 @@ struct DerSignature {
 bool ToDer(DerSignature* out, Number r, Number s) {
   const Evp<DSA_SIG, DSA_SIG_free> pair(DSA_SIG_new());
   if (pair == nullptr || DSA_SIG_set0(pair.get(), r.get(), s.get()) != 1) return false;
-  r.release();  // the pair's now
-  s.release();
+  static_cast<void>(r.release());  // the pair's now
+  static_cast<void>(s.release());
   out->length = i2d_DSA_SIG(pair.get(), &out->data);
   return out->length > 0;
 }

@@ -71,6 +71,7 @@ int ByteString::PrintAdvanced(int (*write)(const char* text, unsigned int length
       // digits that has this hint shows its first digit's code, not its number.
       if (length != 0) {
         char number[32];
+        // NOLINTNEXTLINE(clang-analyzer-core.NullDereference): what has a length has bytes
         const char* end = std::to_chars(number, number + sizeof number, unsigned{data[0]}).ptr;
         write(number, static_cast<unsigned>(end - number), user);
       }

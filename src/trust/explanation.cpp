@@ -146,6 +146,7 @@ TimeStamp* Explanation::GetEnd() const { return state != nullptr ? state->end : 
 Explanation::End Explanation::GetEndKind() const {
   return state != nullptr ? state->endKind : NoEnd;
 }
+// NOLINTNEXTLINE(clang-analyzer-core.NullDereference): the state is there
 size_t Explanation::GetEndCert() const { return state != nullptr ? state->endCert : kNone; }
 
 }  // namespace ZvVesk2

@@ -54,7 +54,7 @@ bool IsStamp(const TimeStamp* stamp) {
   constexpr std::string_view kForm = "####-##-##_##:##:##";
   if (stamp->GetLength() != kForm.size()) return false;
   for (size_t i = 0; i < kForm.size(); ++i) {
-    const unsigned char c = stamp->GetData()[i];
+    const auto c = static_cast<char>(stamp->GetData()[i]);
     if (kForm[i] == '#' ? c < '0' || c > '9' : c != kForm[i]) return false;
   }
   return true;

@@ -125,6 +125,7 @@ TextWriter& TextWriter::Escaped(std::string_view bytes) {
 TextWriter& TextWriter::Fingerprint(DExpression* expression) {
   unsigned char* digest = nullptr;
   unsigned int length = 0;
+  // NOLINTNEXTLINE(clang-analyzer-core.CallAndMessage): callers have a value to tell of
   const int code = expression->ComputeHash(digest, length, ZVCLM_HASH_SHA256, true);
   const std::unique_ptr<unsigned char[]> owner(digest);
   if (code_ == 0) code_ = InOwnWords(code);
