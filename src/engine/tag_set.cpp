@@ -6,8 +6,9 @@
 //   (* set (* prefix ab)) and abc   abc
 //
 // Members that are sets are taken apart, so a result is never a set of sets. The cost is the
-// product of both sizes, and for each result a comparison with those before it: the budget pays for
-// all of them, and Limits::kMaxSetMembers bounds the result.
+// product of both sizes, and for each result a comparison with those before it, but for the strings
+// of large sets (set_index.h): the budget pays for what is done, and Limits::kMaxSetMembers bounds
+// the result.
 #include <utility>
 
 #include "src/engine/budget.h"
