@@ -62,6 +62,7 @@ Action DefineCrlVerify(OptionList& list);
 Action DefineManifestSign(OptionList& list);
 Action DefineManifestApprove(OptionList& list);
 Action DefineManifestVerify(OptionList& list);
+Action DefineManifestInstall(OptionList& list);
 Action DefineManifestShow(OptionList& list);
 Action DefineManifestCompare(OptionList& list);
 Action DefineFloorShow(OptionList& list);

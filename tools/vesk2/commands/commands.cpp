@@ -133,6 +133,10 @@ constexpr Command kCommands[] = {
      "vesk2 manifest approve app.manifest --key bob.pem --tree app", DefineManifestApprove},
     {"manifest", "verify", "Is a directory as signed, by someone authorized?",
      "vesk2 manifest verify app app.manifest --tag '(install (app calc))'", DefineManifestVerify},
+    {"manifest", "install", "Install what a manifest lists, from a directory or an archive",
+     "vesk2 manifest install app.tar.gz app.manifest /opt/app --tag '(install (app calc))'\n"
+     "vesk2 manifest install app app.manifest /opt/app --tag '(install (app calc))' --replace",
+     DefineManifestInstall},
     {"manifest", "show", "Show who signed a manifest, and what it lists",
      "vesk2 manifest show app.manifest --files", DefineManifestShow},
     {"manifest", "compare", "Do two manifests list the same?",

@@ -38,12 +38,15 @@ void RefuseSharedInput(const CommandLine& line) {
 
 // ---- What a command that only looks gives up ----
 
+// And one that takes strangers' archives apart.
 bool OnlyLooks(const std::string& command) {
+  if (command == "manifest install") return true;
   if (command.starts_with("key")) return false;  // keys are in programs and devices, too
   return command.ends_with("verify") || command.ends_with("show");
 }
 
-std::string DirectoryOf(const std::string& path) {
+std::string DirectoryOf(const std::string& named) {
+  const std::string path = named.substr(0, named.find_last_not_of('/') + 1);
   const size_t slash = path.rfind('/');
   return slash == std::string::npos ? "." : path.substr(0, slash + 1);
 }

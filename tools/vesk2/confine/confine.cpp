@@ -130,7 +130,8 @@ constexpr uint64_t kTruncate = uint64_t{1} << 14;  // from the third version of 
 constexpr uint64_t kRefer = uint64_t{1} << 13;     // from the second
 constexpr uint64_t kWriteFile = LANDLOCK_ACCESS_FS_WRITE_FILE | kTruncate;
 constexpr uint64_t kWriteTree = kWriteFile | kRefer | LANDLOCK_ACCESS_FS_MAKE_REG |
-                                LANDLOCK_ACCESS_FS_MAKE_DIR | LANDLOCK_ACCESS_FS_REMOVE_FILE;
+                                LANDLOCK_ACCESS_FS_MAKE_DIR | LANDLOCK_ACCESS_FS_REMOVE_FILE |
+                                LANDLOCK_ACCESS_FS_REMOVE_DIR;
 constexpr uint64_t kFirstVersion = (uint64_t{1} << 13) - 1;  // the rights that it knows
 
 class FileRules {

@@ -8,6 +8,7 @@
 #include <cerrno>
 #include <string>
 #include <string_view>
+#include <utility>
 
 namespace vesk2_command {
 
@@ -21,6 +22,8 @@ class Descriptor {
     if (number_ >= 0) close(number_);
     number_ = number;
   }
+  // The open file is the caller's from now on.
+  int Give() { return std::exchange(number_, -1); }
   int get() const { return number_; }
   // A path under which anybody in this process can open the file.
   std::string Path() const { return "/proc/self/fd/" + std::to_string(number_); }

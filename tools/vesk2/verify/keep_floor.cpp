@@ -28,8 +28,12 @@ std::optional<ExitCode> KeepFloor::Refuse(const TimeStamp& signedAt) {
   return RefuseOlder(signedAt, *lowest);
 }
 
-std::optional<ExitCode> KeepFloor::Raise(const TimeStamp& signedAt) {
-  if (path_.empty() || !raises_) return std::nullopt;
+std::optional<ExitCode> KeepFloor::Raise(const TimeStamp& signedAt,
+                                         const std::function<void()>& accept) {
+  if (path_.empty() || !raises_) {
+    if (accept) accept();
+    return std::nullopt;
+  }
   // Bytes that are no time would be no floor.
   if (BytesOf(*ParseTime(StampText(signedAt), false)) != BytesOf(signedAt)) {
     throw Trouble("the manifest's time of signing is none: " + StampText(signedAt));
@@ -38,6 +42,7 @@ std::optional<ExitCode> KeepFloor::Raise(const TimeStamp& signedAt) {
   const std::optional<Floor> floor = ReadFloor(path_, &tag_);
   const TimeStamp* const lowest = floor ? floor->signedAt.get() : nullptr;
   if (lowest != nullptr && signedAt.IsBefore(lowest)) return RefuseOlder(signedAt, *lowest);
+  if (accept) accept();
   if (lowest != nullptr && !signedAt.IsAfter(lowest)) return std::nullopt;
   WriteFloor(path_, tag_, signedAt);
   Result()["floor"]["raised_to"] = StampJson(ReadFloor(path_, &tag_)->signedAt.get());

@@ -6,6 +6,7 @@
 #ifndef VESK2_TOOLS_KEEP_FLOOR_H
 #define VESK2_TOOLS_KEEP_FLOOR_H
 
+#include <functional>
 #include <optional>
 #include <string>
 
@@ -30,8 +31,10 @@ class KeepFloor {
   // floor was asked for.
   std::optional<ExitCode> Refuse(const TimeStamp& signedAt);
   // Raises the floor to what is about to be accepted. It is a no where somebody has raised it
-  // further since.
-  std::optional<ExitCode> Raise(const TimeStamp& signedAt);
+  // further since. `accept` is what there is to do about it, between the two: of all who accept
+  // something at once under one floor, the newest is the last.
+  std::optional<ExitCode> Raise(const TimeStamp& signedAt,
+                                const std::function<void()>& accept = nullptr);
 
  private:
   ExitCode RefuseOlder(const TimeStamp& signedAt, const TimeStamp& floor) const;

@@ -1,0 +1,184 @@
+// SPDX-License-Identifier: Apache-2.0
+// manifest_authority.cpp: judging who signed a manifest.
+#include "tools/vesk2/commands/manifest_authority.h"
+
+#include "tools/vesk2/confine/confine.h"
+#include "tools/vesk2/explain/explain.h"
+#include "tools/vesk2/files/files.h"
+#include "tools/vesk2/objects/manifest_file.h"
+#include "tools/vesk2/objects/shapes.h"
+#include "tools/vesk2/stores/acl_store.h"
+#include "tools/vesk2/verify/keep_lists.h"
+
+namespace vesk2_command {
+namespace {
+
+constexpr const char* kSigning = "signing";
+
+Period AskedPeriod(const AuthorityOptions& options) {
+  if (options.at == kSigning) return {};
+  if (options.at.empty()) return ParsePeriod(options.period);
+  return {ParseTime(options.at, false), ParseTime(options.at, false)};
+}
+
+// Whether nobody said what moment the answer is about.
+bool IsAboutToday(const AuthorityOptions& options) {
+  return options.at.empty() && options.period.notBefore.empty() && options.period.notAfter.empty();
+}
+
+}  // namespace
+
+void AddAuthorityOptions(OptionList& list, AuthorityOptions& options) {
+  list.Add("--tag", options.tag, "What the signer must be authorized for; of a set, every member")
+      .Required();
+  AddPeriodOptions(list, options.period);
+  list.Add("--at", options.at,
+           "Authorized, and not revoked, at this moment; \"signing\" for the time of signing "
+           "[authorized at the time of signing, not revoked now]")
+      .Excludes("--not-before")
+      .Excludes("--not-after");
+  list.Add(
+      "--no-store-update", options.noStoreUpdate,
+      "Write nothing into a store: do not keep the revocation lists that the manifest carries");
+  AddFloorOptions(list, options.floor);
+  list.Add("--acl-dir", options.aclDirectory, "Trust the entries of this directory too");
+  AddStoreCheckOptions(list, options.stores);
+  list.Add("--explain", options.explain, "Tell why also when the answer is yes");
+}
+
+void StartTreeResult() {
+  for (const char* member : {"tag", "signer", "signed_at", "counts", "changed", "missing",
+                             "links_out", "unlisted", "ignored", "ignored_nothing", "floor"}) {
+    Result()[member] = Json();
+  }
+  StartExplanation();
+}
+
+bool JudgedTree(const ZvVesk2::Manifest& manifest, int code) {
+  return code == 0 || manifest.GetInvalid() != nullptr || manifest.GetMissing() != nullptr ||
+         (code == VESK2_ERR_EXTRA_FILES && manifest.GetExtra() != nullptr);
+}
+
+ManifestAuthority::ManifestAuthority(const AuthorityOptions& options,
+                                     std::vector<std::string> signing)
+    : options_(options), request_(ParseRequest(options.tag)) {
+  question_.file = options.manifest;
+  question_.manifest = true;
+  question_.request = &request_;
+  question_.period = AskedPeriod(options);
+  question_.aclDirectory = options.aclDirectory;
+  question_.signing = std::move(signing);
+  question_.proved = &proved_;
+  Result()["tag"] = TagText(request_.tag.get());
+  floor_.emplace(options.floor, *request_.tag, IsAboutToday(options) && !options.noStoreUpdate);
+}
+
+void ManifestAuthority::Initialize(ZvVesk2::Manifest& manifest, const std::string& directory,
+                                   const std::string& path) const {
+  Check(manifest.Initialize(directory.c_str(), path.c_str(), request_.members[0].text.c_str()),
+        "preparing");
+  manifest.SetStoreUpdate(false);  // the answer decides what is kept
+  if (!options_.aclDirectory.empty()) manifest.SetExtraAclDirectory(NewText(options_.aclDirectory));
+}
+
+long ManifestAuthority::First() const {
+  return question_.period.notBefore ? question_.period.notBefore->ToTime() : 0;
+}
+
+long ManifestAuthority::Last() const {
+  return question_.period.notAfter ? question_.period.notAfter->ToTime() : 0;
+}
+
+std::optional<ExitCode> ManifestAuthority::Judge(const ZvVesk2::Manifest& manifest, int code) {
+  Result()["signed_at"] = StampJson(proved_.GetSigningTime());
+  if (proved_.CountCerts() > 0) {
+    Result()["signer"] = Fingerprint(*proved_.GetCert(0)->GetIssuer());
+  }
+  if (code != 0 && !IsRefusal(code)) ThrowTrouble(manifest, code);
+  broken_ = CheckStores(question_, options_.stores);
+  if (IsAboutToday(options_)) today_.emplace(proved_);
+  const int refused = JudgeMembers(code);
+  if (refused != 0) return Refuse(refused);
+  return RefuseTime();
+}
+
+void ManifestAuthority::ThrowTrouble(const ZvVesk2::Manifest& manifest, int code) const {
+  ExplainTrouble(question_, code);
+  if (code == VESK2_ERR_FILE_NOT_FOUND || code == VESK2_ERR_FIND_DIR) ThrowNoStore(code);
+  ThrowUnreadable(options_.manifest, manifest, code);
+}
+
+// The first refusal of a member of the asked set; `first` is the library's for the first member.
+int ManifestAuthority::JudgeMembers(int first) {
+  int refused = 0;
+  for (size_t i = 0; i < request_.members.size(); ++i) {
+    int code = i == 0 ? first : JudgeMember(request_.members[i].tag.get());
+    if (code == 0 && today_) {
+      code = today_->Judge(request_.members[i].tag.get());
+      byToday_ |= refused == 0 && code != 0;
+    }
+    TellMember(request_, i, code);
+    if (refused == 0) refused = code;
+  }
+  return refused;
+}
+
+int ManifestAuthority::JudgeMember(SExpression* tag) const {
+  ZvVesk2::Evidence same(nullptr);
+  Check(same.Copy(proved_), "judging a member");
+  const int code = same.Judge(tag);
+  if (code < 0 || code == VESK2_ERR_MEM_ALLOC) Check(code, Escape(options_.manifest));
+  return code != 0 ? code : proved_.GetContentCode();
+}
+
+ExitCode ManifestAuthority::Refuse(int code) {
+  Keep(false);
+  int explained = code;
+  if (today_) {
+    question_.proved = &today_->evidence();
+    const int now = today_->Judge(request_.members[0].tag.get());
+    if (now != 0) explained = now;
+  }
+  const ExitCode verdict = byToday_ ? today_->Refuse(question_, code) : No(code, CodeWords(code));
+  ExplainRefusal(question_, explained);
+  return verdict;
+}
+
+std::optional<ExitCode> ManifestAuthority::RefuseTime() {
+  if (today_ && IsSignedInFuture(proved_)) {
+    Keep(false);
+    return No("signed-in-future", "the manifest says it was signed at " +
+                                      StampText(*proved_.GetSigningTime()) +
+                                      ", which is yet to come (--at tells when to judge it)");
+  }
+  const std::optional<ExitCode> older = floor_->Refuse(*proved_.GetSigningTime());
+  if (older) Keep(false);
+  return older;
+}
+
+void ManifestAuthority::Keep(bool yes) const {
+  if (!options_.noStoreUpdate) KeepLists(proved_, yes, broken_);
+}
+
+std::optional<ExitCode> ManifestAuthority::RaiseFloor(const std::function<void()>& accept) {
+  return floor_->Raise(*proved_.GetSigningTime(), accept);
+}
+
+std::string ManifestAuthority::SignedText() const {
+  const bool aboutSigning = today_ || options_.at == kSigning;
+  return "as signed at " + StampText(*proved_.GetSigningTime()) + " by " +
+         Fingerprint(*proved_.GetCert(0)->GetIssuer()) + (aboutSigning ? EndedSince(proved_) : "");
+}
+
+void ManifestAuthority::TellYes() {
+  if (options_.explain) Note(Confinement());
+  if (options_.explain || GetStyle().json) TellGrant();
+}
+
+void ManifestAuthority::TellGrant() {
+  if (today_) question_.proved = &today_->evidence();
+  ExplainGrant(question_);
+  question_.proved = &proved_;
+}
+
+}  // namespace vesk2_command
