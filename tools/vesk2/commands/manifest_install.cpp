@@ -1,6 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 // manifest_install.cpp: vesk2 manifest install. Who signed is judged first; then what is listed is
 // taken into a directory that only we can enter, verified there, and put in its place.
+#include <cerrno>
+#include <cstring>
+
 #include "tools/vesk2/commands/command.h"
 #include "tools/vesk2/commands/manifest_authority.h"
 #include "tools/vesk2/explain/effort.h"
@@ -152,7 +155,9 @@ class Installation {
       const std::string path = entry.substr(root.size() + 1);
       const auto problem = filled_.problems.find(path);
       entry = Join(options_.source, path);
-      finding.reasons[entry] = problem != filled_.problems.end() ? problem->second : "";
+      const bool known =
+          problem != filled_.problems.end() && problem->second != std::strerror(ENOENT);
+      finding.reasons[entry] = known ? problem->second : "";
     }
   }
 

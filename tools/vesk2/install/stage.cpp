@@ -54,26 +54,28 @@ DrawnDirectory::DrawnDirectory(int parent, const std::string& above, const std::
   // Whoever removes leftovers can find it before it is locked, and remove it: it is made anew.
   constexpr int kAttempts = 8;
   const std::string stem = StemOf(name);
-  for (int i = 0; i < kAttempts; ++i) {
-    if (Draw(stem)) return;
-  }
-  throw FileTrouble(Join(above, name), std::strerror(errno), "io");
+  int error = EEXIST;
+  for (int i = 0; i < kAttempts && error == EEXIST; ++i) error = Draw(stem);
+  if (error != 0) throw FileTrouble(Join(above, name), std::strerror(error), "io");
 }
 
-bool DrawnDirectory::Draw(const std::string& stem) {
+// 0, EEXIST for a name that somebody else had or took, or another error.
+int DrawnDirectory::Draw(const std::string& stem) {
   char random[kRandomBytes];
-  if (getrandom(random, sizeof random, 0) != sizeof random) return false;
+  if (getrandom(random, sizeof random, 0) != sizeof random) return EIO;
   const std::string name = stem + Hex({random, sizeof random});
-  if (mkdirat(parent_, name.c_str(), 0700) != 0) return false;
+  if (mkdirat(parent_, name.c_str(), 0700) != 0) return errno;
   file_.Take(OpenBelow(parent_, name, kDirectory));
-  const bool taken = file_.get() < 0 || (flock(file_.get(), LOCK_EX | LOCK_NB) != 0 &&
-                                         errno == EWOULDBLOCK);  // else there are no locks here
-  if (taken || !LeadsTo(parent_, name, file_.get())) {
+  int error = file_.get() >= 0 || errno == ENOENT ? 0 : errno;
+  // Where there are no locks, nobody gets one.
+  const bool taken = flock(file_.get(), LOCK_EX | LOCK_NB) != 0 && errno == EWOULDBLOCK;
+  if (error == 0 && (taken || !LeadsTo(parent_, name, file_.get()))) error = EEXIST;
+  if (error == 0) {
+    name_ = name;
+  } else {
     (void)unlinkat(parent_, name.c_str(), AT_REMOVEDIR);
-    return false;
   }
-  name_ = name;
-  return true;
+  return error;
 }
 
 DrawnDirectory::~DrawnDirectory() {

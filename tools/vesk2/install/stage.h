@@ -30,7 +30,7 @@ class DrawnDirectory {
   void Rename(std::string name) { name_ = std::move(name); }
 
  private:
-  bool Draw(const std::string& stem);
+  int Draw(const std::string& stem);
 
   const int parent_;
   std::string name_;
