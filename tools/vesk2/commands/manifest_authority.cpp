@@ -39,7 +39,7 @@ void AddAuthorityOptions(OptionList& list, AuthorityOptions& options) {
       .Excludes("--not-after");
   list.Add(
       "--no-store-update", options.noStoreUpdate,
-      "Write nothing into a store: do not keep the revocation lists that the manifest carries");
+      "Keep nothing: neither the revocation lists that the manifest carries nor a higher floor");
   AddFloorOptions(list, options.floor);
   list.Add("--acl-dir", options.aclDirectory, "Trust the entries of this directory too");
   AddStoreCheckOptions(list, options.stores);
