@@ -2,6 +2,7 @@
 // The engine's state, its records, keywords and orders.
 #include <cstring>
 
+#include "src/engine/budget.h"
 #include "src/engine/digest.h"
 #include "tests/engine/engine_fixture.h"
 
@@ -65,6 +66,21 @@ TEST_F(Model, LiveRecordsAndBytesAreBounded) {
   EXPECT_EQ(nullptr, spki_elem_new(&engine_)) << "a spent engine stays spent";
 }
 
+// The last piece within a limit is given, and none after it.
+TEST_F(Model, LimitsAreExact) {
+  engine_.budget.combinations = Limits::kMaxCombinations - 1;
+  EXPECT_EQ(0, spki_charge_combination(&engine_));
+  EXPECT_EQ(SPKI_ERR_THRESHOLD, spki_charge_combination(&engine_, SPKI_ERR_THRESHOLD));
+  engine_.budget = {};
+  engine_.budget.live_records = Limits::kMaxRecords - 1;
+  spki_elem* last = spki_elem_new(&engine_);
+  EXPECT_NE(nullptr, last);
+  EXPECT_EQ(nullptr, spki_elem_new(&engine_));
+  engine_.budget = {};
+  engine_.budget.live_records = 1;
+  spki_elem_release(&engine_, last);
+}
+
 // Every row, so that no number can slip.
 TEST(Keywords, RowsAndNumbers) {
   int recognised = 0;
@@ -110,6 +126,8 @@ TEST(Order, BytesAndPaddedBytes) {
   }
   const std::string text = "x";
   EXPECT_EQ(3, spki_cmp_bytes(nullptr, 0, nullptr, 0));
+  EXPECT_EQ(3, spki_cmp_padded(nullptr, 0, Bytes(text), 1, 'x'));
+  EXPECT_EQ(3, spki_cmp_padded(Bytes(text), 1, nullptr, 0, 'x'));
   EXPECT_EQ(3, spki_cmp_cstr(nullptr, 0, "x"));
   EXPECT_EQ(0, spki_cmp_cstr(nullptr, 0, nullptr)) << "identical pointers before the null test";
   EXPECT_EQ(0, spki_cmp_cstr(Bytes(text), 0, text.c_str())) << "whatever the length";
@@ -117,6 +135,9 @@ TEST(Order, BytesAndPaddedBytes) {
 
 TEST_F(Model, AtomsAreEqualByTheOrder) {
   EXPECT_TRUE(spki_atom_equal(&engine_, Atom("x"), Atom(Raw("x\0y"s))));
+  EXPECT_TRUE(spki_atom_equal(&engine_, nullptr, nullptr));
+  EXPECT_FALSE(spki_atom_equal(&engine_, nullptr, Atom("x")));
+  EXPECT_FALSE(spki_atom_equal(&engine_, Atom("x"), nullptr));
 }
 
 TEST(CryptoStatus, UnlistedResultsAreSuccess) {

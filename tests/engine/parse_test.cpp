@@ -21,9 +21,9 @@ TEST_F(Parsing, MalformedListsHaveTheirCodes) {
       {SPKI_ERR_BAD_SEXP_START, {"", "3:abc"}},
       {SPKI_ERR_BAD_LTH_FORMAT,
        {"(", "()", "((1:x))", "(0:)", "(03:abc)", "([0:]3:acl)", "([4:text]x)"}},
-      {SPKI_ERR_COLON_EXPECTED, {"(3", "(3abc)", "(3 :abc)"}},
+      {SPKI_ERR_COLON_EXPECTED, {"(3", "(3abc)", "(3 :abc)", "(3a:" + std::string(80, 'x') + ")"}},
       {SPKI_ERR_SEXP_NOT_CLOSED, {"(3:abc", "(3:abc(1:x)"}},
-      {SPKI_ERR_BAD_SEXP_FORMAT, {"(3:abc x)", "(3:abc 1:x)", "(3:abc0:)"}},
+      {SPKI_ERR_BAD_SEXP_FORMAT, {"(3:abc x)", "(3:abc 1:x)", "(3:abc0:)", "(3:abcx)"}},
       {SPKI_ERR_STRING_TOO_LONG, {"(4:abc", "(2147483649:abc)"}},
       {SPKI_ERR_LTH_TOO_BIG, {"(2147483650:abc)", "(99999999999999999999:abc)"}},
       {SPKI_ERR_DISP_HINT_NOT_CLOSED, {"([4:text)3:acl)"}},
@@ -74,6 +74,26 @@ TEST_F(Parsing, WritingGoesBackToTheBytes) {
   std::string flat = "(1:x";
   for (int i = 0; i < 1'000'000; ++i) flat += "1:y";
   Parse(flat + ")");  // released at the end without deep recursion
+}
+
+// Whichever piece cannot be written, the writer says so.
+TEST_F(Parsing, WritingEndsWithTheFirstRefusal) {
+  struct RefusingSink final : spki_sink {
+    int pieces = 0;
+    int refused = -1;
+    spki_status Put(const void*, size_t) override {
+      return pieces++ == refused ? SPKI_ERR_NO_MEM : 0;
+    }
+  };
+  const spki_elem* list = Chain("(acl (entry [text]foo) x)");
+  RefusingSink all;
+  ASSERT_EQ(0, spki_write_pieces(list, &all));
+  for (int i = 0; i < all.pieces; ++i) {
+    RefusingSink sink;
+    sink.refused = i;
+    EXPECT_EQ(SPKI_ERR_NO_MEM, spki_write_pieces(list, &sink)) << i;
+    EXPECT_EQ(i + 1, sink.pieces);
+  }
 }
 
 }  // namespace

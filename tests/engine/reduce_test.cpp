@@ -13,7 +13,8 @@ TEST_F(ReduceTest, Chains) {
   const std::string r = Entry(R), a = Entry(A, kProp), b = Entry(B, kProp), rest = Cert(A, B);
   const std::string aR = Cert(A, R), aB = Cert(A, B, kProp), bR = Cert(B, R);
   EachGrants(r, {r, r + r, "(acl " + r + ")", a + aR, a + aB + bR, a + bR + aB,
-                 a + "(sequence " + aR + ")", a + b + aR + bR});
+                 a + "(sequence " + aR + ")", a + b + aR + bR, a + Entry(A) + aR,
+                 Entry(R, "(x y)(tag x)")});
   EachGrants(Entry(R, kProp), {a + Cert(A, R, kProp), Entry(R, kProp) + Cert(R, R, kProp)});
   // Not to another, nor without permission to delegate, in any order; other lists say nothing.
   EachGrants("", {Entry(A), a + aB, Entry(A) + aR, a + rest + bR, a + bR + rest, "(x " + r + ")(x)",
@@ -130,7 +131,7 @@ TEST_F(ReduceTest, FaultsStopEverything) {
   EachFails(SPKI_ERR_KEY_OR_HASH_EXPECTED, {Entry(Name("(key A)", "n"))});
   EachFails(SPKI_ERR_BAD_SEXP, {Entry(R, "(valid (not-after))")});
   EachFails(SPKI_ERR_UNKNOWN_HASH_ALG, {hash("md5 " + h20), hash("rmd160 " + h20)});
-  EachFails(SPKI_ERR_BAD_HASH_FORMAT, {hash("sha1")});
+  EachFails(SPKI_ERR_BAD_HASH_FORMAT, {hash("sha1"), hash("*")});
   EachFails(SPKI_ERR_HASH_LTH_DIFFER, {hash("sha1 " + h32), hash("sha256 " + h20)});
   Fails(SPKI_ERR_BAD_SEXP, {Entry(R), "", R, "", "(not-after)"});
   Fails(SPKI_ERR_KEY_OR_HASH_EXPECTED, {Entry(R), "", "(k-of-n)"});

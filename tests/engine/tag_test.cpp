@@ -125,6 +125,7 @@ TEST_F(Tags, NoKeywordIsReadOutOfAnotherKind) {
   EXPECT_EQ(SPKI_TAG_LIST, spki_classify(set));
   word->kind = SPKI_ELEM_STRING;
   EXPECT_EQ(SPKI_TAG_SET, spki_classify(set));
+  EXPECT_EQ(SPKI_TAG_NONE, spki_classify(nullptr));
   const spki_elem* bound = Elem("(ge 5)");
   bound->value.list->kind = SPKI_ELEM_HEAD;
   EXPECT_EQ(nullptr, spki_read_bound(bound).value);
@@ -169,11 +170,16 @@ TEST_F(Tags, TooManyComparisonsAreNoRelation) {
   EXPECT_EQ(nullptr, spki_intersect_set(&engine_, set, Elem("(* set a b)")));
   engine_.budget.spent = 0;
   spki_elem* list = Elem("(ftp)");
+  const spki_atom* word = Atom("x");
   engine_.budget.comparisons = Limits::kMaxComparisons - 2;
   EXPECT_EQ(SPKI_REL_EQUAL, Relation(list, Elem("(ftp)"))) << "one for the list, one inside";
   EXPECT_EQ(SPKI_REL_DISJOINT, Relation(list, list));
   EXPECT_EQ(SPKI_ERR_NO_MEM, engine_.budget.spent);
   EXPECT_EQ(nullptr, spki_intersect_chain(&engine_, list, list)) << "and stays so";
+  // Nothing is equal then, and no value is one of a range.
+  EXPECT_FALSE(spki_atom_equal(&engine_, word, word));
+  EXPECT_FALSE(spki_valid_value(&engine_, word, SPKI_KW_ALPHA));
+  EXPECT_EQ(SPKI_ORDER_NONE, spki_cmp_ordered(&engine_, word, word, SPKI_KW_ALPHA));
 }
 
 TEST_F(Tags, OrderOfValues) {

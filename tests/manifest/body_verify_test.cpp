@@ -80,6 +80,7 @@ constexpr struct {
     // names, and what is in an ignored directory does not matter.
     {"+a +s/f +s/x +s/a", "a s/x s/f f x", kExtra, "V:s/d/ s/d/g b I: M: X:s/ s/a"},
     {"+s/a0 +s/zz/y", "s/a0 s/zz", 0, "V:s/ s/d/ s/d/g s/f b a I: M: X:"},
+    {"+s/d/x +s/x", "s/d/x s/x", 0, "V:s/ s/d/ s/d/g s/f b a I: M: X:"},
     {"-s", "s", 0, "V:b a I: M: X:"},
 };
 
