@@ -247,6 +247,43 @@ TEST(KeyTest, TakesOnePkcs1BlockOnly) {
   }
 }
 
+// A number without known factors that takes one signature s for the block: n = s^3 - block.
+struct OneSignature {
+  std::string n, signature;
+};
+OneSignature MakeModulusFor(int bits, const std::string& digest) {
+  const std::string info = "\0\x30\x31\x30\x0d\x06\x09\x60\x86\x48\x01\x65\x03\x04\x02\x01"s +
+                           "\x05\0\x04\x20"s + digest;
+  const Big block = ToNumber(Block(static_cast<size_t>(bits) / 8, info));
+  const std::unique_ptr<BN_CTX, decltype(&BN_CTX_free)> context(BN_CTX_new(), BN_CTX_free);
+  const Big s(BN_new(), BN_free), n(BN_new(), BN_free);
+  BN_set_bit(s.get(), (bits - 1) / 3);
+  do {  // a little larger each time: odd, and of that many bits in the end
+    const Big step(BN_new(), BN_free);
+    BN_rshift(step.get(), s.get(), 4);
+    BN_add(s.get(), s.get(), step.get());
+    if (BN_is_odd(block.get()) == BN_is_odd(s.get())) BN_add_word(s.get(), 1);
+    BN_sqr(n.get(), s.get(), context.get());
+    BN_mul(n.get(), n.get(), s.get(), context.get());
+    BN_sub(n.get(), n.get(), block.get());
+  } while (BN_num_bits(n.get()) < bits);
+  std::string signature(static_cast<size_t>(bits) / 8, '\0');
+  BN_bn2binpad(s.get(), reinterpret_cast<unsigned char*>(signature.data()),
+               static_cast<int>(signature.size()));
+  return {ToBytes(n), signature};
+}
+
+// The largest modulus is one, larger ones cost nothing.
+TEST(KeyTest, BoundsTheModulus) {
+  const std::string digest = Digest("object");
+  for (const int bits : {2048, 16384, 16392, 65536}) {
+    const OneSignature made = MakeModulusFor(bits, digest);
+    EXPECT_EQ(Valid(Define({made.n, "\3"}), ZVCLM_SCHEME_RSA_PKCS1, 2, digest, made.signature),
+              bits <= 16384)
+        << bits;
+  }
+}
+
 // A PSS block: a mask over zeros, 1 and the salt; the hash of digest and salt; "bc".
 std::string PssBlock(size_t size, const std::string& digest, const std::string& salt,
                      const char* maskHash = "sha256") {
@@ -294,6 +331,16 @@ TEST(KeyTest, LeavesTheCallersErrors) {
   EXPECT_EQ(valid, 0);
   for (const int reason : {1, 8}) EXPECT_EQ(ERR_GET_REASON(ERR_get_error()), reason);
   EXPECT_EQ(ERR_peek_error(), 0u);
+  // Nor is a mark left behind a yes.
+  const std::string signature = Pair(true).SignDigest(digest, "rsa-pss", "sha256");
+  ERR_raise(ERR_LIB_USER, 8);
+  EXPECT_EQ(
+      zvclm_PublicKeyVerifySignature(key.get(), ZVCLM_SCHEME_RSA_PSS, &record, Data(digest),
+                                     Size(digest), Data(signature), Size(signature), &valid, 0),
+      0);
+  EXPECT_EQ(valid, 1);
+  EXPECT_EQ(ERR_GET_REASON(ERR_peek_last_error()), 8);
+  EXPECT_EQ(ERR_pop_to_mark(), 0);
 }
 
 // The first of each kind would be good by arithmetic alone, the others only have to be harmless.
