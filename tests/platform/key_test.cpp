@@ -170,14 +170,20 @@ class BlockKey {
     BN_mod_inverse(d_.get(), ToNumber(kE).get(), order.get(), context_.get());
     key_ = Define({ToBytes(n_), kE});
   }
-  // Whether the signature that opens to `block` is good.
-  bool Takes(const std::string& block, int scheme, const std::string& digest) const {
+  // The signature that opens to `block`.
+  std::string Sign(const std::string& block) const {
     const Big number(BN_new(), BN_free);
     BN_mod_exp(number.get(), ToNumber(block).get(), d_.get(), n_.get(), context_.get());
     std::string signature(size_, '\0');
     BN_bn2binpad(number.get(), reinterpret_cast<unsigned char*>(signature.data()),
                  static_cast<int>(size_));
+    return signature;
+  }
+  bool TakesSignature(const std::string& signature, int scheme, const std::string& digest) const {
     return Valid(key_, scheme, ZVCLM_HASH_SHA256, digest, signature);
+  }
+  bool Takes(const std::string& block, int scheme, const std::string& digest) const {
+    return TakesSignature(Sign(block), scheme, digest);
   }
 
  private:
@@ -315,6 +321,13 @@ TEST(KeyTest, TakesPssBlocksOfAnySaltOnly) {
   std::string trailer = PssBlock(kSize, digest, "salt");
   trailer.back() = '\xcc';
   EXPECT_FALSE(takes(trailer)) << "a trailer that names the hash";
+  // A zero at the start is part of the text: without it the same number is no signature.
+  std::string signature;
+  for (int salt = 0; signature.empty() || signature[0] != '\0'; ++salt) {
+    signature = key.Sign(PssBlock(kSize, digest, std::to_string(salt)));
+  }
+  EXPECT_TRUE(key.TakesSignature(signature, ZVCLM_SCHEME_RSA_PSS, digest));
+  EXPECT_FALSE(key.TakesSignature(signature.substr(1), ZVCLM_SCHEME_RSA_PSS, digest));
 }
 
 TEST(KeyTest, LeavesTheCallersErrors) {

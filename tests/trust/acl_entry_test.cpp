@@ -23,6 +23,11 @@ TEST(AclEntry, ReadsWhatItWrites) {
   ExpectRead<AclEntry>(Entry("(7:version1:2)" + kSubject + Tag("")), kBad);
   ExpectRead<AclEntry>(Entry(kSubject + Tag("") + "(10:generation0:)"), kBad);
   ExpectRead<AclEntry>(Entry(kSubject + Tag("") + "(7:comment0:)(5:valid)"), kBad);
+  // A part without its text is none that was left out: a period that nobody can read is no period.
+  for (const char* part :
+       {"(5:valid(10:not-before))", "(5:valid(9:not-after))", "(10:generation)", "(7:comment)"}) {
+    ExpectRead<AclEntry>(Entry(kSubject + Tag("") + part), kBad);
+  }
   ExpectDamageIsSeen<AclEntry>(kFull);
 }
 
@@ -242,6 +247,11 @@ TEST_F(AclFind, TagLookUps) {
   for (const auto& [ask, tag, code] : cases) EXPECT_EQ(ask(Parse(tag).get()), code) << tag;
 
   EXPECT_EQ(find(nullptr), VESK2_ERR_PARAM_NULL);
+  k_ = 7;  // of an earlier question
+  EXPECT_EQ(FindThreshold(0, Tag("(ftp)")), kNoKey);
+  EXPECT_EQ(k_, 0U);
+  EXPECT_EQ(AclEntry::FindThresholdEntry(Key(0).get(), nullptr, nullptr, nullptr, nullptr, k_),
+            VESK2_ERR_PARAM_NULL);
   EXPECT_EQ(contained(nullptr), kInvalid);
   VeskConf::SetGlobalDirectory("/nonexistent");
   EXPECT_EQ(Find(-1, Tag("(ftp)")), VESK2_ERR_FIND_DIR);

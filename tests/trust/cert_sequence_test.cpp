@@ -58,6 +58,8 @@ TEST_F(CertSequences, NamesAndPaths) {
     Ref<CertSequence> sequence;
     EXPECT_EQ(CertSequence::Import(sequence.Out(), name.c_str(), usePath, nullptr), code) << name;
     EXPECT_EQ(First(nullptr, name.c_str(), usePath), code == 0 ? Triple() : std::to_string(code));
+    if (code != 0) continue;
+    EXPECT_EQ(sequence->GetStorageType(), usePath ? ZvVesk2::StoragePath : ZvVesk2::StorageHome);
   }
 }
 

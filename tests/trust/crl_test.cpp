@@ -6,6 +6,7 @@
 #include <csignal>
 #include <vector>
 
+#include "src/trust/revocation_lists.h"
 #include "tests/trust/trust_test.h"
 
 namespace vesk2test {
@@ -44,6 +45,14 @@ TEST(Crl, ReadsWhatItWrites) {
     EXPECT_EQ(sequence->Import(Wrap(text).get()), kInvalid);
   }
   EXPECT_EQ(Ref(new CrlSequence(nullptr))->Import("/nonexistent"), kNoFile);
+  EXPECT_EQ(Ref(new CrlSequence(nullptr))->Import(static_cast<const char*>(nullptr)), kNoFile);
+  EXPECT_EQ(Ref(new Crl(nullptr))->Import(static_cast<ZvBuffer*>(nullptr)), kInvalid);
+  // Each part is whole, and its own code is told.
+  for (const char* const part : {"4:cert", "9:signature"}) {
+    std::string odd = text;
+    odd.replace(odd.find("6:sha256", odd.find(part)), 8, "3:md5");
+    EXPECT_EQ(Ref(new CrlSequence(nullptr))->Import(Wrap(odd).get()), VESK2_ERR_HASH_ID) << part;
+  }
 }
 
 // Nothing that differs from what was signed is ever verified.
@@ -170,6 +179,23 @@ TEST(CrlStatus, Certificates) {
   EXPECT_EQ(AskCert(store, 1), kNoCrl);
   EXPECT_EQ(AskCert(store, 0), kRevoked);
   EXPECT_EQ(AskCert(store, 1), kRevoked);
+}
+
+// What names a certificate says nothing of a key, whichever is asked about first.
+TEST(CrlStatus, TellsCertificatesFromKeys) {
+  const Ref<SExpression> roots = Acls({Root()}), tag = Parse(kTag);
+  const Ref<SExpression> store =
+      Store({CrlSequenceText(0, kTag, CrlText(Item(HashOf(Revocable())), ""))});
+  const Ref<CertObject> cert = Read<CertObject>(Revocable());
+  for (const bool keysFirst : {false, true}) {
+    RevocationLists lists(roots.get(), store.get());
+    for (const bool keys : {keysFirst, !keysFirst}) {
+      RevocationLists::Decision decision;
+      EXPECT_EQ(keys ? lists.AskCritical(decision, tag.get(), cert.get())
+                     : lists.AskNonCritical(decision, tag.get(), cert.get(), nullptr),
+                keys ? 0 : kRevoked);
+    }
+  }
 }
 
 TEST(CrlStatus, Keys) {

@@ -57,6 +57,12 @@ TEST_F(SequenceFind, RefusesWhatIsMissingOrInUse) {
   EXPECT_EQ(CertSequence::Find(names, nullptr), kInvalid);
   EXPECT_EQ(CertSequence::Find(taken, tag.get()), kInvalid);
   EXPECT_TRUE(none == nullptr && file == text && names == nullptr && taken == tag.get());
+
+  ZvBuffer* buffer = nullptr;
+  ZvVesk2::Cert* cert = nullptr;
+  Signature* signature = nullptr;
+  EXPECT_EQ(CertSequence::GetFirstPair(buffer, cert, signature, names, nullptr, true, {}),
+            kInvalid);
 }
 
 TEST_F(SequenceFind, Pairs) {
