@@ -43,7 +43,7 @@ int Write(const std::string& path, const std::string& bytes, bool replace = true
 TEST(ReplaceTest, WholeOrNotAtAll) {
   const TempDir dir;
   const std::string path = dir.File("x");
-  for (const mode_t mask : {0000, 0022, 0077, 0777}) {
+  for (const mode_t mask : {0000u, 0022u, 0077u, 0777u}) {
     const mode_t old = umask(mask);
     EXPECT_EQ(Write(path, std::to_string(mask)), 0);
     umask(old);
