@@ -5,14 +5,12 @@
 using namespace ZvVesk2;
 using namespace vesk2fuzz;
 
-extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
-  const std::string text(reinterpret_cast<const char*>(data), size);
+FUZZ_TARGET(body) {
   BodyDirectory root(nullptr);
-  const int parsed = root.ParseBody(Wrap(text).get(), nullptr);
+  const int parsed = root.ParseBody(Wrap(input).get(), nullptr);
   Manifest manifest(nullptr);
-  const int compared = manifest.Compare(Wrap(text).get(), Wrap(text).get());
+  const int compared = manifest.Compare(Wrap(input).get(), Wrap(input).get());
   FUZZ_CHECK((parsed == 0) == (compared == 0));
   FUZZ_CHECK(manifest.GetInvalid() == nullptr && manifest.GetMissing() == nullptr &&
              manifest.GetExtra() == nullptr);
-  return 0;
 }

@@ -1,21 +1,26 @@
 // SPDX-License-Identifier: Apache-2.0
-// Runs a fuzz target over the files given, so that every test run replays the corpora without
+// Runs a fuzz target over the files of a folder, so that every test run replays the corpora without
 // libFuzzer.
-#include <cstdint>
-#include <cstdio>
+#include <filesystem>
 #include <fstream>
 #include <iterator>
-#include <string>
 
-extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size);
+#include "fuzz/fuzz_support.h"
+
+namespace fs = std::filesystem;
 
 int main(int argc, char** argv) {
-  for (int i = 1; i < argc; ++i) {
-    std::ifstream file(argv[i], std::ios::binary);
+  if (argc != 3) return 2;
+  const auto target = vesk2fuzz::Targets().find(argv[1]);
+  if (target == vesk2fuzz::Targets().end()) return 2;
+  int count = 0;
+  for (const fs::directory_entry& entry : fs::directory_iterator(argv[2])) {
+    std::ifstream file(entry.path(), std::ios::binary);
     const std::string text((std::istreambuf_iterator<char>(file)),
                            std::istreambuf_iterator<char>());
-    LLVMFuzzerTestOneInput(reinterpret_cast<const uint8_t*>(text.data()), text.size());
+    target->second(text);
+    ++count;
   }
-  std::printf("%d inputs replayed\n", argc - 1);
-  return argc > 1 ? 0 : 1;
+  std::printf("%d inputs replayed\n", count);
+  return count > 0 ? 0 : 1;
 }
