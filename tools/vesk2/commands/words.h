@@ -11,9 +11,9 @@
 
 namespace vesk2_command {
 
-// ArrangeWords returns the words behind argv[0] with the subcommand's own in front. Options of every
-// command, which `common` lists, may stand before it, and "help NOUN VERB" is "NOUN VERB --help".
-// Trouble for words that are no subcommand.
+// ArrangeWords returns the words behind argv[0] with the subcommand's own in front. Options of
+// every command, which `common` lists, may stand before it, and "help NOUN VERB" is "NOUN VERB
+// --help". Trouble for words that are no subcommand.
 std::vector<std::string> ArrangeWords(int argc, const char* const* argv, const OptionList& common);
 
 // The subcommand that arranged words begin with; null when they ask for help only.
