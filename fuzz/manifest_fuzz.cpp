@@ -11,7 +11,7 @@
 #include <fstream>
 
 #include "fuzz/fuzz_support.h"
-#include "fuzz/signing.h"
+#include "fuzz/oracle/signing.h"
 
 using namespace ZvVesk2;
 using namespace vesk2fuzz;

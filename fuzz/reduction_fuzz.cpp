@@ -4,7 +4,7 @@
 //   - a reduction for a wider tag and a period grants no request that the fixpoint refuses; and all
 //     that it grants, where neither sets nor thresholds nor names of some time make it stricter.
 #include "fuzz/engine_support.h"
-#include "fuzz/grant_model.h"
+#include "fuzz/oracle/grant_model.h"
 
 #include <algorithm>
 

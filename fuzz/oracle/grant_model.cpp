@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "fuzz/grant_model.h"
+#include "fuzz/oracle/grant_model.h"
 
 #include <array>
 #include <map>

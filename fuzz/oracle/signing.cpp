@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "fuzz/signing.h"
+#include "fuzz/oracle/signing.h"
 
 #include <memory>
 
