@@ -9,8 +9,8 @@
 #include "tools/vesk2/explain/effort.h"
 #include "tools/vesk2/files/descriptor.h"
 #include "tools/vesk2/files/files.h"
+#include "tools/vesk2/install/destination.h"
 #include "tools/vesk2/install/fill.h"
-#include "tools/vesk2/install/place.h"
 #include "tools/vesk2/objects/manifest_file.h"
 #include "tools/vesk2/say/progress.h"
 #include "tools/vesk2/tree/names.h"
@@ -29,7 +29,7 @@ struct Options {
   std::string source;
   std::string dest;
   AuthorityOptions authority;
-  PlaceOptions place;
+  DestinationOptions place;
   std::string below;
   std::string mostBytes;
   bool allowEmpty = false;
@@ -55,7 +55,7 @@ class Installation {
       authority_.Keep(false);
       return No("nothing-checked", "the manifest lists no file (--allow-empty accepts that)");
     }
-    Place place(options_.dest, options_.place);
+    Destination place(options_.dest, options_.place);
     const std::unique_ptr<Source> source = OpenSource(options_.source, options_.below, wanted);
     if (options_.dryRun) return TellDryRun(wanted);
     try {
@@ -85,7 +85,7 @@ class Installation {
     return std::nullopt;
   }
 
-  ExitCode Install(Source& source, const Wanted& wanted, Place& place) {
+  ExitCode Install(Source& source, const Wanted& wanted, Destination& place) {
     RemoveLeftovers(place.parent(), place.name());
     Stage stage(place.parent(), place.above(), place.name());
     stage.MakeDirectories(wanted);
@@ -167,7 +167,7 @@ class Installation {
     return verdict;
   }
 
-  void TellPlace(const Place& place) const {
+  void TellPlace(const Destination& place) const {
     if (!place.IsDone()) return;
     Result()["installed"] = Escape(options_.dest);
     Result()["kept_old"] = OrNull(Escape(place.KeptOld()));
@@ -199,7 +199,7 @@ Action DefineManifestInstall(OptionList& list) {
   list.Add("manifest", options->authority.manifest, "The manifest file").Required();
   list.Add("dest", options->dest, "Where: a name that nothing has yet").Required();
   AddAuthorityOptions(list, options->authority);
-  AddPlaceOptions(list, options->place);
+  AddDestinationOptions(list, options->place);
   list.Add("--below", options->below, "Of an archive, install what is in this directory of it");
   AddSizeOption(list, options->mostBytes);
   list.Add("--allow-empty", options->allowEmpty, "Install also what lists no file at all");

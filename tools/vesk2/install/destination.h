@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
-// place.h: the name that is installed at. Killed at any moment, what stands there is what stood
-// there before, or the whole installation.
-#ifndef VESK2_TOOLS_PLACE_H
-#define VESK2_TOOLS_PLACE_H
+// destination.h: the name that is installed at. Killed at any moment, what stands there is what
+// stood there before, or the whole installation.
+#ifndef VESK2_TOOLS_DESTINATION_H
+#define VESK2_TOOLS_DESTINATION_H
 
 #include <string>
 
@@ -12,20 +12,20 @@
 
 namespace vesk2_command {
 
-struct PlaceOptions {
+struct DestinationOptions {
   bool replace = false;
   std::string keepOld;  // the name beside it that the old one gets
 };
-void AddPlaceOptions(OptionList& list, PlaceOptions& options);
+void AddDestinationOptions(OptionList& list, DestinationOptions& options);
 
-class Place {
+class Destination {
  public:
   // Trouble when something is there that is not to be replaced, or is no directory.
-  Place(const std::string& path, const PlaceOptions& options);
+  Destination(const std::string& path, const DestinationOptions& options);
   // Removes the old one, if that is still to be done.
-  ~Place();
-  Place(const Place&) = delete;
-  Place& operator=(const Place&) = delete;
+  ~Destination();
+  Destination(const Destination&) = delete;
+  Destination& operator=(const Destination&) = delete;
 
   int parent() const { return parent_.get(); }
   // The path of the directory that it is in, empty for the current one.
@@ -57,4 +57,4 @@ class Place {
 
 }  // namespace vesk2_command
 
-#endif  // VESK2_TOOLS_PLACE_H
+#endif  // VESK2_TOOLS_DESTINATION_H

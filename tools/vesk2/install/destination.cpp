@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// place.cpp: putting an installation in its place.
-#include "tools/vesk2/install/place.h"
+// destination.cpp: putting an installation in its place.
+#include "tools/vesk2/install/destination.h"
 
 #include <fcntl.h>
 #include <sys/stat.h>
@@ -31,7 +31,7 @@ bool IsFree(int directory, const std::string& name) {
 
 }  // namespace
 
-void AddPlaceOptions(OptionList& list, PlaceOptions& options) {
+void AddDestinationOptions(OptionList& list, DestinationOptions& options) {
   Option& replace = list.Add("--replace", options.replace,
                              "Take the place of the directory that is there, and remove it");
   list.Add("--keep-old", options.keepOld,
@@ -39,7 +39,8 @@ void AddPlaceOptions(OptionList& list, PlaceOptions& options) {
       .Excludes(replace);
 }
 
-Place::Place(const std::string& path, const PlaceOptions& options) : keepOld_(options.keepOld) {
+Destination::Destination(const std::string& path, const DestinationOptions& options)
+    : keepOld_(options.keepOld) {
   const std::string bare = path.substr(0, path.find_last_not_of('/') + 1);
   const size_t slash = bare.rfind('/');
   name_ = slash == std::string::npos ? bare : bare.substr(slash + 1);
@@ -62,19 +63,19 @@ Place::Place(const std::string& path, const PlaceOptions& options) : keepOld_(op
   if (old_.get() < 0) throw FileTrouble(path, "not a directory that could be replaced", "exists");
 }
 
-Place::~Place() {
+Destination::~Destination() {
   if (!toRemove_.empty()) RemoveDrawn(parent_.get(), toRemove_, old_.get());
 }
 
-void Place::Fail(const std::string& name) const {
+void Destination::Fail(const std::string& name) const {
   throw FileTrouble(Join(above_, name), std::strerror(errno), errno == EEXIST ? "exists" : "io");
 }
 
-std::string Place::KeptOld() const {
+std::string Destination::KeptOld() const {
   return done_ && old_.get() >= 0 && !keepOld_.empty() ? Join(above_, keepOld_) : "";
 }
 
-void Place::Put(Stage& stage) {
+void Destination::Put(Stage& stage) {
   DrawnDirectory& ready = stage.directory();
   if (!LeadsTo(parent_.get(), ready.name(), ready.file())) {
     throw FileTrouble(Join(above_, ready.name()), "somebody has moved it", "io");
@@ -92,7 +93,7 @@ void Place::Put(Stage& stage) {
 
 // An old one that is to be kept must never have a drawn name, under which the next installation
 // would remove it. So the new one goes first to the name that the old one shall have.
-void Place::Exchange(Stage& stage) {
+void Destination::Exchange(Stage& stage) {
   DrawnDirectory& ready = stage.directory();
   const int parent = parent_.get();
   if (!LeadsTo(parent, name_, old_.get())) {
@@ -109,7 +110,7 @@ void Place::Exchange(Stage& stage) {
   if (keepOld_.empty()) toRemove_ = name;
 }
 
-void Place::RemoveOld() {
+void Destination::RemoveOld() {
   const std::string name = std::exchange(toRemove_, "");
   if (name.empty() || RemoveDrawn(parent_.get(), name, old_.get())) return;
   Note("note: what was there before could not be removed: " + Escape(Join(above_, name)));
