@@ -55,6 +55,7 @@ void SetIndex::Fill() {
     if (spki_charge_step(engine_) != 0) return;
     others += StringOf(m) == nullptr ? 1 : 0;
   }
+  // NOLINTNEXTLINE(bugprone-sizeof-expression): an array of pointers
   others_ = static_cast<const spki_elem**>(spki_allocate(engine_, others * sizeof(spki_elem*)));
   if (others_ == nullptr) return;
   for (const spki_elem* m = spki_form_arguments(tag_); m != nullptr; m = m->next) {
