@@ -10,6 +10,7 @@
 #include "tools/vesk2/commands/parse.h"
 #include "tools/vesk2/confine/confine.h"
 #include "tools/vesk2/files/files.h"
+#include "tools/vesk2/install/source.h"
 
 #include <vesk2.h>
 
@@ -112,6 +113,7 @@ ExitCode Run(int argc, const char* const* argv) {
   StartReport(line->command, ResolveStyle(line->common));
   RefuseSharedInput(*line);
   UseStores(line->common.stores);
+  if (line->command == "manifest install") LoadArchiveLibrary();
   if (OnlyLooks(line->command)) GiveUpTheRest(*line);
   return FinishReport(line->action());
 }

@@ -1,8 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// archive_source.cpp: installing from an archive, which anybody may have made. This file alone sees
-// the library that reads archives.
-#include <archive.h>
-#include <archive_entry.h>
+// archive_source.cpp: installing from an archive, which anybody may have made.
 #include <locale.h>
 
 #include <algorithm>
@@ -12,13 +9,14 @@
 
 #include "tools/vesk2/files/descriptor.h"
 #include "tools/vesk2/files/files.h"
+#include "tools/vesk2/install/archive_library.h"
 #include "tools/vesk2/install/source.h"
 
 namespace vesk2_command {
 namespace {
 
 struct ArchiveDeleter {
-  void operator()(archive* reader) const { archive_read_free(reader); }
+  void operator()(archive* reader) const { Archives().archive_read_free(reader); }
 };
 
 // Archives tell names in encodings, manifests in bytes. With this locale a name in UTF-8 is the
@@ -69,49 +67,51 @@ class ArchiveSource : public Source {
       : path_(std::move(path)),
         file_(file),
         below_(NormalBelow(below)),
-        reader_(archive_read_new()) {
+        library_(Archives()),
+        reader_(library_.archive_read_new()) {
     if (!reader_) throw std::bad_alloc();
     archive* const reader = reader_.get();
     // Where the library was built without one of these, it would start a program to do it.
-    for (const int code :
-         {archive_read_support_filter_gzip(reader), archive_read_support_filter_xz(reader),
-          archive_read_support_filter_zstd(reader), archive_read_support_format_tar(reader),
-          archive_read_support_format_zip(reader)}) {
+    for (const int code : {library_.archive_read_support_filter_gzip(reader),
+                           library_.archive_read_support_filter_xz(reader),
+                           library_.archive_read_support_filter_zstd(reader),
+                           library_.archive_read_support_format_tar(reader),
+                           library_.archive_read_support_format_zip(reader)}) {
       if (code != ARCHIVE_OK) throw Trouble("this machine's libarchive cannot unpack by itself");
     }
-    Require(archive_read_open_fd(reader, file_.get(), size_t{64} << 10));
+    Require(library_.archive_read_open_fd(reader, file_.get(), size_t{64} << 10));
   }
 
   std::optional<SourceEntry> Next() override {
     const Utf8Names names;
     archive_entry* entry = nullptr;
-    const int code = archive_read_next_header(reader_.get(), &entry);
+    const int code = library_.archive_read_next_header(reader_.get(), &entry);
     if (code == ARCHIVE_EOF) return std::nullopt;
     Require(code);
-    const char* const name = archive_entry_pathname(entry);
+    const char* const name = library_.archive_entry_pathname(entry);
     SourceEntry found;
     const std::optional<std::string> path = Normal(name != nullptr ? name : "/");
     found.outer = path.value_or("");
     found.path = path ? Below(*path) : "";
     found.problem = Problem(*entry);
     if (found.problem.empty()) {
-      const bool isFile = archive_entry_filetype(entry) == AE_IFREG;
+      const bool isFile = library_.archive_entry_filetype(entry) == AE_IFREG;
       found.kind = isFile ? EntryKind::kFile : EntryKind::kDirectory;
     }
-    found.executable = (archive_entry_perm(entry) & 0100) != 0;
-    const la_int64_t size = archive_entry_size(entry);
+    found.executable = (library_.archive_entry_perm(entry) & 0100) != 0;
+    const la_int64_t size = library_.archive_entry_size(entry);
     found.size = size > 0 ? static_cast<uint64_t>(size) : 0;
     return found;
   }
 
   size_t Read(char* out, size_t size) override {
-    const la_ssize_t got = archive_read_data(reader_.get(), out, size);
+    const la_ssize_t got = library_.archive_read_data(reader_.get(), out, size);
     if (got < 0) Require(static_cast<int>(got));
     return got > 0 ? static_cast<size_t>(got) : 0;
   }
 
   uint64_t Unpacked() const override {
-    const la_int64_t bytes = archive_filter_bytes(reader_.get(), 0);
+    const la_int64_t bytes = library_.archive_filter_bytes(reader_.get(), 0);
     return bytes > 0 ? static_cast<uint64_t>(bytes) : 0;
   }
 
@@ -120,8 +120,8 @@ class ArchiveSource : public Source {
   // the verification looks at.
   void Require(int code) const {
     if (code == ARCHIVE_OK || code == ARCHIVE_WARN) return;
-    if (archive_errno(reader_.get()) == ENOMEM) throw std::bad_alloc();
-    const char* const why = archive_error_string(reader_.get());
+    if (library_.archive_errno(reader_.get()) == ENOMEM) throw std::bad_alloc();
+    const char* const why = library_.archive_error_string(reader_.get());
     throw FileTrouble(path_, "no archive that can be read: " + Escape(why != nullptr ? why : "?"),
                       "malformed");
   }
@@ -132,9 +132,9 @@ class ArchiveSource : public Source {
     return path.starts_with(below_ + "/") ? path.substr(below_.size() + 1) : "";
   }
 
-  static std::string Problem(archive_entry& entry) {
-    if (archive_entry_hardlink(&entry) != nullptr) return "a link to another entry";
-    switch (archive_entry_filetype(&entry)) {
+  std::string Problem(archive_entry& entry) const {
+    if (library_.archive_entry_hardlink(&entry) != nullptr) return "a link to another entry";
+    switch (library_.archive_entry_filetype(&entry)) {
       case AE_IFREG:
       case AE_IFDIR:
         return "";
@@ -148,6 +148,7 @@ class ArchiveSource : public Source {
   const std::string path_;
   const Descriptor file_;
   const std::string below_;
+  const ArchiveLibrary& library_;
   const std::unique_ptr<archive, ArchiveDeleter> reader_;
 };
 

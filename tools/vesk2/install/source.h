@@ -46,6 +46,10 @@ std::unique_ptr<Source> OpenSource(const std::string& path, const std::string& b
 std::unique_ptr<Source> OpenDirectory(const std::string& path, int directory, const Wanted& wanted);
 std::unique_ptr<Source> OpenArchive(const std::string& path, int file, const std::string& below);
 
+// LoadArchiveLibrary loads what reads archives, if this machine has it. A command that confines
+// itself calls this before: libraries cannot be opened then.
+void LoadArchiveLibrary();
+
 }  // namespace vesk2_command
 
 #endif  // VESK2_TOOLS_SOURCE_H
