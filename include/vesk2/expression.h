@@ -96,7 +96,8 @@ class VESK2_API DExpression {
   // that is more, and for lists nested too deeply.
   virtual unsigned int CanonicalLength() = 0;
   // AdvancedLength is a buffer size in bytes, terminator included, that ExportAdvanced surely fits
-  // in; it is larger than the text. UINT_MAX as above.
+  // in; it is larger than the text. A byte string or an empty list by itself needs one byte more.
+  // UINT_MAX as above.
   virtual unsigned int AdvancedLength() = 0;
   // Export appends the canonical encoding, without hints, to `buf` of `size` bytes at `pos`, which
   // moves on. A list needs one byte of room beyond its ")" and does not report its elements'
@@ -358,8 +359,6 @@ class VESK2_API SExpression : public DExpression {
   // Whether x->IsEqual(e) for some element e. False for null. It looks at one after the other.
   bool Contains(SExpression* x);
 
-  // Iterator walks the elements: for (auto it = list->Begin(); it; it.Next()) use(it.Value());
-  // It is one pointer and stays one.
  private:
   struct Node;
 

@@ -7,6 +7,7 @@
 #include <vesk2/crl.h>
 
 #include <algorithm>
+#include <climits>
 #include <cstring>
 #include <string_view>
 
@@ -24,8 +25,10 @@ namespace {
 // Whether the text of `tag` has a 0 byte in it: as a C string it would name another tag's file. A
 // list of the one source in the place of the other's would take that one's revocations away.
 [[nodiscard]] int HoldsZeroByte(bool& holds, SExpression* tag) {
-  const unsigned int size = tag->AdvancedLength();
-  const std::unique_ptr<unsigned char[]> text(TryNewArray<unsigned char>(size_t{size} + 1));
+  unsigned int size = tag->AdvancedLength();
+  VESK2_REQUIRE(size < UINT_MAX, VESK2_ERR_BUFFER_OVERFLOW);
+  ++size;  // an empty list needs it
+  const std::unique_ptr<unsigned char[]> text(TryNewArray<unsigned char>(size));
   VESK2_REQUIRE(text, VESK2_ERR_MEM_ALLOC);
   unsigned int length = 0;
   VESK2_TRY(tag->ExportAdvanced(text.get(), length, size));

@@ -322,6 +322,9 @@ TEST_F(CrlStore, TagsNameFiles) {
     std::filesystem::create_directory(global.File("cert"));
   }
   EXPECT_EQ(Offer(Sequence(""), Tag("a")), kInvalid);
+  char* none = nullptr;
+  EXPECT_EQ(CrlSequence::StorePath(none, Parse("()").get()), 0);
+  EXPECT_EQ(none, nullptr);
 }
 
 TEST_F(CrlStore, UpdateRules) {

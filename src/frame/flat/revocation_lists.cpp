@@ -5,6 +5,7 @@
 #include <vesk2/acl_entry.h>
 #include <vesk2/crl.h>
 
+#include <climits>
 #include <cstring>
 #include <memory>
 
@@ -116,8 +117,10 @@ namespace {
 // follows would be another tag.
 [[nodiscard]] int IsWholeText(bool& whole, const Vesk2CrlInfoStruct& record) {
   SExpression* const tag = record.crl->GetCert()->GetTag();
-  const unsigned int size = tag->AdvancedLength();
-  const std::unique_ptr<unsigned char[]> text(TryNewArray<unsigned char>(size_t{size} + 1));
+  unsigned int size = tag->AdvancedLength();
+  VESK2_REQUIRE(size < UINT_MAX, VESK2_ERR_BUFFER_OVERFLOW);
+  ++size;  // an empty list needs it
+  const std::unique_ptr<unsigned char[]> text(TryNewArray<unsigned char>(size));
   VESK2_REQUIRE(text, VESK2_ERR_MEM_ALLOC);
   unsigned int length = 0;
   VESK2_TRY(tag->ExportAdvanced(text.get(), length, size));
