@@ -44,6 +44,7 @@ Figures ExpressionFigures();
 Figures TreeFigures();
 Figures StoreFigures();
 Figures ChainFigures();
+Figures GrowthFigures();
 Figures CommandFigures();
 Figures SignatureFigures();
 
@@ -57,13 +58,17 @@ double Spent();
 // The processor time of `ours` over that of `yardstick`: they take turns, so that a busy machine
 // slows both, and the median of the rounds' ratios counts.
 Outcome Ratio(const Effort& effort, const Way& ours, const Way& yardstick);
-// The same of the time on the clock, for what several processors share.
+// The processor time of a way, in seconds: the least of five rounds. Negative for a wrong result.
+double LeastSeconds(const Way& way);
+// The ratio of the times on the clock, for what several processors share.
 Outcome ClockRatio(const Effort& effort, const Way& ours, const Way& yardstick);
 
 // The system calls that `work` makes in a process of its own; negative where nobody may watch.
 long CountCalls(const Way& work);
 // The bytes of memory that `work` adds to a process of its own at the most; negative for a failure.
 double PeakMemory(const Way& work);
+// The most memory that a program holds, in bytes; negative for a failure.
+double PeakOfProgram(const std::vector<std::string>& words);
 
 // ---- Other programs ----------------------------------------------------------------------------
 

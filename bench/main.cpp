@@ -6,6 +6,7 @@
 #include <string_view>
 
 #include "bench/bench.h"
+#include "bench/growth.h"
 #include "bench/worst.h"
 
 namespace bench {
@@ -13,7 +14,8 @@ namespace {
 
 constexpr char kHelp[] =
     "usage: vesk2_bench [--quick] [ID...]   the table, or the figures whose ids begin so\n"
-    "       vesk2_bench --worst             the worst inputs known\n";
+    "       vesk2_bench --worst             the worst inputs known\n"
+    "       vesk2_bench --growth            how the work grows with what is asked about\n";
 
 void Print(const Figure& figure, const Outcome& outcome) {
   std::string value = "-";
@@ -36,7 +38,7 @@ bool PrintTable(const Effort& effort, const std::vector<std::string_view>& ids) 
   bool whole = true;
   std::printf("%-5s %-46s  %-42s  %7s  %6s\n", "", "figure", "yardstick", "ratio", "goal");
   for (const auto& group : {HashFigures, ExpressionFigures, TreeFigures, StoreFigures, ChainFigures,
-                            SignatureFigures, CommandFigures}) {
+                            GrowthFigures, SignatureFigures, CommandFigures}) {
     for (const Figure& figure : group()) {
       bool wanted = ids.empty();
       for (const std::string_view id : ids) wanted |= std::string_view(figure.id).starts_with(id);
@@ -58,6 +60,7 @@ int main(int count, char** arguments) {
   for (int i = 1; i < count; ++i) {
     const std::string_view word = arguments[i];
     if (word == "--worst") return bench::RunWorst();
+    if (word == "--growth") return bench::RunGrowth();
     if (word == "--quick") {
       effort.quick = true;
     } else if (word.starts_with("-")) {

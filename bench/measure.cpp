@@ -53,9 +53,9 @@ Outcome RatioBy(double (*clock)(), const Effort& effort, const Way& ours, const 
   return {Outcome::kMeasured, ratios[ratios.size() / 2], {}};
 }
 
-// A line of /proc/self/status, in bytes.
-double StatusBytes(const std::string& name) {
-  std::ifstream status("/proc/self/status");
+// A line of /proc/PROCESS/status, in bytes.
+double StatusBytes(const std::string& name, const std::string& process = "self") {
+  std::ifstream status("/proc/" + process + "/status");
   std::string word;
   double kibibytes = -1;
   while (status >> word) {
@@ -82,6 +82,15 @@ double Spent() { return SpentBy(RUSAGE_SELF) + SpentBy(RUSAGE_CHILDREN); }
 
 Outcome Ratio(const Effort& effort, const Way& ours, const Way& yardstick) {
   return RatioBy(Spent, effort, ours, yardstick);
+}
+double LeastSeconds(const Way& way) {
+  double least = -1;
+  for (int round = 0; round < 5; ++round) {
+    const double taken = Take(Spent, way);
+    if (taken < 0) return -1;
+    if (least < 0 || taken < least) least = taken;
+  }
+  return least;
 }
 Outcome ClockRatio(const Effort& effort, const Way& ours, const Way& yardstick) {
   return RatioBy(OnTheClock, effort, ours, yardstick);
@@ -122,6 +131,30 @@ double PeakMemory(const Way& work) {
   if (read(ends[0], &grown, sizeof grown) != sizeof grown) grown = -1;
   close(ends[0]);
   return ExitOf(child) == 0 ? grown : -1;
+}
+
+double PeakOfProgram(const std::vector<std::string>& words) {
+  const pid_t child = fork();
+  if (child == 0) {
+    if (ptrace(PTRACE_TRACEME, 0, nullptr, nullptr) != 0) _exit(2);
+    raise(SIGSTOP);
+    Become(words);
+    _exit(127);
+  }
+  int status = 0;
+  if (waitpid(child, &status, 0) != child || !WIFSTOPPED(status)) return -1;
+  ptrace(PTRACE_SETOPTIONS, child, nullptr, PTRACE_O_TRACEEXIT | PTRACE_O_EXITKILL);
+  double peak =
+      -1;  // of the program, not of the process that became it, which was as large as this
+  while (ptrace(PTRACE_CONT, child, nullptr, nullptr) == 0) {
+    if (waitpid(child, &status, 0) != child) return -1;
+    if (WIFEXITED(status)) return WEXITSTATUS(status) == 0 ? peak : -1;
+    if (!WIFSTOPPED(status)) return -1;
+    if (status >> 8 == (SIGTRAP | (PTRACE_EVENT_EXIT << 8))) {
+      peak = StatusBytes("VmHWM", std::to_string(child));
+    }
+  }
+  return -1;
 }
 
 }  // namespace bench

@@ -87,6 +87,14 @@ Outcome MemoryOfEntry(const Effort& effort) {
   return {Outcome::kMeasured, bytes / static_cast<double>(tree.Entries()), {}};
 }
 
+Outcome MemoryOfEntryInCommand(const Effort& effort) {
+  const Tree& few = TheTree(100, kSmall);
+  const Tree& many = TheTree(effort.Of(1'000'000, 100'000), kSmall);
+  const double least = PeakOfProgram(few.Command()), most = PeakOfProgram(many.Command());
+  if (least < 0 || most < 0) return Failed("a wrong result");
+  return {Outcome::kMeasured, (most - least) / static_cast<double>(many.Entries()), {}};
+}
+
 }  // namespace
 
 Figures TreeFigures() {
@@ -107,6 +115,7 @@ Figures TreeFigures() {
       {"F4b", "the same, command", "count", 5.2, CallsOfFileByCommand},
       {"F5", "time of a file, 1,000,000 over 10,000", "ratio", 1.10, Growth},
       {"F6a", "memory of an entry at 1,000,000, library", "bytes", 250, MemoryOfEntry},
+      {"F6b", "the same, command", "bytes", 260, MemoryOfEntryInCommand},
       {"F7", "two jobs, on the clock", "one job", 0.60, TwoJobs},
   };
 }
