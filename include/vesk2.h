@@ -38,7 +38,8 @@
  *     beside them. Outputs are null after a failure unless a function says otherwise.
  *   - The library starts no thread, and takes no lock that a caller could see. The store roots
  *     are process-wide; everything else belongs to the objects a caller makes, which must not be
- *     shared between threads. Separate objects on separate threads need no care.
+ *     shared between threads. Separate objects on separate threads need no care, whatever other
+ *     processes write into the stores meanwhile.
  *   - Nothing is cached: every verification reads the stores and the files afresh, and its
  *     answer speaks of the moment of reading only.
  *   - Names and texts in results are bytes that strangers chose. Pass them through Vesk2Escape
