@@ -3,19 +3,20 @@
 #include "tools/vesk2/files/files.h"
 
 #include <fcntl.h>
+#include <sys/file.h>
 #include <sys/mman.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
 #include <algorithm>
 #include <cerrno>
-#include <chrono>
 #include <cstdio>
 #include <cstring>
 #include <filesystem>
 #include <optional>
 
 #include "tools/vesk2/files/descriptor.h"
+#include "tools/vesk2/files/leftovers.h"
 #include "tools/vesk2/say/interrupt.h"
 #include "tools/vesk2/say/report.h"
 
@@ -66,17 +67,19 @@ std::filesystem::path Directory(const std::string& path) {
 }
 
 // A file that has no name until it is finished: nothing is left of it whatever ends the process.
-// Where the file system cannot do that, it has a temporary name, removed unless the process is
-// killed outright.
+// Where the file system cannot do that, and while it replaces another, it has a temporary name. A
+// process that is killed outright leaves the file under it, to the next one that writes the target.
 class NewFile {
  public:
   NewFile(const std::string& target, mode_t mode) : target_(target), directory_(Directory(target)) {
+    RemoveLeftoverFiles(target);
     file_.Take(open(directory_.c_str(), O_TMPFILE | O_RDWR | O_CLOEXEC, mode));
     const bool supported = file_.get() >= 0 || (errno != EOPNOTSUPP && errno != EISDIR);
     if (!supported || (file_.get() >= 0 && access(file_.Path().c_str(), F_OK) != 0)) {
       OpenNamed(mode);
     }
     if (file_.get() < 0) Fail(target_, errno);
+    (void)flock(file_.get(), LOCK_EX | LOCK_NB);  // where there are no locks, nobody gets one
   }
   ~NewFile() { Unname(); }
   NewFile(const NewFile&) = delete;
@@ -107,14 +110,16 @@ class NewFile {
     return linkat(AT_FDCWD, file_.Path().c_str(), AT_FDCWD, name.c_str(), AT_SYMLINK_FOLLOW);
   }
 
-  // From now on the file may have a temporary name, which an interruption removes. The clock makes
-  // it new where every process has the same number.
+  // From now on the file may have a temporary name, which an interruption removes.
   void Guard() {
-    const auto now = std::chrono::system_clock::now().time_since_epoch().count();
-    name_ = directory_ / (".vesk2-" + std::to_string(getpid()) + "-" + std::to_string(now));
+    const std::string name = DrawName(StemOf(std::filesystem::path(target_).filename()));
+    if (name.empty()) Fail(target_, EIO);
+    name_ = directory_ / name;
     guard_.emplace(name_);
   }
 
+  // Whoever removes leftovers can find it before it is locked, and remove it: giving it its name
+  // then fails.
   void OpenNamed(mode_t mode) {
     Guard();
     file_.Take(open(name_.c_str(), O_RDWR | O_CREAT | O_EXCL | O_CLOEXEC, mode));

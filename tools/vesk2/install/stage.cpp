@@ -5,7 +5,6 @@
 #include <dirent.h>
 #include <fcntl.h>
 #include <sys/file.h>
-#include <sys/random.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -17,6 +16,7 @@
 #include <vector>
 
 #include "tools/vesk2/files/files.h"
+#include "tools/vesk2/files/leftovers.h"
 #include "tools/vesk2/install/below.h"
 #include "tools/vesk2/say/report.h"
 #include "tools/vesk2/tree/names.h"
@@ -24,22 +24,7 @@
 namespace vesk2_command {
 namespace {
 
-constexpr std::string_view kMark = ".tmp-";
-constexpr size_t kRandomBytes = 16;
-constexpr size_t kMaxFileName = 255;
 constexpr int kDirectory = O_RDONLY | O_DIRECTORY | O_NOFOLLOW;
-
-// What the drawn names for `name` begin with: a name that would grow too long is shortened, the
-// mark and the random part never are.
-std::string StemOf(const std::string& name) {
-  constexpr size_t kMost = kMaxFileName - kMark.size() - 2 * kRandomBytes;
-  return name.substr(0, kMost) + std::string(kMark);
-}
-
-bool IsLeftover(std::string_view found, const std::string& stem) {
-  return found.size() == stem.size() + 2 * kRandomBytes && found.starts_with(stem) &&
-         found.find_first_not_of("0123456789abcdef", stem.size()) == std::string_view::npos;
-}
 
 std::string PathIn(int parent, const std::string& name) {
   return "/proc/self/fd/" + std::to_string(parent) + "/" + name;
@@ -61,9 +46,8 @@ DrawnDirectory::DrawnDirectory(int parent, const std::string& above, const std::
 
 // 0, EEXIST for a name that somebody else had or took, or another error.
 int DrawnDirectory::Draw(const std::string& stem) {
-  char random[kRandomBytes];
-  if (getrandom(random, sizeof random, 0) != sizeof random) return EIO;
-  const std::string name = stem + Hex({random, sizeof random});
+  const std::string name = DrawName(stem);
+  if (name.empty()) return EIO;
   if (mkdirat(parent_, name.c_str(), 0700) != 0) return errno;
   file_.Take(OpenBelow(parent_, name, kDirectory));
   int error = file_.get() >= 0 || errno == ENOENT ? 0 : errno;
