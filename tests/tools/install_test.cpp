@@ -8,10 +8,8 @@
 
 #include <fcntl.h>
 #include <signal.h>
-#include <sys/ptrace.h>
 #include <sys/stat.h>
 #include <sys/syscall.h>
-#include <sys/user.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -26,19 +24,7 @@
 #include <vector>
 
 #include "tests/sweep/scenes.h"
-#include "tools/vesk2/commands/command.h"
-
-// <linux/ptrace.h> and <sys/ptrace.h> cannot both be included; this is the part that is needed.
-struct SystemCall {
-  uint8_t op;
-  uint8_t pad[3];
-  uint32_t machine;
-  uint64_t instruction, stack;
-  uint64_t number;
-  uint64_t arguments[6];
-};
-constexpr uint8_t kEntry = 1;
-constexpr int kGetSystemCall = 0x420e;
+#include "tests/tools/traced_command.h"
 
 static bool cannotExchange = false;
 extern "C" {
@@ -56,7 +42,6 @@ namespace vesk2test {
 namespace {
 
 namespace fs = std::filesystem;
-using Words = std::vector<std::string>;
 using Tree = std::map<std::string, std::string>;  // what is at each path below
 
 Tree Look(const std::string& root) {
@@ -77,107 +62,6 @@ Tree Look(const std::string& root) {
     tree[path] = text;
   }
   return tree;
-}
-
-// ---- The command, in a child ----
-
-pid_t Start(const Words& words, bool traced) {
-  const pid_t child = fork();
-  if (child != 0) return child;
-  const int null = open("/dev/null", O_WRONLY);
-  dup2(null, STDOUT_FILENO);
-  dup2(null, STDERR_FILENO);
-  std::vector<const char*> arguments = {"vesk2"};
-  for (const std::string& word : words) arguments.push_back(word.c_str());
-  if (traced) {
-    ptrace(PTRACE_TRACEME, 0, nullptr, nullptr);
-    raise(SIGSTOP);
-  }
-  _exit(vesk2_command::RunCommand(static_cast<int>(arguments.size()), arguments.data()));
-}
-
-constexpr int kKilled = -1;
-int Wait(pid_t child) {
-  int status = 0;
-  EXPECT_EQ(waitpid(child, &status, 0), child);
-  return WIFEXITED(status) ? WEXITSTATUS(status) : kKilled;
-}
-int RunCommand(const Words& words) { return Wait(Start(words, false)); }
-
-// What is said is no part of it.
-bool Changes(const SystemCall& call) {
-  constexpr uint64_t kCalls[] = {
-#ifdef SYS_rename
-      SYS_rename,   SYS_mkdir,    SYS_rmdir,     SYS_unlink,      SYS_link,
-      SYS_symlink,  SYS_chmod,
-#endif
-      SYS_renameat, SYS_mkdirat,  SYS_renameat2, SYS_unlinkat,    SYS_linkat,
-      SYS_flock,    SYS_openat2,  SYS_symlinkat, SYS_fchmod,      SYS_fchmodat,
-      SYS_write,    SYS_pwrite64, SYS_fsync,     SYS_memfd_create};
-  const bool says = call.number == SYS_write && call.arguments[0] <= STDERR_FILENO;
-  return !says && std::ranges::find(kCalls, call.number) != std::end(kCalls);
-}
-
-// Where a lock cannot be had, nobody has one; what cannot be removed stays.
-bool IsForgiven(uint64_t call) {
-#ifdef SYS_rmdir
-  if (call == SYS_rmdir || call == SYS_unlink) return true;
-#endif
-  return call == SYS_flock || call == SYS_unlinkat;
-}
-
-struct Point {
-  long n;         // of the calls that count
-  int error = 0;  // what it fails with; 0: the command is killed before it
-  bool all = false;
-};
-struct Outcome {
-  bool reached = false;
-  uint64_t call = 0;
-  int exit = 0;
-};
-
-// Has the call that the child has just entered fail; whether that is possible on this machine.
-bool FailCall([[maybe_unused]] pid_t child, [[maybe_unused]] int error) {
-#ifdef __x86_64__
-  user_regs_struct registers = {};
-  int status = 0;
-  ptrace(PTRACE_GETREGS, child, nullptr, &registers);
-  registers.orig_rax = ~0ULL;
-  ptrace(PTRACE_SETREGS, child, nullptr, &registers);
-  ptrace(PTRACE_SYSCALL, child, nullptr, nullptr);
-  waitpid(child, &status, 0);
-  registers.rax = static_cast<unsigned long long>(-error);
-  return ptrace(PTRACE_SETREGS, child, nullptr, &registers) == 0;
-#else
-  return false;
-#endif
-}
-
-Outcome RunTo(const Words& words, const Point& point) {
-  const pid_t child = Start(words, true);
-  int status = 0;
-  waitpid(child, &status, 0);
-  ptrace(static_cast<__ptrace_request>(PTRACE_SETOPTIONS), child, nullptr,
-         PTRACE_O_TRACESYSGOOD | PTRACE_O_EXITKILL);
-  Outcome outcome;
-  long seen = 0;
-  for (;;) {
-    ptrace(PTRACE_SYSCALL, child, nullptr, nullptr);
-    waitpid(child, &status, 0);
-    if (!WIFSTOPPED(status)) break;
-    SystemCall call = {};
-    if (WSTOPSIG(status) != (SIGTRAP | 0x80)) continue;
-    ptrace(static_cast<__ptrace_request>(kGetSystemCall), child, sizeof call, &call);
-    if (call.op != kEntry || (!point.all && !Changes(call)) || seen++ != point.n) continue;
-    outcome = {true, call.number, 0};
-    if (point.error != 0 && FailCall(child, point.error)) continue;
-    kill(child, SIGKILL);
-    waitpid(child, &status, 0);
-    break;
-  }
-  outcome.exit = WIFEXITED(status) ? WEXITSTATUS(status) : kKilled;
-  return outcome;
 }
 
 // ---- The place ----
@@ -259,6 +143,14 @@ class InstallTest : public testing::Test {
   Tree old_, new_;
 };
 
+// Where a lock cannot be had, nobody has one; what cannot be removed stays.
+bool IsForgiven(uint64_t call) {
+#ifdef SYS_rmdir
+  if (call == SYS_rmdir || call == SYS_unlink) return true;
+#endif
+  return call == SYS_flock || call == SYS_unlinkat;
+}
+
 const std::vector<Words> kWays = {{}, {"--replace"}, {"--keep-old", "kept"}};
 
 TEST_F(InstallTest, KilledAnywhereTheOldOrTheWholeNewOneIsThere) {
@@ -267,7 +159,7 @@ TEST_F(InstallTest, KilledAnywhereTheOldOrTheWholeNewOneIsThere) {
     long n = 0;
     for (;; ++n) {
       Prepare(!options.empty());
-      const Outcome outcome = RunTo(Install(options), {n, 0, all});
+      const Outcome outcome = RunTo(CommandOf(Install(options)), {n, 0, all});
       if (!outcome.reached) break;
       Judge(outcome, options,
             "killed before " + std::to_string(n) + ", call " + std::to_string(outcome.call));
@@ -286,7 +178,7 @@ TEST_F(InstallTest, WhateverFailsNothingElseIsAccepted) {
     long n = 0;
     for (;; ++n) {
       Prepare(!options.empty());
-      const Outcome outcome = RunTo(Install(options), {n, EIO});
+      const Outcome outcome = RunTo(CommandOf(Install(options)), {n, EIO});
       if (!outcome.reached) break;
       const std::string point =
           "failed: " + std::to_string(n) + ", call " + std::to_string(outcome.call);
