@@ -605,6 +605,96 @@ std::vector<Case> FlatCases() {
   };
 }
 
+// A whole manifest, written to nowhere: every step's code counts, the constructor's by the first.
+int WriteManifest(CertObject* cert, Signature* signature, CrlSequence* list, TimeStamp* time,
+                  FILE* stream) {
+  constexpr unsigned char kBytes[32] = {};
+  constexpr unsigned char kToken[4] = {};
+  ManifestWriter writer(nullptr);
+  int code = writer.SetHead("creator", time);
+  if (code == 0) code = writer.BeginBody(kToken);
+  for (int i = 0; i < 20 && code == 0; ++i) code = writer.AddFile("a file", kBytes);
+  if (code == 0) code = writer.OpenDirectory("a directory");
+  if (code == 0) code = writer.CloseDirectory();
+  if (code == 0) code = writer.EndBody();
+  Ref<Hash> digest;
+  if (code == 0) code = writer.SignedDigest(digest.Out(), ZVCLM_HASH_SHA256);
+  if (bool(digest) != (code == 0)) return -1;
+  for (int i = 0; i < 2 && code == 0; ++i) code = writer.AddCertificate(cert, signature);
+  if (code == 0) code = writer.AddList(list);
+  return code != 0 ? code : writer.Write(stream);
+}
+
+// Manifests as they are written, compared and explained.
+std::vector<Case> ManifestCases() {
+  ManifestText text;
+  text.chain = Signed(W().link, TestKey::Rsa(0));
+  text.body = Body(FileEntry("one", "1") + DirEntry("gone", DirEntry("deep", FileEntry("f", ""))));
+  W().dir.Write("left.manifest", ManifestFile(text));
+  text.body = Body(FileEntry("one", "1") + DirEntry("new", DirEntry("deep", FileEntry("f", ""))));
+  W().dir.Write("right.manifest", ManifestFile(text));
+  std::string changed = ManifestFile(text);
+  changed.replace(changed.find("3:one"), 5, "3:oNe");
+  W().dir.Write("changed.manifest", changed);
+  const auto make = [](const char* file) {
+    Manifest* manifest = nullptr;
+    const std::string tree = W().dir.File("tree");
+    EXPECT_EQ(CreateManifestContext(&manifest, tree.c_str(), W().File(file), "install (app calc)"),
+              0);
+    return std::shared_ptr<Manifest>(manifest, DeleteManifestContext);
+  };
+  return {
+      {"ManifestWriter",
+       [] {
+         const auto null = std::shared_ptr<FILE>(std::fopen("/dev/null", "w"), std::fclose);
+         return [cert = KeptAs<CertObject>(W().cert), list = KeptAs<CrlSequence>(W().list),
+                 signature = KeptAs<Signature>(TestKey::Rsa(0).Sign(W().cert)),
+                 time = KeptAs<TimeStamp>(Str(kFrom)), null] {
+           return Outcome{
+               WriteManifest(cert.get(), signature.get(), list.get(), time.get(), null.get())};
+         };
+       }},
+      // Whole directories on either side: none is passed over.
+      {"CompareManifest of what differs",
+       [make] {
+         return [manifest = make("left.manifest")] {
+           const int code = CompareManifest(manifest.get(), W().File("right.manifest"));
+           return Outcome::Of(code, VESK2_ERR_FILE_NOT_FOUND);
+         };
+       }},
+      // That it is another listing than the signed one stands, with what is known of it or without.
+      {"VerifyManifestExplained of another listing",
+       [make] {
+         return [manifest = make("changed.manifest")] {
+           Vesk2ExplanationStruct* why = nullptr;
+           const int code = VerifyManifestExplained(manifest.get(), 0, 0, &why);
+           const bool fits = why == nullptr || (why->code == code && why->valid == 0);
+           Vesk2FreeExplanation(why);
+           Outcome outcome = Outcome::Of(code, VESK2_ERR_HASH_MATCH);
+           outcome.outputsFit &= fits;
+           return outcome;
+         };
+       },
+       true},
+      // More certificates than there is room for at first, kept as evidence.
+      {"CertSequence::Verify with evidence of a long chain",
+       [] {
+         const std::string pair = Signed(W().link, TestKey::Rsa(0)) + List({Str("owner")});
+         std::string pairs;
+         for (int i = 0; i < 5; ++i) pairs += pair;
+         W().dir.Write("long.cert", List({Str("sequence"), pairs}));
+         Ref<CertSequence> chain;
+         EXPECT_EQ(CertSequence::Import(chain.Out(), W().File("long"), true, nullptr), 0);
+         return [chain = Keep(std::move(chain)), tag = Kept(Tag("install (app calc)"))] {
+           Evidence evidence(nullptr);
+           const int code = chain->Verify(nullptr, tag.get(), nullptr, nullptr, evidence);
+           return Outcome{code, code != 0 || evidence.CountCerts() == 5};
+         };
+       },
+       true},
+  };
+}
+
 // The machines of scenes.h: extra directory, home store, carried lists, and stores that are not to
 // be written. `scenes` outlives the rows.
 std::vector<Case> SceneCases(const Scenes& scenes) {
@@ -684,6 +774,7 @@ TEST(AllocationSweep, Scenes) {
 TEST(AllocationSweep, Expressions) { Sweep(ExpressionCases()); }
 TEST(AllocationSweep, Objects) { Sweep(ObjectCases()); }
 TEST(AllocationSweep, TrustAndReduction) { Sweep(TrustCases()); }
+TEST(AllocationSweep, Manifests) { Sweep(ManifestCases()); }
 TEST(AllocationSweep, FlatFunctions) {
   std::vector<Case> cases = FlatCases();
   for (Case& row : cases) row = InOwnWords(std::move(row));
