@@ -159,7 +159,8 @@ TEST_F(InstallTest, KilledAnywhereTheOldOrTheWholeNewOneIsThere) {
     long n = 0;
     for (;; ++n) {
       Prepare(!options.empty());
-      const Outcome outcome = RunTo(CommandOf(Install(options)), {n, 0, all});
+      const Outcome outcome =
+          RunTo(CommandOf(Install(options)), {n, kKill, all ? Calls::kEvery : Calls::kChanging});
       if (!outcome.reached) break;
       Judge(outcome, options,
             "killed before " + std::to_string(n) + ", call " + std::to_string(outcome.call));

@@ -51,26 +51,52 @@ int Wait(pid_t child) {
   return WIFEXITED(status) ? WEXITSTATUS(status) : kKilled;
 }
 
-// What is said is no part of it.
-bool Changes(const SystemCall& call) {
-  constexpr uint64_t kCalls[] = {
+constexpr uint64_t kTransferring[] = {SYS_read, SYS_pread64, SYS_write, SYS_pwrite64};
+constexpr uint64_t kChanging[] = {
 #ifdef SYS_rename
-      SYS_rename,   SYS_mkdir,    SYS_rmdir,     SYS_unlink,      SYS_link,
-      SYS_symlink,  SYS_chmod,
+    SYS_rename,   SYS_mkdir,    SYS_rmdir,     SYS_unlink,      SYS_link,
+    SYS_symlink,  SYS_chmod,
 #endif
-      SYS_renameat, SYS_mkdirat,  SYS_renameat2, SYS_unlinkat,    SYS_linkat,
-      SYS_flock,    SYS_openat2,  SYS_symlinkat, SYS_fchmod,      SYS_fchmodat,
-      SYS_write,    SYS_pwrite64, SYS_fsync,     SYS_memfd_create};
-  const bool says = call.number == SYS_write && call.arguments[0] <= STDERR_FILENO;
-  return !says && std::ranges::find(kCalls, call.number) != std::end(kCalls);
+    SYS_renameat, SYS_mkdirat,  SYS_renameat2, SYS_unlinkat,    SYS_linkat,
+    SYS_flock,    SYS_openat2,  SYS_symlinkat, SYS_fchmod,      SYS_fchmodat,
+    SYS_write,    SYS_pwrite64, SYS_fsync,     SYS_memfd_create};
+constexpr uint64_t kLooking[] = {
+#ifdef SYS_open
+    SYS_open,       SYS_stat,  SYS_lstat,      SYS_access, SYS_readlink,
+#endif
+    SYS_openat,     SYS_read,  SYS_pread64,    SYS_close,  SYS_fstat,
+    SYS_newfstatat, SYS_statx, SYS_getdents64, SYS_lseek,  SYS_faccessat,
+    SYS_readlinkat, SYS_fcntl, SYS_getrandom};
+
+bool Counts(const SystemCall& call, Calls calls) {
+  if (call.number == SYS_write && call.arguments[0] <= STDERR_FILENO) return false;
+  const auto isOneOf = [&](const auto& table) {
+    return std::ranges::find(table, call.number) != std::end(table);
+  };
+  switch (calls) {
+    case Calls::kChanging:
+      return isOneOf(kChanging);
+    case Calls::kOfFiles:
+      return isOneOf(kChanging) || isOneOf(kLooking);
+    case Calls::kTransfers:
+      return isOneOf(kTransferring);
+    case Calls::kEvery:
+      return true;
+  }
+  return false;
 }
 
-// Has the call that the child has just entered fail; whether that is possible on this machine.
+// Has the call that the child has just entered fail, or do half; whether that is possible on this
+// machine.
 bool FailCall([[maybe_unused]] pid_t child, [[maybe_unused]] int error) {
 #ifdef __x86_64__
   user_regs_struct registers = {};
   int status = 0;
   ptrace(PTRACE_GETREGS, child, nullptr, &registers);
+  if (error == kHalf) {
+    registers.rdx -= registers.rdx / 2;
+    return ptrace(PTRACE_SETREGS, child, nullptr, &registers) == 0;
+  }
   registers.orig_rax = ~0ULL;
   ptrace(PTRACE_SETREGS, child, nullptr, &registers);
   ptrace(PTRACE_SYSCALL, child, nullptr, nullptr);
@@ -110,9 +136,11 @@ Outcome RunTo(const Task& task, const Point& point) {
     SystemCall call = {};
     if (WSTOPSIG(status) != (SIGTRAP | 0x80)) continue;
     ptrace(static_cast<__ptrace_request>(kGetSystemCall), child, sizeof call, &call);
-    if (call.op != kEntry || (!point.all && !Changes(call)) || seen++ != point.n) continue;
+    if (call.op != kEntry || !Counts(call, point.calls)) continue;
+    const bool follows = outcome.reached && point.lasting && call.number == outcome.call;
+    if (seen++ != point.n && !follows) continue;
     outcome = {true, call.number, 0};
-    if (point.error != 0 && FailCall(child, point.error)) continue;
+    if (point.error != kKill && FailCall(child, point.error)) continue;
     kill(child, SIGKILL);
     waitpid(child, &status, 0);
     break;

@@ -22,10 +22,17 @@ constexpr int kKilled = -1;
 int RunTask(const Task& task);
 int RunCommand(const Words& words);
 
+// Which calls count. What goes to standard output and error never does.
+enum class Calls { kChanging, kOfFiles, kTransfers, kEvery };
+
+// What befalls the n-th of them: an errno, or
+constexpr int kKill = 0;   // the child is killed before it
+constexpr int kHalf = -1;  // half of what is to be read or written is
 struct Point {
-  long n;            // of the calls that count
-  int error = 0;     // what it fails with; 0: the child is killed before it
-  bool all = false;  // whether every call counts
+  long n;
+  int error = kKill;
+  Calls calls = Calls::kChanging;
+  bool lasting = false;  // whether all that follow of its kind fail, too
 };
 struct Outcome {
   bool reached = false;
