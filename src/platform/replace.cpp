@@ -31,8 +31,9 @@ constexpr size_t kRandomBytes = 16;
 constexpr size_t kSuffix = kMarkLength + 2 * kRandomBytes;
 // The longest name that a file system takes.
 constexpr size_t kMaxFileName = 255;
-// Names drawn before giving up: each is new, so that a second one is hardly ever needed.
-constexpr int kAttempts = 8;
+// Names drawn before giving up. Each is new; a second one is needed only when somebody who removes
+// leftovers comes between the making of a file and its locking, again and again on a busy disk.
+constexpr int kAttempts = 100;
 
 // By the form of the name alone, so that the file of another program is hardly ever meant; who has
 // its lock is asked before it goes.
