@@ -28,12 +28,17 @@ namespace {
 
 std::string WhyKept(CrlSequence& list, CrlSequence& kept) {
   const Cert& cert = *list.GetCert();
+  const Cert& other = *kept.GetCert();
   const Ref<TimeStamp> now = ParseTime("now", false);
   if (cert.GetNotBefore() != nullptr && cert.GetNotBefore()->IsAfter(now.get())) {
     return "it begins only at " + StampText(*cert.GetNotBefore());
   }
+  const bool premature =
+      other.GetNotBefore() != nullptr && other.GetNotBefore()->IsAfter(now.get());
+  const TimeStamp* const end = cert.GetNotAfter();
+  if (premature || (end != nullptr && end->IsAfterOrEqual(other.GetNotAfter()))) return "";
   return "it is older than the stored list, which is valid " +
-         PeriodText(kept.GetCert()->GetNotBefore(), kept.GetCert()->GetNotAfter());
+         PeriodText(other.GetNotBefore(), other.GetNotAfter());
 }
 
 // "carol-install-revoke-all": a name without anything that shells read.
@@ -157,13 +162,13 @@ std::string StoreCrl(CrlSequence& list, SExpression* acls, const std::string& pa
   if (!reason.empty()) return reason;
   Check(list.UpdateStore(acls), Escape(path));
   const Ref<CrlSequence> kept = FindStored(list.GetCert()->GetTag(), nullptr).list;
-  if (!kept) {
-    const Text directory(CrlSequence::CalcDir(ZvVesk2::StorageGlobal));
-    throw Trouble(Escape(path) + ": cannot be written to " +
-                      (directory ? Escape(directory.get()) : "the store"),
-                  "io");
-  }
-  return Canonical(*kept) == Canonical(list) ? "" : WhyKept(list, *kept);
+  if (kept && Canonical(*kept) == Canonical(list)) return "";
+  const std::string why = kept ? WhyKept(list, *kept) : "";
+  if (!why.empty()) return why;
+  const Text directory(CrlSequence::CalcDir(ZvVesk2::StorageGlobal));
+  throw Trouble(Escape(path) + ": cannot be written to " +
+                    (directory ? Escape(directory.get()) : "the store"),
+                "io");
 }
 
 void TrustSource(PublicKey& issuer, SExpression* tag, const std::string& keyName, bool dryRun) {
