@@ -7,6 +7,8 @@
 // VESK2_SWEEP_ALL kills at every system call, and fails all that have to do with files.
 #include <gtest/gtest.h>
 
+#include <sched.h>
+#include <sys/mount.h>
 #include <sys/syscall.h>
 #include <unistd.h>
 
@@ -14,8 +16,10 @@
 #include <cstdio>
 #include <cstdlib>
 #include <filesystem>
+#include <fstream>
 #include <map>
 #include <string>
+#include <vector>
 
 #include "tests/support/temp_dir.h"
 #include "tests/support/test_key.h"
@@ -258,6 +262,38 @@ class Writers : public testing::Test {
     std::printf("%s: killed %ld times, failed %ld times\n", name, kills, failures);
   }
 
+  std::vector<Writer> Table();
+
+  // In a child: on a file system of its own, that takes nothing any more. (What is removed needs no
+  // room.)
+  static constexpr int kNoMount = 77;
+  int RunOnDisk(bool full, const Writer& writer) const {
+    const char* const path = dir_.Path().c_str();
+    if (unshare(CLONE_NEWNS) != 0 || mount("", "/", "", MS_PRIVATE | MS_REC, nullptr) != 0 ||
+        mount("none", path, "tmpfs", 0, "size=1m") != 0) {
+      return kNoMount;
+    }
+    Restore();
+    if (full) {
+      const std::string page(4096, 'x');
+      for (const size_t size : {page.size(), size_t{1}}) {
+        std::ofstream filler(At("filler"), std::ios::app);
+        while (filler.write(page.data(), static_cast<std::streamsize>(size)).flush()) {
+        }
+      }
+    } else if (mount("none", path, "", MS_REMOUNT | MS_RDONLY, nullptr) != 0) {
+      return kNoMount;
+    }
+    const int code = RunTask(CommandHere(writer.words));
+    Files found = Look();
+    std::erase_if(found, [&](const auto& file) {
+      const std::string& name = file.first;
+      return !before_.contains(name) && (name == "filler" || name.ends_with(".lock"));
+    });
+    if (found == before_ && (code == 2 || (writer.forgives && code == 0))) return 0;
+    return full && code == 0 && found.size() < before_.size() ? 0 : 1;
+  }
+
   const bool quick_ = UseMemory();
   TempDir dir_;
   Files before_, after_, stable_;
@@ -285,7 +321,7 @@ TEST_F(Writers, OfTheLibrary) {
   for (const auto& row : rows) Sweep(row.name, row.task, row.task, false, true);
 }
 
-TEST_F(Writers, OfTheCommand) {
+std::vector<Writer> Writers::Table() {
   const std::string tag = "(install)";
   const Words grant = {"acl", "grant", "--subject", At("other.pub"), "--tag", tag, "--name", "x"};
   const Words join = {"cert", "join", At("one.cert"), At("two.cert"), "-o", At("both.cert")};
@@ -297,7 +333,7 @@ TEST_F(Writers, OfTheCommand) {
   const Words floor = {"floor", "set", "--tag", tag, "--floor", At("f"), "2025"};
   const Words approve = {"manifest", "approve", At("m"), "--key", At("other.pem")};
   const Words install = {"acl", "install", At("new/more.acl")};
-  const Writer writers[] = {
+  return {
       {"acl grant", grant, Join(grant, {"-f"})},
       {"acl install", install, Join(install, {"-f"})},
       {"acl remove", {"acl", "remove", "vendor"}, {}, true},
@@ -315,10 +351,24 @@ TEST_F(Writers, OfTheCommand) {
       {"manifest verify --floor", Verify("m", {"--floor", At("f")})},
       {"manifest verify --remember", Verify("m", {"--remember"})},
   };
-  for (const Writer& writer : writers) {
+}
+
+TEST_F(Writers, OfTheCommand) {
+  for (const Writer& writer : Table()) {
     const Words& again = writer.again.empty() ? writer.words : writer.again;
     Sweep(writer.name, CommandHere(writer.words), CommandHere(again), writer.refused,
           writer.forgives);
+  }
+}
+
+// What is there stays as it is, and that nothing could be written is told.
+TEST_F(Writers, OnDisksThatTakeNothing) {
+  for (const bool full : {false, true}) {
+    for (const Writer& writer : Table()) {
+      const int status = RunTask([&] { return RunOnDisk(full, writer); });
+      if (status == kNoMount) GTEST_SKIP() << "may not mount anything";
+      EXPECT_EQ(status, 0) << writer.name << (full ? ", full" : ", read-only");
+    }
   }
 }
 
