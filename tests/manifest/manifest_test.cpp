@@ -430,6 +430,12 @@ TEST_F(ManifestTest, ReadsWithoutTheChainAndHandsTheBodyOver) {
   EXPECT_EQ(std::string(reinterpret_cast<const char*>(body->Data()), body->Remaining()),
             parts.body);
   EXPECT_EQ(manifest.ReadManifest(false, 0, 0, nullptr), 0);
+  // Without a store nothing is authorized; whoever asks for the evidence gets the rest of it.
+  Evidence evidence(nullptr);
+  manifest.SetEvidence(&evidence);
+  EXPECT_EQ(manifest.VerifyManifest(0, 0), VESK2_ERR_FILE_NOT_FOUND);
+  EXPECT_GT(evidence.GetListingPosition(), 0U);
+  manifest.SetEvidence(nullptr);
 
   std::string text = ManifestFile(parts);
   text[text.size() - 3] ^= 1;
@@ -509,6 +515,7 @@ TEST_F(ManifestTest, InitializeRefusesNullAndBadTags) {
   EXPECT_EQ(manifest.Initialize("d", "m", nullptr), VESK2_ERR_INVALID_PARAM);
   EXPECT_NE(manifest.Initialize("d", "m", "(a"), 0);
   EXPECT_EQ(manifest.Initialize("d", "m", "(a)"), 0);
+  EXPECT_EQ(manifest.CopyExtraAclDirectory("d"), 0);
   EXPECT_EQ(manifest.VerifyManifest(0, 0), VESK2_ERR_OPEN_MANIFEST_FILE);
 }
 

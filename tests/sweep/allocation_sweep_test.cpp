@@ -590,7 +590,8 @@ std::vector<Case> FlatCases() {
            Vesk2ExplanationStruct* why = nullptr;
            const int code = VerifyManifestExplained(manifest.get(), 0, 0, &why);
            const bool fits =
-               why == nullptr || (why->code == code && (code != 0 || why->valid == 1));
+               why == nullptr ||
+               (why->code == code && (code != 0 || (why->valid == 1 && why->entry != nullptr)));
            Vesk2FreeExplanation(why);
            return Outcome{code, fits && (code != 0 || manifest->GetListing() != nullptr)};
          };

@@ -44,6 +44,19 @@ std::string Told(const Explanation& explanation) {
   return told;
 }
 
+// What is told when the second certificate is not the signer's.
+std::string OutOfOrder(const std::string& subject, const std::string& signer) {
+  const auto print = [](const std::string& key) {
+    std::string text = "sha256:";
+    for (const char byte : Digest(key)) {
+      text += "0123456789abcdef"[static_cast<unsigned char>(byte) >> 4];
+      text += "0123456789abcdef"[byte & 15];
+    }
+    return text;
+  };
+  return " is for " + print(subject) + ", not for the signer " + print(signer);
+}
+
 class Explaining : public TrustTest {
  protected:
   Explaining() { WriteAcl("source", AclEntryText(KeyText(4), Tag(kSource))); }
@@ -78,6 +91,8 @@ TEST_F(Explaining, Refusals) {
   const std::string late =
       Link(0, {.subject = KeyText(1), .propagate = true, .notBefore = kMiddle});
   const std::string forged = Cert({.issuer = KeyText(0), .subject = KeyText(1), .propagate = true});
+  const std::string bad = forged + TestKey::Rsa(3).Sign(forged) + "()";
+  const std::string either = "(6:k-of-n[num]1:\1[num]1:\2" + KeyText(0) + KeyText(5) + ")";
   const std::string several =
       "(6:k-of-n[num]1:\2[num]1:\3" + KeyText(0) + KeyText(5) + KeyText(6) + ")";
   // The name in the store: what stands there; the chain; the tag; when; the code; the reasons.
@@ -86,6 +101,8 @@ TEST_F(Explaining, Refusals) {
        "signature 2"},
       {root, listed + top + Link(0, 7), "(ftp)", kMiddle, VESK2_ERR_CERT_REVOKED,
        "revoked 1, key-revoked 3"},
+      {root, bad + forged + TestKey::Rsa(3).Sign(forged) + "()", "(ftp)", "", VESK2_ERR_SIGNATURE,
+       "signature 1, signature 2"},
       {root, lost + top, "(ftp)", "", VESK2_ERR_CRL_NOT_FOUND, "undetermined 1"},
       {root, ended + top, "(ftp)", kMiddle, kNone, "period 1, combination"},
       {root, ended + late, "(ftp)", "", kNone, "period 1/2"},
@@ -101,10 +118,16 @@ TEST_F(Explaining, Refusals) {
       {AclEntryText(HashOf(KeyText(0), "sha1"), Tag("(web)")), top, "(ftp)", "", kNone,
        "tag root.acl"},
       {AclEntryText(several, Tag("(ftp)")), top, "(ftp)", "", kNone, "threshold root.acl"},
+      // Nobody is missing.
+      {AclEntryText(either, Tag("(web)")), top, "(ftp)", "", kNone, "tag root.acl"},
       {root, Link(0, {.subject = "(6:k-of-n[num]1:\1[num]1:\1" + KeyText(3) + ")"}), "(ftp)", "",
        SPKI_ERR_KEY_OR_HASH_EXPECTED, "unreadable 1"},
       {AclEntryText("(6:k-of-n[num]1:\3[num]1:\1" + KeyText(3) + ")", Tag("(ftp)")), top, "(ftp)",
        "", SPKI_ERR_KOFN_SYNTAX, "unreadable root.acl"},
+      // The first that stops the reduction, and not whom it could not be asked about.
+      {AclEntryText("(6:k-of-n[num]1:\3[num]1:\1" + KeyText(3) + ")", Tag("(ftp)")),
+       Link(0, {.subject = "(6:k-of-n[num]1:\1[num]1:\1" + KeyText(3) + ")"}), "(ftp)", "",
+       SPKI_ERR_KEY_OR_HASH_EXPECTED, "unreadable root.acl"},
   };
   global.Write(
       "cert/" + kSource + ".crl",
@@ -117,6 +140,37 @@ TEST_F(Explaining, Refusals) {
   std::filesystem::remove_all(global.File("acl"));
   EXPECT_EQ(Verify(leaf, "(ftp)", ""), VESK2_ERR_ACL_ENTRY_NOT_FOUND);
   EXPECT_EQ(Told(explanation), "no-entry");
+}
+
+// What is told of the loss: what was valid or granted, and what was asked.
+TEST_F(Explaining, Texts) {
+  const std::string root = AclEntryText(KeyText(0), Tag("(ftp)"), true, kPast, kFuture);
+  const std::string top = Link(0, 1);
+  const std::string from = std::string(" from ") + kPast + " until " + kFuture + ", ";
+  // The chain; when; what is in the text of the first reason, and of the last.
+  const std::tuple<std::string, std::string, std::string, std::string> cases[] = {
+      {Link(1, 2) + top, kFarFuture, std::string(" was valid until ") + kFuture + ", asked was ",
+       "the chain grants (ftp)" + from + "asked was (ftp) "},
+      {Link(1, {.subject = KeyText(2), .notBefore = kFuture}) + top, kMiddle,
+       std::string(" is not valid before ") + kFuture + ", asked was ", "asked was (ftp) "},
+      {Link(1, {.subject = KeyText(2), .tag = Tag("(ftp a)")}) + top, kMiddle,
+       " grants (ftp a), asked was (ftp)", "the chain grants (ftp a)" + from + "asked was (ftp) "},
+  };
+  WriteAcl("root", root);
+  for (const auto& [items, at, first, last] : cases) {
+    EXPECT_NE(Verify(items, "(ftp)", at), 0);
+    ASSERT_GT(explanation.CountReasons(), 0U) << first;
+    const std::string texts[] = {explanation.GetReason(0).text,
+                                 explanation.GetReason(explanation.CountReasons() - 1).text};
+    EXPECT_NE(texts[0].find(first), std::string::npos) << texts[0];
+    EXPECT_NE(texts[1].find(last), std::string::npos) << texts[1];
+  }
+  // Asked about several tags, the first that is beyond.
+  const Ref<SExpression> members = Parse(List({Tag("(ftp a)"), Tag("(web)")}));
+  EXPECT_EQ(Verify(top, "(ftp)", kMiddle), 0);
+  ASSERT_EQ(explanation.Explain(evidence, kNone, tag.get(), members.get()), 0);
+  EXPECT_TRUE(Told(explanation).starts_with("tag 1, tag root.acl")) << Told(explanation);
+  EXPECT_NE(std::string(explanation.GetReason(0).text).find("asked was (web)"), std::string::npos);
 }
 
 // A manifest's own reasons, from evidence that is put together by hand.
@@ -139,12 +193,17 @@ TEST_F(Explaining, RefusedManifests) {
     evidence.Clear(Evidence::SignedManifest);
     ASSERT_EQ(evidence.AddCert(first, nullptr, 0) + evidence.AddCert(second, nullptr, 0), 0);
     evidence.SetContent(VESK2_ERR_HASH_MATCH, listing, 7);
-    ASSERT_EQ(explanation.SetNames("a\x1b.manifest", nullptr), 0);
+    ASSERT_EQ(explanation.SetNames("a\x1b\xc2\xa7.manifest", "extra"), 0);
     ASSERT_EQ(explanation.Explain(evidence, code, tag.get()), 0);
     EXPECT_EQ(Told(explanation), reasons);
+    if (second == stray.get()) {
+      EXPECT_TRUE(
+          std::string(explanation.GetReason(0).text).ends_with(OutOfOrder(KeyText(2), KeyText(1))));
+    }
     if (listing == 0) continue;
-    EXPECT_STREQ(explanation.GetReason(0).text,
-                 "a\\x1b.manifest: byte 7: not in the expected form (VESK2_ERR_PARSE_FILE)");
+    EXPECT_STREQ(
+        explanation.GetReason(0).text,
+        "a\\x1b\xc2\xa7.manifest: byte 7: not in the expected form (VESK2_ERR_PARSE_FILE)");
   }
 }
 
@@ -163,6 +222,8 @@ TEST_F(Explaining, Grants) {
                    std::string>
       cases[] = {
           {plain, elsewhere, top, "a.acl", "1", E::NoEnd, E::kNone, ""},
+          {AclEntryText(KeyText(0), Tag("(web)")), plain, top, "b.acl", "1", E::NoEnd, E::kNone,
+           ""},
           {elsewhere, brief, Link(1, 2) + top, "b.acl", "21", E::EntryEnds, E::kNone, kFuture},
           {plain, brief, ends + Link(3, 4) + top, "a.acl", "31", E::CertEnds, 0, kSoon},
           {brief, plain, ends + top, "a.acl", "21", E::CertEnds, 0, kSoon},
@@ -240,6 +301,34 @@ TEST_F(Explaining, IsBounded) {
   // Each certificate of a yes would have to be left out once.
   ASSERT_EQ(explanation.Explain(evidence, 0, tag.get()), 0);
   EXPECT_EQ(explanation.GetEntry(), nullptr);
+
+  // Each entry is tried with all that the chain brings, which alone is too much.
+  const std::string entry = AclEntryText(KeyText(0), Tag("(ftp)"));
+  evidence.SetEntries(Acls({entry, entry, entry, entry, entry, entry, entry, entry}).get());
+  ASSERT_EQ(explanation.Explain(evidence, 0, tag.get()), 0);
+  EXPECT_FALSE(explanation.IsComplete());
+
+  // One that grants, and more beside it than can be left out one by one.
+  evidence.Clear(Evidence::Chain);
+  for (int i = 0; i < 3'000; ++i) {
+    const auto cert = Cert({.issuer = KeyText(i == 0 ? 0 : 3), .subject = KeyText(1)});
+    ASSERT_EQ(evidence.AddCert(Read<CertObject>(cert).get(), nullptr, 0), 0);
+  }
+  evidence.SetEntries(Acls({AclEntryText(KeyText(0), Tag("(ftp)"))}).get());
+  ASSERT_EQ(evidence.MarkRevoked() + evidence.Prove(tag.get()), 0);
+  ASSERT_EQ(explanation.Explain(evidence, 0, tag.get()), 0);
+  EXPECT_FALSE(explanation.IsComplete());
+  EXPECT_EQ(explanation.GetEntry(), nullptr);
+  EXPECT_EQ(explanation.CountPath(), 0U);
+}
+
+// Evidence that a caller put together, and forgot something.
+TEST_F(Explaining, NothingIsProvedWithoutWhatIsNeeded) {
+  tag = Parse(Tag("(ftp)"));
+  EXPECT_EQ(evidence.MarkRevoked(), VESK2_ERR_PARAM_NULL);
+  evidence.Clear(Evidence::SignedManifest);
+  evidence.SetEntries(Acls({AclEntryText(KeyText(0), Tag("(ftp)"))}).get());
+  EXPECT_EQ(evidence.Prove(tag.get()), VESK2_ERR_SIGNING_CERT_ORDER);
 }
 
 }  // namespace
