@@ -6,6 +6,7 @@
 
 #include <signal.h>
 #include <sys/mman.h>
+#include <sys/prctl.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -131,8 +132,10 @@ class Threads : public testing::Test {
     return code;
   }
 
-  // In a process of its own: imports one list after the other, and entries, until it is killed.
+  // In a process of its own: imports one list after the other, and entries, until it is killed, or
+  // the test is.
   [[noreturn]] void Import(std::atomic<int>& imports) const {
+    prctl(PR_SET_PDEATHSIG, SIGKILL);
     for (unsigned i = 0;; ++i) {
       dir_.Write("new/list.crl", RevocationList(100 + i % 2 * 300));
       dir_.Write("new/more.acl",
