@@ -54,6 +54,9 @@ vesk2 manifest sign tree --key signer.pem --cert signer.cert --crl later.crl -o 
 vesk2 manifest verify tree carries.m --tag '(install (app calc))' >said 2>&1 || fail "carried lists"
 cmp -s later.crl "$VESK2_GLOBAL/cert/calc (revoke all).crl" || fail "the carried list is not stored"
 mkdir out && vesk2 show certs/signer.cert --advanced -o out/text >said 2>&1 && [ -s out/text ] || fail "show -o"
+vesk2 manifest verify tree signed/tree.manifest --tag '(install (app calc))' --report out/page.html \
+  >said 2>&1 && [ -s out/page.html ] || fail "--report"
+tries cert verify certs/signer.cert --tag '(install (app calc))' --report out/chain.html
 # A manifest that is replaced by another one at any moment is read, the old or the new.
 cp signed/tree.manifest next && ln next same && mv same signed/tree.manifest
 vesk2 manifest verify tree signed/tree.manifest --tag '(install (app calc))' >said 2>&1 || fail "replaced"

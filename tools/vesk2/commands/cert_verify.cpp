@@ -5,7 +5,9 @@
 #include "tools/vesk2/explain/effort.h"
 #include "tools/vesk2/explain/explain.h"
 #include "tools/vesk2/objects/cert_chain.h"
+#include "tools/vesk2/objects/shapes.h"
 #include "tools/vesk2/objects/texts.h"
+#include "tools/vesk2/page/page.h"
 #include "tools/vesk2/say/report.h"
 #include "tools/vesk2/stores/acl_store.h"
 #include "tools/vesk2/verify/store_check.h"
@@ -22,6 +24,7 @@ struct Options {
   PeriodOptions period;
   bool explain = false;
   StoreCheck stores;
+  PageOptions page;
 };
 
 Period AskedPeriod(const Options& options) {
@@ -57,7 +60,7 @@ int VerifyMembers(const CertChain& chain, const Question& question, const StoreC
 }
 
 ExitCode Run(const Options& options) {
-  Result() = {{"subject", Json()}, {"tag", Json()}};
+  Result() = {{"about", Json()}, {"subject", Json()}, {"tag", Json()}};
   StartExplanation();
   StartAnswer();
   const Request request = ParseRequest(options.tag);
@@ -65,6 +68,8 @@ ExitCode Run(const Options& options) {
   question.file = options.file;
   question.request = &request;
   question.period = AskedPeriod(options);
+  Result()["about"] = {{"file", Escape(options.file)}};
+  Result()["about"].update(PeriodJson(question.period));
   const CertChain chain = ReadCertChain(options.file);
   const std::vector<ChainLink> links = ChainLinks(chain, options.file);
 
@@ -82,7 +87,9 @@ ExitCode Run(const Options& options) {
   }
   const ExitCode verdict = Yes(subject + " is granted " + tag);
   if (options.explain) Note(Confinement());
-  if (options.explain || GetStyle().json) ExplainGrant(question);
+  std::optional<UnshownNotes> unshown;
+  if (!options.explain) unshown.emplace();
+  if (options.explain || CollectsFacts()) ExplainGrant(question);
   return verdict;
 }
 
@@ -100,7 +107,8 @@ Action DefineCertVerify(OptionList& list) {
       .Excludes("--not-after");
   AddStoreCheckOptions(list, options->stores);
   list.Add("--explain", options->explain, "Tell why also when the answer is yes");
-  return [options] { return Run(*options); };
+  AddPageOptions(list, options->page);
+  return WithPage(options->page, [options] { return Run(*options); });
 }
 
 }  // namespace vesk2_command

@@ -47,7 +47,7 @@ void AddAuthorityOptions(OptionList& list, AuthorityOptions& options) {
 }
 
 void StartTreeResult() {
-  for (const char* member : {"tag", "signer", "signed_at", "counts", "changed", "missing",
+  for (const char* member : {"about", "tag", "signer", "signed_at", "counts", "changed", "missing",
                              "links_out", "unlisted", "ignored", "ignored_nothing", "floor"}) {
     Result()[member] = Json();
   }
@@ -70,6 +70,8 @@ ManifestAuthority::ManifestAuthority(const AuthorityOptions& options,
   question_.signing = std::move(signing);
   question_.proved = &proved_;
   Result()["tag"] = TagText(request_.tag.get());
+  Result()["about"]["file"] = Escape(options.manifest);
+  Result()["about"].update(PeriodJson(question_.period));
   floor_.emplace(options.floor, *request_.tag, IsAboutToday(options) && !options.noStoreUpdate);
 }
 
@@ -172,7 +174,12 @@ std::string ManifestAuthority::SignedText() const {
 
 void ManifestAuthority::TellYes() {
   if (options_.explain) Note(Confinement());
-  if (options_.explain || GetStyle().json) TellGrant();
+  options_.explain ? TellGrant() : TellCollectedGrant();
+}
+
+void ManifestAuthority::TellCollectedGrant() {
+  const UnshownNotes unshown;
+  if (CollectsFacts()) TellGrant();
 }
 
 void ManifestAuthority::TellGrant() {

@@ -72,11 +72,13 @@ class ManifestAuthority {
   std::string SignedText() const;
   // What --explain and machines are told of a yes.
   void TellYes();
-  // Explains by what is known today, where that is what was asked.
-  void TellGrant();
+  // The same of a signer who was authorized, whose tree is refused: for machines only.
+  void TellCollectedGrant();
   const Question& question() const { return question_; }
 
  private:
+  // Explains by what is known today, where that is what was asked.
+  void TellGrant();
   [[noreturn]] void ThrowTrouble(const ZvVesk2::Manifest& manifest, int code) const;
   int JudgeMembers(int first);
   int JudgeMember(SExpression* tag) const;

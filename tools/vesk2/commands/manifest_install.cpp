@@ -163,7 +163,7 @@ class Installation {
 
   ExitCode Refused(ExitCode verdict) {
     authority_.Keep(false);
-    if (GetStyle().json) authority_.TellGrant();
+    authority_.TellCollectedGrant();
     return verdict;
   }
 

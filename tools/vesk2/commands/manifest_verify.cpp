@@ -8,6 +8,7 @@
 #include "tools/vesk2/explain/explain.h"
 #include "tools/vesk2/files/files.h"
 #include "tools/vesk2/objects/manifest_file.h"
+#include "tools/vesk2/page/page.h"
 #include "tools/vesk2/say/progress.h"
 #include "tools/vesk2/say/report.h"
 #include "tools/vesk2/tree/ignored_listing.h"
@@ -31,6 +32,7 @@ struct Options {
   bool allowEmpty = false;
   bool all = false;
   unsigned jobs = 0;
+  PageOptions page;
 };
 
 // How to sign the tree again as it was asked about; empty when that is not to be had again.
@@ -118,7 +120,7 @@ class Answer {
     const std::string text = summary + IgnoredText(tree_.ignored.size());
     const ExitCode verdict = code != 0 ? No(code, text) : No("link-leaves-tree", text);
     TellTree(findings);
-    if (GetStyle().json) authority_.TellGrant();
+    authority_.TellCollectedGrant();
     if (code != 0) ExplainTree(authority_.question());
     return verdict;
   }
@@ -145,12 +147,14 @@ Action DefineManifestVerify(OptionList& list) {
   list.Add("--allow-empty", options->allowEmpty, "Accept an answer about no file at all");
   LentThreads::AddOption(list, options->jobs);
   list.Add("--all", options->all, "Tell every finding, on a terminal too");
-  return [options] {
+  AddPageOptions(list, options->page);
+  return WithPage(options->page, [options] {
     StartTreeResult();
+    Result()["about"]["directory"] = Escape(options->directory);
     RealDirectory(options->directory);
     StartAnswer();
     return Answer(*options).Give();
-  };
+  });
 }
 
 }  // namespace vesk2_command

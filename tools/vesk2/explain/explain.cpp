@@ -302,7 +302,10 @@ void ExplainGrant(const Question& question) {
 void ExplainTrouble(const Question& question, int code) {
   Explain([&] {
     const Evidence evidence = GatherEvidence(question);
-    if (GetStyle().json && !evidence.certs.empty()) TellFacts(evidence);
+    if (CollectsFacts() && !evidence.certs.empty()) {
+      const UnshownNotes unshown;
+      TellFacts(evidence);
+    }
     if (code < 0) TellLosses(question, code);
   });
 }

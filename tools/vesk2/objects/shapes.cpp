@@ -35,6 +35,10 @@ Json GrantJson(const char* kind, const Granting& grant) {
 Json StampJson(const TimeStamp* stamp) {
   return stamp != nullptr ? Json(StampText(*stamp)) : Json();
 }
+Json PeriodJson(const Period& period) {
+  return {{"not_before", StampJson(period.notBefore.get())},
+          {"not_after", StampJson(period.notAfter.get())}};
+}
 Json TagJson(SExpression* tag) { return tag != nullptr ? Json(TagText(tag)) : Json(); }
 Json TextJson(const ByteString* text) {
   return text != nullptr ? Json(Escape(BytesOf(*text))) : Json();

@@ -16,6 +16,8 @@
 namespace vesk2_command {
 
 Json StampJson(const TimeStamp* stamp);
+// {"not_before", "not_after"}.
+Json PeriodJson(const Period& period);
 Json TagJson(SExpression* tag);
 Json TextJson(const ByteString* text);
 // "key", "hash" or "k-of-n".

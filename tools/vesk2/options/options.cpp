@@ -22,7 +22,7 @@ constexpr struct {
     {"DIR", Access::kReads, " acl-dir global home tree "},
     {"FILE", Access::kReads,
      " cert chain crl ignore-from items-of key passphrase-file request revoke-key subject "},
-    {"FILE", Access::kWrites, " floor output "},
+    {"FILE", Access::kWrites, " floor output report "},
     {"FILE[:N]", Access::kReads, " issuer-of revoke-cert subject-of "},
     {"N", Access::kNone, " bits jobs passphrase-fd threshold "},
     {"NAME", Access::kNone, " keep-old name names "},

@@ -22,6 +22,8 @@ constexpr const char* kRed = "\033[31m";
 // What has been said so far; a process answers one question.
 struct State {
   Style style;
+  bool collects = false;
+  int unshown = 0;  // how many UnshownNotes there are
   std::string command;
   std::string reason;
   int code = 0;
@@ -44,23 +46,8 @@ void WriteError(const std::string& line) {
 }
 
 void WriteJson(ExitCode code) {
-  constexpr const char* kVerdicts[] = {"yes", "no", "trouble"};
-  constexpr const char* kReasons[] = {"ok", "no", "trouble"};
-  Json answer = {
-      {"schema", "vesk2.answer/2"},
-      {"command", report.command},
-      {"verdict", kVerdicts[code]},
-      {"exit", static_cast<int>(code)},
-      {"reason", report.reason.empty() ? kReasons[code] : report.reason},
-      {"code", report.code},
-      {"message", report.message},
-  };
-  answer["file"] = OrNull(report.file);
-  answer["byte"] = report.byte ? Json(*report.byte) : Json();
-  answer["notes"] = report.notes;
-  answer["result"] = report.result.is_null() ? Json::object() : report.result;
   // In ASCII: the words of a command line are as they are, and may turn a terminal's text.
-  std::printf("%s\n", answer.dump(-1, ' ', true).c_str());
+  std::printf("%s\n", MakeAnswer(code).dump(-1, ' ', true).c_str());
 }
 
 }  // namespace
@@ -100,12 +87,18 @@ void Say(const std::string& line) {
 
 void Note(const std::string& line) {
   report.notes.push_back(line);
-  if (!report.style.quiet && !report.style.json) WriteError(line);
+  if (!report.style.quiet && !report.style.json && report.unshown == 0) WriteError(line);
 }
 
 void Detail(const std::string& line) {
   if (report.style.verbose) Note(line);
 }
+
+UnshownNotes::UnshownNotes() { ++report.unshown; }
+UnshownNotes::~UnshownNotes() { --report.unshown; }
+
+void CollectFacts() { report.collects = true; }
+bool CollectsFacts() { return report.collects || report.style.json; }
 
 Json& Result() { return report.result; }
 Json OrNull(const std::string& text) { return text.empty() ? Json() : Json(text); }
@@ -131,6 +124,33 @@ ExitCode No(const std::string& reason, const std::string& text) {
   return kNo;
 }
 
+Json MakeAnswer(ExitCode code) {
+  constexpr const char* kVerdicts[] = {"yes", "no", "trouble"};
+  constexpr const char* kReasons[] = {"ok", "no", "trouble"};
+  Json answer = {
+      {"schema", "vesk2.answer/2"},
+      {"command", report.command},
+      {"verdict", kVerdicts[code]},
+      {"exit", static_cast<int>(code)},
+      {"reason", report.reason.empty() ? kReasons[code] : report.reason},
+      {"code", report.code},
+      {"message", report.message},
+  };
+  answer["file"] = OrNull(report.file);
+  answer["byte"] = report.byte ? Json(*report.byte) : Json();
+  answer["notes"] = report.notes;
+  answer["result"] = report.result.is_null() ? Json::object() : report.result;
+  return answer;
+}
+
+void RecordTrouble(const Trouble& trouble) {
+  report.reason = trouble.reason;
+  report.code = trouble.code;
+  report.message = trouble.what();
+  report.file = trouble.file;
+  report.byte = trouble.byte;
+}
+
 ExitCode FinishReport(ExitCode code) {
   if (report.style.json) WriteJson(code);
   if (std::fflush(stdout) == 0 && std::ferror(stdout) == 0) return code;
@@ -140,11 +160,7 @@ ExitCode FinishReport(ExitCode code) {
 
 ExitCode FinishReport(const Trouble& trouble) {
   WriteError(std::string("vesk2: ") + trouble.what());
-  report.reason = trouble.reason;
-  report.code = trouble.code;
-  report.message = trouble.what();
-  report.file = trouble.file;
-  report.byte = trouble.byte;
+  RecordTrouble(trouble);
   return FinishReport(kTrouble);
 }
 

@@ -66,6 +66,17 @@ void Say(const std::string& line);
 void Note(const std::string& line);
 // Detail is a note that only --verbose asks for.
 void Detail(const std::string& line);
+// While one lives, notes are kept for machines and not shown: nobody asked for them.
+class UnshownNotes {
+ public:
+  UnshownNotes();
+  ~UnshownNotes();
+  UnshownNotes(const UnshownNotes&) = delete;
+  UnshownNotes& operator=(const UnshownNotes&) = delete;
+};
+// CollectFacts has a command find out for Result what else only --json asks for.
+void CollectFacts();
+bool CollectsFacts();
 // The members that a command adds for machines.
 Json& Result();
 
@@ -77,6 +88,10 @@ ExitCode Yes(const std::string& text);
 ExitCode No(int code, const std::string& text);
 // A no of the command's own, which no library code stands for.
 ExitCode No(const std::string& reason, const std::string& text);
+
+// What has been said so far, as --json writes it. RecordTrouble makes trouble of it.
+Json MakeAnswer(ExitCode code);
+void RecordTrouble(const Trouble& trouble);
 
 // FinishReport writes the answer for machines and flushes standard output: a verdict that could not
 // be written is trouble. Its result is the exit status.
