@@ -8,6 +8,7 @@
 #include "tools/vesk2/keys/key_reference.h"
 #include "tools/vesk2/keys/key_source.h"
 #include "tools/vesk2/objects/crl_file.h"
+#include "tools/vesk2/objects/tag_bounds.h"
 #include "tools/vesk2/say/report.h"
 #include "tools/vesk2/stores/grant.h"
 #include "tools/vesk2/verify/self_check.h"
@@ -86,7 +87,7 @@ ExitCode Run(const Options& options) {
   const std::string name = EntryName(options);
   const Ref<AclEntry> entry =
       MakeEntry({MakeSubject(ReadKeys(options), options.threshold), options.propagate,
-                 ParseTypedTag(options.tag), ParsePeriod(options.period), options.comment});
+                 ParseIssuedTag(options.tag), ParsePeriod(options.period), options.comment});
   const bool issuer = !options.issuerOf.empty();
   CheckGrant(*entry, issuer ? options.issuerOf : options.subjectOf, issuer, options.strict);
   GrantEntry(*entry, {name, options.flags});

@@ -9,6 +9,7 @@
 #include "tools/vesk2/keys/key_source.h"
 #include "tools/vesk2/objects/crl_file.h"
 #include "tools/vesk2/objects/join.h"
+#include "tools/vesk2/objects/tag_bounds.h"
 #include "tools/vesk2/say/report.h"
 #include "tools/vesk2/verify/self_check.h"
 
@@ -65,7 +66,7 @@ Wish ReadRequest(const Options& options) {
     if (!wish.tag) throw FileTrouble(path, "asks for everything: --tag says how much", "usage");
     return wish;
   }
-  Ref<SExpression> tag = ParseTypedTag(options.tag);
+  Ref<SExpression> tag = ParseIssuedTag(options.tag);
   if (wish.tag && !tag->IsSubset(wish.tag.get())) {
     throw Trouble(
         "--tag " + TagText(tag.get()) + " is more than was requested, " + TagText(wish.tag.get()),
@@ -80,7 +81,7 @@ Wish ReadWish(const Options& options) {
   if (options.subject.empty()) throw Trouble("nobody to certify: --subject or --request", "usage");
   if (options.tag.empty()) throw Trouble("--tag is required", "usage");
   return {Ref<ZvVesk2::Subject>(ReadPublicKey(options.subject).Release()),
-          ParseTypedTag(options.tag), ""};
+          ParseIssuedTag(options.tag), ""};
 }
 
 Signers OpenSigners(const SignerOptions& options) {

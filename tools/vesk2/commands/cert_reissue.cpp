@@ -7,6 +7,7 @@
 #include "tools/vesk2/files/files.h"
 #include "tools/vesk2/keys/key_source.h"
 #include "tools/vesk2/objects/splice.h"
+#include "tools/vesk2/objects/tag_bounds.h"
 #include "tools/vesk2/say/report.h"
 
 namespace vesk2_command {
@@ -71,7 +72,7 @@ ExitCode Write(const Options& options, const Work& work, const Renewal& renewal,
 ExitCode Renew(const Options& options) {
   Work work = Open(options);
   Renewal renewal;
-  if (!options.tag.empty()) renewal.tag = ParseTypedTag(options.tag);
+  if (!options.tag.empty()) renewal.tag = ParseIssuedTag(options.tag);
   renewal.propagate = options.propagate;
   renewal.period = ParsePeriod(options.period);
   renewal.newPeriod = renewal.period.notBefore || renewal.period.notAfter;

@@ -3,6 +3,7 @@
 // that the key issues to itself, which shows that whoever asks has the key.
 #include "tools/vesk2/commands/command.h"
 #include "tools/vesk2/keys/issue.h"
+#include "tools/vesk2/objects/tag_bounds.h"
 #include "tools/vesk2/say/report.h"
 
 namespace vesk2_command {
@@ -18,7 +19,7 @@ struct Options {
 };
 
 ExitCode Run(const Options& options) {
-  const Ref<SExpression> tag = ParseTag(options.tag);
+  const Ref<SExpression> tag = ParseIssuedTag(options.tag);
   const Ref<ByteString> comment = MakeText(options.comment);
   const auto signer = OpenSigner(options.signer);
   const Ref<PublicKey> subject = signer->Public();

@@ -11,6 +11,7 @@
 #include "tools/vesk2/keys/issue.h"
 #include "tools/vesk2/keys/key_source.h"
 #include "tools/vesk2/objects/splice.h"
+#include "tools/vesk2/objects/tag_bounds.h"
 #include "tools/vesk2/tree/tree.h"
 #include "tools/vesk2/tree/tree_findings.h"
 
@@ -71,7 +72,7 @@ std::vector<SignedCert> Additions(const Options& options, const SignatureBlock& 
   const Ref<PublicKey> approver = key.Public();
   const ZvVesk2::Cert& content = *block.certs.front().cert;
   const Ref<SExpression> tag =
-      options.tag.empty() ? Ref<SExpression>::Share(content.GetTag()) : ParseTypedTag(options.tag);
+      options.tag.empty() ? Ref<SExpression>::Share(content.GetTag()) : ParseIssuedTag(options.tag);
   std::vector<SignedCert> added;
   added.push_back(
       IssueCert(key, {content.GetSubject(), false, tag.get()}, options.signer.algorithm));

@@ -147,10 +147,10 @@ struct Parts {
 };
 
 Parts Prepare(const Options& options, const SigningKey& key, ManifestWriter& writer) {
-  if (!options.grant.empty()) RequirePlainBounds(ParseTag(options.grant).get());
+  if (!options.grant.empty()) (void)ParseIssuedTag(options.grant);
   const std::string creator = "libvesk2 " + LibraryVersion();
   Check(writer.SetHead(creator.c_str(), ParseTime(options.at, false).get()), kWriting);
-  Parts parts{options.tag.empty() ? Ref<SExpression>() : ParseTypedTag(options.tag),
+  Parts parts{options.tag.empty() ? Ref<SExpression>() : ParseIssuedTag(options.tag),
               SignersCerts(options, key)};
   AddLists(options, writer);
   return parts;
@@ -181,8 +181,8 @@ void CheckWritten(const std::string& unnamed, const Options& options, const Igno
 
 // The machine trusts the signing key for a tag from now on, as with acl grant.
 void WriteGrant(const Options& options, const SigningKey& key) {
-  const Ref<ZvVesk2::AclEntry> entry =
-      MakeEntry({Ref<ZvVesk2::Subject>(key.Public().Release()), true, ParseTag(options.grant)});
+  const Ref<ZvVesk2::AclEntry> entry = MakeEntry(
+      {Ref<ZvVesk2::Subject>(key.Public().Release()), true, ParseIssuedTag(options.grant)});
   const std::string name = KeyNickname(options.signer.keys[0]);
   GrantEntry(*entry, {FreeEntryName(*entry, name), {false, options.flags.dryRun}});
 }

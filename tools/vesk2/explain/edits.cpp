@@ -99,7 +99,7 @@ bool EditMaker::Covers(SExpression* tag) const {
 // Whether the asked tag is one that the commands issue.
 bool EditMaker::CanIssue() const {
   try {
-    RequirePlainBounds(question_.request->tag.get());
+    (void)ParseIssuedTag(question_.request->text);
   } catch (const Trouble&) {
     return false;
   }
@@ -253,7 +253,7 @@ void EditMaker::Widen(std::vector<Edit>& edits, const EntryEvidence& each) const
 
   const bool retag = !Covers(old.GetTag());
   if (retag && (!CanIssue() || !old.GetTag()->IsSubset(question_.request->tag.get()))) return;
-  const std::string tag = retag ? question_.request->text : ReadableTag(old.GetTag());
+  const std::string tag = retag ? question_.request->text : IssuableTag(old.GetTag());
   const Limits limits =
       MendPeriod(old.GetNotBefore(), old.GetNotAfter(), evidence_.first, evidence_.last, false);
   const bool changed = retag || limits.changed || !old.GetPropagate();
@@ -263,7 +263,7 @@ void EditMaker::Widen(std::vector<Edit>& edits, const EntryEvidence& each) const
   edit.target = edit.file = each.file;
   try {
     edit.entry =
-        MakeEntry({Ref<ZvVesk2::Subject>::Share(key), true, ParseTag(tag), limits.Parse()});
+        MakeEntry({Ref<ZvVesk2::Subject>::Share(key), true, ParseIssuedTag(tag), limits.Parse()});
   } catch (const Trouble&) {
     return;  // the old tag is none that is issued
   }

@@ -55,7 +55,7 @@ std::vector<Remedy> SignAgain(const Question& question, const Evidence& evidence
   const Cert& old = *evidence.certs[0].cert;
   auto* signer = dynamic_cast<PublicKey*>(old.GetIssuer());
   const std::vector<Cert*> chain = CarriedChain(evidence);
-  const std::string tag = ReadableTag(old.GetTag());
+  const std::string tag = IssuableTag(old.GetTag());
   if (signer == nullptr || !old.GetSubject()->IsHash() || chain.empty()) return {};
   if (old.GetTag() != nullptr && tag.empty()) return {};
   const Policy policy(question, evidence);

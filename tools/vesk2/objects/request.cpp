@@ -2,6 +2,7 @@
 // request.cpp: taking requested sets apart.
 #include "tools/vesk2/objects/request.h"
 
+#include "tools/vesk2/objects/tag_bounds.h"
 #include "tools/vesk2/say/report.h"
 
 namespace vesk2_command {
@@ -69,6 +70,18 @@ Texts Alternatives(DExpression& element) {
   return members;
 }
 
+// A tag's text, if `parse` reads it back.
+std::string ReadBack(SExpression* tag, Ref<SExpression> (*parse)(const std::string&)) {
+  if (tag == nullptr) return "";
+  const Text text(tag->ExportTag("tag"));
+  if (!text) return "";
+  try {
+    return parse(text.get())->IsEqual(tag) ? text.get() : "";
+  } catch (const Trouble&) {
+    return "";
+  }
+}
+
 }  // namespace
 
 Request ParseRequest(const std::string& text) {
@@ -91,15 +104,7 @@ void TellMember(const Request& request, size_t index, int code) {
                                  {"code", code}});
 }
 
-std::string ReadableTag(SExpression* tag) {
-  if (tag == nullptr) return "";
-  const Text text(tag->ExportTag("tag"));
-  if (!text) return "";
-  try {
-    return ParseTypedTag(text.get())->IsEqual(tag) ? text.get() : "";
-  } catch (const Trouble&) {
-    return "";
-  }
-}
+std::string ReadableTag(SExpression* tag) { return ReadBack(tag, ParseTypedTag); }
+std::string IssuableTag(SExpression* tag) { return ReadBack(tag, ParseIssuedTag); }
 
 }  // namespace vesk2_command

@@ -33,6 +33,8 @@ void TellMember(const Request& request, size_t index, int code);
 // The body of a tag as text that ParseTypedTag reads back, for commands that are told to people;
 // empty when there is none, since the advanced form has no quoting.
 std::string ReadableTag(SExpression* tag);
+// The same for commands that issue it: text that ParseIssuedTag reads back.
+std::string IssuableTag(SExpression* tag);
 
 }  // namespace vesk2_command
 

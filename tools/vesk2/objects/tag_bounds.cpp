@@ -1,8 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
-// tag_bounds.cpp: finding the bounds that are none.
+// tag_bounds.cpp: finding what was probably meant otherwise.
 #include "tools/vesk2/objects/tag_bounds.h"
 
+#include "tools/vesk2/objects/crl_file.h"
 #include "tools/vesk2/objects/expression.h"
+#include "tools/vesk2/say/shell_words.h"
 
 namespace vesk2_command {
 namespace {
@@ -38,6 +40,13 @@ DExpression* FindOdd(SExpression& list) {
   return nullptr;
 }
 
+// The one list that the items of a tag were probably meant to be.
+std::string MeantList(SExpression& tag, const std::string& text) {
+  auto it = tag.Begin();
+  it.Next();  // the keyword
+  return it.Value()->IsSExpression() ? "(* set " + text + ")" : "(" + text + ")";
+}
+
 }  // namespace
 
 void RequirePlainBounds(SExpression* tag) {
@@ -45,6 +54,16 @@ void RequirePlainBounds(SExpression* tag) {
   if (odd == nullptr) return;
   throw Trouble("tag \"" + TagText(tag) + "\": the bound " + InlineText(*odd) +
                     " of a range is not one operator and one value, as (le 5) is",
+                "usage");
+}
+
+Ref<SExpression> ParseIssuedTag(const std::string& text) {
+  Ref<SExpression> tag = ParseTypedTag(text);
+  RequirePlainBounds(tag.get());
+  const bool oneList = tag->Count() == 2 && tag->Last()->IsSExpression();
+  if (oneList || IsRevocationTag(tag.get())) return tag;
+  throw Trouble("tag \"" + Escape(text) + "\": not one list in parentheses; did you mean " +
+                    ShellWord(MeantList(*tag, text)) + "?",
                 "usage");
 }
 

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// tag_bounds.h: the bounds of ranges in a tag that is about to be issued.
+// tag_bounds.h: tags that are compared as they are, and not issued.
 #ifndef VESK2_TOOLS_TAG_BOUNDS_H
 #define VESK2_TOOLS_TAG_BOUNDS_H
 
@@ -11,6 +11,12 @@ namespace vesk2_command {
 // one operator and one value. The comparison of tags reads more items, or fewer, as something else
 // than their writer meant, and may then grant what he ruled out: such a tag is not issued.
 void RequirePlainBounds(SExpression* tag);
+
+// ParseIssuedTag is ParseTypedTag of a tag that is to be issued or trusted. Trouble also for what
+// RequirePlainBounds refuses, and for one that is not one list: "install" without its parentheses
+// has nothing in common with "(install)", and would be granted to nobody's use. Only the tags of
+// revocation lists are made of words and a list.
+Ref<SExpression> ParseIssuedTag(const std::string& text);
 
 }  // namespace vesk2_command
 
