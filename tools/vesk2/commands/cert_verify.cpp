@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // cert_verify.cpp: vesk2 cert verify.
 #include "tools/vesk2/commands/command.h"
+#include "tools/vesk2/commands/no_store.h"
 #include "tools/vesk2/confine/confine.h"
 #include "tools/vesk2/explain/effort.h"
 #include "tools/vesk2/explain/explain.h"
@@ -9,7 +10,6 @@
 #include "tools/vesk2/objects/texts.h"
 #include "tools/vesk2/page/page.h"
 #include "tools/vesk2/say/report.h"
-#include "tools/vesk2/stores/acl_store.h"
 #include "tools/vesk2/verify/store_check.h"
 
 #include <vesk2/evidence.h>
@@ -35,9 +35,10 @@ Period AskedPeriod(const Options& options) {
   return {ParseTime(at, false), ParseTime(at, false)};
 }
 
-// The answer about every member; the first refusal is the answer to all.
-int VerifyMembers(const CertChain& chain, const Question& question, const StoreCheck& stores,
-                  ZvVesk2::Evidence& proved) {
+// The answer about every member; the first refusal is the answer to all. None where no entry could
+// be loaded.
+std::optional<int> VerifyMembers(const CertChain& chain, const Question& question,
+                                 const StoreCheck& stores, ZvVesk2::Evidence& proved) {
   const Request& request = *question.request;
   int first = 0;
   for (size_t i = 0; i < request.members.size(); ++i) {
@@ -47,7 +48,7 @@ int VerifyMembers(const CertChain& chain, const Question& question, const StoreC
                                             question.period.notAfter.get(), proved);
     if (code == VESK2_ERR_MEM_ALLOC || code == VESK2_ERR_READ_FILE)
       Check(code, Escape(question.file));
-    if (proved.GetEntries() == nullptr) ThrowNoStore(VESK2_ERR_ACL_ENTRY_NOT_FOUND);
+    if (proved.GetEntries() == nullptr) return std::nullopt;
     if (code < 0) {
       ExplainTrouble(question, code);
       Check(code, Escape(question.file));
@@ -79,10 +80,11 @@ ExitCode Run(const Options& options) {
   Result()["tag"] = tag;
   ZvVesk2::Evidence proved(nullptr);
   question.proved = &proved;
-  const int code = VerifyMembers(chain, question, options.stores, proved);
-  if (code != 0) {
-    const ExitCode verdict = No(code, CodeWords(code));
-    ExplainRefusal(question, code);
+  const std::optional<int> code = VerifyMembers(chain, question, options.stores, proved);
+  if (!code) return RefuseWithoutStore(question, VESK2_ERR_ACL_ENTRY_NOT_FOUND);
+  if (*code != 0) {
+    const ExitCode verdict = No(*code, CodeWords(*code));
+    ExplainRefusal(question, *code);
     return verdict;
   }
   const ExitCode verdict = Yes(subject + " is granted " + tag);

@@ -2,12 +2,12 @@
 // manifest_authority.cpp: judging who signed a manifest.
 #include "tools/vesk2/commands/manifest_authority.h"
 
+#include "tools/vesk2/commands/no_store.h"
 #include "tools/vesk2/confine/confine.h"
 #include "tools/vesk2/explain/explain.h"
 #include "tools/vesk2/files/files.h"
 #include "tools/vesk2/objects/manifest_file.h"
 #include "tools/vesk2/objects/shapes.h"
-#include "tools/vesk2/stores/acl_store.h"
 #include "tools/vesk2/verify/keep_lists.h"
 
 namespace vesk2_command {
@@ -24,6 +24,11 @@ Period AskedPeriod(const AuthorityOptions& options) {
 // Whether nobody said what moment the answer is about.
 bool IsAboutToday(const AuthorityOptions& options) {
   return options.at.empty() && options.period.notBefore.empty() && options.period.notAfter.empty();
+}
+
+// Of a verification that did not come to the tree: no entry could be loaded.
+bool IsAboutStore(int code) {
+  return code == VESK2_ERR_FILE_NOT_FOUND || code == VESK2_ERR_FIND_DIR;
 }
 
 }  // namespace
@@ -96,6 +101,7 @@ std::optional<ExitCode> ManifestAuthority::Judge(const ZvVesk2::Manifest& manife
   if (proved_.CountCerts() > 0) {
     Result()["signer"] = Fingerprint(*proved_.GetCert(0)->GetIssuer());
   }
+  if (IsAboutStore(code)) return RefuseWithoutStore(question_, code);
   if (code != 0 && !IsRefusal(code)) ThrowTrouble(manifest, code);
   broken_ = CheckStores(question_, options_.stores);
   if (IsAboutToday(options_)) today_.emplace(proved_);
@@ -106,7 +112,6 @@ std::optional<ExitCode> ManifestAuthority::Judge(const ZvVesk2::Manifest& manife
 
 void ManifestAuthority::ThrowTrouble(const ZvVesk2::Manifest& manifest, int code) const {
   ExplainTrouble(question_, code);
-  if (code == VESK2_ERR_FILE_NOT_FOUND || code == VESK2_ERR_FIND_DIR) ThrowNoStore(code);
   ThrowUnreadable(options_.manifest, manifest, code);
 }
 

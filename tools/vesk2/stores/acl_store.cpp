@@ -13,6 +13,20 @@ namespace vesk2_command {
 
 using ZvVesk2::AclEntry;
 
+namespace {
+
+bool HoldsNoEntry(const std::string& directory, bool mayBeAbsent) {
+  std::error_code error;
+  std::filesystem::directory_iterator file(directory, error);
+  if (error) return mayBeAbsent && error == std::errc::no_such_file_or_directory;
+  for (; !error && file != std::filesystem::directory_iterator(); file.increment(error)) {
+    if (file->path().string().ends_with(".acl")) return false;
+  }
+  return !error;
+}
+
+}  // namespace
+
 Ref<SExpression> LoadAcls() {
   Ref<SExpression> acls;
   const int code = AclEntry::Import(acls.Out(), nullptr, nullptr);
@@ -36,6 +50,11 @@ std::vector<std::string> ExplainStore() {
   }
   if (!any) reasons.push_back(Escape(AclDirectory()) + ": holds no entry (*.acl)");
   return reasons;
+}
+
+bool HasNoStore(const std::string& extraDirectory) {
+  return HoldsNoEntry(AclDirectory(), true) &&
+         (extraDirectory.empty() || HoldsNoEntry(extraDirectory, false));
 }
 
 void ThrowNoStore(int code) {

@@ -16,7 +16,12 @@ Ref<SExpression> LoadAcls();
 
 // Why the ACL store yields no entry.
 std::vector<std::string> ExplainStore();
-// Notes that, and throws the Trouble for a store without which nothing can be answered.
+// Whether there is no store at all: nothing at its place, or no entry in it; nor any in the
+// directory that is trusted beside it, if one was named. What is there and cannot be read is no
+// absence.
+bool HasNoStore(const std::string& extraDirectory);
+// Notes why there is no entry, and throws the Trouble for a store without which nothing can be
+// answered.
 [[noreturn]] void ThrowNoStore(int code);
 
 }  // namespace vesk2_command
