@@ -1,8 +1,8 @@
 #!/usr/bin/python3
 # SPDX-License-Identifier: Apache-2.0
 """check-reasons.py ROOT: that docs/json.md lists every reason: the library's codes of which the
-command's sources speak, with their numbers, and the words that these give to Trouble and No. Prints
-those that are missing."""
+command's sources speak, with their numbers, and the words that these give to Trouble and No; and
+every finding of the audit. Prints those that are missing."""
 import pathlib
 import re
 import sys
@@ -19,5 +19,8 @@ for source in [*sorted((root / "tools/vesk2").rglob("*.cpp")), root / "src/frame
         if f"| `{word}` | {numbers[name]} |" not in page:
             missing.append(f"{word} {numbers[name]} ({source.name})")
     words = re.findall(r'(?:Trouble\([^;]*?,\s*|\bNo\(\s*)"([a-z0-9-]+)"[,)]', text)
+    missing += [f"{word} ({source.name})" for word in words if f"| `{word}` |" not in page]
+for source in sorted((root / "tools/vesk2/audit").glob("*.cpp")):
+    words = re.findall(r'\bAdd\("([a-z0-9-]+)"', source.read_text())
     missing += [f"{word} ({source.name})" for word in words if f"| `{word}` |" not in page]
 sys.exit("\n".join(missing) or 0)

@@ -41,6 +41,7 @@ mkdir certs && cp signer.cert certs
 tries cert verify certs/signer.cert --tag '(install (app calc))'
 tries show certs/signer.cert
 tries manifest show signed/tree.manifest
+tries store check
 # What is installed is written beside nothing else, and what it replaces is removed.
 mkdir place packed && tar cf packed/tree.tar -C tree .
 tries manifest install packed/tree.tar signed/tree.manifest place/app --tag '(install (app calc))'

@@ -71,6 +71,7 @@ Action DefineFloorReset(OptionList& list);
 Action DefineTagCheck(OptionList& list);
 Action DefineShow(OptionList& list);
 Action DefineStoreShow(OptionList& list);
+Action DefineStoreCheck(OptionList& list);
 Action DefineVersion(OptionList& list);
 Action DefineCompletion(OptionList& list);
 Action DefineManual(OptionList& list);

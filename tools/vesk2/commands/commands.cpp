@@ -158,6 +158,8 @@ constexpr Command kCommands[] = {
      "vesk2 show signer.cert\nvesk2 show --json app.manifest\nvesk2 show --advanced -", DefineShow},
     {"store", "show", "Show where the stores are and what they hold", "vesk2 store show",
      DefineStoreShow},
+    {"store", "check", "Say what is wrong with the stores, or will be",
+     "vesk2 store check\nvesk2 store check --within 12w --json", DefineStoreCheck},
     {"version", "", "Show the version of the command and the library", "vesk2 version",
      DefineVersion},
     {"completion", "", "Write a script that completes commands in a shell",

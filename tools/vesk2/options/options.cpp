@@ -19,6 +19,7 @@ constexpr struct {
 } kValues[] = {
     {"COMMAND", Access::kNone, " sign-with "},
     {"DEST", Access::kWrites, " dest "},
+    {"DURATION", Access::kNone, " within "},
     {"DIR", Access::kReads, " acl-dir global home tree "},
     {"FILE", Access::kReads,
      " cert chain crl ignore-from items-of key passphrase-file request revoke-key subject "},
