@@ -88,6 +88,8 @@ constexpr Command kCommands[] = {
     {"key", "export", "Write a public key as other programs read it",
      "vesk2 key export vendor.pub --format x509\nvesk2 key export vendor.pem --format ssh -o v.ssh",
      DefineKeyExport},
+    {"key", "name", "Give a key a name of your own, which answers show beside its fingerprint",
+     "vesk2 key name vendor.pub 'The vendor'\nvesk2 key name", DefineKeyName},
     {"acl", "grant", "Write an entry into the ACL store: a root of trust",
      "vesk2 acl grant --subject vendor.pub --tag '(install)' --propagate\n"
      "vesk2 acl grant --threshold 2 --subject alice.pub --subject bob.pub --subject carol.pub "
@@ -120,6 +122,8 @@ constexpr Command kCommands[] = {
      "vesk2 cert verify signer.cert --tag '(install (app calc))'", DefineCertVerify},
     {"cert", "find", "Find stored chains for a tag", "vesk2 cert find --tag '(install (app calc))'",
      DefineCertFind},
+    {"cert", "install", "Keep a chain in the user's store, where it is found by its tag",
+     "vesk2 cert install signer.cert", DefineCertInstall},
     {"crl", "issue", "Sign a list of what is revoked",
      "vesk2 crl issue --key vendor.pem --tag 'install (revoke all)' --revoke-key signer.pub "
      "--not-after 2027 -o vendor.crl\n"

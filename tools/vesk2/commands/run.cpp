@@ -11,6 +11,8 @@
 #include "tools/vesk2/confine/confine.h"
 #include "tools/vesk2/files/files.h"
 #include "tools/vesk2/install/source.h"
+#include "tools/vesk2/say/names.h"
+#include "tools/vesk2/stores/key_names.h"
 
 #include <vesk2.h>
 
@@ -82,6 +84,16 @@ void GiveUpTheRest(const CommandLine& line) {
   Confine(reach);
 }
 
+// An answer does not depend on names: without them it is given all the same.
+void LoadNames() {
+  UseNames({});
+  try {
+    UseNames(ReadNames());
+  } catch (const Trouble& trouble) {
+    Note(std::string("note: ") + trouble.what() + "; keys are told without their names");
+  }
+}
+
 bool TerminalTakesColor() {
   const char* noColor = std::getenv("NO_COLOR");
   if (noColor != nullptr && *noColor != '\0') return false;
@@ -116,6 +128,7 @@ ExitCode Run(int argc, const char* const* argv) {
   UseStores(line->common.stores);
   if (line->command == "manifest install") LoadArchiveLibrary();
   if (OnlyLooks(line->command)) GiveUpTheRest(*line);
+  LoadNames();
   return FinishReport(line->action());
 }
 

@@ -13,6 +13,7 @@
 #include "tools/vesk2/files/stores.h"
 #include "tools/vesk2/objects/shapes.h"
 #include "tools/vesk2/objects/texts.h"
+#include "tools/vesk2/say/names.h"
 #include "tools/vesk2/say/report.h"
 
 #include <vesk2/explanation.h>
@@ -25,12 +26,13 @@ using ZvVesk2::AclEntry;
 using ZvVesk2::Cert;
 using ZvVesk2::Explanation;
 
-// Enough of a fingerprint to tell keys apart by eye.
+// Enough of a fingerprint to tell keys apart by eye, with the key's name: what is cut is not told
+// by it later.
 std::string Short(const std::string& fingerprints) {
   constexpr size_t kDigits = 16;
   std::string text;
   size_t digits = 0;
-  for (const char c : fingerprints) {
+  for (const char c : WithNames(fingerprints)) {
     const bool hex = std::isxdigit(static_cast<unsigned char>(c)) != 0;
     digits = hex ? digits + 1 : 0;
     if (digits <= kDigits) text += c;
@@ -104,6 +106,8 @@ Json AskedRevocation(const Evidence& evidence, size_t index) {
   return json;
 }
 
+}  // namespace
+
 // ---- Facts ----
 
 Json ToldCert(const Evidence& evidence, size_t index) {
@@ -114,6 +118,8 @@ Json ToldCert(const Evidence& evidence, size_t index) {
   json["revocation"] = AskedRevocation(evidence, index);
   return json;
 }
+
+namespace {
 
 // "SUBJECT (COMMENT) may TAG, PERIOD, and pass it on".
 template <typename Grant>

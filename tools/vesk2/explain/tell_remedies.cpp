@@ -24,7 +24,7 @@ void TellRemedies(const std::vector<Remedy>& remedies) {
     if (!remedy.commands.empty()) lead = "or: ";
     Json commands = Json::array();
     for (const auto& words : remedy.commands) {
-      Note("  " + ShellLine(words));
+      NoteCommand("  " + ShellLine(words));
       commands.push_back(JsonWords(words));
     }
     list.push_back({{"kind", remedy.kind},

@@ -26,7 +26,7 @@ constexpr struct {
     {"FILE", Access::kWrites, " floor output report "},
     {"FILE[:N]", Access::kReads, " issuer-of revoke-cert subject-of "},
     {"N", Access::kNone, " bits jobs passphrase-fd threshold "},
-    {"NAME", Access::kNone, " keep-old name names "},
+    {"NAME", Access::kNone, " keep-old name names remove "},
     {"PATH", Access::kReads, " ignore "},
     {"PATH", Access::kNone, " below "},
     {"PATTERN", Access::kNone, " ignore-pattern "},

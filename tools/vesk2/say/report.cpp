@@ -9,6 +9,7 @@
 #include <vector>
 
 #include "tools/vesk2/say/line.h"
+#include "tools/vesk2/say/names.h"
 
 #include <vesk2/context.h>
 #include <vesk2/wording.h>
@@ -82,10 +83,12 @@ const Style& GetStyle() { return report.style; }
 void Say(const std::string& line) {
   if (report.style.json) return;
   EraseLine();
-  std::printf("%s\n", line.c_str());
+  std::printf("%s\n", WithNames(line).c_str());
 }
 
-void Note(const std::string& line) {
+void Note(const std::string& line) { NoteCommand(WithNames(line)); }
+
+void NoteCommand(const std::string& line) {
   report.notes.push_back(line);
   if (!report.style.quiet && !report.style.json && report.unshown == 0) WriteError(line);
 }
@@ -104,7 +107,7 @@ Json& Result() { return report.result; }
 Json OrNull(const std::string& text) { return text.empty() ? Json() : Json(text); }
 
 ExitCode Yes(const std::string& text) {
-  report.message = text;
+  report.message = WithNames(text);
   Say(Colored("yes", kGreen) + ": " + text);
   return kYes;
 }
@@ -112,14 +115,14 @@ ExitCode Yes(const std::string& text) {
 ExitCode No(int code, const std::string& text) {
   report.reason = ReasonWord(code);
   report.code = code;
-  report.message = text;
+  report.message = WithNames(text);
   Say(Colored("no", kRed) + ": " + (text.empty() ? "" : text + " ") + "(" + CodeName(code) + ")");
   return kNo;
 }
 
 ExitCode No(const std::string& reason, const std::string& text) {
   report.reason = reason;
-  report.message = text;
+  report.message = WithNames(text);
   Say(Colored("no", kRed) + ": " + text);
   return kNo;
 }
@@ -139,14 +142,15 @@ Json MakeAnswer(ExitCode code) {
   answer["file"] = OrNull(report.file);
   answer["byte"] = report.byte ? Json(*report.byte) : Json();
   answer["notes"] = report.notes;
-  answer["result"] = report.result.is_null() ? Json::object() : report.result;
+  Json& result = answer["result"] = report.result.is_null() ? Json::object() : report.result;
+  AddNames(result);
   return answer;
 }
 
 void RecordTrouble(const Trouble& trouble) {
   report.reason = trouble.reason;
   report.code = trouble.code;
-  report.message = trouble.what();
+  report.message = WithNames(trouble.what());
   report.file = trouble.file;
   report.byte = trouble.byte;
 }
@@ -159,8 +163,8 @@ ExitCode FinishReport(ExitCode code) {
 }
 
 ExitCode FinishReport(const Trouble& trouble) {
-  WriteError(std::string("vesk2: ") + trouble.what());
   RecordTrouble(trouble);
+  WriteError("vesk2: " + report.message);
   return FinishReport(kTrouble);
 }
 

@@ -1,9 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 // report.h: what the command says.
 //
-// For people, the verdict goes to standard output and everything else to standard error, and no
-// byte of a file name or of a signed object reaches the screen unescaped. With --json one object
-// says the same: the schema is docs/answer.schema.json, and escaped texts stay escaped in it.
+// A key that has a pet name is told with it: names.h. For people, the verdict goes to standard
+// output and everything else to standard error, and no byte of a file name or of a signed object
+// reaches the screen unescaped. With --json one object says the same: the schema is
+// docs/answer.schema.json, and escaped texts stay escaped in it.
 #ifndef VESK2_TOOLS_REPORT_H
 #define VESK2_TOOLS_REPORT_H
 
@@ -64,6 +65,8 @@ const Style& GetStyle();
 void Say(const std::string& line);
 // Note writes a line to standard error unless --quiet; with --json it goes into "notes" instead.
 void Note(const std::string& line);
+// NoteCommand is a note of a command line, to be pasted as it is: no name of a key goes into it.
+void NoteCommand(const std::string& line);
 // Detail is a note that only --verbose asks for.
 void Detail(const std::string& line);
 // While one lives, notes are kept for machines and not shown: nobody asked for them.

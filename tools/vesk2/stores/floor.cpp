@@ -2,8 +2,6 @@
 // floor.cpp: floor files.
 #include "tools/vesk2/stores/floor.h"
 
-#include <fcntl.h>
-#include <sys/file.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -100,16 +98,7 @@ FloorLock::FloorLock(const std::string& path) {
   if (!home.empty() && parent == std::filesystem::path(home + "/floor")) {
     std::filesystem::create_directories(parent, error);  // what fails is told by the next step
   }
-  const std::string name = path + ".lock";
-  constexpr int kFlags = O_RDWR | O_CREAT | O_CLOEXEC | O_NOFOLLOW | O_NONBLOCK | O_NOCTTY;
-  file_.Take(open(name.c_str(), kFlags, 0600));
-  if (file_.get() < 0) throw FileTrouble(name, std::strerror(errno), "io");
-  constexpr unsigned kTries = 10;  // a second
-  for (unsigned tries = 0; flock(file_.get(), LOCK_EX | LOCK_NB) != 0; ++tries) {
-    if (errno != EWOULDBLOCK && errno != EINTR) throw FileTrouble(name, std::strerror(errno), "io");
-    if (tries == kLockWait * kTries) throw FileTrouble(name, "held by another process", "io");
-    usleep(1'000'000 / kTries);
-  }
+  lock_.emplace(path);
 }
 
 void WriteFloor(const std::string& path, SExpression& tag, const TimeStamp& signedAt) {

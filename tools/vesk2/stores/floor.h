@@ -14,9 +14,9 @@
 #include <optional>
 #include <string>
 
-#include "tools/vesk2/files/descriptor.h"
 #include "tools/vesk2/objects/objects.h"
 #include "tools/vesk2/objects/times.h"
+#include "tools/vesk2/stores/file_lock.h"
 
 namespace vesk2_command {
 
@@ -36,14 +36,13 @@ std::string FloorPath(SExpression& tag);
 std::optional<Floor> ReadFloor(const std::string& path, SExpression* tag);
 
 // While it lives, nobody else changes the floor at a path. It makes the directory of those that are
-// kept by tag. Trouble when somebody else keeps the lock for longer than kLockWait seconds.
+// kept by tag. Trouble as of FileLock.
 class FloorLock {
  public:
-  static constexpr unsigned kLockWait = 60;
   explicit FloorLock(const std::string& path);
 
  private:
-  Descriptor file_;
+  std::optional<FileLock> lock_;
 };
 // WriteFloor sets a floor, of a path that is locked: never past the present.
 void WriteFloor(const std::string& path, SExpression& tag, const TimeStamp& signedAt);

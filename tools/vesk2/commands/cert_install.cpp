@@ -1,0 +1,77 @@
+// SPDX-License-Identifier: Apache-2.0
+// cert_install.cpp: vesk2 cert install.
+#include <filesystem>
+#include <set>
+
+#include "tools/vesk2/audit/chain_state.h"
+#include "tools/vesk2/commands/command.h"
+#include "tools/vesk2/commands/describe.h"
+#include "tools/vesk2/stores/acl_store.h"
+#include "tools/vesk2/stores/cert_store.h"
+
+namespace vesk2_command {
+namespace {
+
+struct Options {
+  std::vector<std::string> files;
+  std::string name;
+  WriteFlags flags;
+};
+
+std::string ChainName(const Options& options, const std::string& path) {
+  if (!options.name.empty()) return options.name;
+  if (path == kStandard) throw Trouble("a chain from standard input needs a --name", "usage");
+  return std::filesystem::path(path).stem().string();
+}
+
+// What is refused now is of no use in the store; cert verify explains it.
+ExitCode Refuse(const std::string& path, const ChainState& state) {
+  if (state.proved().GetEntries() == nullptr) ThrowNoStore(VESK2_ERR_ACL_ENTRY_NOT_FOUND);
+  if (state.code() < 0) Check(state.code(), Escape(path));
+  for (const std::string& text : state.Revocations()) Note(Escape(path) + ": " + text);
+  return No(state.code(), Escape(path) + ": " + CodeWords(state.code()));
+}
+
+ExitCode Run(const Options& options) {
+  if (!options.name.empty() && options.files.size() > 1) {
+    throw Trouble("--name is for one chain", "usage");
+  }
+  // All are verified, and their names free, before the first is written.
+  std::vector<CertChain> chains;
+  std::set<std::string> names;
+  Result()["chains"] = Json::array();
+  for (const std::string& path : options.files) {
+    chains.push_back(ReadCertChain(path));
+    const ChainState state(chains.back(), path);
+    if (state.code() != 0) return Refuse(path, state);
+    const std::string name = ChainName(options, path);
+    if (!names.insert(ChainPath(name)).second) {
+      throw Trouble("two chains " + Escape(name), "usage");
+    }
+    if (!IsStored(*chains.back(), name)) RefuseExisting(ChainPath(name), options.flags.force);
+  }
+  for (size_t i = 0; i < chains.size(); ++i) {
+    const std::string name = ChainName(options, options.files[i]);
+    StoreChain(*chains[i], name, options.flags);
+    Json said = DescribeChain(ChainLinks(chains[i], options.files[i])).members();
+    said["file"] = Escape(ChainPath(name));
+    Result()["chains"].push_back(std::move(said));
+  }
+  return kYes;
+}
+
+}  // namespace
+
+Action DefineCertInstall(OptionList& list) {
+  auto options = std::make_shared<Options>();
+  list.Add("files", options->files, "Certificate files: chains").Required();
+  list.Add("--name", options->name,
+           "Name in the store, where there is one chain [the file's name]");
+  AddWriteFlags(list, options->flags);
+  list.Footer(
+      "A chain is kept when it grants now what its first certificate is for; cert find looks it up "
+      "by that.\nExit status 1 when one is refused: then none is kept.");
+  return [options] { return Run(*options); };
+}
+
+}  // namespace vesk2_command
