@@ -22,8 +22,8 @@ void CheckCert(const std::string& path, const ChainState& state, size_t index, b
   const std::string revocation = judged ? state.Revocation(index) : "";
   if (revocation.empty()) return;
   const bool unknown = proved.GetRevocationStatus(index) == Cert::Undetermined;
-  Finding& finding = unknown ? findings.Add("no-list", path, revocation)
-                             : findings.Add("revoked", path, revocation);
+  StoreFinding& finding = unknown ? findings.Add("no-list", path, revocation)
+                                  : findings.Add("revoked", path, revocation);
   finding.certificate = index + 1;
   finding.when = Ref<TimeStamp>::Share(proved.GetRevokedSince(index));
 }

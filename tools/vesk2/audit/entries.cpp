@@ -60,7 +60,7 @@ class EntryKeys {
       if (evidence_.GetRevocationStatus(i) != Cert::KeyRevoked) continue;
       Subject& key = *evidence_.GetCert(i)->GetSubject();
       const CrlSequence* list = evidence_.GetRevocationList(i);
-      Finding& finding =
+      StoreFinding& finding =
           findings.Add("revoked", paths_[i],
                        "trusts " + SubjectText(key) + ", which is revoked" +
                            (list != nullptr ? " by " + TagText(list->GetCert()->GetTag()) : "") +

@@ -11,8 +11,9 @@ namespace vesk2_command {
 Findings::Findings(Ref<TimeStamp> now, Ref<TimeStamp> soon)
     : now_(std::move(now)), soon_(std::move(soon)) {}
 
-Finding& Findings::Add(const std::string& word, const std::string& path, const std::string& text) {
-  return found_.emplace_back(Finding{word, path, text});
+StoreFinding& Findings::Add(const std::string& word, const std::string& path,
+                            const std::string& text) {
+  return found_.emplace_back(StoreFinding{word, path, text});
 }
 
 bool Findings::AddEnd(const std::string& path, const std::string& what, const TimeStamp* end,
@@ -20,8 +21,8 @@ bool Findings::AddEnd(const std::string& path, const std::string& what, const Ti
   if (end == nullptr || !end->IsBefore(soon_.get())) return false;
   const bool ended = end->IsBefore(now_.get());
   const std::string stamp = StampText(*end);
-  Finding& finding = ended ? Add("ended", path, what + " ended at " + stamp)
-                           : Add("ending", path, what + " ends at " + stamp);
+  StoreFinding& finding = ended ? Add("ended", path, what + " ended at " + stamp)
+                                : Add("ending", path, what + " ends at " + stamp);
   finding.certificate = certificate;
   finding.when = Ref<TimeStamp>::Share(const_cast<TimeStamp*>(end));
   return ended;
@@ -54,9 +55,9 @@ void Findings::ReadDirectory(const std::function<void()>& read) {
 }
 
 void Findings::Tell() {
-  std::ranges::stable_sort(found_, {}, &Finding::path);
+  std::ranges::stable_sort(found_, {}, &StoreFinding::path);
   Json& list = Result()["findings"] = Json::array();
-  for (const Finding& each : found_) {
+  for (const StoreFinding& each : found_) {
     Say(each.word + "  " + Escape(each.path) + ": " + each.text);
     list.push_back({{"finding", each.word},
                     {"file", Escape(each.path)},

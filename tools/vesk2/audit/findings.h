@@ -16,7 +16,7 @@
 
 namespace vesk2_command {
 
-struct Finding {
+struct StoreFinding {
   std::string word;
   std::string path;
   std::string text;          // escaped
@@ -30,7 +30,7 @@ class Findings {
   Findings(Ref<TimeStamp> now, Ref<TimeStamp> soon);
 
   // Adds a finding and returns it, for what else is known of it.
-  Finding& Add(const std::string& word, const std::string& path, const std::string& text);
+  StoreFinding& Add(const std::string& word, const std::string& path, const std::string& text);
   // The period of what `what` names has passed, or will soon. Whether it has is told.
   bool AddEnd(const std::string& path, const std::string& what, const TimeStamp* end,
               size_t certificate = 0);
@@ -51,7 +51,7 @@ class Findings {
  private:
   Ref<TimeStamp> now_;
   Ref<TimeStamp> soon_;
-  std::vector<Finding> found_;
+  std::vector<StoreFinding> found_;
   std::optional<Trouble> trouble_;
 };
 
