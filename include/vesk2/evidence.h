@@ -31,6 +31,7 @@
 namespace ZvVesk2 {
 
 class CrlSequence;
+class Hash;
 
 // Evidence is what an answer about authority rests on: certificates with their signatures'
 // verdicts, entries, lists, and the moments that were asked about. It may lie on the stack. What is
@@ -126,6 +127,9 @@ class VESK2_API Evidence {
   // Takes it that there is a current list of this source, a tag as GetRevocationSource gives it,
   // which revokes no more than the others. VESK2_ERR_PARAM_NULL.
   [[nodiscard]] int AssumeList(SExpression* source);
+  // Takes it that a list which counts names this digest, whenever it is asked: of a key, or of a
+  // certificate that names a source. VESK2_ERR_PARAM_NULL.
+  [[nodiscard]] int AssumeRevoked(Hash* digest);
   // Whom the question is about; null for the subject of the first certificate.
   void SetSubject(Subject* subject);
   // The time of signing of a manifest. It decides when no period is given.
@@ -183,7 +187,8 @@ class VESK2_API Evidence {
   struct Link;
   // Makes room for that many certificates.
   [[nodiscard]] VESK2_LOCAL int Reserve(size_t wanted);
-  // Whether AssumeList was told of the source.
+  // Adds to what is assumed; whether AssumeList was told of the source.
+  [[nodiscard]] VESK2_LOCAL int Assume(DExpression* item);
   [[nodiscard]] VESK2_LOCAL int Assumed(bool& assumed, SExpression* source) const;
   // What is refused before a store is asked: too few certificates, no digest, a signature that does
   // not hold.

@@ -139,15 +139,28 @@ void Evidence::SetLists(SExpression* stored, SExpression* carried) {
   carriedLists = Ref<SExpression>::Share(carried);
 }
 
-// A new list each time, as a copy may hold the old one.
 int Evidence::AssumeList(SExpression* source) {
   VESK2_REQUIRE(source != nullptr, VESK2_ERR_PARAM_NULL);
+  return Assume(source);
+}
+
+// As an item without a date, which is how a list names what it revokes: ItemIndex reads it.
+int Evidence::AssumeRevoked(Hash* digest) {
+  VESK2_REQUIRE(digest != nullptr, VESK2_ERR_PARAM_NULL);
+  Ref<SExpression> item;
+  VESK2_TRY(SExpression::Create(item.Out(), "item", context));
+  VESK2_TRY(AppendShared(item.get(), digest));
+  return Assume(item.get());
+}
+
+// A new list each time, as a copy may hold the old one.
+int Evidence::Assume(DExpression* item) {
   Ref<SExpression> more(TryNew<SExpression>(context));
   VESK2_REQUIRE(more, VESK2_ERR_MEM_ALLOC);
   if (assumed) {  // which a copy may share
     for (auto it = assumed->Begin(); it; it.Next()) VESK2_TRY(AppendShared(more.get(), it.Value()));
   }
-  VESK2_TRY(AppendShared(more.get(), source));
+  VESK2_TRY(AppendShared(more.get(), item));
   assumed = std::move(more);
   return 0;
 }

@@ -39,6 +39,20 @@ constexpr size_t kIssuersPlace = 1;
   return 0;
 }
 
+// As a list would: the key first, and a certificate only if it names a source.
+[[nodiscard]] int MarkSupposed(bool& revoked, int32_t& status, Cert& cert,
+                               const ItemIndex& supposed) {
+  const ItemIndex::Item* item = nullptr;
+  VESK2_TRY(supposed.Find(item, cert.GetSubject()));
+  revoked = item != nullptr;
+  if (revoked) status = Cert::KeyRevoked;
+  if (revoked || cert.GetRevocationElement() == nullptr) return 0;
+  VESK2_TRY(supposed.Find(item, &cert));
+  revoked = item != nullptr;
+  if (revoked && status != Cert::KeyRevoked) status = Cert::RevokedByCrl;
+  return 0;
+}
+
 }  // namespace
 
 // A subject that was set stands, whatever certificates come and go: the question is about somebody.
@@ -58,6 +72,12 @@ int Evidence::MarkRevoked() {
   VESK2_TRY(AppendUnproved(lists.get(), storedLists.get()));
   VESK2_TRY(AppendUnproved(lists.get(), carriedLists.get()));
   RevocationLists revocations(entries.get(), lists.get());
+  ItemIndex supposed;  // what AssumeRevoked was told of
+  if (assumed) {
+    VESK2_TRY(supposed.Reserve(assumed->Count()));
+    supposed.Add(assumed.get(), nullptr);
+    supposed.Sort();
+  }
   for (size_t i = 0; i < count; ++i) {
     Link& link = links[i];
     RevocationLists::Decision decision;
@@ -69,6 +89,12 @@ int Evidence::MarkRevoked() {
     // Told by the explanation, and by the moment that it ends, since then the answer does.
     link.list = Ref<CrlSequence>::Share(decision.list);
     link.since = Ref<TimeStamp>::Share(decision.since);
+    bool revoked = false;
+    VESK2_TRY(MarkSupposed(revoked, link.status, *link.cert, supposed));
+    if (revoked) {  // by no list that there is
+      link.list.Reset();
+      link.since.Reset();
+    }
     // An assumed list only ever fills a gap: what is revoked stays revoked.
     if (link.status != Cert::Undetermined) continue;
     bool listed = false;

@@ -8,6 +8,7 @@
 
 #include <vesk2/context.h>
 #include <vesk2/evidence.h>
+#include <vesk2/hash.h>
 #include <vesk2/manifest.h>
 
 #include "src/platform/text.h"
@@ -351,6 +352,19 @@ TEST_F(ManifestTest, EvidenceReadsOnAndJudgesChanges) {
   ASSERT_EQ(late->Set(kOutside), 0);
   other.SetPeriod(late.get(), late.get());
   EXPECT_EQ(other.Judge(manifest.GetTag()), VESK2_ERR_NOT_AUTHORIZED);
+  // As if a list named the content's certificate, one that names no source, or the signer's key.
+  const std::pair<std::string, int> revoked[] = {
+      {Canonical(*evidence.GetCert(0)), VESK2_ERR_CERT_REVOKED},
+      {Canonical(*evidence.GetCert(1)), 0},
+      {signer.Public(), VESK2_ERR_SIGNING_CERT_ORDER}};
+  for (const auto& [object, code] : revoked) {
+    mend();
+    const Ref<ZvVesk2::Hash> digest(new ZvVesk2::Hash(nullptr));
+    ASSERT_EQ(digest->Import(Wrap(HashOf(object)).get()), 0);
+    ASSERT_EQ(other.AssumeRevoked(digest.get()), 0);
+    EXPECT_EQ(other.Judge(manifest.GetTag()), code);
+  }
+  EXPECT_EQ(other.AssumeRevoked(nullptr), VESK2_ERR_PARAM_NULL);
   // The original is as it was, and a list that other entries proved is proved again.
   mend();
   Ref<SExpression> entries;
