@@ -173,7 +173,7 @@ bool Fixpoint::Reach(const Grantee& grantee, const Credential& of) {
     for (const Grantee& member : grantee.members) {
       more = Reach(member, of) || more;
       const Facts& member_facts = reached_[&member];
-      for (int key = 0; key < kKeys; ++key) {
+      for (int key = 0; key < world_.keys; ++key) {
         const bool may = member_facts.contains({key, true});
         count[{key, true}] += may;
         count[{key, false}] += may || member_facts.contains({key, false});

@@ -41,6 +41,7 @@ struct World {
   std::vector<TagTree> tags;
   std::vector<Credential> credentials;
   int requester = 0;
+  int keys = kKeys;
 };
 World MakeWorld(Choices& choices);
 

@@ -67,6 +67,8 @@ Action DefineManifestVerify(OptionList& list);
 Action DefineManifestInstall(OptionList& list);
 Action DefineManifestShow(OptionList& list);
 Action DefineManifestCompare(OptionList& list);
+Action DefineWho(OptionList& list);
+Action DefineUntil(OptionList& list);
 Action DefineFloorShow(OptionList& list);
 Action DefineFloorSet(OptionList& list);
 Action DefineFloorReset(OptionList& list);

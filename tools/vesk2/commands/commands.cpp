@@ -53,6 +53,24 @@ constexpr Noun kNouns[] = {
      "last pattern that matches decides, and nothing comes back of a directory that is left out. "
      "Files of patterns have one a line, # begins a comment, and they must not lie in the tree. "
      "[...] is refused."},
+    {"who", "Show who may sign for a tag",
+     "Tells the keys that may sign a manifest for a tag now, each with the way it comes to that: "
+     "the "
+     "ACL entry, then the certificates, and until when. They are those whose manifest manifest "
+     "verify would accept, with these certificates. Of keys that must agree the group is told.\n"
+     "Certificates are taken from the user's store and from the files of --cert: who signs "
+     "elsewhere "
+     "with others that are not at hand is not told.\n"
+     "The options --if-... ask about a machine that differs in something: the answer says so, "
+     "tells "
+     "who may sign no longer or newly, and writes nothing."},
+    {"until", "Show when an answer about authority changes by itself",
+     "An answer changes when something that it rests on ends or begins: an ACL entry, a "
+     "certificate, "
+     "a revocation list, after which nobody knows what is revoked. A key is asked about as who "
+     "does it, a certificate file as cert verify does, a manifest as manifest verify does: by "
+     "its time of signing, with what is revoked. Its tree is not looked at.\n"
+     "What somebody will decide is in no file: lists and entries to come can change it before."},
     {"floor", "Keep releases out that are older than what was accepted",
      "A release that was signed properly, and has faults that a newer one mended, is an attack "
      "when "
@@ -150,6 +168,14 @@ constexpr Command kCommands[] = {
      "vesk2 manifest show app.manifest --files", DefineManifestShow},
     {"manifest", "compare", "Do two manifests list the same?",
      "vesk2 manifest compare old.manifest new.manifest", DefineManifestCompare},
+    {"who", "", "Who may sign for a tag, by which way, and until when?",
+     "vesk2 who '(install (app calc))' --cert signer.cert\n"
+     "vesk2 who '(install)' --if-revoked signer.pub",
+     DefineWho},
+    {"until", "", "When does the answer change by itself, and why?",
+     "vesk2 until app.manifest --tag '(install (app calc))'\n"
+     "vesk2 until signer.pub --cert signer.cert --tag '(install (app calc))'",
+     DefineUntil},
     {"floor", "show", "Show the newest times of signing that were accepted",
      "vesk2 floor show --tag '(install (app calc))'", DefineFloorShow},
     {"floor", "set", "Refuse what was signed before a time",

@@ -104,7 +104,7 @@ std::optional<ExitCode> ManifestAuthority::Judge(const ZvVesk2::Manifest& manife
   if (IsAboutStore(code)) return RefuseWithoutStore(question_, code);
   if (code != 0 && !IsRefusal(code)) ThrowTrouble(manifest, code);
   broken_ = CheckStores(question_, options_.stores);
-  if (IsAboutToday(options_)) today_.emplace(proved_);
+  if (IsAboutToday(options_)) today_.emplace(proved_, *ParseTime("now", false));
   const int refused = JudgeMembers(code);
   if (refused != 0) return Refuse(refused);
   return RefuseTime();
@@ -152,7 +152,7 @@ ExitCode ManifestAuthority::Refuse(int code) {
 }
 
 std::optional<ExitCode> ManifestAuthority::RefuseTime() {
-  if (today_ && IsSignedInFuture(proved_)) {
+  if (today_ && IsSignedInFuture(proved_, *ParseTime("now", false))) {
     Keep(false);
     return No("signed-in-future", "the manifest says it was signed at " +
                                       StampText(*proved_.GetSigningTime()) +

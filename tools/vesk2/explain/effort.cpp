@@ -17,9 +17,12 @@ namespace {
 constexpr uint64_t kLeastWork = 20'000'000;
 constexpr uint64_t kLeastBytes = uint64_t{48} << 20;
 constexpr uint64_t kMultiple = 2;
+// Of a search: so many times that.
+constexpr uint64_t kSearches = 50;
 
 struct Effort {
   bool started = false;
+  uint64_t times = 1;
   uint64_t begin = 0;  // the work done before the answer, and before its explanation
   uint64_t answered = 0;
   uint64_t bytes = 0;
@@ -41,22 +44,33 @@ void StartEffort() {
   effort.answered = ZvVesk2::Verify::WorkDone();
 }
 
+void StartSearch() {
+  StartAnswer();
+  StartEffort();
+  effort.times = kSearches;
+}
+
+void SpendEffort(uint64_t bytes) {
+  effort.bytes += bytes;
+  SpendEffort();
+}
+
 void SpendEffort(const ZvVesk2::Evidence& judged) {
   if (effort.sized != &judged) {
     effort.sized = &judged;
     effort.size = judged.Size();
   }
-  effort.bytes += effort.size;
-  SpendEffort();
+  SpendEffort(effort.size);
 }
 
 void SpendEffort() {
   if (!effort.started) return;
   const uint64_t work = ZvVesk2::Verify::WorkDone() - effort.answered;
-  if (work <= std::max(kLeastWork, kMultiple * (effort.answered - effort.begin)) &&
-      effort.bytes <= std::max(kLeastBytes, kMultiple * effort.size)) {
+  if (work <= effort.times * std::max(kLeastWork, kMultiple * (effort.answered - effort.begin)) &&
+      effort.bytes <= effort.times * std::max(kLeastBytes, kMultiple * effort.size)) {
     return;
   }
+  if (effort.times > 1) throw Trouble("the search takes too long; name fewer certificates");
   throw Trouble("it has cost several times as much as the answer");
 }
 

@@ -24,15 +24,15 @@ constexpr struct {
     {"FILE", Access::kReads,
      " cert chain crl ignore-from items-of key passphrase-file request revoke-key subject "},
     {"FILE", Access::kWrites, " floor output report "},
-    {"FILE[:N]", Access::kReads, " issuer-of revoke-cert subject-of "},
+    {"FILE[:N]", Access::kReads, " if-revoked issuer-of revoke-cert subject-of "},
     {"N", Access::kNone, " bits jobs passphrase-fd threshold "},
-    {"NAME", Access::kNone, " keep-old name names remove "},
+    {"NAME", Access::kNone, " if-without keep-old name names remove "},
     {"PATH", Access::kReads, " ignore "},
     {"PATH", Access::kNone, " below "},
     {"PATTERN", Access::kNone, " ignore-pattern "},
     {"SIZE", Access::kNone, " max-bytes "},
     {"TAG", Access::kNone, " asked grant granted revocation tag "},
-    {"TIME", Access::kNone, " at date not-after not-before time "},
+    {"TIME", Access::kNone, " at date if-at not-after not-before time "},
     {"", Access::kAnywhere, " allow-links "},
 };
 

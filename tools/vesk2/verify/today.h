@@ -14,8 +14,8 @@ namespace vesk2_command {
 
 class Today {
  public:
-  // `proved` is what the verification kept, by the time of signing.
-  explicit Today(const ZvVesk2::Evidence& proved);
+  // `proved` is what the verification kept, by the time of signing; `now` is what the clock shows.
+  Today(const ZvVesk2::Evidence& proved, TimeStamp& now);
 
   // What a verification would answer today about the authority for a tag.
   int Judge(SExpression* tag) const;
@@ -30,8 +30,10 @@ class Today {
   ZvVesk2::Evidence today_;
 };
 
-// Whether a manifest claims to be signed later than clocks may differ.
-bool IsSignedInFuture(const ZvVesk2::Evidence& proved);
+// Clocks of machines that sign and verify differ by less, in seconds.
+inline constexpr long kClockDifference = 300;
+// Whether a manifest claims to be signed later than that.
+bool IsSignedInFuture(const ZvVesk2::Evidence& proved, const TimeStamp& now);
 // "; certificate 2 ended at STAMP" for each certificate that has ended since the signing.
 std::string EndedSince(const ZvVesk2::Evidence& proved);
 

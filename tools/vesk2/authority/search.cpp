@@ -1,0 +1,372 @@
+// SPDX-License-Identifier: Apache-2.0
+// search.cpp: what is put to the library. One entry alone grants nearly always, and what covers all
+// that is asked only ever adds to a grant: so for each entry all such certificates are tried
+// together, and then what is not needed is left out. Certificates and entries for less can stand in
+// the way of others, as a reduction looks at its first result: the way that is found is judged with
+// all entries, and where none is good, all certificates together are tried too.
+#include "tools/vesk2/authority/search.h"
+
+#include <algorithm>
+#include <deque>
+#include <set>
+#include <utility>
+
+#include "tools/vesk2/explain/effort.h"
+#include "tools/vesk2/objects/texts.h"
+#include "tools/vesk2/say/report.h"
+
+namespace vesk2_command {
+namespace {
+
+using ZvVesk2::AclEntry;
+using ZvVesk2::Cert;
+using ZvVesk2::Hash;
+using ZvVesk2::Principal;
+using ZvVesk2::Subject;
+using ZvVesk2::ThresholdSubject;
+
+constexpr const char* kWhat = "looking for who may sign";
+
+std::vector<PublicKey*> MembersOf(ThresholdSubject& several) {
+  Ref<SExpression> members;
+  Check(several.GetSubjects(members.Out()), kWhat);
+  std::vector<PublicKey*> keys;
+  for (auto it = members->Begin(); it; it.Next()) {
+    auto* const key = dynamic_cast<PublicKey*>(it.Value());
+    if (key != nullptr) keys.push_back(key);
+  }
+  return keys;  // borrowed from `several`, which shares them
+}
+
+// How subjects can name a key.
+std::vector<std::string> NamesOf(PublicKey& key) {
+  return {Fingerprint(key), SubjectText(*HashOf(key, ZVCLM_HASH_SHA1, true))};
+}
+
+Ref<Cert> NewCert(Principal& issuer, Subject& subject, bool propagate) {
+  Ref<Cert> cert(new Cert(nullptr));
+  Check(cert->Set(&issuer, &subject, propagate, nullptr, nullptr, nullptr, nullptr, nullptr),
+        kWhat);
+  return cert;
+}
+
+// Some content, which nobody has signed.
+Ref<Hash> Content() { return MakeHash(ZVCLM_HASH_SHA256, std::string(32, '\x5a')); }
+
+void AddTo(ZvVesk2::Evidence& evidence, Cert& cert, ZvVesk2::Signature* signature = nullptr) {
+  Check(evidence.AddCert(&cert, signature, 0), kWhat);
+}
+
+}  // namespace
+
+// ---- Keys ----
+
+Search::Search(const Holdings& holdings, const Request& request, const Supposition& supposition)
+    : holdings_(holdings),
+      request_(request),
+      supposition_(supposition),
+      entries_(supposition.Entries(holdings.entries.get())) {
+  for (auto it = entries_->Begin(); it; it.Next()) {
+    auto* const entry = dynamic_cast<AclEntry*>(it.Value());
+    if (entry == nullptr) continue;  // the keyword
+    AddSubject(entry->GetSubject(), entryList_.size(), entriesFor_);
+    entryList_.push_back(entry);
+  }
+  for (size_t i = 0; i < holdings_.certs.size(); ++i) {
+    const Cert& cert = *holdings_.certs[i].cert;
+    AddSubject(cert.GetSubject(), i, certsFor_);
+    AddKey(cert.GetIssuer());
+    covers_.push_back(Covers(cert.GetTag()));
+  }
+}
+
+void Search::AddKey(DExpression* subject) {
+  auto* const key = dynamic_cast<PublicKey*>(subject);
+  if (key != nullptr) keys_.emplace(Fingerprint(*key), Ref<PublicKey>::Share(key));
+}
+
+void Search::AddSubject(Subject* subject, size_t number, Named& named) {
+  auto* const several = dynamic_cast<ThresholdSubject*>(subject);
+  if (several == nullptr) {
+    AddKey(subject);
+    named[SubjectText(*subject)].push_back(number);
+    return;
+  }
+  Signers group{{}, several->GetK()};
+  for (PublicKey* const member : MembersOf(*several)) {
+    AddKey(member);
+    named[Fingerprint(*member)].push_back(number);
+    group.keys.push_back(Ref<PublicKey>::Share(member));
+  }
+  if (group.IsGroup()) groups_.emplace(SubjectText(*subject), std::move(group));
+}
+
+std::vector<Signers> Search::Candidates() const {
+  std::vector<Signers> candidates;
+  for (const auto& [fingerprint, key] : keys_) {
+    if (Numbers(entriesFor_, *key).empty() && Numbers(certsFor_, *key).empty()) continue;
+    candidates.push_back(OneKey(key));
+  }
+  for (const auto& [text, group] : groups_) {
+    Signers copy{{}, group.k};
+    for (const auto& key : group.keys) copy.keys.push_back(Ref<PublicKey>::Share(key.get()));
+    candidates.push_back(std::move(copy));
+  }
+  return candidates;
+}
+
+Signers OneKey(const Ref<PublicKey>& key) {
+  Signers one;
+  one.keys.push_back(Ref<PublicKey>::Share(key.get()));
+  return one;
+}
+
+Ref<PublicKey> Search::FindKey(const std::string& fingerprint) const {
+  const auto found = keys_.find(fingerprint);
+  return found != keys_.end() ? Ref<PublicKey>::Share(found->second.get()) : Ref<PublicKey>();
+}
+
+bool Search::IsInGroup(PublicKey& key) const {
+  return std::any_of(groups_.begin(), groups_.end(), [&](const auto& each) {
+    const auto& keys = each.second.keys;
+    return std::any_of(keys.begin(), keys.end(),
+                       [&](const auto& member) { return member->IsEqual(&key); });
+  });
+}
+
+std::vector<size_t> Search::Numbers(const Named& named, PublicKey& key) {
+  std::vector<size_t> numbers;
+  for (const std::string& name : NamesOf(key)) {
+    const auto found = named.find(name);
+    if (found == named.end()) continue;
+    numbers.insert(numbers.end(), found->second.begin(), found->second.end());
+  }
+  return numbers;
+}
+
+// ---- What may lead to them ----
+
+// The nearest first.
+std::vector<size_t> Search::Reach(const std::vector<PublicKey*>& keys) const {
+  std::vector<size_t> reached;
+  std::set<std::string> seen;
+  std::set<size_t> taken;
+  std::deque<PublicKey*> next(keys.begin(), keys.end());
+  for (; !next.empty(); next.pop_front()) {
+    if (!seen.insert(Fingerprint(*next.front())).second) continue;
+    for (const size_t number : Numbers(certsFor_, *next.front())) {
+      if (!taken.insert(number).second) continue;
+      reached.push_back(number);
+      auto* const issuer = dynamic_cast<PublicKey*>(CertOf(number).GetIssuer());
+      if (issuer != nullptr) next.push_back(issuer);
+    }
+  }
+  return reached;
+}
+
+// In the order of the store.
+std::vector<AclEntry*> Search::EntriesFor(const std::vector<PublicKey*>& keys,
+                                          const std::vector<size_t>& reached) const {
+  std::set<size_t> numbers;
+  const auto add = [&](PublicKey* key) {
+    if (key == nullptr) return;
+    const std::vector<size_t> named = Numbers(entriesFor_, *key);
+    numbers.insert(named.begin(), named.end());
+  };
+  for (PublicKey* const key : keys) add(key);
+  for (const size_t cert : reached) add(dynamic_cast<PublicKey*>(CertOf(cert).GetIssuer()));
+  std::vector<AclEntry*> entries;
+  for (const size_t number : numbers) entries.push_back(entryList_[number]);
+  return entries;
+}
+
+bool Search::Covers(SExpression* tag) const {
+  if (tag == nullptr) return true;
+  const ByteString* const head = dynamic_cast<ByteString*>(tag->First());
+  if (head == nullptr || !head->IsEqual("tag") || tag->Count() < 2) return true;
+  return std::all_of(request_.members.begin(), request_.members.end(),
+                     [&](const auto& member) { return member.tag->IsSubset(tag); });
+}
+
+// Those that name the signer as a manifest's second certificate must.
+std::vector<size_t> Search::OwnCerts(PublicKey& signer, const std::vector<size_t>& reached) const {
+  std::vector<size_t> own;
+  for (const size_t number : reached) {
+    if (CertOf(number).GetSubject()->IsEqual(&signer)) own.push_back(number);
+  }
+  own.push_back(Way::kSelf);
+  return own;
+}
+
+// ---- Judging ----
+
+void Search::MakeEvidence(const Way& way, TimeStamp* at, ZvVesk2::Evidence& evidence) const {
+  evidence.Clear(ZvVesk2::Evidence::SignedManifest);
+  const Ref<Hash> content = Content();
+  AddTo(evidence, *NewCert(*way.signer, *content, false));
+  const auto add = [&](size_t number) {
+    AddTo(evidence, CertOf(number), holdings_.certs[number].signature.get());
+  };
+  if (way.own == Way::kSelf) AddTo(evidence, *NewCert(*way.signer, *way.signer, true));
+  if (way.own != Way::kSelf) add(way.own);
+  for (const size_t number : way.rest) add(number);
+  for (PublicKey* const key : way.approvers) AddTo(evidence, *NewCert(*key, *content, false));
+  evidence.SetEntries(entries_.get());
+  evidence.SetLists(holdings_.lists.get(), nullptr);
+  evidence.SetSigningTime(at);
+  evidence.SetRevocationTime(at);
+  supposition_.Revoke(evidence);
+}
+
+std::vector<std::string> Search::Places(const Way& way) const {
+  std::vector<std::string> places(1);
+  places.push_back(way.own != Way::kSelf ? holdings_.certs[way.own].place : "");
+  for (const size_t number : way.rest) places.push_back(holdings_.certs[number].place);
+  places.resize(places.size() + way.approvers.size());
+  return places;
+}
+
+int Search::Judge(const Way& way, TimeStamp* at, bool alone) const {
+  ZvVesk2::Evidence evidence(nullptr);
+  MakeEvidence(way, at, evidence);
+  SpendEffort(evidence.Size());
+  Ref<SExpression> granting;
+  if (alone && way.entry != nullptr) granting = ListOf({way.entry}, "acl");
+  evidence.SetGrantingEntries(granting.get());
+  return JudgeMembers(evidence, request_);
+}
+
+bool Search::IsRevoked(PublicKey& key, TimeStamp* at) const {
+  Way self;
+  self.signer = &key;
+  ZvVesk2::Evidence evidence(nullptr);
+  MakeEvidence(self, at, evidence);
+  Check(evidence.MarkRevoked(), kWhat);
+  return evidence.GetRevocationStatus(1) != Cert::NotRevoked;
+}
+
+// ---- Ways ----
+
+// What ends first goes first: of two ways the one that lasts longer is left.
+void Search::Shorten(Way& way, TimeStamp* at, bool alone) const {
+  std::vector<size_t> order = way.rest;
+  std::stable_sort(order.begin(), order.end(), [&](size_t a, size_t b) {
+    const TimeStamp* const end = CertOf(a).GetNotAfter();
+    const TimeStamp* const other = CertOf(b).GetNotAfter();
+    return end != nullptr && (other == nullptr || end->IsBefore(other));
+  });
+  for (const size_t number : order) {
+    Way shorter = way;
+    std::erase(shorter.rest, number);
+    if (Judge(shorter, at, alone) == 0) way = std::move(shorter);
+  }
+}
+
+void Search::FindFor(const std::vector<PublicKey*>& keys, TimeStamp* at, size_t most,
+                     std::vector<Way>& ways) const {
+  const std::vector<size_t> reached = Reach(keys);
+  std::vector<size_t> covering;
+  std::copy_if(reached.begin(), reached.end(), std::back_inserter(covering),
+               [&](size_t number) { return covers_[number]; });
+  std::vector<AclEntry*> entries = EntriesFor(keys, reached);
+  std::erase_if(entries, [&](const AclEntry* each) { return !Covers(each->GetTag()); });
+  std::set<std::pair<AclEntry*, std::set<size_t>>> found;
+  // Adds a way, unless it is none when all entries are there.
+  const auto add = [&](Way& way, bool alone) {
+    if (Judge(way, at, alone) != 0) return;
+    Shorten(way, at, alone);
+    std::set<size_t> certs(way.rest.begin(), way.rest.end());
+    if (way.own != Way::kSelf) certs.insert(way.own);
+    if (alone && Judge(way, at) != 0) return;
+    if (found.emplace(way.entry, std::move(certs)).second) ways.push_back(way);
+  };
+  Way start;
+  start.signer = keys.front();
+  start.approvers.assign(keys.begin() + 1, keys.end());
+  const std::vector<size_t> owns = OwnCerts(*keys.front(), reached);
+  for (const size_t own : owns) {
+    start.own = own;
+    start.rest = covering;
+    std::erase(start.rest, own);
+    for (AclEntry* const entry : entries) {
+      if (ways.size() >= most) return;
+      Way way = start;
+      way.entry = entry;
+      add(way, true);
+    }
+  }
+  for (const auto* certs : {&std::as_const(covering), &reached}) {
+    for (const size_t own : owns) {
+      if (!ways.empty()) return;
+      Way way = start;
+      way.own = own;
+      way.rest = *certs;
+      std::erase(way.rest, own);
+      add(way, false);
+    }
+  }
+}
+
+std::vector<Way> Search::FindWays(const Signers& signers, TimeStamp* at, size_t most) const {
+  std::vector<Way> ways;
+  ForEachChoice(signers, at, [&](const std::vector<PublicKey*>& keys) {
+    FindFor(keys, at, most, ways);
+    return ways.empty();
+  });
+  return ways;
+}
+
+// The key itself; of a group each k that follow each other, without those that are revoked, whom
+// nobody should ask.
+void Search::ForEachChoice(
+    const Signers& signers, TimeStamp* at,
+    const std::function<bool(const std::vector<PublicKey*>&)>& goesOn) const {
+  std::vector<PublicKey*> asked;
+  for (const auto& key : signers.keys) {
+    if (!signers.IsGroup() || !IsRevoked(*key, at)) asked.push_back(key.get());
+  }
+  if (asked.size() < signers.k) return;
+  for (size_t i = 0; i < asked.size(); ++i) {
+    if (!goesOn({asked.begin(), asked.begin() + static_cast<ptrdiff_t>(signers.k)})) return;
+    std::rotate(asked.begin(), asked.begin() + 1, asked.end());
+  }
+}
+
+Signers Search::Agreeing(const Signers& signers, TimeStamp* at) const {
+  Signers agreeing{{}, signers.k};
+  std::set<PublicKey*> good;
+  ForEachChoice(signers, at, [&](const std::vector<PublicKey*>& keys) {
+    std::vector<Way> ways;
+    FindFor(keys, at, 1, ways);
+    if (!ways.empty()) good.insert(keys.begin(), keys.end());
+    return true;
+  });
+  for (const auto& key : signers.keys) {
+    if (good.count(key.get()) != 0) agreeing.keys.push_back(Ref<PublicKey>::Share(key.get()));
+  }
+  return agreeing;
+}
+
+Moments Search::MomentsOf(const Signers& signers) const {
+  std::vector<PublicKey*> keys;
+  for (const auto& key : signers.keys) keys.push_back(key.get());
+  const std::vector<size_t> reached = Reach(keys);
+  Moments moments;
+  for (const size_t number : reached) moments.AddCert(CertOf(number));
+  for (const AclEntry* entry : EntriesFor(keys, reached)) {
+    moments.AddPeriod(entry->GetNotBefore(), entry->GetNotAfter());
+  }
+  moments.AddLists(holdings_.lists.get());
+  return moments;
+}
+
+bool Search::MaySign(const Signers& signers, TimeStamp* at, std::vector<Way>& known) const {
+  for (const Way& way : known) {
+    if (Judge(way, at) == 0) return true;
+  }
+  std::vector<Way> ways = FindWays(signers, at, 1);
+  known.insert(known.end(), ways.begin(), ways.end());
+  return !ways.empty();
+}
+
+}  // namespace vesk2_command
