@@ -5,6 +5,7 @@
 
 #include "tools/vesk2/commands/command.h"
 #include "tools/vesk2/commands/describe.h"
+#include "tools/vesk2/files/files.h"
 #include "tools/vesk2/files/stores.h"
 #include "tools/vesk2/objects/texts.h"
 #include "tools/vesk2/stores/acl_store.h"
@@ -67,13 +68,13 @@ std::string Store(CrlSequence& list, const std::string& path, SExpression* acls,
   if (!reason.empty()) return reason;
   const Change change = Compare(list, acls, force, said);
   if (!change.gone.empty() && !change.isRenewal && !force) {
-    said["lets_go"] = TellLetGo(change.gone, Escape(path) + " would let go:");
+    said["lets_go"] = TellLetGo(change.gone, InputName(path) + " would let go:");
     return "it ends no later than the stored list, which revokes more (--force stores it all the "
            "same)";
   }
   reason = StoreCrl(list, acls, path);
   if (reason.empty() && !change.gone.empty()) {
-    said["lets_go"] = TellLetGo(change.gone, "note: " + Escape(path) + " lets go:");
+    said["lets_go"] = TellLetGo(change.gone, "note: " + InputName(path) + " lets go:");
   }
   return reason;
 }
@@ -86,8 +87,8 @@ ExitCode Offer(const std::string& path, const Sources& sources, bool force, Json
   const std::string reason = Store(*list, path, acls.get(), force, said);
   said["stored"] = reason.empty();
   if (!reason.empty()) said["why"] = reason;
-  Say(reason.empty() ? "stored: " + Escape(path) + ": " + CrlText(*list)
-                     : "not stored: " + Escape(path) + ": " + reason);
+  Say(reason.empty() ? "stored: " + InputName(path) + ": " + CrlText(*list)
+                     : "not stored: " + InputName(path) + ": " + reason);
   return reason.empty() ? kYes : kNo;
 }
 
@@ -96,7 +97,7 @@ ExitCode Run(const Options& options) {
   const Sources sources(LoadAcls().get());
   ExitCode worst = kYes;
   for (const std::string& path : files) {
-    Json said = {{"file", Escape(path)}, {"stored", false}, {"why", Json()}};
+    Json said = {{"file", InputName(path)}, {"stored", false}, {"why", Json()}};
     ExitCode code = kTrouble;
     try {
       code = Offer(path, sources, options.force, said);

@@ -55,7 +55,7 @@ ExitCode Run(const Options& options) {
   const int code = manifest.Compare(bodies[0].get(), bodies[1].get());
   const bool compared = manifest.GetInvalid() != nullptr || manifest.GetMissing() != nullptr ||
                         manifest.GetExtra() != nullptr;
-  if (code != 0 && !compared) Check(code, Escape(options.from) + ", " + Escape(options.to));
+  if (code != 0 && !compared) Check(code, InputName(options.from) + ", " + InputName(options.to));
   return Answer(manifest, code);
 }
 

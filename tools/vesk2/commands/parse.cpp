@@ -102,7 +102,9 @@ class HelpText : public CLI::Formatter {
     for (const Command& command : Commands()) {
       const bool verb = app->get_parent() != nullptr && app->get_name() == command.verb &&
                         app->get_parent()->get_name() == command.noun;
-      const bool lone = *command.verb == '\0' && app->get_name() == command.noun;
+      // "show" is a command, and a verb of others.
+      const bool lone = *command.verb == '\0' && app->get_name() == command.noun &&
+                        app->get_parent() != nullptr && app->get_parent()->get_parent() == nullptr;
       if (verb || lone) text += "\nExamples:\n" + Indented(command.examples);
     }
     return text + "\n";
@@ -198,12 +200,12 @@ std::unique_ptr<CommandLine> ParseCommandLine(int argc, const char* const* argv)
   auto line = std::make_unique<CommandLine>();
   OptionList common;
   AddCommonOptions(common, line->common);
-  const std::vector<std::string> words = ArrangeWords(argc, argv, common);
+  std::vector<std::string> words = ArrangeWords(argc, argv, common);
   const Command* command = FindCommand(words);
   if (command != nullptr) {
     line->command = CommandName(*command);
     line->action = DefineOptions(*command, line->options, line->common);
-    RequireKnownOptions(words, line->options);
+    words = CheckOptions(words, line->options);
   }
   CLI::App app{"Signed manifests and SPKI certificates, checked offline.", "vesk2"};
   try {

@@ -29,12 +29,17 @@ bool WantsJson(int argc, const char* const* argv) {
   return false;
 }
 
+// "-", and "-:2", the second certificate in it.
+bool IsStandardInput(const std::string& value) {
+  return value == kStandard || value.starts_with(std::string(kStandard) + ":");
+}
+
 // Standard input can be read for one argument only.
 void RefuseSharedInput(const CommandLine& line) {
   size_t readers = 0;
   for (const Given& given : line.given) {
-    if (given.option->Opens() == Access::kWrites) continue;
-    readers += static_cast<size_t>(std::ranges::count(given.values, kStandard));
+    if (given.option->Opens() != Access::kReads) continue;
+    readers += static_cast<size_t>(std::ranges::count_if(given.values, IsStandardInput));
   }
   if (readers > 1) throw Trouble("standard input (-) is asked for more than once", "usage");
 }

@@ -4,6 +4,7 @@
 
 #include <algorithm>
 
+#include "tools/vesk2/files/files.h"
 #include "tools/vesk2/keys/key_source.h"
 #include "tools/vesk2/objects/join.h"
 #include "tools/vesk2/say/report.h"
@@ -26,7 +27,7 @@ ChainFile ChainOfManifest(const std::string& path, PublicKey& signer) {
   if (!file.parts.empty() && file.parts.front().signedCert.cert->GetSubject()->IsEqual(&signer)) {
     return file;
   }
-  throw Trouble(Escape(path) + ": signed by " + Fingerprint(*block.certs[0].cert->GetIssuer()) +
+  throw Trouble(InputName(path) + ": signed by " + Fingerprint(*block.certs[0].cert->GetIssuer()) +
                 ", not by the signing key " + Fingerprint(signer));
 }
 

@@ -55,7 +55,10 @@ const Option* FindOption(const OptionList& options, const std::string& name) {
 std::string OptionName(const std::string& word) {
   return word.starts_with("--") ? word.substr(0, word.find('=')) : word.substr(0, 2);
 }
-bool IsOptionWord(const std::string& word) { return word.size() > 1 && word.starts_with('-'); }
+// "-:2" is a certificate of standard input.
+bool IsOptionWord(const std::string& word) {
+  return word.size() > 1 && word.starts_with('-') && !word.starts_with("-:");
+}
 // Whether the value of an option is the next word.
 bool TakesNext(const Option& option, const std::string& word) {
   return !option.IsFlag() && word == OptionName(word);
@@ -143,10 +146,25 @@ const Command* FindCommand(const std::vector<std::string>& words) {
   return nullptr;
 }
 
-void RequireKnownOptions(const std::vector<std::string>& words, const OptionList& options) {
-  for (size_t i = 0; i < words.size() && words[i] != "--"; ++i) {
-    if (IsOptionWord(words[i]) && TakesNext(KnownOption(options, words[i]), words[i])) ++i;
+std::vector<std::string> CheckOptions(const std::vector<std::string>& words,
+                                      const OptionList& options) {
+  Words checked;
+  Words last = {"--"};
+  for (size_t i = 0; i < words.size(); ++i) {
+    if (words[i] == "--") {
+      last.insert(last.end(), words.begin() + static_cast<std::ptrdiff_t>(i) + 1, words.end());
+      break;
+    }
+    if (words[i].starts_with("-:")) {
+      last.push_back(words[i]);
+      continue;
+    }
+    checked.push_back(words[i]);
+    const bool next = IsOptionWord(words[i]) && TakesNext(KnownOption(options, words[i]), words[i]);
+    if (next && i + 1 < words.size()) checked.push_back(words[++i]);
   }
+  if (last.size() > 1) checked.insert(checked.end(), last.begin(), last.end());
+  return checked;
 }
 
 }  // namespace vesk2_command

@@ -19,8 +19,10 @@ std::vector<std::string> ArrangeWords(int argc, const char* const* argv, const O
 // The subcommand that arranged words begin with; null when they ask for help only.
 const Command* FindCommand(const std::vector<std::string>& words);
 
-// Trouble for the first word of a subcommand's line that looks like an option and is none.
-void RequireKnownOptions(const std::vector<std::string>& words, const OptionList& options);
+// CheckOptions is Trouble for the first word of a subcommand's line that looks like an option and
+// is none. It returns the words, with operands that look like one ("-:2") behind a "--".
+std::vector<std::string> CheckOptions(const std::vector<std::string>& words,
+                                      const OptionList& options);
 
 }  // namespace vesk2_command
 

@@ -10,6 +10,7 @@
 #include "tools/vesk2/explain/effort.h"
 #include "tools/vesk2/explain/find_remedies.h"
 #include "tools/vesk2/explain/tell_remedies.h"
+#include "tools/vesk2/files/files.h"
 #include "tools/vesk2/files/stores.h"
 #include "tools/vesk2/objects/shapes.h"
 #include "tools/vesk2/objects/texts.h"
@@ -166,9 +167,9 @@ void TellFacts(const Evidence& evidence) {
 // Has the library explain a code.
 void Ask(Explanation& explanation, const Question& question, int code) {
   const std::string& directory = question.aclDirectory;
-  Check(
-      explanation.SetNames(question.file.c_str(), directory.empty() ? nullptr : directory.c_str()),
-      "explaining");
+  Check(explanation.SetNames(question.file == kStandard ? "standard input" : question.file.c_str(),
+                             directory.empty() ? nullptr : directory.c_str()),
+        "explaining");
   const Request& request = *question.request;
   Ref<SExpression> members(new SExpression(nullptr));
   for (const auto& member : request.members) InsertShared(*members, member.tag.get());

@@ -206,9 +206,13 @@ int MemoryFile(std::string_view bytes) {
   return file;
 }
 
+std::string InputName(const std::string& path) {
+  return path == kStandard ? "standard input" : Escape(path);
+}
+
 Trouble FileTrouble(const std::string& path, const std::string& text, const std::string& reason) {
-  Trouble trouble(Escape(path) + ": " + text, reason);
-  trouble.file = Escape(path);
+  Trouble trouble(InputName(path) + ": " + text, reason);
+  trouble.file = InputName(path);
   return trouble;
 }
 
@@ -222,6 +226,7 @@ std::string WhyUnreadable(const std::string& path) {
 }
 
 std::string ReadFile(const std::string& path, size_t limit) {
+  Detail("reads " + InputName(path));
   if (path == kStandard) {
     if (StandardInput().size() > limit) throw FileTrouble("standard input", "too large", "io");
     return StandardInput();

@@ -14,14 +14,17 @@
 
 namespace vesk2_command {
 
+// "-" names standard input where a file is read, and standard output where one is written.
+inline constexpr char kStandard[] = "-";
+
+// What a file that is read is called in a message: its path, escaped, or "standard input".
+std::string InputName(const std::string& path);
+
 // A Trouble "PATH: TEXT" that names the file for machines too.
 Trouble FileTrouble(const std::string& path, const std::string& text, const std::string& reason);
 
 // Why a file that the library could not open cannot be read, in words.
 std::string WhyUnreadable(const std::string& path);
-
-// "-" names standard input where a file is read, and standard output where one is written.
-inline constexpr char kStandard[] = "-";
 
 // ReadFile returns the contents of a regular file or of standard input; Trouble when it cannot, or
 // past `limit` bytes. Standard input is read once and kept: a file may be looked at twice.

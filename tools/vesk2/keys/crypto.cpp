@@ -125,7 +125,7 @@ Ref<PublicKey> MakePublicKey(bool rsa, const std::vector<std::string>& numbers,
   }
   const Buffer buffer = WrapBytes(text + "))");
   Ref<PublicKey> result(new PublicKey(nullptr));
-  Check(result->Import(buffer.get()), Escape(source));
+  Check(result->Import(buffer.get()), InputName(source));
   return result;
 }
 

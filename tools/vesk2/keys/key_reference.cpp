@@ -23,7 +23,7 @@ bool InAgent(const std::string& name) { return name.rfind(kAgentScheme, 0) == 0;
 Ref<PublicKey> PublicFromPem(const Secret& pem, const std::string& path) {
   const Bio bio = ReadOnly(pem);
   const CryptoKey key = OwnKey(PEM_read_bio_PUBKEY(bio.get(), nullptr, nullptr, nullptr));
-  Require(key != nullptr, Escape(path) + ": no public key");
+  Require(key != nullptr, InputName(path) + ": no public key");
   return MakePublicKey(key.get(), path);
 }
 

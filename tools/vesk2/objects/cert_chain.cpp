@@ -2,6 +2,7 @@
 // cert_chain.cpp: certificate sequence files.
 #include "tools/vesk2/objects/cert_chain.h"
 
+#include "tools/vesk2/files/files.h"
 #include "tools/vesk2/say/report.h"
 
 namespace vesk2_command {
@@ -34,7 +35,7 @@ std::vector<ChainLink> ChainLinks(const CertChain& chain, const std::string& pat
     item.Next();
     links.push_back(link);
   }
-  if (links.empty()) throw Trouble(Escape(path) + ": holds no certificate");
+  if (links.empty()) throw Trouble(InputName(path) + ": holds no certificate");
   return links;
 }
 
@@ -67,7 +68,7 @@ void WriteSequence(CertSequence& sequence, const std::string& path, const WriteF
 void RequireCertFor(const CertChain& chain, const std::string& path, PublicKey& key) {
   const Cert* const cert = ChainLinks(chain, path)[0].cert;
   if (!cert->GetSubject()->IsEqual(&key)) {
-    throw Trouble(Escape(path) + ": its first certificate is for " +
+    throw Trouble(InputName(path) + ": its first certificate is for " +
                   Fingerprint(*cert->GetSubject()) + ", not for the signing key " +
                   Fingerprint(key));
   }

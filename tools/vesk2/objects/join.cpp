@@ -5,6 +5,7 @@
 #include <algorithm>
 #include <set>
 
+#include "tools/vesk2/files/files.h"
 #include "tools/vesk2/say/report.h"
 
 namespace vesk2_command {
@@ -29,7 +30,7 @@ void RequireOneKey(const ChainFile& first, const ChainFile& other) {
   Subject& subject = SubjectOf(other.parts.front());
   if (subject.IsEqual(&key)) return;
   throw Trouble(Escape(other.path) + ": its first certificate is for " + Fingerprint(subject) +
-                ", that of " + Escape(first.path) + " for " + Fingerprint(key));
+                ", that of " + InputName(first.path) + " for " + Fingerprint(key));
 }
 
 }  // namespace

@@ -75,7 +75,7 @@ SignatureBlock ReadSignatureBlock(const std::string& path) {
   Manifest& manifest = *block.owner;
   block.proved = std::make_unique<Evidence>(nullptr);
   Evidence& evidence = *block.proved;
-  Check(manifest.Initialize("", InputPath(path).c_str(), "none"), Escape(path));
+  Check(manifest.Initialize("", InputPath(path).c_str(), "none"), InputName(path));
   manifest.SetEvidence(&evidence);
   block.code = manifest.ReadManifest(false, 0, 0, nullptr);
   manifest.SetEvidence(nullptr);
@@ -95,7 +95,7 @@ SignatureBlock ReadSignatureBlock(const std::string& path) {
 }
 
 int ReadSigned(const std::string& path, Manifest& manifest, Buffer& body) {
-  Check(manifest.Initialize("", InputPath(path).c_str(), "none"), Escape(path));
+  Check(manifest.Initialize("", InputPath(path).c_str(), "none"), InputName(path));
   ZvBuffer* read = nullptr;
   const int code = manifest.ReadManifest(false, 0, 0, &read);
   body.reset(read);
@@ -116,7 +116,7 @@ bool IsRefusal(int code) {
 void ThrowUnreadable(const std::string& path, const Manifest& manifest, int code) {
   if (code == VESK2_ERR_OPEN_MANIFEST_FILE) throw FileTrouble(path, WhyUnreadable(path), "io");
   const bool wasRead = code > 0 && code != VESK2_ERR_MEM_ALLOC && code != VESK2_ERR_READ_FILE;
-  if (!wasRead) Check(code, Escape(path));
+  if (!wasRead) Check(code, InputName(path));
   Malformed(path, manifest.GetReadPosition(), "manifest", code);
 }
 

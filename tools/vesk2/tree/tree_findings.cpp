@@ -31,6 +31,7 @@ std::map<std::string, std::string> Reasons(const ZvVesk2::Manifest& manifest) {
 
 // The name under which the manifest itself lies in the top directory; empty when it does not.
 std::string OwnName(const TreeQuestion& question) {
+  if (question.manifest == kStandard) return "";  // a file of that name is another one
   const std::filesystem::path path(question.manifest);
   std::error_code error;
   const auto parent = std::filesystem::canonical(

@@ -4,6 +4,7 @@
 
 #include <algorithm>
 
+#include "tools/vesk2/files/files.h"
 #include "tools/vesk2/keys/key_source.h"
 #include "tools/vesk2/objects/acl_file.h"
 #include "tools/vesk2/objects/request.h"
@@ -94,7 +95,8 @@ void SelfCheck::CheckChain(const Chain& chain) {
   for (size_t i = 0; i < chain.certs.size(); ++i) {
     const SignedCert& each = chain.certs[i];
     Cert& cert = *each.cert;
-    const std::string name = "certificate " + std::to_string(i + 1) + " of " + Escape(chain.path);
+    const std::string name =
+        "certificate " + std::to_string(i + 1) + " of " + InputName(chain.path);
     const int code = each.signature->Verify(&cert);
     if (code != 0) Add(name + ": " + Reason(code));
     CheckPeriod(name, cert, chain.at);
@@ -132,7 +134,7 @@ void CheckGrant(AclEntry& entry, const std::string& place, bool issuer, bool str
     check.CheckChain(chain);
     for (size_t i = 0; i < chain.certs.size(); ++i) {
       if (GrantsAnything(entry.GetTag(), chain.certs[i])) continue;
-      check.Add("certificate " + std::to_string(i + 1) + " of " + Escape(at.path) + " grants " +
+      check.Add("certificate " + std::to_string(i + 1) + " of " + InputName(at.path) + " grants " +
                 TagText(chain.certs[i].cert->GetTag()) + ", nothing of " + TagText(entry.GetTag()));
     }
   }
