@@ -2,15 +2,14 @@
 // passphrase.cpp: passphrases from files, descriptors and the terminal.
 #include "tools/vesk2/keys/passphrase.h"
 
-#include <fcntl.h>
 #include <openssl/crypto.h>
-#include <openssl/evp.h>
 #include <unistd.h>
 
 #include <cerrno>
 #include <cstring>
 
 #include "tools/vesk2/files/files.h"
+#include "tools/vesk2/keys/terminal.h"
 #include "tools/vesk2/say/report.h"
 
 namespace vesk2_command {
@@ -45,24 +44,23 @@ std::shared_ptr<const Secret> NamedPassphrase(const PassphraseOptions& options) 
   const size_t size = options.given->text().size();
   if (size == 0 || size > kMaxPassphrase) {
     throw Trouble(
-        (file ? Escape(options.file) : "--passphrase-fd " + std::to_string(options.descriptor)) +
+        (file ? InputName(options.file) : "--passphrase-fd " + std::to_string(options.descriptor)) +
             (size == 0 ? ": holds no passphrase" : ": too long for a passphrase"),
         "passphrase");
   }
   return options.given;
 }
 
-// Without a terminal libcrypto would read standard input, where nobody was asked for anything.
-bool HaveTerminal() {
-  const int terminal = open("/dev/tty", O_RDWR | O_CLOEXEC | O_NOCTTY);
-  if (terminal >= 0) close(terminal);
-  return terminal >= 0;
-}
-
 int AskTerminal(char* out, int size, const std::string& prompt, bool twice) {
-  if (!HaveTerminal()) return -1;
-  if (EVP_read_pw_string(out, size, prompt.c_str(), twice ? 1 : 0) != 0) return -1;
-  return static_cast<int>(std::strlen(out));
+  const Terminal terminal;
+  if (!terminal.IsThere()) return -1;
+  const int length = terminal.Ask(prompt, out, size);
+  if (!twice || length < 0) return length;
+  char again[kMaxPassphrase] = "";
+  const bool same = terminal.Ask("Verifying - " + prompt, again, sizeof again) == length &&
+                    std::memcmp(out, again, static_cast<size_t>(length)) == 0;
+  OPENSSL_cleanse(again, sizeof again);
+  return same ? length : -1;
 }
 
 int FromOptions(char* out, int size, const PassphraseOptions& options) {
@@ -107,7 +105,7 @@ int GivePassphrase(char* out, int size, int /*writing*/, void* user) {
     length =
         asking.options.Named()
             ? FromOptions(out, size, asking.options)
-            : AskTerminal(out, size, asking.what + (" of " + Escape(asking.path)) + ": ", false);
+            : AskTerminal(out, size, asking.what + (" of " + InputName(asking.path)) + ": ", false);
     if (length >= 0) {
       asking.used = std::make_shared<const Secret>(std::string(out, static_cast<size_t>(length)));
     }
