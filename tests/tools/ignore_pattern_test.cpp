@@ -53,10 +53,11 @@ TEST(IgnorePattern, MatchesPathsBelowTheRoot) {
   }
   EXPECT_TRUE(IgnorePattern("!a", "here").IsNegated());
   EXPECT_TRUE(IgnorePattern("a\\ ", "here").Matches("a ", false));
+  EXPECT_TRUE(IgnorePattern("a\\\\\\ ", "here").Matches("a\\ ", false));
 }
 
 TEST(IgnorePattern, RefusesWhatMeantSomethingElse) {
-  for (const char* text : {"/", "!", "!/", "//a", "a//b", "[ab]", "a\\", "a\\/b", "a ", "a\r"}) {
+  for (const char* text : {"/", "!", "!/", "//a", "a//b", "[ab]", "a\\", "a\\/b", "a ", "a\r", "a\\\\ "}) {
     EXPECT_THROW(IgnorePattern(text, "here"), Trouble) << text;
   }
 }

@@ -22,6 +22,9 @@ struct Refusal {
 
 Refusal Judge(CrlSequence& list, SExpression* tag, SExpression* acls, TimeStamp& at) {
   const ZvVesk2::Cert& cert = *list.GetCert();
+  if (tag != nullptr && cert.GetTag() == nullptr) {
+    return {VESK2_ERR_AUTH_TAG_MISSING, "the list has no tag, and is of no source"};
+  }
   if (tag != nullptr && !tag->IsEqual(cert.GetTag())) {
     return {VESK2_ERR_NOT_AUTHORIZED, "it is of the source " + TagText(cert.GetTag())};
   }

@@ -2,6 +2,7 @@
 // token_uri.cpp: PKCS#11 URIs.
 #include "tools/vesk2/keys/token_uri.h"
 
+#include <algorithm>
 #include <set>
 
 #include "tools/vesk2/say/report.h"
@@ -109,6 +110,12 @@ TokenUri ParseTokenUri(const std::string& uri) {
   return result;
 }
 
-std::string ShownTokenUri(const std::string& uri) { return uri.substr(0, uri.find('?')); }
+// Without the query, and without a PIN that stands before the "?" by mistake.
+std::string ShownTokenUri(const std::string& uri) {
+  std::string shown = uri.substr(0, uri.find('?'));
+  for (const char* pin : {":pin-", ";pin-", "&pin-"})
+    shown.resize(std::min(shown.find(pin), shown.size()));
+  return shown;
+}
 
 }  // namespace vesk2_command

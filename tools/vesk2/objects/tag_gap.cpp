@@ -99,6 +99,13 @@ Why ExplainRange(DExpression& asked, DExpression& granted) {
   const Ref<SExpression> open = ListOf({elements[0], elements[1], elements[2]});
   if (!Within(asked, *open)) {
     const std::string kind = InlineText(*elements[2]);
+    const std::vector<DExpression*> own = FormOf(asked) == kRange
+                                              ? ElementsOf(static_cast<SExpression&>(asked))
+                                              : std::vector<DExpression*>();
+    if (own.size() > 2 && InlineText(*own[2]) == kind) {
+      return {"range-strict", text + " does not span two values of the ordering " + kind +
+                                  ": it lies within an equal range only; ask for the value itself"};
+    }
     return word ? Why{"no-value", text + " is no value of the ordering " + kind}
                 : Why{"other-ordering", text + " is not of the ordering " + kind};
   }

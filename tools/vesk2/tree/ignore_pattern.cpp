@@ -65,7 +65,9 @@ IgnorePattern::IgnorePattern(const std::string& text, const std::string& where) 
   }
   components_.emplace_back();
   bool escaped = false;
+  bool meant = true;  // that the last byte is what it is
   for (const char c : rest) {
+    meant = escaped;
     if (c == '/' && !escaped) {
       anchored_ = true;
       components_.emplace_back();
@@ -80,7 +82,8 @@ IgnorePattern::IgnorePattern(const std::string& text, const std::string& where) 
   }
   if (escaped) refuse("a \\ at the end");
   const bool blank = rest.ends_with(' ') || rest.ends_with('\t') || rest.ends_with('\r');
-  if (blank && !rest.ends_with("\\ ")) refuse("a blank at the end; \\ before it if it is meant");
+  if (blank && !(meant && rest.ends_with(' ')))
+    refuse("a blank at the end; \\ before it if it is meant");
   for (const Component& component : components_) {
     if (component.empty()) refuse("an empty name");
   }
