@@ -110,8 +110,9 @@ Action DefineAclGrant(OptionList& list) {
   Option& issuer = list.Add("--issuer-of", options->issuerOf,
                             "Or the issuer in a chain, manifest or revocation list: FILE, or "
                             "FILE:N for the N-th certificate [the last]");
-  Option& other = list.Add("--subject-of", options->subjectOf,
-                           "Or the subject in a chain or manifest: FILE, or FILE:N [the first]");
+  Option& other = list.Add(
+      "--subject-of", options->subjectOf,
+      "Or the signer of a manifest, or the subject in a chain: FILE, or FILE:N [the first]");
   subject.Several().Excludes(issuer).Excludes(other);
   issuer.Excludes(other);
   list.Add("--threshold", options->threshold,

@@ -22,6 +22,7 @@ using Signers = std::vector<std::unique_ptr<SigningKey>>;
 struct Options {
   SignerOptions signer;
   std::string subject;
+  std::string subjectOf;
   std::string request;
   std::string tag;
   bool propagate = false;
@@ -78,10 +79,13 @@ Wish ReadRequest(const Options& options) {
 
 Wish ReadWish(const Options& options) {
   if (!options.request.empty()) return ReadRequest(options);
-  if (options.subject.empty()) throw Trouble("nobody to certify: --subject or --request", "usage");
+  if (options.subject.empty() && options.subjectOf.empty()) {
+    throw Trouble("nobody to certify: --subject, --subject-of or --request", "usage");
+  }
   if (options.tag.empty()) throw Trouble("--tag is required", "usage");
-  return {Ref<ZvVesk2::Subject>(ReadPublicKey(options.subject).Release()),
-          ParseIssuedTag(options.tag), ""};
+  Ref<PublicKey> key = options.subject.empty() ? ReadKeyOf(options.subjectOf, false)
+                                               : ReadPublicKey(options.subject);
+  return {Ref<ZvVesk2::Subject>(key.Release()), ParseIssuedTag(options.tag), ""};
 }
 
 Signers OpenSigners(const SignerOptions& options) {
@@ -160,8 +164,14 @@ Action DefineCertIssue(OptionList& list) {
   auto options = std::make_shared<Options>();
   AddSignerOptions(list, options->signer, SignerCount::kSeveral);
   Option& subject = list.Add("--subject", options->subject, "The public key that is certified");
+  Option& subjectOf =
+      list.Add(
+              "--subject-of", options->subjectOf,
+              "Or the signer of a manifest, or the subject in a chain: FILE, or FILE:N [the first]")
+          .Excludes(subject);
   list.Add("--request", options->request, "Or the key that made this request, for what it asks")
-      .Excludes(subject);
+      .Excludes(subject)
+      .Excludes(subjectOf);
   list.Add("--tag", options->tag,
            "What for: \"(install (app calc))\"; of a request, less than it asks");
   list.Add("--propagate", options->propagate,

@@ -5,6 +5,7 @@
 #include <algorithm>
 #include <vector>
 
+#include "tools/vesk2/files/files.h"
 #include "tools/vesk2/objects/cert_chain.h"
 #include "tools/vesk2/objects/crl_file.h"
 #include "tools/vesk2/objects/manifest_file.h"
@@ -36,13 +37,13 @@ std::vector<SignedCert> ReadCerts(const std::string& path) {
       certs.push_back(Share(link.cert, link.signature));
     }
   }
-  if (certs.empty()) throw Trouble(Escape(path) + ": holds no certificate");
+  if (certs.empty()) throw Trouble(InputName(path) + ": holds no certificate");
   return certs;
 }
 
 void RequireCert(const std::vector<SignedCert>& certs, size_t number, const std::string& path) {
   if (number >= 1 && number <= certs.size()) return;
-  throw Trouble(Escape(path) + ": holds " + std::to_string(certs.size()) +
+  throw Trouble(InputName(path) + ": holds " + std::to_string(certs.size()) +
                 " certificates, no number " + std::to_string(number));
 }
 
@@ -61,12 +62,18 @@ Place ParsePlace(const std::string& argument) {
 Ref<PublicKey> ReadKeyOf(const std::string& argument, bool issuer) {
   const Place place = ParsePlace(argument);
   const std::vector<SignedCert> certs = ReadCerts(place.path);
-  const size_t number = place.number != 0 ? place.number : issuer ? certs.size() : 1;
+  // The first certificate of a manifest is the signer's, for its content.
+  const bool signer =
+      !issuer && place.number == 0 && OpenBuffer(place.path)->LooksAt("(8:manifest");
+  if (signer) issuer = true;
+  const size_t number = signer || (!issuer && place.number == 0) ? 1
+                        : place.number != 0                      ? place.number
+                                                                 : certs.size();
   RequireCert(certs, number, place.path);
   const Cert& cert = *certs[number - 1].cert;
   auto* key = dynamic_cast<PublicKey*>(issuer ? cert.GetIssuer() : cert.GetSubject());
   if (key != nullptr) return Ref<PublicKey>::Share(key);
-  throw Trouble(Escape(place.path) + ": the " + (issuer ? "issuer" : "subject") +
+  throw Trouble(InputName(place.path) + ": the " + (issuer ? "issuer" : "subject") +
                 " of certificate " + std::to_string(number) + " is not a key");
 }
 

@@ -25,8 +25,8 @@ std::vector<SignedCert> ReadCerts(const std::string& path);
 void RequireCert(const std::vector<SignedCert>& certs, size_t number, const std::string& path);
 
 // ReadKeyOf reads the issuer or the subject of the N-th certificate of FILE[:N]: by default of the
-// last for an issuer, where a chain has its root, and of the first for a subject. Trouble when it
-// is no key.
+// last for an issuer, where a chain has its root, and of the first for a subject; the subject of a
+// manifest is its signer. Trouble when it is no key.
 Ref<PublicKey> ReadKeyOf(const std::string& argument, bool issuer);
 
 }  // namespace vesk2_command
