@@ -5,6 +5,7 @@
 #include "tools/vesk2/confine/confine.h"
 #include "tools/vesk2/explain/effort.h"
 #include "tools/vesk2/explain/explain.h"
+#include "tools/vesk2/files/files.h"
 #include "tools/vesk2/objects/cert_chain.h"
 #include "tools/vesk2/objects/shapes.h"
 #include "tools/vesk2/objects/texts.h"
@@ -28,11 +29,8 @@ struct Options {
 };
 
 Period AskedPeriod(const Options& options) {
-  if (!options.period.notBefore.empty() || !options.period.notAfter.empty()) {
-    return ParsePeriod(options.period);
-  }
-  const std::string at = options.at.empty() ? "now" : options.at;
-  return {ParseTime(at, false), ParseTime(at, false)};
+  const bool open = options.period.notBefore.empty() && options.period.notAfter.empty();
+  return ParseMoment(options.period, options.at.empty() && open ? "now" : options.at);
 }
 
 // The answer about every member; the first refusal is the answer to all. None where no entry could
@@ -47,12 +45,15 @@ std::optional<int> VerifyMembers(const CertChain& chain, const Question& questio
                             : chain->Verify(nullptr, tag, question.period.notBefore.get(),
                                             question.period.notAfter.get(), proved);
     if (code == VESK2_ERR_MEM_ALLOC || code == VESK2_ERR_READ_FILE)
-      Check(code, Escape(question.file));
+      Check(code, InputName(question.file));
     if (proved.GetEntries() == nullptr) return std::nullopt;
     if (code < 0) {
       ExplainTrouble(question, code);
-      Check(code, Escape(question.file));
+      Check(code, InputName(question.file));
     }
+    if (i == 0) DetailEvidence(question);
+    Detail("authority for " + Escape(request.members[i].text) + ": " +
+           (code == 0 ? "granted" : Reason(code)));
     if (i == 0) (void)CheckStores(question, stores);
     TellMember(request, i, code);
     if (first == 0) first = code;
@@ -69,7 +70,7 @@ ExitCode Run(const Options& options) {
   question.file = options.file;
   question.request = &request;
   question.period = AskedPeriod(options);
-  Result()["about"] = {{"file", Escape(options.file)}};
+  Result()["about"] = {{"file", InputName(options.file)}};
   Result()["about"].update(PeriodJson(question.period));
   const CertChain chain = ReadCertChain(options.file);
   const std::vector<ChainLink> links = ChainLinks(chain, options.file);
@@ -103,10 +104,7 @@ Action DefineCertVerify(OptionList& list) {
   list.Add("--tag", options->tag,
            "What its first subject must be authorized for; of a set, every member")
       .Required();
-  AddPeriodOptions(list, options->period);
-  list.Add("--at", options->at, "Authorized at this moment [now]")
-      .Excludes("--not-before")
-      .Excludes("--not-after");
+  AddMomentOptions(list, options->period, options->at, "Authorized at this moment [now]");
   AddStoreCheckOptions(list, options->stores);
   list.Add("--explain", options->explain, "Tell why also when the answer is yes");
   AddPageOptions(list, options->page);

@@ -17,8 +17,7 @@ constexpr const char* kSigning = "signing";
 
 Period AskedPeriod(const AuthorityOptions& options) {
   if (options.at == kSigning) return {};
-  if (options.at.empty()) return ParsePeriod(options.period);
-  return {ParseTime(options.at, false), ParseTime(options.at, false)};
+  return ParseMoment(options.period, options.at);
 }
 
 // Whether nobody said what moment the answer is about.
@@ -36,12 +35,9 @@ bool IsAboutStore(int code) {
 void AddAuthorityOptions(OptionList& list, AuthorityOptions& options) {
   list.Add("--tag", options.tag, "What the signer must be authorized for; of a set, every member")
       .Required();
-  AddPeriodOptions(list, options.period);
-  list.Add("--at", options.at,
-           "Authorized, and not revoked, at this moment; \"signing\" for the time of signing "
-           "[authorized at the time of signing, not revoked now]")
-      .Excludes("--not-before")
-      .Excludes("--not-after");
+  AddMomentOptions(list, options.period, options.at,
+                   "Authorized, and not revoked, at this moment; \"signing\" for the time of "
+                   "signing [authorized at the time of signing, not revoked now]");
   list.Add(
       "--no-store-update", options.noStoreUpdate,
       "Keep nothing: neither the revocation lists that the manifest carries nor a higher floor");
@@ -75,7 +71,7 @@ ManifestAuthority::ManifestAuthority(const AuthorityOptions& options,
   question_.signing = std::move(signing);
   question_.proved = &proved_;
   Result()["tag"] = TagText(request_.tag.get());
-  Result()["about"]["file"] = Escape(options.manifest);
+  Result()["about"]["file"] = InputName(options.manifest);
   Result()["about"].update(PeriodJson(question_.period));
   floor_.emplace(options.floor, *request_.tag, IsAboutToday(options) && !options.noStoreUpdate);
 }
@@ -101,6 +97,8 @@ std::optional<ExitCode> ManifestAuthority::Judge(const ZvVesk2::Manifest& manife
   if (proved_.CountCerts() > 0) {
     Result()["signer"] = Fingerprint(*proved_.GetCert(0)->GetIssuer());
   }
+  DetailEvidence(question_);
+  Detail("authority, as asked: " + (code == 0 ? "granted" : Reason(code)));
   if (IsAboutStore(code)) return RefuseWithoutStore(question_, code);
   if (code != 0 && !IsRefusal(code)) ThrowTrouble(manifest, code);
   broken_ = CheckStores(question_, options_.stores);
@@ -122,6 +120,7 @@ int ManifestAuthority::JudgeMembers(int first) {
     int code = i == 0 ? first : JudgeMember(request_.members[i].tag.get());
     if (code == 0 && today_) {
       code = today_->Judge(request_.members[i].tag.get());
+      Detail("authority, by what is revoked today: " + (code == 0 ? "granted" : Reason(code)));
       byToday_ |= refused == 0 && code != 0;
     }
     TellMember(request_, i, code);
@@ -134,7 +133,7 @@ int ManifestAuthority::JudgeMember(SExpression* tag) const {
   ZvVesk2::Evidence same(nullptr);
   Check(same.Copy(proved_), "judging a member");
   const int code = same.Judge(tag);
-  if (code < 0 || code == VESK2_ERR_MEM_ALLOC) Check(code, Escape(options_.manifest));
+  if (code < 0 || code == VESK2_ERR_MEM_ALLOC) Check(code, InputName(options_.manifest));
   return code != 0 ? code : proved_.GetContentCode();
 }
 

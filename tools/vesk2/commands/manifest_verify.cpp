@@ -53,7 +53,7 @@ class Answer {
       : options_(options),
         authority_(options.authority, SigningWords(options)),
         rules_(options.ignore, options.directory),
-        bytes_(options.authority.manifest, rules_, options.directory),
+        bytes_(InputPath(options.authority.manifest), rules_, options.directory),
         tree_{options.directory,  options.authority.manifest, bytes_.ignored(),
               options.allowExtra, options.allowLinks,         options.all},
         manifest_(nullptr) {
@@ -71,8 +71,10 @@ class Answer {
 
  private:
   int VerifyFiles() {
-    const ProgressLine progress("verifying", [&] { return manifest_.CountListedFiles(); });
-    const LentThreads threads(options_.jobs, options_.authority.manifest);
+    const ProgressLine progress("verifying", [&] { return FilesToRead(); });
+    Detail("reads " + InputName(options_.authority.manifest) + ", and the files of " +
+           Escape(options_.directory) + " that it lists");
+    const LentThreads threads(options_.jobs, bytes_.path());
     Check(manifest_.SetFileCallbacks(progress.Callbacks()), "preparing");
     manifest_.SetTaskRunner(threads.Runner());
     const int code = manifest_.VerifyManifest(authority_.First(), authority_.Last());
@@ -81,7 +83,15 @@ class Answer {
     return code;
   }
 
+  size_t FilesToRead() const {
+    const size_t listed = manifest_.CountListedFiles();
+    return listed > bytes_.files() ? listed - bytes_.files() : 0;
+  }
+
   ExitCode AnswerTree() {
+    Detail("compared " + Plural(manifest_.CountListedFiles(), "listed file") + ": " +
+           (code_ == 0 ? "as signed" : Reason(code_)));
+    Detail("looks for links and unlisted entries in " + Escape(options_.directory));
     const std::vector<Finding> findings = FindInTree(manifest_, tree_);
     const std::string summary = Summary(findings);
     const bool asSigned = code_ == 0 && summary.empty();

@@ -6,6 +6,7 @@
 #include <filesystem>
 #include <set>
 
+#include "tools/vesk2/files/files.h"
 #include "tools/vesk2/files/stores.h"
 #include "tools/vesk2/objects/texts.h"
 #include "tools/vesk2/say/report.h"
@@ -92,6 +93,19 @@ Evidence GatherEvidence(const Question& question) {
   evidence.last = proved.GetLast();
   evidence.contentSigned = proved.GetContentCode() == 0 && proved.GetListingCode() == 0;
   return evidence;
+}
+
+void DetailEvidence(const Question& question) {
+  const ZvVesk2::Evidence& proved = *question.proved;
+  const SExpression* entries = proved.GetEntries();
+  const std::string beside =
+      question.aclDirectory.empty() ? "" : " and " + Escape(question.aclDirectory);
+  Detail("read " + Plural(proved.CountCerts(), "certificate") + " of " + InputName(question.file));
+  Detail("read " + std::to_string(entries != nullptr ? entries->Count() - 1 : 0) +
+         " of the entries in " + Escape(AclDirectory()) + beside);
+  Detail("read " + Plural(ListsOf(proved.GetStoredLists()).size(), "revocation list") +
+         " of the store, and " + std::to_string(ListsOf(proved.GetCarriedLists()).size()) +
+         " that the file carries");
 }
 
 std::string CertName(const Evidence& evidence, size_t index) {

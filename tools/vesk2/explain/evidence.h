@@ -62,6 +62,9 @@ struct Evidence {
 // GatherEvidence takes apart what was proved for a question.
 Evidence GatherEvidence(const Question& question);
 
+// What was read for the answer, as notes that only --verbose asks for.
+void DetailEvidence(const Question& question);
+
 // "certificate N (issuer FINGERPRINT)".
 std::string CertName(const Evidence& evidence, size_t index);
 std::string EntryName(const EntryEvidence& entry);

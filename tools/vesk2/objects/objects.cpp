@@ -61,6 +61,7 @@ std::string LikelyMistake(const SExpression& list) {
 
 Buffer OpenBuffer(const std::string& path) {
   if (path == kStandard) return WrapBytes(ReadFile(path, ZvVesk2::Limits::kMaxFile));
+  Detail("reads " + Escape(path));
   Buffer buffer(ZVsysutil::zv_buffer_wrap_file(path.c_str()));
   if (!buffer) throw FileTrouble(path, WhyUnreadable(path), "io");
   return buffer;

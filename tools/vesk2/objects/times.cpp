@@ -41,6 +41,12 @@ void AddPeriodOptions(OptionList& list, PeriodOptions& options) {
   list.Add("--not-after", options.notAfter, "Last moment; 2026 is the end of that year");
 }
 
+void AddMomentOptions(OptionList& list, PeriodOptions& options, std::string& at,
+                      std::string_view about) {
+  AddPeriodOptions(list, options);
+  list.Add("--at", at, about).Excludes("--not-before").Excludes("--not-after");
+}
+
 Period ParsePeriod(const PeriodOptions& options) {
   Period period;
   if (!options.notBefore.empty()) period.notBefore = ParseTime(options.notBefore, false);
@@ -49,6 +55,11 @@ Period ParsePeriod(const PeriodOptions& options) {
     throw Trouble("--not-before lies after --not-after", "usage");
   }
   return period;
+}
+
+Period ParseMoment(const PeriodOptions& options, const std::string& at) {
+  if (at.empty()) return ParsePeriod(options);
+  return {ParseTime(at, false), ParseTime(at, false)};
 }
 
 std::string StampText(const TimeStamp& stamp) { return Escape(BytesOf(stamp)); }

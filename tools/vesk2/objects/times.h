@@ -25,6 +25,9 @@ struct PeriodOptions {
   std::string notAfter;
 };
 void AddPeriodOptions(OptionList& list, PeriodOptions& options);
+// The same of a question, with --at for one moment, which `about` describes.
+void AddMomentOptions(OptionList& list, PeriodOptions& options, std::string& at,
+                      std::string_view about);
 
 // Null where nothing was given.
 struct Period {
@@ -32,6 +35,8 @@ struct Period {
   Ref<TimeStamp> notAfter;
 };
 Period ParsePeriod(const PeriodOptions& options);
+// One moment twice; the period where `at` is empty.
+Period ParseMoment(const PeriodOptions& options, const std::string& at);
 
 // A stamp's text, escaped: stamps in files hold whatever their writer put there.
 std::string StampText(const TimeStamp& stamp);

@@ -24,21 +24,30 @@ class Expansion {
     for (uint32_t i = 0; i < files.GetCount(); ++i) {
       const std::string name = static_cast<BodyObject&>(*files.at(i)).GetName();
       listed.insert(name);
-      (void)Asks(Join(relative, name), false);
+      files_ += Asks(Join(relative, name), false) ? 1 : 0;
     }
     auto& below = directory.GetSubdirectories();
     for (uint32_t i = 0; i < below.GetCount(); ++i) {
       auto& each = static_cast<BodyDirectory&>(*below.at(i));
       const std::string path = each.GetName();
       listed.insert(path.substr(path.rfind('/') + 1));
-      if (!Asks(path, true)) Visit(each, path);
+      Asks(path, true) ? CountBelow(each) : Visit(each, path);
     }
     VisitDisk(listed, relative);
   }
 
   std::set<std::string> ignored;
+  size_t files() const { return files_; }
 
  private:
+  void CountBelow(BodyDirectory& directory) {
+    files_ += directory.GetFiles().GetCount();
+    auto& below = directory.GetSubdirectories();
+    for (uint32_t i = 0; i < below.GetCount(); ++i) {
+      CountBelow(static_cast<BodyDirectory&>(*below.at(i)));
+    }
+  }
+
   bool Asks(const std::string& relative, bool isDirectory) {
     const bool ignores = rules_.Ignores(relative, isDirectory);
     if (ignores) ignored.insert(relative);
@@ -58,6 +67,7 @@ class Expansion {
 
   const IgnoreRules& rules_;
   const std::string root_;
+  size_t files_ = 0;  // that are listed and ignored
 };
 
 }  // namespace
@@ -73,6 +83,7 @@ IgnoredListing::IgnoredListing(const std::string& manifest, const IgnoreRules& r
   Expansion expansion(rules, directory);
   expansion.Visit(*block.listing, "");
   ignored_ = std::move(expansion.ignored);
+  files_ = expansion.files();
 }
 
 }  // namespace vesk2_command

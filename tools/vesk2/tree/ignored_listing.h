@@ -21,11 +21,14 @@ class IgnoredListing {
                  const std::string& directory);
   const std::string& path() const { return path_; }
   const std::set<std::string>& ignored() const { return ignored_; }
+  // How many of them are listed files, those in ignored directories too.
+  size_t files() const { return files_; }
 
  private:
   std::string path_;
   Descriptor copy_;
   std::set<std::string> ignored_;
+  size_t files_ = 0;
 };
 
 }  // namespace vesk2_command
