@@ -57,7 +57,8 @@ TEST(IgnorePattern, MatchesPathsBelowTheRoot) {
 }
 
 TEST(IgnorePattern, RefusesWhatMeantSomethingElse) {
-  for (const char* text : {"/", "!", "!/", "//a", "a//b", "[ab]", "a\\", "a\\/b", "a ", "a\r", "a\\\\ "}) {
+  for (const char* text :
+       {"/", "!", "!/", "//a", "a//b", "[ab]", "a\\", "a\\/b", "a ", "a\r", "a\\\\ "}) {
     EXPECT_THROW(IgnorePattern(text, "here"), Trouble) << text;
   }
 }
