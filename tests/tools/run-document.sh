@@ -25,6 +25,7 @@ if [[ -e $build/cmake_install.cmake ]]; then
   LD_LIBRARY_PATH=${PKG_CONFIG_PATH%/pkgconfig}
   export PKG_CONFIG_PATH LD_LIBRARY_PATH PYTHONPATH=$bindings PYTHONDONTWRITEBYTECODE=1
 fi
+umask 022
 failures=0 command='' ran=0 file=''
 
 masked() {

@@ -19,6 +19,7 @@ work=$(mktemp -d) || exit 1
 trap 'chmod -R u+rwx "$work"; rm -rf "$work"' EXIT
 mkdir "$work/run" "$work/bin" && ln -s "$(realpath "$1")" "$work/bin/vesk2" && cd "$work/run" || exit 1
 VESK2_HOME=$work/home VESK2_GLOBAL=$work/global LC_ALL=C PATH=$work/bin:$PATH
+umask 022 # what a store's audit finds depends on it
 export TOOLS VESK2_HOME VESK2_GLOBAL LC_ALL PATH
 failures=0
 

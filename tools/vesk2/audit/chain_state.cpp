@@ -11,13 +11,42 @@ namespace vesk2_command {
 
 using ZvVesk2::Cert;
 
+namespace {
+
+// What is asked about a chain: all that its first certificate grants.
+Ref<SExpression> TagOf(const ChainLink& first) {
+  SExpression* const granted = first.cert->GetTag();
+  return granted != nullptr ? Ref<SExpression>::Share(granted) : ParseTag("(*)");
+}
+
+// Memory that ran out, and a file that another process holds, are no answer.
+int RequireAnswer(int code, const std::string& path) {
+  if (code == VESK2_ERR_MEM_ALLOC || code == VESK2_ERR_READ_FILE) Check(code, Escape(path));
+  return code;
+}
+
+}  // namespace
+
 ChainState::ChainState(const CertChain& chain, const std::string& path) : proved_(nullptr) {
-  SExpression* const granted = ChainLinks(chain, path)[0].cert->GetTag();
-  const Ref<SExpression> everything = granted == nullptr ? ParseTag("(*)") : Ref<SExpression>();
+  const Ref<SExpression> tag = TagOf(ChainLinks(chain, path)[0]);
   const Ref<TimeStamp> now = ParseTime("now", false);
-  code_ = chain->Verify(nullptr, granted != nullptr ? granted : everything.get(), now.get(),
-                        now.get(), proved_);
-  if (code_ == VESK2_ERR_MEM_ALLOC || code_ == VESK2_ERR_READ_FILE) Check(code_, Escape(path));
+  code_ = RequireAnswer(chain->Verify(nullptr, tag.get(), now.get(), now.get(), proved_), path);
+}
+
+ChainState::ChainState(const CertChain& chain, const std::string& path, SExpression* acls,
+                       SExpression* lists)
+    : proved_(nullptr) {
+  const std::vector<ChainLink> links = ChainLinks(chain, path);
+  for (const ChainLink& link : links) {
+    const int code = RequireAnswer(link.signature->Verify(link.cert), path);
+    Check(proved_.AddCert(link.cert, link.signature, code), Escape(path));
+  }
+  const Ref<TimeStamp> now = ParseTime("now", false);
+  proved_.SetEntries(acls);
+  proved_.SetLists(lists, nullptr);
+  proved_.SetPeriod(now.get(), now.get());
+  Check(proved_.MarkRevoked(), Escape(path));
+  code_ = RequireAnswer(proved_.Judge(TagOf(links[0]).get()), path);
 }
 
 std::string ChainState::Revocation(size_t index) const {

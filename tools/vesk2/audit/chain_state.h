@@ -15,7 +15,10 @@ namespace vesk2_command {
 class ChainState {
  public:
   // Asks about what the first certificate grants, now.
-  explicit ChainState(const CertChain& chain, const std::string& path);
+  ChainState(const CertChain& chain, const std::string& path);
+  // The same of many chains: the entries and the lists were read already.
+  ChainState(const CertChain& chain, const std::string& path, SExpression* acls,
+             SExpression* lists);
 
   // The code of the verification: 0, or the first refusal; a code of the engine is negative.
   int code() const { return code_; }
