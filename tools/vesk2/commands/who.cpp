@@ -6,6 +6,7 @@
 #include "tools/vesk2/authority/search.h"
 #include "tools/vesk2/commands/command.h"
 #include "tools/vesk2/explain/effort.h"
+#include "tools/vesk2/page/page.h"
 #include "tools/vesk2/say/report.h"
 
 #include <vesk2/wording.h>
@@ -20,6 +21,7 @@ struct Options {
   std::string tag;
   HoldingsOptions holdings;
   SuppositionOptions supposed;
+  PageOptions page;
 };
 
 // A way, or somebody's authority, and when it ends.
@@ -222,7 +224,8 @@ Action DefineWho(OptionList& list) {
   list.Add("tag", options->tag, "What they may sign for; of a set, every member").Required();
   AddHoldingsOptions(list, options->holdings);
   AddSuppositionOptions(list, options->supposed);
-  return [options] { return Run(*options); };
+  AddPageOptions(list, options->page);
+  return WithPage(options->page, [options] { return Run(*options); });
 }
 
 }  // namespace vesk2_command

@@ -106,6 +106,9 @@ Graph::Graph(const Json& answer) {
   for (const Json& entry : Member(result, "acl")) AddEntry(entry);
   const Json& chain = Member(result, "chain");  // its end first
   for (size_t i = chain.size(); i-- > 0;) AddCertificate(chain[i]);
+  for (const char* signers : {"keys", "groups"}) {
+    for (const Json& each : Member(result, signers)) AddWays(each);
+  }
   AddAnswer(answer);
   bool cut = !edges_[answer_].cuts.empty();
   for (const Json& reason : Member(result, "lost")) {
@@ -175,6 +178,30 @@ void Graph::AddCertificate(const Json& certificate) {
   facts.push_back(RevocationFact(Member(certificate, "revocation")));
   Edge(issuer, subject, "certificate " + ValueText(number)).facts = std::move(facts);
   AddMembers(certificate, subject);
+}
+
+// Of an answer about who may sign: each way to a key, or to several together, is one step.
+void Graph::AddWays(const Json& signer) {
+  const bool several = !Member(signer, "members").is_null();
+  const std::string name =
+      several ? Member(signer, "members").dump() : ValueText(Member(signer, "key"));
+  const size_t node = Node(name, several ? "may sign together" : "may sign");
+  if (several) AddMembers({{"threshold", signer}}, node);
+  for (const Json& way : Member(signer, "ways")) {
+    std::string path;
+    for (const Json& step : Member(way, "path")) {
+      path += (path.empty() ? "" : ", then ") + ValueText(step);
+    }
+    GraphEdge& edge = Edge(kStore, node, path);
+    const std::string until = ValueText(Member(way, "until"));
+    edge.facts.push_back(until.empty() ? "it does not end by itself" : "until " + until);
+    edge.carries = true;
+    if (several) {
+      edge.facts.push_back(ValueText(Member(signer, "k")) + " of " +
+                           std::to_string(Member(signer, "members").size()) + " keys must agree");
+    }
+  }
+  if (several) nodes_[node].name = "any " + ValueText(Member(signer, "k")) + " keys of these";
 }
 
 // The last step: the tree as it is, or the question about who stands at the end of the chain.

@@ -45,6 +45,7 @@ class Graph {
   void AddMembers(const Json& grant, size_t node);
   void AddEntry(const Json& entry);
   void AddCertificate(const Json& certificate);
+  void AddWays(const Json& signer);
   void AddAnswer(const Json& answer);
   void Cut(const Json& reason);
   void CutAtHead(const std::string& text);
