@@ -146,7 +146,8 @@ def _entries(book: Book) -> None:
     one("open-after-tag", "an entry may end right after its tag", book.object(short, "entry"), True)
     one("fifo", "a pipe is no entry", {"fifo": 1}, False)
     files = {"global/acl/root.txt": book.object(short, "entry"), "chain.cert": leaf}
-    book.case("kinds/entry-other-name", "only files named .acl are entries", files, ask_chain(), nothing)
+    book.case("kinds/entry-other-name", "only files named .acl are entries", files, ask_chain(),
+              (library("ACL_ENTRY_NOT_FOUND"), command(1, "nothing-trusted")))
     files = {"global/acl/root.acl/": None, "chain.cert": leaf}
     book.case("kinds/entry-directory", "a directory is none", files, ask_chain(), nothing)
 

@@ -262,7 +262,7 @@ def _authority(book: Book) -> None:
     del nothing["global/acl/e1.acl"]
     book.case(
         "manifests/no-store", "nothing is trusted", nothing, ask_manifest(),
-        (library("FILE_NOT_FOUND"), command(2, "no-acl-store")),
+        (library("FILE_NOT_FOUND"), command(1, "nothing-trusted")),
     )
     book.case(
         "manifests/acl-directory", "an entry of a directory that is trusted beside",

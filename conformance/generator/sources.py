@@ -39,7 +39,7 @@ def _held(book: Book) -> None:
         ("other-tag", GOOD, {"tag": "calc (revoke some)"}, no("NOT_AUTHORIZED"), "a list of another source"),
         ("wider-tag", GOOD, {"tag": "calc"}, (library("NOT_AUTHORIZED"), command(2, "trouble")), "tags of lists end in (revoke ...), or are none"),
         ("blanks", GOOD, {"tag": "calc  (revoke all)"}, (library("NOT_AUTHORIZED"), command(0, "ok")), "the library compares the tag as text, the command as a tag"),
-        ("untagged", untagged, {}, (library("AUTH_TAG_MISSING"), command(1, "not-authorized")), "a list without a source: to the command, of another one"),
+        ("untagged", untagged, {}, (library("AUTH_TAG_MISSING"), command(1, "auth-tag-missing")), "a list without a source: to the command, of another one"),
         ("untagged-alone", untagged, {"tag": None}, nobody, "nobody is trusted with none"),
         ("stranger", revocations(STRANGER, TAG, DUMMY), {}, nobody, "a key that is not trusted with it"),
         ("other-entry", GOOD, {"sources": [entry(SOURCE, "other (revoke all)")]}, nobody, "its signer is trusted with another source"),
