@@ -39,6 +39,8 @@ grep -qxF "read $work/run/tree/one: DONE" said || fail "the tree is closed"
 grep -qxF "read $VESK2_GLOBAL/acl/vendor.acl: DONE" said || fail "the store is closed"
 mkdir certs && cp signer.cert certs
 tries cert verify certs/signer.cert --tag '(install (app calc))'
+tries who '(install (app calc))' --cert certs/signer.cert
+tries until certs/signer.cert --tag '(install (app calc))'
 tries show certs/signer.cert
 tries manifest show signed/tree.manifest
 tries store check

@@ -316,20 +316,31 @@ std::vector<Way> Search::FindWays(const Signers& signers, TimeStamp* at, size_t 
   return ways;
 }
 
-// The key itself; of a group each k that follow each other, without those that are revoked, whom
-// nobody should ask.
+// The key itself; of a group each choice of as many as must agree, with each of them as the signer,
+// up to a number of choices: what one member has of its own can make it the only signer. Those that
+// are revoked nobody should ask.
 void Search::ForEachChoice(
     const Signers& signers, TimeStamp* at,
     const std::function<bool(const std::vector<PublicKey*>&)>& goesOn) const {
+  constexpr size_t kMostChoices = 200;
   std::vector<PublicKey*> asked;
   for (const auto& key : signers.keys) {
     if (!signers.IsGroup() || !IsRevoked(*key, at)) asked.push_back(key.get());
   }
   if (asked.size() < signers.k) return;
-  for (size_t i = 0; i < asked.size(); ++i) {
-    if (!goesOn({asked.begin(), asked.begin() + static_cast<ptrdiff_t>(signers.k)})) return;
-    std::rotate(asked.begin(), asked.begin() + 1, asked.end());
-  }
+  std::vector<bool> chosen(asked.size());
+  std::fill_n(chosen.begin(), signers.k, true);
+  size_t choices = 0;
+  do {
+    std::vector<PublicKey*> keys;
+    for (size_t i = 0; i < asked.size(); ++i) {
+      if (chosen[i]) keys.push_back(asked[i]);
+    }
+    for (size_t i = 0; i < keys.size(); ++i) {
+      if (!goesOn(keys) || ++choices == kMostChoices) return;
+      std::rotate(keys.begin(), keys.begin() + 1, keys.end());
+    }
+  } while (std::prev_permutation(chosen.begin(), chosen.end()));
 }
 
 Signers Search::Agreeing(const Signers& signers, TimeStamp* at) const {

@@ -47,6 +47,13 @@ void AddSuppositionOptions(OptionList& list, SuppositionOptions& options) {
   list.Add("--if-without", options.without,
            "Answer as if this ACL entry were not there, named as acl list shows it");
   list.Add("--if-at", options.at, "Answer as if the clock showed this time");
+  if (std::none_of(list.options().begin(), list.options().end(),
+                   [](const Option& each) { return each.LongName() == "--at"; })) {
+    return;
+  }
+  for (const char* other : {"--at", "--not-before", "--not-after"}) {
+    list.Get("--if-at").Excludes(other);
+  }
 }
 
 bool IsHypothetical(const SuppositionOptions& options) {
@@ -75,20 +82,20 @@ Supposition::Supposition(const SuppositionOptions& options)
   if (!options.at.empty()) at_ = ParseTime(options.at, false);
   Json& told = Result()["hypothetical"] = {
       {"revoked", Json::array()}, {"without", Json::array()}, {"at", Json()}};
-  words_ = "hypothetically";
+  std::string words = "hypothetically";
   for (const std::string& argument : options.revoked) {
-    words_ += ", with " + Escape(argument) + " revoked";
+    words += ", with " + Escape(argument) + " revoked";
     told["revoked"].push_back(Escape(argument));
   }
   for (const std::string& name : without_) {
-    words_ += ", without " + Escape(name);
+    words += ", without " + Escape(name);
     told["without"].push_back(Escape(name));
   }
   if (at_) {
-    words_ += ", at " + StampText(*at_);
+    words += ", at " + StampText(*at_);
     told["at"] = StampText(*at_);
   }
-  words_ += ": ";
+  SetVerdictPrefix(words + ": ");
 }
 
 // As crl issue names it: a key without display hints, a certificate as it stands in its file.
@@ -146,6 +153,16 @@ void Supposition::Change(ZvVesk2::Evidence& evidence) const {
   if (!any_) return;
   evidence.SetEntries(Entries(evidence.GetEntries()).get());
   Revoke(evidence);
+}
+
+void Supposition::TellAsItIs(int code) {
+  TellAsItIs(code == 0, ReasonWord(code), code, Reason(code));
+}
+
+void Supposition::TellAsItIs(bool yes, const std::string& reason, int code,
+                             const std::string& why) {
+  Result()["as_it_is"] = {{"verdict", yes ? "yes" : "no"}, {"reason", reason}, {"code", code}};
+  Note("the answer is hypothetical; as things are: " + (yes ? "yes" : "no: " + why));
 }
 
 }  // namespace vesk2_command

@@ -22,6 +22,7 @@ struct SuppositionOptions {
   std::vector<std::string> without;
   std::string at;
 };
+// --if-at excludes the options of `list` that ask about another moment.
 void AddSuppositionOptions(OptionList& list, SuppositionOptions& options);
 // Whether any of them was given.
 bool IsHypothetical(const SuppositionOptions& options);
@@ -30,7 +31,7 @@ class Supposition {
  public:
   // Nothing is supposed.
   Supposition() = default;
-  // Reads what is named; the member "hypothetical" of the result tells of it.
+  // Reads what is named. Every verdict then begins with it, and the result tells of it.
   explicit Supposition(const SuppositionOptions& options);
   // These digests are revoked.
   explicit Supposition(std::vector<Ref<ZvVesk2::Hash>> revoked)
@@ -45,8 +46,9 @@ class Supposition {
   void Revoke(ZvVesk2::Evidence& evidence) const;
   // Both, for evidence that holds its entries; it must be judged anew.
   void Change(ZvVesk2::Evidence& evidence) const;
-  // "hypothetically, if X were revoked, without Y, at STAMP: "; empty when nothing is supposed.
-  const std::string& Words() const { return words_; }
+  // What the answer is as things are, which the result and a note tell beside the other.
+  static void TellAsItIs(int code);
+  static void TellAsItIs(bool yes, const std::string& reason, int code, const std::string& why);
 
  private:
   void AddRevoked(const std::string& argument);
@@ -55,7 +57,6 @@ class Supposition {
   std::vector<Ref<ZvVesk2::Hash>> revoked_;
   std::vector<std::string> without_;
   Ref<TimeStamp> at_;
-  std::string words_;
 };
 
 // ParseFingerprint reads "sha256:" and 64 digits; null for any other text.

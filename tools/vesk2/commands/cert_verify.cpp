@@ -1,5 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // cert_verify.cpp: vesk2 cert verify.
+#include "tools/vesk2/authority/change.h"
+#include "tools/vesk2/authority/supposition.h"
 #include "tools/vesk2/commands/command.h"
 #include "tools/vesk2/commands/no_store.h"
 #include "tools/vesk2/confine/confine.h"
@@ -26,35 +28,58 @@ struct Options {
   bool explain = false;
   StoreCheck stores;
   PageOptions page;
+  SuppositionOptions supposed;
 };
 
-Period AskedPeriod(const Options& options) {
+Period AskedPeriod(const Options& options, const Supposition& supposition) {
+  if (!options.supposed.at.empty()) return {supposition.Now(), supposition.Now()};
   const bool open = options.period.notBefore.empty() && options.period.notAfter.empty();
   return ParseMoment(options.period, options.at.empty() && open ? "now" : options.at);
+}
+
+void RequireAnswer(const Question& question, int code) {
+  if (code >= 0 && code != VESK2_ERR_MEM_ALLOC && code != VESK2_ERR_READ_FILE) return;
+  if (code < 0) ExplainTrouble(question, code);
+  Check(code, InputName(question.file));
+}
+
+// The same evidence with what is supposed, and what the answer is without.
+int Suppose(const Question& question, const Options& options, const Supposition& supposition,
+            ZvVesk2::Evidence& proved) {
+  ZvVesk2::Evidence now(nullptr);
+  Check(now.Copy(proved), "judging a supposition");
+  const Period period = AskedPeriod(options, Supposition());
+  if (!options.supposed.at.empty()) now.SetPeriod(period.notBefore.get(), period.notAfter.get());
+  Supposition::TellAsItIs(JudgeMembers(now, *question.request));
+  supposition.Change(proved);
+  return proved.Judge(question.request->members[0].tag.get());
 }
 
 // The answer about every member; the first refusal is the answer to all. None where no entry could
 // be loaded.
 std::optional<int> VerifyMembers(const CertChain& chain, const Question& question,
-                                 const StoreCheck& stores, ZvVesk2::Evidence& proved) {
+                                 const Options& options, const Supposition& supposition,
+                                 ZvVesk2::Evidence& proved) {
   const Request& request = *question.request;
   int first = 0;
   for (size_t i = 0; i < request.members.size(); ++i) {
     SExpression* tag = request.members[i].tag.get();
-    const int code = i != 0 ? proved.Judge(tag)
-                            : chain->Verify(nullptr, tag, question.period.notBefore.get(),
-                                            question.period.notAfter.get(), proved);
-    if (code == VESK2_ERR_MEM_ALLOC || code == VESK2_ERR_READ_FILE)
-      Check(code, InputName(question.file));
-    if (proved.GetEntries() == nullptr) return std::nullopt;
-    if (code < 0) {
-      ExplainTrouble(question, code);
-      Check(code, InputName(question.file));
+    int code = i != 0 ? proved.Judge(tag)
+                      : chain->Verify(nullptr, tag, question.period.notBefore.get(),
+                                      question.period.notAfter.get(), proved);
+    if (proved.GetEntries() == nullptr && code >= 0 && code != VESK2_ERR_MEM_ALLOC &&
+        code != VESK2_ERR_READ_FILE) {
+      return std::nullopt;
     }
+    RequireAnswer(question, code);
     if (i == 0) DetailEvidence(question);
     Detail("authority for " + Escape(request.members[i].text) + ": " +
            (code == 0 ? "granted" : Reason(code)));
-    if (i == 0) (void)CheckStores(question, stores);
+    if (i == 0) {
+      (void)CheckStores(question, options.stores);
+      if (supposition.Any()) code = Suppose(question, options, supposition, proved);
+      RequireAnswer(question, code);
+    }
     TellMember(request, i, code);
     if (first == 0) first = code;
   }
@@ -62,14 +87,19 @@ std::optional<int> VerifyMembers(const CertChain& chain, const Question& questio
 }
 
 ExitCode Run(const Options& options) {
-  Result() = {{"about", Json()}, {"subject", Json()}, {"tag", Json()}};
+  Result() = {{"about", Json()},
+              {"subject", Json()},
+              {"tag", Json()},
+              {"hypothetical", Json()},
+              {"as_it_is", Json()}};
   StartExplanation();
   StartAnswer();
   const Request request = ParseRequest(options.tag);
   Question question;
   question.file = options.file;
   question.request = &request;
-  question.period = AskedPeriod(options);
+  const Supposition supposition(options.supposed);
+  question.period = AskedPeriod(options, supposition);
   Result()["about"] = {{"file", InputName(options.file)}};
   Result()["about"].update(PeriodJson(question.period));
   const CertChain chain = ReadCertChain(options.file);
@@ -81,7 +111,7 @@ ExitCode Run(const Options& options) {
   Result()["tag"] = tag;
   ZvVesk2::Evidence proved(nullptr);
   question.proved = &proved;
-  const std::optional<int> code = VerifyMembers(chain, question, options.stores, proved);
+  const std::optional<int> code = VerifyMembers(chain, question, options, supposition, proved);
   if (!code) return RefuseWithoutStore(question, VESK2_ERR_ACL_ENTRY_NOT_FOUND);
   if (*code != 0) {
     const ExitCode verdict = No(*code, CodeWords(*code));
@@ -107,6 +137,7 @@ Action DefineCertVerify(OptionList& list) {
   AddMomentOptions(list, options->period, options->at, "Authorized at this moment [now]");
   AddStoreCheckOptions(list, options->stores);
   list.Add("--explain", options->explain, "Tell why also when the answer is yes");
+  AddSuppositionOptions(list, options->supposed);
   AddPageOptions(list, options->page);
   return WithPage(options->page, [options] { return Run(*options); });
 }

@@ -48,8 +48,9 @@ void AddAuthorityOptions(OptionList& list, AuthorityOptions& options) {
 }
 
 void StartTreeResult() {
-  for (const char* member : {"about", "tag", "signer", "signed_at", "counts", "changed", "missing",
-                             "links_out", "unlisted", "ignored", "ignored_nothing", "floor"}) {
+  for (const char* member :
+       {"about", "hypothetical", "as_it_is", "tag", "signer", "signed_at", "counts", "changed",
+        "missing", "links_out", "unlisted", "ignored", "ignored_nothing", "floor"}) {
     Result()[member] = Json();
   }
   StartExplanation();
@@ -62,7 +63,7 @@ bool JudgedTree(const ZvVesk2::Manifest& manifest, int code) {
 
 ManifestAuthority::ManifestAuthority(const AuthorityOptions& options,
                                      std::vector<std::string> signing)
-    : options_(options), request_(ParseRequest(options.tag)) {
+    : options_(options), request_(ParseRequest(options.tag)), supposition_(options.supposed) {
   question_.file = options.manifest;
   question_.manifest = true;
   question_.request = &request_;
@@ -73,7 +74,8 @@ ManifestAuthority::ManifestAuthority(const AuthorityOptions& options,
   Result()["tag"] = TagText(request_.tag.get());
   Result()["about"]["file"] = InputName(options.manifest);
   Result()["about"].update(PeriodJson(question_.period));
-  floor_.emplace(options.floor, *request_.tag, IsAboutToday(options) && !options.noStoreUpdate);
+  floor_.emplace(options.floor, *request_.tag,
+                 IsAboutToday(options) && !options.noStoreUpdate && !IsHypothetical());
 }
 
 void ManifestAuthority::Initialize(ZvVesk2::Manifest& manifest, const std::string& directory,
@@ -102,8 +104,9 @@ std::optional<ExitCode> ManifestAuthority::Judge(const ZvVesk2::Manifest& manife
   if (IsAboutStore(code)) return RefuseWithoutStore(question_, code);
   if (code != 0 && !IsRefusal(code)) ThrowTrouble(manifest, code);
   broken_ = CheckStores(question_, options_.stores);
-  if (IsAboutToday(options_)) today_.emplace(proved_, *ParseTime("now", false));
-  const int refused = JudgeMembers(code);
+  if (IsHypothetical()) code = Suppose(code);
+  if (IsAboutToday(options_)) today_.emplace(proved_, *supposition_.Now());
+  const int refused = JudgeAll(code);
   if (refused != 0) return Refuse(refused);
   return RefuseTime();
 }
@@ -113,8 +116,27 @@ void ManifestAuthority::ThrowTrouble(const ZvVesk2::Manifest& manifest, int code
   ThrowUnreadable(options_.manifest, manifest, code);
 }
 
+// The same evidence with what is supposed, after the answer without.
+int ManifestAuthority::Suppose(int code) {
+  if (code == 0 && IsAboutToday(options_)) {
+    const Today today(proved_, *ParseTime("now", false));
+    for (const Request::Member& member : request_.members) {
+      if (code == 0) code = JudgeMember(member.tag.get());
+      if (code == 0) code = today.Judge(member.tag.get());
+    }
+  }
+  if (code == 0 && IsAboutToday(options_) && IsSignedInFuture(proved_, *ParseTime("now", false))) {
+    Supposition::TellAsItIs(false, "signed-in-future", 0, "its time of signing is yet to come");
+  } else {
+    Supposition::TellAsItIs(code);
+  }
+  supposition_.Change(proved_);
+  Check(proved_.MarkRevoked(), "judging a supposition");
+  return JudgeMember(request_.members[0].tag.get());
+}
+
 // The first refusal of a member of the asked set; `first` is the library's for the first member.
-int ManifestAuthority::JudgeMembers(int first) {
+int ManifestAuthority::JudgeAll(int first) {
   int refused = 0;
   for (size_t i = 0; i < request_.members.size(); ++i) {
     int code = i == 0 ? first : JudgeMember(request_.members[i].tag.get());
@@ -151,7 +173,7 @@ ExitCode ManifestAuthority::Refuse(int code) {
 }
 
 std::optional<ExitCode> ManifestAuthority::RefuseTime() {
-  if (today_ && IsSignedInFuture(proved_, *ParseTime("now", false))) {
+  if (today_ && IsSignedInFuture(proved_, *supposition_.Now())) {
     Keep(false);
     return No("signed-in-future", "the manifest says it was signed at " +
                                       StampText(*proved_.GetSigningTime()) +
@@ -163,7 +185,7 @@ std::optional<ExitCode> ManifestAuthority::RefuseTime() {
 }
 
 void ManifestAuthority::Keep(bool yes) const {
-  if (!options_.noStoreUpdate) KeepLists(proved_, yes, broken_);
+  if (!options_.noStoreUpdate && !IsHypothetical()) KeepLists(proved_, yes, broken_);
 }
 
 std::optional<ExitCode> ManifestAuthority::RaiseFloor(const std::function<void()>& accept) {
@@ -173,7 +195,8 @@ std::optional<ExitCode> ManifestAuthority::RaiseFloor(const std::function<void()
 std::string ManifestAuthority::SignedText() const {
   const bool aboutSigning = today_ || options_.at == kSigning;
   return "as signed at " + StampText(*proved_.GetSigningTime()) + " by " +
-         Fingerprint(*proved_.GetCert(0)->GetIssuer()) + (aboutSigning ? EndedSince(proved_) : "");
+         Fingerprint(*proved_.GetCert(0)->GetIssuer()) +
+         (aboutSigning ? EndedSince(proved_, *supposition_.Now()) : "");
 }
 
 void ManifestAuthority::TellYes() {

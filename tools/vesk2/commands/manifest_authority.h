@@ -11,6 +11,7 @@
 #include <string>
 #include <vector>
 
+#include "tools/vesk2/authority/supposition.h"
 #include "tools/vesk2/explain/evidence.h"
 #include "tools/vesk2/options/options.h"
 #include "tools/vesk2/say/report.h"
@@ -32,6 +33,7 @@ struct AuthorityOptions {
   bool explain = false;
   StoreCheck stores;
   FloorOptions floor;
+  SuppositionOptions supposed;  // declared by the commands that take them
 };
 // The manifest and the other operands are the command's own to declare.
 void AddAuthorityOptions(OptionList& list, AuthorityOptions& options);
@@ -54,6 +56,8 @@ class ManifestAuthority {
   // The period to ask about, in seconds; 0 where it is open.
   long First() const;
   long Last() const;
+  // Whether the answer is about a machine that differs from this one: it is to change nothing.
+  bool IsHypothetical() const { return supposition_.Any(); }
   // For Manifest::SetEvidence, of the verification that Judge is told of.
   ZvVesk2::Evidence& proved() { return proved_; }
 
@@ -80,13 +84,15 @@ class ManifestAuthority {
   // Explains by what is known today, where that is what was asked.
   void TellGrant();
   [[noreturn]] void ThrowTrouble(const ZvVesk2::Manifest& manifest, int code) const;
-  int JudgeMembers(int first);
+  int Suppose(int code);
+  int JudgeAll(int first);
   int JudgeMember(SExpression* tag) const;
   ExitCode Refuse(int code);
   std::optional<ExitCode> RefuseTime();
 
   const AuthorityOptions& options_;
   Request request_;
+  Supposition supposition_;
   Question question_;
   ZvVesk2::Evidence proved_{nullptr};
   std::optional<Today> today_;

@@ -262,7 +262,7 @@ ExitCode Run(const Options& options) {
   const int code = subject->Judge(now.get());
   const std::optional<long> change = subject->AllMoments().FirstChange(
       now->ToTime(), [&](TimeStamp* at) { return subject->Judge(at) == 0; });
-  std::string text = supposition.Words() + subject->Name();
+  std::string text = subject->Name();
   if (code == 0) text += " is authorized for " + tag;
   if (code != 0) text += " is not authorized for " + tag + ": " + CodeWords(code);
   if (!change) {

@@ -206,9 +206,8 @@ ExitCode Run(const Options& options) {
   answer.Complete();
   std::set<std::string> now;
   if (supposition.Any()) now = NamesNow(holdings, request);
-  const ExitCode verdict = answer.IsEmpty()
-                               ? No("nobody", supposition.Words() + "nobody may sign for " + tag)
-                               : Yes(supposition.Words() + answer.Summary() + tag);
+  const ExitCode verdict =
+      answer.IsEmpty() ? No("nobody", "nobody may sign for " + tag) : Yes(answer.Summary() + tag);
   answer.Tell();
   if (supposition.Any()) {
     TellDifference(now, answer.Names(), "no_longer", "no longer: ");

@@ -97,7 +97,7 @@ Request ParseRequest(const std::string& text) {
 void TellMember(const Request& request, size_t index, int code) {
   if (request.members.size() < 2) return;
   const std::string tag = Escape(request.members[index].text);
-  Say("member " + tag + ": " + (code == 0 ? "yes" : "no: " + Reason(code)));
+  Say(VerdictPrefix() + "member " + tag + ": " + (code == 0 ? "yes" : "no: " + Reason(code)));
   Result()["members"].push_back({{"tag", tag},
                                  {"verdict", code == 0 ? "yes" : "no"},
                                  {"reason", ReasonWord(code)},

@@ -29,6 +29,7 @@ struct State {
   std::string reason;
   int code = 0;
   std::string message;
+  std::string prefix;
   std::string file;
   std::optional<uint64_t> byte;
   std::vector<std::string> notes;
@@ -106,24 +107,28 @@ bool CollectsFacts() { return report.collects || report.style.json; }
 Json& Result() { return report.result; }
 Json OrNull(const std::string& text) { return text.empty() ? Json() : Json(text); }
 
+void SetVerdictPrefix(const std::string& words) { report.prefix = words; }
+const std::string& VerdictPrefix() { return report.prefix; }
+
 ExitCode Yes(const std::string& text) {
-  report.message = WithNames(text);
-  Say(Colored("yes", kGreen) + ": " + text);
+  report.message = WithNames(report.prefix + text);
+  Say(Colored("yes", kGreen) + ": " + report.prefix + text);
   return kYes;
 }
 
 ExitCode No(int code, const std::string& text) {
   report.reason = ReasonWord(code);
   report.code = code;
-  report.message = WithNames(text);
-  Say(Colored("no", kRed) + ": " + (text.empty() ? "" : text + " ") + "(" + CodeName(code) + ")");
+  report.message = WithNames(report.prefix + text);
+  const std::string said = report.prefix + text;
+  Say(Colored("no", kRed) + ": " + (said.empty() ? "" : said + " ") + "(" + CodeName(code) + ")");
   return kNo;
 }
 
 ExitCode No(const std::string& reason, const std::string& text) {
   report.reason = reason;
-  report.message = WithNames(text);
-  Say(Colored("no", kRed) + ": " + text);
+  report.message = WithNames(report.prefix + text);
+  Say(Colored("no", kRed) + ": " + report.prefix + text);
   return kNo;
 }
 

@@ -95,6 +95,9 @@ ExitCode No(const std::string& reason, const std::string& text);
 // What has been said so far, as --json writes it. RecordTrouble makes trouble of it.
 Json MakeAnswer(ExitCode code);
 void RecordTrouble(const Trouble& trouble);
+// SetVerdictPrefix has every verdict of this answer begin with these words: what it supposes.
+void SetVerdictPrefix(const std::string& words);
+const std::string& VerdictPrefix();
 
 // FinishReport writes the answer for machines and flushes standard output: a verdict that could not
 // be written is trouble. Its result is the exit status.

@@ -55,12 +55,11 @@ bool IsSignedInFuture(const ZvVesk2::Evidence& proved, const TimeStamp& now) {
   return signedAt != nullptr && signedAt->IsAfter(latest.get());
 }
 
-std::string EndedSince(const ZvVesk2::Evidence& proved) {
-  const Ref<TimeStamp> now = ParseTime("now", false);
+std::string EndedSince(const ZvVesk2::Evidence& proved, const TimeStamp& now) {
   std::string text;
   for (size_t i = 0; i < proved.CountCerts(); ++i) {
     const TimeStamp* end = proved.GetCert(i)->GetNotAfter();
-    if (end == nullptr || !end->IsBefore(now.get())) continue;
+    if (end == nullptr || !end->IsBefore(&now)) continue;
     text += "; certificate " + std::to_string(i + 1) + " ended at " + StampText(*end);
   }
   return text;

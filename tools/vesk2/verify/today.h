@@ -34,8 +34,8 @@ class Today {
 inline constexpr long kClockDifference = 300;
 // Whether a manifest claims to be signed later than that.
 bool IsSignedInFuture(const ZvVesk2::Evidence& proved, const TimeStamp& now);
-// "; certificate 2 ended at STAMP" for each certificate that has ended since the signing.
-std::string EndedSince(const ZvVesk2::Evidence& proved);
+// "; certificate 2 ended at STAMP" for each certificate that has ended by then.
+std::string EndedSince(const ZvVesk2::Evidence& proved, const TimeStamp& now);
 
 }  // namespace vesk2_command
 
