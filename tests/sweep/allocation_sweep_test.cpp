@@ -655,6 +655,21 @@ std::vector<Case> ManifestCases() {
                WriteManifest(cert.get(), signature.get(), list.get(), time.get(), null.get())};
          };
        }},
+      // Each call says by itself that the writer was not made.
+      {"ManifestWriter::SetHead",
+       [] {
+         return [time = KeptAs<TimeStamp>(Str(kFrom))] {
+           ManifestWriter writer(nullptr);
+           return Outcome{writer.SetHead("creator", time.get())};
+         };
+       }},
+      Plain("ManifestWriter::SignedDigest of nothing",
+            [] {
+              ManifestWriter writer(nullptr);
+              Ref<Hash> digest;
+              const int code = writer.SignedDigest(digest.Out(), ZVCLM_HASH_SHA256);
+              return Outcome::Of(code, VESK2_ERR_INVALID_PARAM);
+            }),
       // Whole directories on either side: none is passed over.
       {"CompareManifest of what differs",
        [make] {
