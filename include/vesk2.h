@@ -410,7 +410,7 @@ typedef struct Vesk2ReasonStruct {
 typedef struct Vesk2ExplanationStruct {
   uint32_t size;              /* sizeof the library's record; members may be added at its end */
   int32_t code;               /* the answer */
-  int32_t isComplete;         /* 0 when looking for reasons was stopped, for what it cost */
+  int32_t isComplete;         /* 0 when looking was stopped, for what it cost or lacked */
   Vesk2ReasonStruct* reasons; /* in a chain, the first place where authority was lost first */
   /* Of a manifest. The numbers are 0 unless the tree was compared. */
   char* signer;     /* the fingerprint of the key that signed it; null unless its signature holds */

@@ -95,8 +95,10 @@ bool ExplanationState::Afford(uint64_t bytes) {
 }
 
 // That there was no memory for one question is the explanation's failure, and no "no".
-int ExplanationState::ProveMembers(Evidence& changed) const {
+int ExplanationState::ProveMembers(Evidence& changed) {
   const int code = EachMember([&](SExpression* member) { return changed.Prove(member); });
+  constexpr int kNoEngine = 16386;  // it had no memory to begin with
+  if (code == SPKI_ERR_NO_MEM || code == kNoEngine) complete = false;
   return LacksMemory(code) ? VESK2_ERR_MEM_ALLOC : code;
 }
 

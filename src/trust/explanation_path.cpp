@@ -35,6 +35,7 @@ int ExplanationPath::FindEntry() {
     if (!state_.Afford(evidence_.Size())) return 0;
     bool granted = false;
     VESK2_TRY(GrantAlone(granted, entry));
+    if (!state_.complete) return 0;  // whether it grants is not known
     if (granted) state_.entry = entry;
   }
   return 0;

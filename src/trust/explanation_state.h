@@ -36,8 +36,9 @@ struct ExplanationState {
   // Runs `ask` on each tag that must be granted until it returns anything but 0.
   template <typename Ask>
   [[nodiscard]] int EachMember(Ask ask) const;
-  // The code of the first tag that the evidence does not prove.
-  [[nodiscard]] int ProveMembers(Evidence& changed) const;
+  // The code of the first tag that the evidence does not prove. A reduction that ran out of memory
+  // or of work has not found out: the explanation is incomplete then.
+  [[nodiscard]] int ProveMembers(Evidence& changed);
 
   // ---- What it may cost ----
   // From here on the explanation pays; what it cost to index the question is bounded by the

@@ -591,7 +591,8 @@ std::vector<Case> FlatCases() {
            const int code = VerifyManifestExplained(manifest.get(), 0, 0, &why);
            const bool fits =
                why == nullptr ||
-               (why->code == code && (code != 0 || (why->valid == 1 && why->entry != nullptr)));
+               (why->code == code &&
+                (code != 0 || (why->valid == 1 && (why->entry != nullptr || !why->isComplete))));
            Vesk2FreeExplanation(why);
            return Outcome{code, fits && (code != 0 || manifest->GetListing() != nullptr)};
          };
