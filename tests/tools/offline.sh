@@ -3,7 +3,7 @@
 # offline.sh COMMAND SESSION...: runs the sessions with every system call of the command that could
 # reach the network or change a file on record. No command may open a socket, and verifications may
 # change nothing but the machine's revocation lists, not even those with --no-store-update, and a
-# floor that they are asked to keep.
+# floor or a report that they are asked for.
 set -u
 here=$(cd "$(dirname "$0")" && pwd)
 logs=$(mktemp -d) || exit 1
@@ -55,7 +55,10 @@ for log in "$logs"/log.??????; do
     *) sed -i '\|/global/cert[/"]|d' "$logs/changes" ;;
   esac
   case $(cat "$log.words") in
-    *--floor* | *--remember*) sed -Ei '\,/home"|/floor[/"]|[.]lock"|/[.]vesk2-|O_TMPFILE,d' "$logs/changes" ;;
+    *--floor* | *--remember*) sed -Ei '\,/home"|/floor[/"]|[.]lock"|[.]tmp-|O_TMPFILE,d' "$logs/changes" ;;
+  esac
+  case $(cat "$log.words") in
+    *--report*) sed -Ei '\,[.]html["].|[.]html[.]tmp-|O_TMPFILE,d' "$logs/changes" ;;
   esac
   [ ! -s "$logs/changes" ] || { cat "$logs/changes"; report "changes a file"; }
 done

@@ -90,7 +90,7 @@ void LoadStores(ZvVesk2::Evidence& evidence, const std::string& aclDirectory) {
   Ref<SExpression> entries;
   const int code = ZvVesk2::AclEntry::Import(entries.Out(), nullptr, more);
   if (code == VESK2_ERR_MEM_ALLOC) throw std::bad_alloc();
-  if (code != 0) ThrowNoStore(code);
+  if (code != 0) entries = NoEntries(aclDirectory, code);
   Ref<SExpression> stored;
   Check(ZvVesk2::CrlSequence::ImportStore(stored.Out(), entries.get(), nullptr),
         "the store of revocation lists");

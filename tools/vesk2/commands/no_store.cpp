@@ -36,8 +36,7 @@ ExitCode RefuseWithoutStore(Question& question, int code) {
   const ExitCode verdict =
       No("nothing-trusted", "this machine trusts nobody: there is no entry in its ACL store, " +
                                 Escape(AclDirectory()));
-  Note(
-      "vesk2 acl grant and acl install make entries; --global and VESK2_GLOBAL name another store");
+  TellHowToTrust();
   ExplainWithoutEntries(question);
   return verdict;
 }

@@ -154,7 +154,10 @@ class ChainSubject : public FileSubject {
     const int code =
         chain->Verify(nullptr, request.members.at(0).tag.get(), now.get(), now.get(), proved_);
     if (code == VESK2_ERR_MEM_ALLOC || code == VESK2_ERR_READ_FILE) Check(code, Escape(path_));
-    if (proved_.GetEntries() == nullptr) ThrowNoStore(VESK2_ERR_ACL_ENTRY_NOT_FOUND);
+    if (proved_.GetEntries() == nullptr) {
+      proved_.SetEntries(NoEntries("", VESK2_ERR_ACL_ENTRY_NOT_FOUND).get());
+      proved_.SetLists(nullptr, proved_.GetCarriedLists());
+    }
     if (code < 0) Check(code, Escape(path_));
     CheckAndChange(options, supposition, false);
   }

@@ -91,7 +91,7 @@ class Answer {
   }
 
   void Tell() const {
-    Json& keys = Result()["keys"] = Json::array();
+    Json& keys = Result()["may_sign"] = Json::array();
     Json& groups = Result()["groups"] = Json::array();
     for (const Found& each : found_) {
       (each.signers.IsGroup() ? groups : keys).push_back(ToJson(each));
@@ -192,7 +192,7 @@ void TellDifference(const std::set<std::string>& from, const std::set<std::strin
 
 ExitCode Run(const Options& options) {
   Result()["tag"] = Json();
-  for (const char* member : {"hypothetical", "keys", "groups", "no_longer", "newly"}) {
+  for (const char* member : {"hypothetical", "may_sign", "groups", "no_longer", "newly"}) {
     Result()[member] = Json();
   }
   StartSearch();

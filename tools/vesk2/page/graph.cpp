@@ -106,7 +106,7 @@ Graph::Graph(const Json& answer) {
   for (const Json& entry : Member(result, "acl")) AddEntry(entry);
   const Json& chain = Member(result, "chain");  // its end first
   for (size_t i = chain.size(); i-- > 0;) AddCertificate(chain[i]);
-  for (const char* signers : {"keys", "groups"}) {
+  for (const char* signers : {"may_sign", "groups"}) {
     for (const Json& each : Member(result, signers)) AddWays(each);
   }
   AddAnswer(answer);

@@ -65,4 +65,15 @@ void ThrowNoStore(int code) {
   throw trouble;
 }
 
+void TellHowToTrust() {
+  Note(
+      "vesk2 acl grant and acl install make entries; --global and VESK2_GLOBAL name another store");
+}
+
+Ref<SExpression> NoEntries(const std::string& extraDirectory, int code) {
+  if (!HasNoStore(extraDirectory)) ThrowNoStore(code);
+  TellHowToTrust();
+  return ListOf({}, "acl");
+}
+
 }  // namespace vesk2_command

@@ -20,6 +20,10 @@ std::vector<std::string> ExplainStore();
 // directory that is trusted beside it, if one was named. What is there and cannot be read is no
 // absence.
 bool HasNoStore(const std::string& extraDirectory);
+// NoEntries answers for a store from which no entry could be loaded: an empty list, and how to make
+// entries noted, where there is none; else ThrowNoStore.
+Ref<SExpression> NoEntries(const std::string& extraDirectory, int code);
+void TellHowToTrust();
 // Notes why there is no entry, and throws the Trouble for a store without which nothing can be
 // answered.
 [[noreturn]] void ThrowNoStore(int code);
