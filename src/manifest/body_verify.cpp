@@ -125,12 +125,16 @@ int FileHashing::HashOne(int& state, const FileChunk& chunk, const BodyFile& fil
 // goes as deep as the listing nests, which its reader bounds.
 class FindingTree {
  public:
-  FindingTree(DiskWalk& walk, Findings& findings) : walk_(walk), findings_(findings) {}
+  // Of files that were told of, the listing forgets what it says, unless it is to be kept: a
+  // million records then stand where a million entries stood.
+  FindingTree(DiskWalk& walk, Findings& findings, bool keepListing)
+      : walk_(walk), findings_(findings), keepListing_(keepListing) {}
 
   // Collects the statuses found in one directory.
   [[nodiscard]] int Directory(StatusSet& statuses) {
     const std::unique_ptr<DirectoryFound> found = walk_.TakeFound();
     VESK2_TRY(Files(*found, statuses));
+    if (!keepListing_) found->directory->GetFiles().clear();
     VESK2_TRY(Subdirectories(*found->directory, statuses));
     return Unlisted(*found, statuses);
   }
@@ -142,6 +146,7 @@ class FindingTree {
 
   DiskWalk& walk_;
   Findings& findings_;
+  const bool keepListing_;
 };
 
 // A file that could not be opened is missing, as what is no regular file is: both are not there as
@@ -248,8 +253,9 @@ int Manifest::CheckListing(std::unique_ptr<BodyDirectory> root) {
   const Vesk2TaskRunner* const runner = taskRunner.run != nullptr ? &taskRunner : nullptr;
   FileHashing hashing(*root, *this, runner, call);
   int checked = hashing.Run(runner);
-  if (checked == 0) checked = FindingTree(hashing.Walk(), findings).Directory(statuses);
-  if (evidence != nullptr) listing = std::move(root);
+  const bool keep = evidence != nullptr;
+  if (checked == 0) checked = FindingTree(hashing.Walk(), findings, keep).Directory(statuses);
+  if (keep) listing = std::move(root);
   VESK2_TRY(checked);
   VESK2_TRY(Publish(findings));
   return statuses.Code();

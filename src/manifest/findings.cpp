@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-// Recording findings, and handing them to the manifest's four lists. A finding costs one record and
-// its name. Reasons are few and are kept apart, sorted by record, so that a million records need no
-// member for them.
+// Recording findings, and handing them to the manifest's four lists. A finding costs one record,
+// which holds its name. Reasons are few and are kept apart, sorted by record, so that a million
+// records need no member for them.
 #include "src/manifest/findings.h"
 
 #include <algorithm>
@@ -10,6 +10,7 @@
 #include <vesk2/manifest.h>
 
 #include "src/frame/check.h"
+#include "src/frame/file_item.h"
 #include "src/platform/text.h"
 
 namespace ZvVesk2 {
@@ -25,13 +26,11 @@ int StatusSet::Code() const {
 
 int Findings::AddFile(const BodyDirectory& directory, const char* name, uint32_t status,
                       StatusSet& statuses, int reason) {
-  std::unique_ptr<char[]> path(ZVsysutil::zv_join_path(directory.GetName(), name));
-  return Add(std::move(path), false, status, statuses, reason);
+  return Add(FileItemOfPath(directory.GetName(), name), false, status, statuses, reason);
 }
 
 int Findings::AddDirectory(const char* path, uint32_t status, StatusSet& statuses, int reason) {
-  std::unique_ptr<char[]> copy(ZVsysutil::zv_fstrdup(path));
-  return Add(std::move(copy), true, status, statuses, reason);
+  return Add(FileItemOfPath(nullptr, path), true, status, statuses, reason);
 }
 
 // The fourth is for what is too much, and there is no fifth.
@@ -41,14 +40,11 @@ Findings::List& Findings::ListOf(uint32_t status) {
   return status == BodyObject::Missing ? missing_ : extra_;
 }
 
-// The record is made before anything changes; it then goes to the front, which costs nothing
-// however long the list is.
-int Findings::Add(std::unique_ptr<char[]> name, bool isDirectory, uint32_t status,
-                  StatusSet& statuses, int reason) {
-  VESK2_REQUIRE(name, VESK2_ERR_MEM_ALLOC);
-  FileItemList made(FileItemCreate(name.get(), nullptr));
+// The record goes to the front, which costs nothing however long the list is.
+int Findings::Add(FileItem* record, bool isDirectory, uint32_t status, StatusSet& statuses,
+                  int reason) {
+  FileItemList made(record);
   VESK2_REQUIRE(made, VESK2_ERR_MEM_ALLOC);
-  static_cast<void>(name.release());
   made->isDirectory = isDirectory ? 1 : 0;
   if (reason != 0) VESK2_TRY(AddReason(made.get(), reason));
   List& list = ListOf(status);

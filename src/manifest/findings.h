@@ -45,8 +45,9 @@ class Findings {
     FileItemList items;
     FileItem* last = nullptr;
   };
-  [[nodiscard]] int Add(std::unique_ptr<char[]> name, bool isDirectory, uint32_t status,
-                        StatusSet& statuses, int reason);
+  // Takes over the record; null stands for no memory.
+  [[nodiscard]] int Add(FileItem* record, bool isDirectory, uint32_t status, StatusSet& statuses,
+                        int reason);
   [[nodiscard]] int AddReason(const FileItem* item, int reason);
   List& ListOf(uint32_t status);
 

@@ -3,12 +3,14 @@
 #include <vesk2/context.h>
 #include <vesk2/file_item.h>
 
+#include <array>
 #include <cstring>
 #include <string>
 #include <utility>
 
 #include <gtest/gtest.h>
 
+#include "src/frame/file_item.h"
 #include "src/platform/text.h"
 
 namespace ZvVesk2 {
@@ -52,6 +54,23 @@ TEST(FileItem, TheMissingFormIsDerived) {
     item->next = std::exchange(chain, item);
   }
   EXPECT_EQ(FileItemDelete(chain), 2u);
+}
+
+// Records of both kinds stand in one chain, and one call frees them.
+TEST(FileItem, OfAPathHoldsItsName) {
+  FileItem* chain = FileItemCreate(ZVsysutil::zv_strdup("its own"), nullptr);
+  for (const auto& [directory, name, path] : {std::array{(const char*)nullptr, "a", "a"},
+                                              {"", "a", "a"},
+                                              {"d", "a", "d/a"},
+                                              {"d/", "a", "d/a"},
+                                              {"/", "a", "/a"},
+                                              {"d", "", "d"}}) {
+    FileItem* item = FileItemOfPath(directory, name);
+    EXPECT_STREQ(item->name, path);
+    EXPECT_TRUE(item->size == 28 && item->nameA == item->name && item->isDirectory == 0);
+    item->next = std::exchange(chain, item);
+  }
+  EXPECT_EQ(FileItemDelete(chain), 7u);
 }
 
 }  // namespace
