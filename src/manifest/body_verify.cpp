@@ -26,7 +26,6 @@
 namespace ZvVesk2 {
 namespace {
 
-using ZVsysutil::zv_join_path;
 using ZVsysutil::ZvLocked;
 
 // Hashes the listed files. Any number of threads take part in it. The lock guards the walk and the
@@ -98,15 +97,15 @@ int FileHashing::Hash(const FileChunk& chunk, FileDigester& digester) {
 int FileHashing::HashOne(int& state, const FileChunk& chunk, const BodyFile& file,
                          FileDigester& digester) {
   const char* const directory = chunk.found->directory->GetName();
-  std::unique_ptr<char[]> path;  // of which only some have need
-  if (chunk.open == nullptr || manifest_.GetFileCallbacks() != nullptr) {
-    path.reset(zv_join_path(directory, file.GetName()));
-    VESK2_REQUIRE(path, VESK2_ERR_MEM_ALLOC);
-  }
-  FileToDigest wanted = {{ZVsysutil::kZvNoDirectory, path.get()}, path.get()};
+  char joined[kLongestPath + 1];  // of which only some have need
+  const bool asked = chunk.open == nullptr || manifest_.GetFileCallbacks() != nullptr;
+  // What nobody can name is not there, however it is opened.
+  const char* path = nullptr;
+  if (asked && ZVsysutil::zv_concat_path_to(joined, sizeof joined, directory, file.GetName()))
+    path = joined;
+  FileToDigest wanted = {{ZVsysutil::kZvNoDirectory, path}, path};
   if (chunk.open != nullptr) {
     wanted.place = {chunk.open->listing.Descriptor(), file.GetName(), state == kSeenRegular};
-    // What nobody can name is not there: the same answer as by its path.
     if (chunk.open->prefix + std::strlen(file.GetName()) > kLongestPath)
       wanted.place.name = nullptr;
   }

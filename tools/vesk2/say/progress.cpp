@@ -2,6 +2,8 @@
 // progress.cpp: the progress line.
 #include "tools/vesk2/say/progress.h"
 
+#include <ctime>
+
 #include <cstdio>
 #include <utility>
 
@@ -11,9 +13,14 @@
 namespace vesk2_command {
 namespace {
 
-using std::chrono::milliseconds;
+constexpr int64_t kPause = 100;
 
-constexpr milliseconds kPause{100};
+// In milliseconds, and some of them late: a tenth of a second is asked about, twice a file.
+int64_t Now() {
+  timespec now{};
+  clock_gettime(CLOCK_MONOTONIC_COARSE, &now);
+  return int64_t{now.tv_sec} * 1000 + now.tv_nsec / 1'000'000;
+}
 
 std::string Bytes(double bytes) {
   constexpr const char* kUnits[] = {"B", "kB", "MB", "GB", "TB"};
@@ -39,36 +46,42 @@ ProgressLine::ProgressLine(const std::string& doing, std::function<size_t()> tot
       wanted_(GetStyle().progress),
       callbacks_{sizeof callbacks_, this, nullptr,
                  [](void* user, uint64_t bytes) {
-                   return static_cast<ProgressLine*>(user)->Add(0, bytes);
+                   static_cast<ProgressLine*>(user)->Add(0, bytes);
+                   return 0;
                  },
                  [](void* user, const char*, int) { static_cast<ProgressLine*>(user)->Add(1, 0); }},
-      start_(Clock::now()),
+      start_(Now()),
       next_(start_ + kPause) {}
 
 ProgressLine::~ProgressLine() {
   if (wanted_) EraseLine();
 }
 
-int ProgressLine::Add(uint64_t files, uint64_t bytes) {
-  const std::lock_guard<std::mutex> locked(mutex_);
-  files_ += files;
-  bytes_ += bytes;
-  const Clock::time_point now = Clock::now();
-  if (now < next_) return 0;
-  next_ = now + kPause;
-  DrawLine(Text(std::chrono::duration<double>(now - start_).count()));
-  return 0;
+void ProgressLine::Add(uint64_t files, uint64_t bytes) {
+  if (files > 0) files_.fetch_add(files, std::memory_order_relaxed);
+  if (bytes > 0) bytes_.fetch_add(bytes, std::memory_order_relaxed);
+  const int64_t now = Now();
+  if (now >= next_.load(std::memory_order_relaxed)) Draw(now);
+}
+
+// Of threads that come at once, one draws.
+void ProgressLine::Draw(int64_t now) {
+  const std::lock_guard<std::mutex> locked(drawing_);
+  if (now < next_.load(std::memory_order_relaxed)) return;
+  next_.store(now + kPause, std::memory_order_relaxed);
+  DrawLine(Text(static_cast<double>(now - start_) / 1000));
 }
 
 std::string ProgressLine::Text(double seconds) const {
   const size_t total = total_ ? total_() : 0;
-  const auto bytes = static_cast<double>(bytes_);
-  std::string text = doing_ + " " + std::to_string(files_);
+  const uint64_t files = files_;
+  const auto bytes = static_cast<double>(bytes_.load());
+  std::string text = doing_ + " " + std::to_string(files);
   if (total > 0) text += "/" + std::to_string(total);
   text += " files, " + Bytes(bytes) + ", " + Bytes(bytes / seconds) + "/s";
-  if (files_ == 0 || files_ > total) return text;
-  const double each = seconds / static_cast<double>(files_);
-  return text + ", " + Minutes(each * static_cast<double>(total - files_)) + " left";
+  if (files == 0 || files > total) return text;
+  const double each = seconds / static_cast<double>(files);
+  return text + ", " + Minutes(each * static_cast<double>(total - files)) + " left";
 }
 
 }  // namespace vesk2_command
