@@ -169,7 +169,8 @@ struct DiskWalk::Level {
 
 // Whoever stops half-way (no memory, a callback) leaves directories open and findings untaken.
 DiskWalk::~DiskWalk() {
-  Release(open_);
+  Release(current_.open);
+  Release(ahead_.open);
   while (top_ != nullptr) Leave();
   while (TakeFound() != nullptr) {
   }
@@ -194,60 +195,60 @@ void DiskWalk::Leave() {
   top_ = left->above;
 }
 
-// A thread takes some files of one directory at a time. The walk itself goes on under the caller's
-// lock, which is cheap beside hashing.
-int DiskWalk::Next(FileChunk& chunk) {
-  chunk = {};
-  bool more = true;
-  // Directories without files are passed over here, and are found all the same.
-  while (last_ == nullptr || nextFile_ == last_->directory->GetFiles().GetCount()) {
-    VESK2_TRY(GoOn(more));
-    if (!more) return 0;
+// Threads share a directory until its files are taken. Those without files are passed over here,
+// and are found all the same.
+int DiskWalk::Next(FilesToHash& files) {
+  files = {};
+  while (current_.found == nullptr || current_.found->AllTaken()) {
+    Release(current_.open);
+    current_ = std::exchange(ahead_, {});
+    if (current_.found == nullptr) VESK2_TRY(GoOn(current_));
+    if (current_.found == nullptr) return 0;
   }
-  const uint32_t left = last_->directory->GetFiles().GetCount() - nextFile_;
-  chunk = {last_, open_, nextFile_, nextFile_ + std::min(left, chunkSize_)};
-  if (open_ != nullptr) ++open_->users;
-  nextFile_ = chunk.end;
+  files = current_;
+  if (files.open != nullptr) ++files.open->users;
   return 0;
 }
 
-// Enters the next directory, the root first. Depth first, in the order of the listing, as the
-// findings are told. An ignored directory is not even opened.
-int DiskWalk::GoOn(bool& more) {
-  Release(std::exchange(open_, nullptr));
-  if (!std::exchange(begun_, true)) return Enter(root_);
+int DiskWalk::Prepare() { return ahead_.found == nullptr ? GoOn(ahead_) : 0; }
+
+// Enters the next directory, the root first; without one, `files` stays empty. Depth first, in the
+// order of the listing, as the findings are told. An ignored directory is not even opened.
+int DiskWalk::GoOn(FilesToHash& files) {
+  if (!std::exchange(begun_, true)) return Enter(files, root_);
   while (top_ != nullptr) {
     while (BodyObject* const entry = top_->directory.GetSubdirectories().at(top_->next)) {
       ++top_->next;
       if (!top_->ignore.Ignores(entry->GetName()))
-        return Enter(static_cast<BodyDirectory&>(*entry));
+        return Enter(files, static_cast<BodyDirectory&>(*entry));
     }
     Leave();
   }
-  more = false;
   return 0;
 }
 
 // The findings are chained in the order in which directories are entered: a recursion through the
 // listing takes them off in the same order.
-int DiskWalk::Enter(BodyDirectory& directory) {
+int DiskWalk::Enter(FilesToHash& files, BodyDirectory& directory) {
   std::unique_ptr<DirectoryFound> found;
   VESK2_TRY(MakeFound(found, directory));
   Level* const level = TryNew<Level>(directory, top_);
   VESK2_REQUIRE(level != nullptr, VESK2_ERR_MEM_ALLOC);
   top_ = level;
-  VESK2_TRY(Search(*found));
+  FilesToHash entered = {found.get(), nullptr};
+  VESK2_TRY(Search(entered));
   (last_ != nullptr ? last_->next : first_) = found.get();
   // Nothing can fail behind the chaining, so that the walk and its findings agree.
   last_ = found.release();
-  nextFile_ = 0;
+  files = entered;
   return 0;
 }
 
 // Opens and lists the directory that was entered last. Files of one that cannot be opened are asked
 // by their paths. A directory that is missing or cannot be listed keeps its reason; its files are
 // then missing by their own doing. For want of memory or descriptors nothing is decided.
-int DiskWalk::Search(DirectoryFound& found) {
+int DiskWalk::Search(FilesToHash& files) {
+  DirectoryFound& found = *files.found;
   std::unique_ptr<OpenDirectory> open(TryNew<OpenDirectory>());
   VESK2_REQUIRE(open, VESK2_ERR_MEM_ALLOC);
   const char* const path = found.directory->GetName();
@@ -264,10 +265,10 @@ int DiskWalk::Search(DirectoryFound& found) {
   VESK2_REQUIRE(code != VESK2_ERR_MEM_ALLOC, code);
   if (searched && code != 0) found.reason = code;
   if (!opened) return 0;
-  open_ = open.release();
+  files.open = open.release();
   if (top_->depth < kHeldLevels && found.directory->GetSubdirectories().GetCount() > 0) {
-    ++open_->users;
-    top_->open = open_;
+    ++files.open->users;
+    top_->open = files.open;
     top_->owns = true;
   }
   return 0;

@@ -1,14 +1,16 @@
 // SPDX-License-Identifier: Apache-2.0
 // The walk through a listed tree on disk: what the directories say of their entries, and the listed
-// files that are to be hashed, a few at a time.
+// files that are to be hashed, a directory at a time.
 //
 // Directories are listed before their files are opened, and what they say of an entry's kind is
 // believed; of links and where a disk says nothing, the entry is asked. A listed file that a
 // directory calls regular is opened from that directory without a look of its own. A walk belongs
-// to one caller at a time: threads that share one take turns under a lock (body_verify.cpp).
+// to one caller at a time: threads that share one take turns under a lock (body_verify.cpp). The
+// files of a directory they take without it.
 #ifndef VESK2_SRC_MANIFEST_BODY_DISK_H
 #define VESK2_SRC_MANIFEST_BODY_DISK_H
 
+#include <atomic>
 #include <memory>
 
 #include <vesk2/manifest_body.h>
@@ -44,22 +46,27 @@ ZVsysutil::ZvPlace PlaceOf(const OpenDirectory* open, const char* path);
 // What was found in one listed directory.
 struct DirectoryFound {
   BodyDirectory* directory;
-  // A FileState for each, in their order. Threads write those of their chunks, and the walk those
-  // that it has not handed out: never two at one place.
+  // A FileState for each, in their order. The walk writes them before it hands the directory out,
+  // and then each is written by the thread that took the file.
   std::unique_ptr<int[]> files;
+  // How often a file was asked for. Past their count there are no more.
+  std::atomic<uint32_t> asked = 0;
   // Entries of the disk, ignored ones too, sorted: files by bare name, directories by path.
   PointerArray<BodyObject> unlisted;
   // Why it was not searched for them, or 0. VESK2_ERR_FIND_DIR, mostly.
   int reason = 0;
   DirectoryFound* next = nullptr;
+
+  uint32_t Count() const { return directory->GetFiles().GetCount(); }
+  // The place of a file that nobody else takes; Count() or more when all are taken.
+  uint32_t Take() { return asked.fetch_add(1, std::memory_order_relaxed); }
+  bool AllTaken() const { return asked.load(std::memory_order_relaxed) >= Count(); }
 };
 
-// Some files of one directory: the work that a thread takes at once.
-struct FileChunk {
+// A directory whose files are hashed, by as many threads as come.
+struct FilesToHash {
   DirectoryFound* found = nullptr;
   OpenDirectory* open = nullptr;  // null: they are opened by their paths
-  uint32_t first = 0;
-  uint32_t end = 0;
 };
 
 // The longest path that the system takes.
@@ -67,16 +74,17 @@ inline constexpr size_t kLongestPath = 4095;
 
 class DiskWalk {
  public:
-  // Hands out at most `chunkSize` files at once.
-  DiskWalk(BodyDirectory& root, uint32_t chunkSize) : root_(root), chunkSize_(chunkSize) {}
+  explicit DiskWalk(BodyDirectory& root) : root_(root) {}
   ~DiskWalk();
   DiskWalk(const DiskWalk&) = delete;
   DiskWalk& operator=(const DiskWalk&) = delete;
 
-  // Next hands out files, ignored ones too; chunk.found is null when there are no more. Done takes
-  // them back. VESK2_ERR_MEM_ALLOC.
-  [[nodiscard]] int Next(FileChunk& chunk);
-  void Done(const FileChunk& chunk) { Release(chunk.open); }
+  // Next hands out a directory of which files are left, ignored ones among them; files.found is
+  // null when there is none. Done takes it back. Prepare lists the directory after it, so that who
+  // is through with this one need not wait for that. VESK2_ERR_MEM_ALLOC.
+  [[nodiscard]] int Next(FilesToHash& files);
+  [[nodiscard]] int Prepare();
+  void Done(const FilesToHash& files) { Release(files.open); }
   // What was found, a directory a call, in the order in which a recursion comes to them.
   std::unique_ptr<DirectoryFound> TakeFound();
 
@@ -84,21 +92,19 @@ class DiskWalk {
   // A directory whose subdirectories are being visited.
   struct Level;
 
-  [[nodiscard]] int Enter(BodyDirectory& directory);
-  [[nodiscard]] int Search(DirectoryFound& found);
-  [[nodiscard]] int GoOn(bool& more);
+  [[nodiscard]] int Enter(FilesToHash& files, BodyDirectory& directory);
+  [[nodiscard]] int Search(FilesToHash& files);
+  [[nodiscard]] int GoOn(FilesToHash& files);
   void Leave();
   static void Release(OpenDirectory* open);
 
   BodyDirectory& root_;
-  const uint32_t chunkSize_;
   // The root has been entered.
   bool begun_ = false;
-  DirectoryFound* first_ = nullptr;
-  DirectoryFound* last_ = nullptr;  // whose files are handed out
-  OpenDirectory* open_ = nullptr;   // that directory
-  // The first file of `last_` that was not handed out.
-  uint32_t nextFile_ = 0;
+  DirectoryFound* first_ = nullptr;  // of those that were found and not taken
+  DirectoryFound* last_ = nullptr;
+  FilesToHash current_;  // what is handed out
+  FilesToHash ahead_;    // what comes after it, where that is listed already
   // The directory whose subdirectories are visited now; those above hang behind it.
   Level* top_ = nullptr;
 };

@@ -7,6 +7,7 @@
 // listed files are hashed, by any number of threads, in whatever order they come; then what was
 // found is told in the order of the listing, by one. So the results do not depend on who was
 // faster.
+#include <atomic>
 #include <cstring>
 #include <memory>
 #include <utility>
@@ -28,13 +29,13 @@ namespace {
 
 using ZVsysutil::ZvLocked;
 
-// Hashes the listed files. Any number of threads take part in it. The lock guards the walk and the
-// first trouble; a file's state is written by the one thread that has its chunk.
+// Hashes the listed files. Any number of threads take part in it. The lock guards the walk; files
+// are taken without it, and a file's state is written by the one thread that took it.
 class FileHashing {
  public:
   FileHashing(BodyDirectory& root, const Manifest& manifest, const Vesk2TaskRunner* runner,
               ZVsysutil::ZvCall& call)
-      : walk_(root, runner != nullptr ? 1 : UINT32_MAX), manifest_(manifest), call_(call) {}
+      : walk_(root), shared_(runner != nullptr), manifest_(manifest), call_(call) {}
 
   // Hashes all; the calling thread goes on when the runner's are done, or alone.
   [[nodiscard]] int Run(const Vesk2TaskRunner* runner) {
@@ -47,14 +48,16 @@ class FileHashing {
  private:
   static void TakePart(void* self) { static_cast<FileHashing*>(self)->TakePart(); }
   void TakePart();
-  bool Exchange(FileChunk& chunk, int code);
-  [[nodiscard]] int Hash(const FileChunk& chunk, FileDigester& digester);
-  [[nodiscard]] int HashOne(int& state, const FileChunk& chunk, const BodyFile& file,
+  bool Exchange(FilesToHash& files, int code);
+  [[nodiscard]] int Prepare();
+  [[nodiscard]] int Hash(const FilesToHash& files, FileDigester& digester);
+  [[nodiscard]] int HashOne(int& state, const FilesToHash& files, const BodyFile& file,
                             FileDigester& digester);
 
-  ZVsysutil::ZvLock lock_;  // of the walk and the trouble
+  ZVsysutil::ZvLock lock_;  // of the walk
   DiskWalk walk_;
-  int trouble_ = 0;
+  const bool shared_;  // more than one thread may take part
+  std::atomic<int> trouble_ = 0;
   const Manifest& manifest_;
   ZVsysutil::ZvCall& call_;
 };
@@ -64,29 +67,37 @@ class FileHashing {
 void FileHashing::TakePart() {
   const ZVsysutil::ZvCall call(call_);
   FileDigester digester(manifest_.GetContext(), manifest_.GetFileCallbacks());
-  FileChunk chunk;
+  FilesToHash files;
   int code = 0;
-  while (Exchange(chunk, code)) code = Hash(chunk, digester);
+  while (Exchange(files, code)) code = Hash(files, digester);
 }
 
-// Gives a chunk back, with what came of it, for another; false when there is no more to do. The
+// Gives a directory back, with what came of it, for another; false when there is no more to do. The
 // first trouble ends it for all: what the others still do is not asked about.
-bool FileHashing::Exchange(FileChunk& chunk, int code) {
+bool FileHashing::Exchange(FilesToHash& files, int code) {
   const ZvLocked locked(lock_);
-  walk_.Done(chunk);
-  chunk = {};
+  walk_.Done(files);
+  files = {};
   if (trouble_ == 0) trouble_ = code;
-  if (trouble_ == 0) trouble_ = walk_.Next(chunk);
-  return trouble_ == 0 && chunk.found != nullptr;
+  if (trouble_ == 0) trouble_ = walk_.Next(files);
+  return trouble_ == 0 && files.found != nullptr;
 }
 
-// Ignored files are in the chunk and are skipped: a chunk is a range.
-int FileHashing::Hash(const FileChunk& chunk, FileDigester& digester) {
-  for (uint32_t i = chunk.first; i < chunk.end; ++i) {
-    int& state = chunk.found->files[i];
-    const BodyObject* const file = chunk.found->directory->GetFiles().at(i);
+int FileHashing::Prepare() {
+  const ZvLocked locked(lock_);
+  return walk_.Prepare();
+}
+
+// One file after the other that no other thread takes, until none is left. Who takes the middle one
+// lists the next directory: the others have enough to do meanwhile.
+int FileHashing::Hash(const FilesToHash& files, FileDigester& digester) {
+  DirectoryFound& found = *files.found;
+  for (uint32_t i = found.Take(); i < found.Count() && trouble_ == 0; i = found.Take()) {
+    if (shared_ && i == found.Count() / 2) VESK2_TRY(Prepare());
+    int& state = found.files[i];
+    const BodyObject* const file = found.directory->GetFiles().at(i);
     if (state == kIgnored) continue;
-    VESK2_TRY(HashOne(state, chunk, static_cast<const BodyFile&>(*file), digester));
+    VESK2_TRY(HashOne(state, files, static_cast<const BodyFile&>(*file), digester));
   }
   return 0;
 }
@@ -94,19 +105,19 @@ int FileHashing::Hash(const FileChunk& chunk, FileDigester& digester) {
 // Opened from the directory that was listed, where there is one, so that nobody can put another
 // tree in its place between two files. Why a file was not read is its state and not an error: the
 // other files are compared all the same.
-int FileHashing::HashOne(int& state, const FileChunk& chunk, const BodyFile& file,
+int FileHashing::HashOne(int& state, const FilesToHash& files, const BodyFile& file,
                          FileDigester& digester) {
-  const char* const directory = chunk.found->directory->GetName();
+  const char* const directory = files.found->directory->GetName();
   char joined[kLongestPath + 1];  // of which only some have need
-  const bool asked = chunk.open == nullptr || manifest_.GetFileCallbacks() != nullptr;
+  const bool asked = files.open == nullptr || manifest_.GetFileCallbacks() != nullptr;
   // What nobody can name is not there, however it is opened.
   const char* path = nullptr;
   if (asked && ZVsysutil::zv_concat_path_to(joined, sizeof joined, directory, file.GetName()))
     path = joined;
   FileToDigest wanted = {{ZVsysutil::kZvNoDirectory, path}, path};
-  if (chunk.open != nullptr) {
-    wanted.place = {chunk.open->listing.Descriptor(), file.GetName(), state == kSeenRegular};
-    if (chunk.open->prefix + std::strlen(file.GetName()) > kLongestPath)
+  if (files.open != nullptr) {
+    wanted.place = {files.open->listing.Descriptor(), file.GetName(), state == kSeenRegular};
+    if (files.open->prefix + std::strlen(file.GetName()) > kLongestPath)
       wanted.place.name = nullptr;
   }
   unsigned char digest[kFileDigestSize];
