@@ -134,8 +134,8 @@ class HelpText : public CLI::Formatter {
 
 // ---- The command line ----
 
-// The options of the chosen command only: defining those of the others takes longer than a small
-// verification.
+// Without a chosen command all are defined, for the help; else that one alone, since defining the
+// others takes longer than a small verification.
 void Define(CLI::App& app, const Command* chosen, CommandLine& line) {
   app.formatter(std::make_shared<HelpText>(line.options));
   app.set_help_flag(kHelp, "Show this help");
@@ -143,9 +143,11 @@ void Define(CLI::App& app, const Command* chosen, CommandLine& line) {
                        "Show the version");
   app.require_subcommand(1);
   for (const Noun& noun : Nouns()) {
+    if (chosen != nullptr && std::string_view(chosen->noun) != noun.name) continue;
     CLI::App* group = app.add_subcommand(noun.name, noun.about);
     for (const Command& command : Commands()) {
       if (std::string_view(command.noun) != noun.name) continue;
+      if (chosen != nullptr && &command != chosen) continue;
       const bool lone = *command.verb == '\0';
       if (!lone) group->require_subcommand(1);
       CLI::App* own = lone ? group : group->add_subcommand(command.verb, command.about);
@@ -173,8 +175,10 @@ std::vector<std::string> ParserWords(const std::vector<std::string>& arranged) {
 
 void CollectGiven(const CLI::App& app, CommandLine& line) {
   for (const CLI::Option* parsed : app.get_options()) {
+    // Asked first: of some thirty options few are given, and finding one compares all names.
+    if (parsed->count() == 0) continue;
     const Option* option = FindOption(line.options, *parsed);
-    if (option == nullptr || parsed->count() == 0) continue;
+    if (option == nullptr) continue;
     line.given.push_back(
         {option, option->IsFlag() ? std::vector<std::string>() : parsed->results()});
   }
