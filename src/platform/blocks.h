@@ -25,6 +25,7 @@ struct alignas(16) ZvBlock {
   void Drop(uint32_t count);
 
   std::atomic<uint32_t> things;
+  const bool large;  // stands in pages of its own
 };
 
 // Makes things. Their memory is aligned to 8 bytes.
