@@ -2,7 +2,7 @@
 // cert_find.cpp: vesk2 cert find.
 #include "tools/vesk2/audit/chain_state.h"
 #include "tools/vesk2/commands/command.h"
-#include "tools/vesk2/explain/explain.h"
+#include "tools/vesk2/explain/tell_facts.h"
 #include "tools/vesk2/say/report.h"
 
 namespace vesk2_command {

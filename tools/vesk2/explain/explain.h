@@ -26,9 +26,6 @@ void ExplainGrant(const Question& question);
 // ExplainTrouble tells machines of what was read, and names the credentials that the reduction
 // cannot read.
 void ExplainTrouble(const Question& question, int code);
-// ToldCert is a certificate of an answer for machines, with what its signature is worth and what
-// the lists say of it.
-Json ToldCert(const Evidence& evidence, size_t index);
 // StartExplanation puts those members into the result, null until they are known.
 void StartExplanation();
 
