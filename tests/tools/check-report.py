@@ -3,7 +3,8 @@
 """check-report.py PAGE ANSWER: the page that --report wrote beside an answer for machines.
 
 The page must be well-formed, load nothing, hold no element and no attribute but those that the
-command writes, and tell every text and every number of the answer. Prints what is wrong.
+command writes, tell every text and every number of the answer, and have for every entry and
+certificate a step with its tag, period and k-of-n. Prints what is wrong.
 """
 import json
 import re
@@ -46,6 +47,28 @@ def read_back(line):
     return [part.encode("utf-8", "surrogateescape") for part in shlex.split(line)]
 
 
+def grants(result):
+    """Each entry and certificate of the answer, with the name of its step."""
+    for grant in result.get("acl") or []:
+        yield "ACL entry " + grant["entry"], grant
+    for grant in result.get("chain") or []:
+        yield f"certificate {grant['certificate']}", grant
+    for signer in (result.get("may_sign") or []) + (result.get("groups") or []):
+        for way in signer["ways"]:
+            for place, grant in zip(way["path"], way["steps"], strict=True):
+                yield ("ACL entry " if "entry" in grant else "certificate ") + place, grant
+
+
+def step_facts(grant):
+    yield "; tag: " + (grant["tag"] or "no limit") + ";"
+    first, last = grant["not_before"], grant["not_after"]
+    if first is None and last is None:
+        yield "; period: always;"
+    yield from (moment for moment in (first, last) if moment is not None)
+    if grant["threshold"] is not None:
+        yield "; {k} of {n} keys must agree;".format(**grant["threshold"])
+
+
 def faults(page, answer):
     if not page.isascii():
         yield "not ASCII"
@@ -72,6 +95,11 @@ def faults(page, answer):
     for text in leaves(answer):
         if text.strip() not in texts:
             yield f"not told: {text}"
+    steps = ["".join(element.itertext()) for element in root.iter() if element.tag.endswith("li")]
+    for name, grant in grants(result):
+        if not any(step.startswith(shown(name) + ": ") and all(shown(fact) in step for fact in step_facts(grant))
+                   for step in steps):
+            yield f"no step with tag and period: {name}"
     lines = [read_back("".join(e.itertext())) for e in root.iter() if e.tag.endswith("code")]
     for remedy in remedies:
         if shown(remedy["text"]) not in texts:

@@ -60,6 +60,16 @@ TEST(Page, AnyGraphIsDrawn) {
                                {"subject", "2 of"},
                                {"threshold", {{"k", 2}, {"n", 3}, {"members", {key(), key()}}}}});
     }
+    for (size_t signer = random() % 3; signer > 0; --signer) {
+      Json way = {{"path", {"1", key()}}, {"steps", Json::array()}};
+      for (size_t step = random() % 4; step > 0; --step) {
+        way["steps"].push_back({{"kind", random() % 2 ? "acl-entry" : "certificate"},
+                                {"issuer", key()},
+                                {"subject", key()},
+                                {"subject_kind", random() % 2 ? "hash" : "key"}});
+      }
+      result["may_sign"].push_back({{"key", key()}, {"ways", {way}}});
+    }
     result["lost"].push_back({{"kind", random() % 2 ? "no-entry" : "tag"},
                               {"text", "the reason"},
                               {"certificate", random() % 14},

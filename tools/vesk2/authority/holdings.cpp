@@ -54,21 +54,21 @@ class Loader {
   void AddFile(const std::string& path) {
     const std::vector<SignedCert> certs = ReadCerts(path);
     for (size_t i = 0; i < certs.size(); ++i) {
-      Add(certs[i], Escape(path) + ":" + std::to_string(i + 1));
+      Add({Ref<ZvVesk2::Cert>::Share(certs[i].cert.get()),
+           Ref<ZvVesk2::Signature>::Share(certs[i].signature.get()), Escape(path), i + 1});
     }
   }
 
  private:
-  void Add(const SignedCert& each, const std::string& place) {
+  void Add(HeldCert each) {
     // A digest signs nothing and passes nothing on: such a certificate is for a manifest's content.
     if (each.cert->GetSubject()->IsHash() && !each.cert->GetPropagate()) return;
     if (!seen_.insert(Canonical(*each.cert)).second) return;
     int code = each.signature->Verify(each.cert.get());
     if (code == VESK2_ERR_MEM_ALLOC) throw std::bad_alloc();
     if (code == 0) code = TryReduction(*ListOf({}, "acl"), {each.cert.get()});
-    if (code != 0) return Note("note: " + place + ": " + Reason(code) + "; passed over");
-    holdings_.certs.push_back({Ref<ZvVesk2::Cert>::Share(each.cert.get()),
-                               Ref<ZvVesk2::Signature>::Share(each.signature.get()), place});
+    if (code != 0) return Note("note: " + each.Place() + ": " + Reason(code) + "; passed over");
+    holdings_.certs.push_back(std::move(each));
   }
 
   Holdings& holdings_;

@@ -20,7 +20,10 @@ namespace vesk2_command {
 struct HeldCert {
   Ref<ZvVesk2::Cert> cert;
   Ref<ZvVesk2::Signature> signature;  // which holds
-  std::string place;                  // "FILE:N", escaped
+  std::string file;                   // escaped
+  size_t number = 0;                  // in it
+
+  std::string Place() const { return file + ":" + std::to_string(number); }
 };
 
 struct Holdings {

@@ -218,11 +218,19 @@ void Search::MakeEvidence(const Way& way, TimeStamp* at, ZvVesk2::Evidence& evid
   supposition_.Revoke(evidence);
 }
 
+std::vector<const HeldCert*> Search::Carried(const Way& way) const {
+  std::vector<const HeldCert*> carried(1);
+  carried.push_back(way.own != Way::kSelf ? &holdings_.certs[way.own] : nullptr);
+  for (const size_t number : way.rest) carried.push_back(&holdings_.certs[number]);
+  carried.resize(carried.size() + way.approvers.size());
+  return carried;
+}
+
 std::vector<std::string> Search::Places(const Way& way) const {
-  std::vector<std::string> places(1);
-  places.push_back(way.own != Way::kSelf ? holdings_.certs[way.own].place : "");
-  for (const size_t number : way.rest) places.push_back(holdings_.certs[number].place);
-  places.resize(places.size() + way.approvers.size());
+  std::vector<std::string> places;
+  for (const HeldCert* const each : Carried(way)) {
+    places.push_back(each != nullptr ? each->Place() : "");
+  }
   return places;
 }
 

@@ -71,8 +71,9 @@ class Search {
 
   // The code of the library for a way, with `alone` of its entry alone.
   int Judge(const Way& way, TimeStamp* at, bool alone = false) const;
-  // What Judge judges, and the places of its certificates; empty for those that are only made up.
+  // What Judge judges, its certificates, null for those that are only made up, and their places.
   void MakeEvidence(const Way& way, TimeStamp* at, ZvVesk2::Evidence& evidence) const;
+  std::vector<const HeldCert*> Carried(const Way& way) const;
   std::vector<std::string> Places(const Way& way) const;
 
   SExpression* entries() const { return entries_.get(); }

@@ -3,13 +3,11 @@
 #include <algorithm>
 #include <set>
 
-#include "tools/vesk2/authority/search.h"
+#include "tools/vesk2/authority/steps.h"
 #include "tools/vesk2/commands/command.h"
 #include "tools/vesk2/explain/effort.h"
 #include "tools/vesk2/page/page.h"
 #include "tools/vesk2/say/report.h"
-
-#include <vesk2/wording.h>
 
 namespace vesk2_command {
 namespace {
@@ -35,6 +33,7 @@ struct Found {
   std::vector<Way> ways;
   Until until;
   std::vector<Until> each;  // of the ways
+  std::vector<Json> steps;  // of the ways, where machines are told
 };
 
 std::string UntilText(const Until& until) {
@@ -47,16 +46,6 @@ void AddUntil(Json& json, const Until& until) {
   json["because"] = until.second ? CauseJson(until.cause) : Json();
 }
 
-// From the entry to the certificate that names the signer.
-std::vector<std::string> PathOf(const Search& search, const Way& way) {
-  std::vector<std::string> path;
-  if (way.entry != nullptr) path.push_back(Owned(ZvVesk2::Wording::OfEntry(way.entry)));
-  const std::vector<std::string> places = search.Places(way);
-  std::copy_if(places.rbegin(), places.rend(), std::back_inserter(path),
-               [](const std::string& place) { return !place.empty(); });
-  return path;
-}
-
 class Answer {
  public:
   Answer(const Search& search, Ref<TimeStamp> at) : search_(search), at_(std::move(at)) {
@@ -64,7 +53,7 @@ class Answer {
       std::vector<Way> ways = search.FindWays(candidate, at_.get(), kMostWays);
       if (ways.empty()) continue;
       if (candidate.IsGroup()) candidate = search.Agreeing(candidate, at_.get());
-      found_.push_back({std::move(candidate), std::move(ways), {}, {}});
+      found_.push_back({std::move(candidate), std::move(ways), {}, {}, {}});
     }
   }
 
@@ -129,6 +118,7 @@ class Answer {
           at_->ToTime(), [&](TimeStamp* at) { return search_.Judge(way, at) == 0; });
       if (until.second) until.cause = CauseOf(way, *until.second);
       found.each.push_back(std::move(until));
+      if (CollectsFacts()) found.steps.push_back(StepsOf(search_, way, at_.get()));
     }
     if (found.until.second) found.until.cause = CauseOf(LastOf(found, known), *found.until.second);
   }
@@ -161,6 +151,7 @@ class Answer {
     Json& ways = json["ways"] = Json::array();
     for (size_t i = 0; i < found.ways.size(); ++i) {
       Json way = {{"path", PathOf(search_, found.ways[i])}};
+      if (CollectsFacts()) way["steps"] = found.steps[i];
       AddUntil(way, found.each[i]);
       ways.push_back(std::move(way));
     }

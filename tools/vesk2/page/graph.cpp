@@ -2,6 +2,8 @@
 // graph.cpp: from the members of an answer to nodes and edges.
 #include "tools/vesk2/page/graph.h"
 
+#include <algorithm>
+
 namespace vesk2_command {
 namespace {
 
@@ -105,9 +107,11 @@ Graph::Graph(const Json& answer) {
   TakeApprovals(Member(result, "approvals"), approvals_);
   for (const Json& entry : Member(result, "acl")) AddEntry(entry);
   const Json& chain = Member(result, "chain");  // its end first
-  for (size_t i = chain.size(); i-- > 0;) AddCertificate(chain[i]);
+  for (size_t i = chain.size(); i-- > 0;) {
+    AddCertificate(chain[i], ValueText(Member(chain[i], "certificate")));
+  }
   for (const char* signers : {"may_sign", "groups"}) {
-    for (const Json& each : Member(result, signers)) AddWays(each);
+    for (const Json& each : Member(result, signers)) AddSigner(each);
   }
   AddAnswer(answer);
   bool cut = !edges_[answer_].cuts.empty();
@@ -163,7 +167,7 @@ void Graph::AddEntry(const Json& entry) {
   AddMembers(entry, subject);
 }
 
-void Graph::AddCertificate(const Json& certificate) {
+void Graph::AddCertificate(const Json& certificate, const std::string& name) {
   const size_t issuer = Node(ValueText(Member(certificate, "issuer")), "key");
   const size_t subject = SubjectNode(certificate);
   const Json& number = Member(certificate, "certificate");
@@ -176,32 +180,42 @@ void Graph::AddCertificate(const Json& certificate) {
                         : "signature: " + ValueText(Member(signature, "reason")));
   }
   facts.push_back(RevocationFact(Member(certificate, "revocation")));
-  Edge(issuer, subject, "certificate " + ValueText(number)).facts = std::move(facts);
+  Edge(issuer, subject, "certificate " + name).facts = std::move(facts);
   AddMembers(certificate, subject);
 }
 
-// Of an answer about who may sign: each way to a key, or to several together, is one step.
-void Graph::AddWays(const Json& signer) {
+// Of an answer about who may sign: a key, or several together, and what leads to them.
+void Graph::AddSigner(const Json& signer) {
   const bool several = !Member(signer, "members").is_null();
-  const std::string name =
-      several ? Member(signer, "members").dump() : ValueText(Member(signer, "key"));
-  const size_t node = Node(name, several ? "may sign together" : "may sign");
-  if (several) AddMembers({{"threshold", signer}}, node);
-  for (const Json& way : Member(signer, "ways")) {
-    std::string path;
-    for (const Json& step : Member(way, "path")) {
-      path += (path.empty() ? "" : ", then ") + ValueText(step);
-    }
-    GraphEdge& edge = Edge(kStore, node, path);
-    const std::string until = ValueText(Member(way, "until"));
-    edge.facts.push_back(until.empty() ? "it does not end by itself" : "until " + until);
-    edge.carries = true;
-    if (several) {
-      edge.facts.push_back(ValueText(Member(signer, "k")) + " of " +
-                           std::to_string(Member(signer, "members").size()) + " keys must agree");
-    }
-  }
+  const size_t node = several ? Node(Member(signer, "members").dump(), "may sign together")
+                              : Node(ValueText(Member(signer, "key")), "key");
   if (several) nodes_[node].name = "any " + ValueText(Member(signer, "k")) + " keys of these";
+  nodes_[node].kind = several ? "may sign together" : "may sign";
+  for (const Json& way : Member(signer, "ways")) AddWay(way, node);
+  for (const Json& member : Member(signer, "members")) {
+    Edge(Node(ValueText(member), "key"), node, "with the others").carries = true;
+  }
+  const std::string until = ValueText(Member(signer, "until"));
+  signing_.push_back({node, 0, several ? "they may sign" : "it may sign"});
+  signing_.back().facts = {until.empty() ? "it does not end by itself" : "until " + until};
+}
+
+// Ways share steps: each is drawn once.
+void Graph::AddWay(const Json& way, size_t signer) {
+  const Json& path = Member(way, "path");
+  const Json& steps = Member(way, "steps");
+  for (size_t i = 0; i < std::min(path.size(), steps.size()); ++i) {
+    const std::string place = ValueText(path[i]);
+    const bool entry = Member(steps[i], "kind") == "acl-entry";
+    const auto [known, isNew] = steps_.try_emplace({entry, place}, edges_.size());
+    if (isNew && entry) AddEntry(steps[i]);
+    if (isNew && !entry) AddCertificate(steps[i], place);
+    edges_[known->second].carries = true;
+  }
+  // A digest of another kind than that which a key is told by.
+  const Json& last = steps.empty() ? steps : steps.back();
+  if (Member(last, "subject_kind") != "hash" || SubjectNode(last) == signer) return;
+  Edge(SubjectNode(last), signer, "the digest of").carries = true;
 }
 
 // The last step: the tree as it is, or the question about who stands at the end of the chain.
@@ -216,9 +230,17 @@ void Graph::AddAnswer(const Json& answer) {
   answer_ = edges_.size();
   nodes_.push_back({"the answer: " + ValueText(Member(answer, "verdict")),
                     ValueText(Member(answer, "message"))});
+  const std::string asked = "asked tag: " + ValueText(Member(result, "tag"));
+  for (GraphEdge& edge : signing_) {
+    edge.to = nodes_.size() - 1;
+    edge.facts.push_back(asked);
+    edge.carries = true;
+    edges_.push_back(std::move(edge));
+  }
+  if (!signing_.empty()) return;
   GraphEdge& edge =
       Edge(from, nodes_.size() - 1, directory.empty() ? "the question" : "the tree " + directory);
-  edge.facts = {"asked tag: " + ValueText(Member(result, "tag"))};
+  edge.facts = {asked};
   if (counts.is_null()) return;
   edge.facts.push_back(ValueText(Member(counts, "listed")) + " listed, " +
                        ValueText(Member(counts, "valid")) + " as signed");

@@ -44,8 +44,9 @@ class Graph {
   size_t SubjectNode(const Json& grant);
   void AddMembers(const Json& grant, size_t node);
   void AddEntry(const Json& entry);
-  void AddCertificate(const Json& certificate);
-  void AddWays(const Json& signer);
+  void AddCertificate(const Json& certificate, const std::string& name);
+  void AddSigner(const Json& signer);
+  void AddWay(const Json& way, size_t signer);
   void AddAnswer(const Json& answer);
   void Cut(const Json& reason);
   void CutAtHead(const std::string& text);
@@ -57,7 +58,9 @@ class Graph {
   std::map<std::string, size_t> entries_;  // edges by the entry's file
   std::map<size_t, size_t> certificates_;  // and by the certificate's number
   std::map<std::string, std::map<std::string, std::string>> approvals_;  // entry, key, what of it
-  size_t answer_ = 0;  // the edge that leads to the answer
+  std::map<std::pair<bool, std::string>, size_t> steps_;  // edges: whether of an entry, its place
+  std::vector<GraphEdge> signing_;                        // of those who may sign, to the answer
+  size_t answer_ = 0;                                     // the first edge that leads to the answer
 };
 
 // A member, or null where there is none, whatever the value is.
