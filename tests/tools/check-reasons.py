@@ -18,7 +18,7 @@ for source in [*sorted((root / "tools/vesk2").rglob("*.cpp")), root / "src/frame
         word = name.removeprefix("VESK2_ERR_").lower().replace("_", "-")
         if f"| `{word}` | {numbers[name]} |" not in page:
             missing.append(f"{word} {numbers[name]} ({source.name})")
-    words = re.findall(r'(?:Trouble\([^;]*?,\s*|\bNo\(\s*)"([a-z0-9-]+)"[,)]', text)
+    words = re.findall(r'(?:Trouble\([^;]*?,\s*|\bNo\(\s*)"([a-z0-9-]+)"(?:,|\)(?! \+))', text)
     missing += [f"{word} ({source.name})" for word in words if f"| `{word}` |" not in page]
 for source in sorted((root / "tools/vesk2/audit").glob("*.cpp")):
     words = re.findall(r'\bAdd\("([a-z0-9-]+)"', source.read_text())

@@ -47,14 +47,14 @@ std::vector<Ref<PublicKey>> ReadKeys(const Options& options) {
 // One key, or k of several together.
 Ref<Subject> MakeSubject(std::vector<Ref<PublicKey>> keys, unsigned threshold) {
   if (keys.size() == 1 && threshold == 0) return Ref<Subject>(keys[0].Release());
-  const std::string count = std::to_string(keys.size());
+  const std::string count = Plural(keys.size(), "key");
   if (threshold == 0) {
-    throw Trouble(count + " keys: --threshold says how many of them must agree", "usage");
+    throw Trouble(count + ": --threshold says how many of them must agree", "usage");
   }
   if (threshold > keys.size()) {
-    throw Trouble("--threshold " + std::to_string(threshold) + " of " + count + " keys", "usage");
+    throw Trouble("--threshold " + std::to_string(threshold) + " of " + count, "usage");
   }
-  if (keys.size() > 255) throw Trouble(count + " keys: a threshold is of 255 at most", "usage");
+  if (keys.size() > 255) throw Trouble(count + ": a threshold is of 255 at most", "usage");
   Ref<ThresholdSubject> subject(new ThresholdSubject(nullptr));
   Check(subject->Set(threshold, static_cast<unsigned>(keys.size())), "building a threshold");
   std::set<std::string> seen;

@@ -97,7 +97,7 @@ class Installation {
     TellPlace(place);
     place.RemoveOld();
     const ExitCode verdict =
-        Yes("installed " + std::to_string(wanted.files()) + " files of " + Escape(options_.source) +
+        Yes("installed " + Plural(wanted.files(), "file") + " of " + Escape(options_.source) +
             " as " + Escape(options_.dest) + ", " + authority_.SignedText());
     if (filled_.passedOver > 0) {
       Note("note: passed over, as they are not listed: " + std::to_string(filled_.passedOver));
@@ -175,7 +175,7 @@ class Installation {
 
   ExitCode TellDryRun(const Wanted& wanted) {
     Result()["would_write"].push_back(Escape(options_.dest));
-    const ExitCode verdict = Yes("would install " + std::to_string(wanted.files()) + " files as " +
+    const ExitCode verdict = Yes("would install " + Plural(wanted.files(), "file") + " as " +
                                  Escape(options_.dest) + ", " + authority_.SignedText());
     Note("what " + Escape(options_.source) + " holds was not looked at");
     authority_.TellYes();

@@ -94,7 +94,7 @@ void AddApprovals(Sheet& sheet, const std::string& path, const SignatureBlock& b
     AddKeys(part, "revoked", each.revoked);
     sheet.AddPart("approvals",
                   EntryName(*each.entry) + " wants " + std::to_string(each.k) + " of " +
-                      std::to_string(each.n) + " keys for " + TagText(each.entry->entry->GetTag()) +
+                      Plural(each.n, "key") + " for " + TagText(each.entry->entry->GetTag()) +
                       (each.Missing() > 0 ? ", missing: " + std::to_string(each.Missing()) : ""),
                   std::move(part));
   }

@@ -78,8 +78,8 @@ Listing ListOrExplain(const Options& options, const IgnoreRules& rules, Manifest
   Listing listing = ListTree(options.directory, how, writer);
   for (const std::string& problem : listing.problems) Note(problem);
   if (!listing.problems.empty()) {
-    throw Trouble(std::to_string(listing.problems.size()) +
-                      " entries could not be verified later; nothing was signed (--ignore leaves "
+    throw Trouble(Plural(listing.problems.size(), "entry") +
+                      " could not be verified later; nothing was signed (--ignore leaves "
                       "an entry out)",
                   "tree-unverifiable");
   }

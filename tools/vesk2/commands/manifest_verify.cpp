@@ -119,9 +119,9 @@ class Answer {
     if (!asSigned) return RefuseTree(findings, summary);
     if (empty) return RefuseEmpty(findings);
     if (const auto older = authority_.RaiseFloor()) return *older;
-    const ExitCode verdict =
-        Yes(std::to_string(checked) + " files of " + Escape(options_.directory) + " are " +
-            authority_.SignedText() + IgnoredText(tree_.ignored.size()));
+    const ExitCode verdict = Yes(Plural(checked, "file") + " of " + Escape(options_.directory) +
+                                 (checked == 1 ? " is " : " are ") + authority_.SignedText() +
+                                 IgnoredText(tree_.ignored.size()));
     TellTree(findings);
     authority_.TellYes();
     return verdict;

@@ -106,7 +106,7 @@ std::vector<Approvals> FindApprovals(const Question& question, const Evidence& e
 
 std::string ApprovalsText(const Approvals& approvals) {
   const size_t count = approvals.approved.size();
-  std::string text = std::to_string(count) + " of " + std::to_string(approvals.k) + " approvals";
+  std::string text = std::to_string(count) + " of " + Plural(approvals.k, "approval");
   if (count > 0) text += ", by " + Joined(approvals.approved, " and ");
   if (approvals.Missing() == 0) return text;
   text += "; " + std::to_string(approvals.Missing()) +

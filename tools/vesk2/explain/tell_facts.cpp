@@ -100,7 +100,8 @@ std::string ListText(const Json& list) {
       "list by " + Short(list["issuer"]) + " until " + list["not_after"].get<std::string>();
   if (!list["age_days"].is_null()) {
     const long days = list["age_days"];
-    text += days == 0 ? ", made today" : ", " + std::to_string(days) + " days old";
+    if (days == 0) text += ", made today";
+    if (days > 0) text += ", " + Plural(static_cast<size_t>(days), "day") + " old";
   }
   return text;
 }

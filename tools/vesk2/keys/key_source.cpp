@@ -43,8 +43,8 @@ std::vector<SignedCert> ReadCerts(const std::string& path) {
 
 void RequireCert(const std::vector<SignedCert>& certs, size_t number, const std::string& path) {
   if (number >= 1 && number <= certs.size()) return;
-  throw Trouble(InputName(path) + ": holds " + std::to_string(certs.size()) +
-                " certificates, no number " + std::to_string(number));
+  throw Trouble(InputName(path) + ": holds " + Plural(certs.size(), "certificate") +
+                ", no number " + std::to_string(number));
 }
 
 Place ParsePlace(const std::string& argument) {

@@ -18,6 +18,11 @@ std::string PeriodOf(const Json& grant) {
          (last.empty() ? "" : "until " + last);
 }
 
+std::string KeysText(const Json& threshold) {
+  const std::string n = ValueText(Member(threshold, "n"));
+  return ValueText(Member(threshold, "k")) + " of " + n + (n == "1" ? " key" : " keys");
+}
+
 // What an entry and a certificate both say.
 std::vector<std::string> GrantFacts(const Json& grant) {
   const Json& tag = Member(grant, "tag");
@@ -25,8 +30,7 @@ std::vector<std::string> GrantFacts(const Json& grant) {
                                     "period: " + PeriodOf(grant)};
   const Json& threshold = Member(grant, "threshold");
   if (!threshold.is_null()) {
-    facts.push_back(ValueText(Member(threshold, "k")) + " of " + ValueText(Member(threshold, "n")) +
-                    " keys must agree");
+    facts.push_back(KeysText(threshold) + " must agree");
   }
   facts.emplace_back(Member(grant, "propagate") == true ? "may be passed on"
                                                         : "may not be passed on");
@@ -143,8 +147,7 @@ size_t Graph::SubjectNode(const Json& grant) {
       Node(ValueText(Member(grant, "subject")), ValueText(Member(grant, "subject_kind")));
   const Json& threshold = Member(grant, "threshold");
   if (!threshold.is_null()) {
-    nodes_[node].name = "any " + ValueText(Member(threshold, "k")) + " of " +
-                        ValueText(Member(threshold, "n")) + " keys";
+    nodes_[node].name = "any " + KeysText(threshold);
   }
   return node;
 }

@@ -76,9 +76,9 @@ std::string ProgressLine::Text(double seconds) const {
   const size_t total = total_ ? total_() : 0;
   const uint64_t files = files_;
   const auto bytes = static_cast<double>(bytes_.load());
-  std::string text = doing_ + " " + std::to_string(files);
-  if (total > 0) text += "/" + std::to_string(total);
-  text += " files, " + Bytes(bytes) + ", " + Bytes(bytes / seconds) + "/s";
+  std::string text = doing_ + " " + (total > 0 ? std::to_string(files) + "/" : "");
+  text += Plural(total > 0 ? total : files, "file") + ", " + Bytes(bytes) + ", " +
+          Bytes(bytes / seconds) + "/s";
   if (files == 0 || files > total) return text;
   const double each = seconds / static_cast<double>(files);
   return text + ", " + Minutes(each * static_cast<double>(total - files)) + " left";

@@ -180,7 +180,9 @@ std::string LibraryVersion() {
 }
 
 std::string Plural(size_t count, const std::string& what) {
-  return std::to_string(count) + " " + what + (count == 1 ? "" : "s");
+  const std::string text = std::to_string(count) + " " + what;
+  if (count == 1) return text;
+  return what.ends_with("ry") ? text.substr(0, text.size() - 1) + "ies" : text + "s";
 }
 
 std::string CodeName(int code) {

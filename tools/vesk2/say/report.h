@@ -118,7 +118,7 @@ std::string Reason(int code);
 // The library's version, "1.1.0".
 std::string LibraryVersion();
 
-// "1 file", "2 files".
+// "1 file", "2 files", "3 entries".
 std::string Plural(size_t count, const std::string& what);
 
 // Hexadecimal digits of `bytes`.

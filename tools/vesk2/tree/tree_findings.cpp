@@ -106,9 +106,8 @@ void Print(const Finding& finding, size_t limit) {
     const std::string& entry = groups[i].entries[0];
     const std::string why = Why(finding, entry);
     Note(std::string(finding.kind) + ": " +
-         (count > 1
-              ? Escape(groups[i].path) + ", with all its " + std::to_string(count) + " entries"
-              : Escape(entry) + (why.empty() ? "" : " (" + why + ")")));
+         (count > 1 ? Escape(groups[i].path) + ", with all its " + Plural(count, "entry")
+                    : Escape(entry) + (why.empty() ? "" : " (" + why + ")")));
   }
   if (groups.size() > limit) {
     Note("and " + std::to_string(groups.size() - limit) + " more " + finding.kind + " (--all)");
