@@ -268,6 +268,7 @@ ExitCode Run(const Options& options) {
   std::string text = subject->Name();
   if (code == 0) text += " is authorized for " + tag;
   if (code != 0) text += " is not authorized for " + tag + ": " + CodeWords(code);
+  if (code != 0) NoteMeantRequest(request);
   if (!change) {
     text += code == 0 ? ", without end" : ", and nothing that is known will change that";
     return code == 0 ? Yes(text) : No(code, text);

@@ -199,6 +199,7 @@ ExitCode Run(const Options& options) {
   if (supposition.Any()) now = NamesNow(holdings, request);
   const ExitCode verdict =
       answer.IsEmpty() ? No("nobody", "nobody may sign for " + tag) : Yes(answer.Summary() + tag);
+  if (answer.IsEmpty()) NoteMeantRequest(request);
   answer.Tell();
   if (supposition.Any()) {
     TellDifference(now, answer.Names(), "no_longer", "no longer: ");

@@ -147,6 +147,7 @@ void Explain(Tell&& tell) {
 }  // namespace
 
 void ExplainRefusal(const Question& question, int code) {
+  NoteMeantRequest(*question.request);
   Explain([&] {
     const Evidence evidence = GatherEvidence(question);
     TellFacts(evidence);

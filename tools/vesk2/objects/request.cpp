@@ -94,6 +94,11 @@ Request ParseRequest(const std::string& text) {
   return request;
 }
 
+void NoteMeantRequest(const Request& request) {
+  const std::string why = WhyNotOneList(*request.tag, request.text);
+  if (!why.empty()) Note(why);
+}
+
 void TellMember(const Request& request, size_t index, int code) {
   if (request.members.size() < 2) return;
   const std::string tag = Escape(request.members[index].text);

@@ -27,6 +27,9 @@ struct Request {
 // member. Trouble for more than 64 members.
 Request ParseRequest(const std::string& text);
 
+// NoteMeantRequest notes, beside a no, what was probably meant by a tag without its parentheses.
+void NoteMeantRequest(const Request& request);
+
 // TellMember says the answer about one of several members, and adds it to "members" of the result.
 void TellMember(const Request& request, size_t index, int code);
 

@@ -60,11 +60,16 @@ void RequirePlainBounds(SExpression* tag) {
 Ref<SExpression> ParseIssuedTag(const std::string& text) {
   Ref<SExpression> tag = ParseTypedTag(text);
   RequirePlainBounds(tag.get());
-  const bool oneList = tag->Count() == 2 && tag->Last()->IsSExpression();
-  if (oneList || IsRevocationTag(tag.get())) return tag;
-  throw Trouble("tag \"" + Escape(text) + "\": not one list in parentheses; did you mean " +
-                    ShellWord(MeantList(*tag, text)) + "?",
-                "usage");
+  const std::string why = WhyNotOneList(*tag, text);
+  if (!why.empty()) throw Trouble(why, "usage");
+  return tag;
+}
+
+std::string WhyNotOneList(SExpression& tag, const std::string& text) {
+  const bool oneList = tag.Count() == 2 && tag.Last()->IsSExpression();
+  if (oneList || IsRevocationTag(&tag)) return "";
+  return "tag \"" + Escape(text) + "\": not one list in parentheses; did you mean " +
+         ShellWord(MeantList(tag, text)) + "?";
 }
 
 }  // namespace vesk2_command

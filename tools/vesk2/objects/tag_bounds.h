@@ -17,6 +17,9 @@ void RequirePlainBounds(SExpression* tag);
 // has nothing in common with "(install)", and would be granted to nobody's use. Only the tags of
 // revocation lists are made of words and a list.
 Ref<SExpression> ParseIssuedTag(const std::string& text);
+// The words of that, with what was probably meant; empty for a tag that is one list. A question
+// about any other is answered, and a no is where they help.
+std::string WhyNotOneList(SExpression& tag, const std::string& text);
 
 }  // namespace vesk2_command
 
