@@ -23,7 +23,7 @@ int Judgements(size_t certs, int most) {
   const Ref<ZvVesk2::Cert> cert = LongCert();
   ZvVesk2::Evidence proved(nullptr);
   for (size_t i = 0; i < certs; ++i) EXPECT_EQ(proved.AddCert(cert.get(), nullptr, 0), 0);
-  const Ref<SExpression> entries = EntryList({});
+  const Ref<SExpression> entries = ListOf({}, "acl");
   proved.SetEntries(entries.get());
   const Request request = ParseRequest("(a)");
   Question question;

@@ -137,10 +137,8 @@ std::optional<long> Moments::FirstChange(long from,
 Cause FindCause(ZvVesk2::Evidence& refused, const Request& request, long second,
                 const std::vector<std::string>& places) {
   const int code = JudgeMembers(refused, request);
-  Ref<SExpression> members(new SExpression(nullptr));
-  for (const auto& member : request.members) Append(*members, *member.tag);
   Explanation why(nullptr);
-  Check(why.Explain(refused, code, request.tag.get(), members.get()), "explaining");
+  Check(why.Explain(refused, code, request.tag.get(), MemberList(request).get()), "explaining");
   if (why.CountReasons() == 0) return {"combination", CodeWords(code), "", "", ""};
   size_t best = 0;
   for (size_t i = 1; i < why.CountReasons(); ++i) {

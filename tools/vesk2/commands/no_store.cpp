@@ -18,7 +18,7 @@ namespace {
 void ExplainWithoutEntries(Question& question) {
   ZvVesk2::Evidence judged(nullptr);
   Check(judged.Copy(*question.proved), "explaining");
-  judged.SetEntries(EntryList({}).get());
+  judged.SetEntries(ListOf({}, "acl").get());
   judged.SetLists(nullptr, question.proved->GetCarriedLists());
   const int code = judged.Judge(question.request->tag.get());
   const ZvVesk2::Evidence* proved = std::exchange(question.proved, &judged);

@@ -52,7 +52,7 @@ class Finder {
     SExpression* const tag = request != nullptr ? request->tag.get() : entry.GetTag();
     const Ref<AclEntry> trusted =
         BuildEntry({Ref<Subject>::Share(&member), true, Ref<SExpression>::Share(tag)});
-    const Ref<SExpression> entries = EntryList({trusted.get()});
+    const Ref<SExpression> entries = ListOf({trusted.get()}, "acl");
     alone.SetGrantingEntries(entries.get());
     if (request == nullptr) return GrantsAnything(alone);
     for (const Request::Member& each : request->members) {

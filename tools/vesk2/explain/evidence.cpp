@@ -123,23 +123,6 @@ bool Names(Subject* subject, DExpression* key) {
   return threshold != nullptr && principal != nullptr && threshold->HasMember(principal);
 }
 
-void InsertShared(SExpression& list, DExpression* item) {
-  auto shared = Ref<DExpression>::Share(item);
-  Check(list.Insert(shared.get()), "building a list");
-  (void)shared.Release();
-}
-
-Ref<SExpression> RevocationSource(const Cert& cert) {
-  const SExpression* element = cert.GetRevocationElement();
-  Ref<SExpression> source;
-  if (element == nullptr) return source;
-  Check(SExpression::Create(source.Out(), "tag", nullptr), "building a tag");
-  auto it = element->Begin();
-  if (it) it.Next();  // the keyword
-  for (; it; it.Next()) InsertShared(*source, it.Value());
-  return source;
-}
-
 const EntryEvidence* Voucher(const Evidence& evidence, SExpression* source) {
   const auto found = std::find_if(
       evidence.entries.rbegin(), evidence.entries.rend(),
@@ -147,20 +130,13 @@ const EntryEvidence* Voucher(const Evidence& evidence, SExpression* source) {
   return found != evidence.entries.rend() ? &*found : nullptr;
 }
 
-std::vector<AclEntry*> AllEntries(const Evidence& evidence) {
-  std::vector<AclEntry*> entries;
+Ref<SExpression> AllEntries(const Evidence& evidence) {
+  std::vector<DExpression*> entries;
   for (const EntryEvidence& each : evidence.entries) entries.push_back(each.entry.get());
-  return entries;
+  return ListOf(entries, "acl");
 }
 
-Ref<SExpression> EntryList(const std::vector<AclEntry*>& entries) {
-  Ref<SExpression> list;
-  Check(SExpression::Create(list.Out(), "acl", nullptr), "building a list");
-  for (AclEntry* entry : entries) InsertShared(*list, entry);
-  return list;
-}
-
-Ref<SExpression> LoadLists(const Evidence& evidence, SExpression*) {
+Ref<SExpression> LoadLists(const Evidence& evidence) {
   std::vector<std::string> texts;
   if (evidence.proved != nullptr) {
     for (CrlSequence* list : ListsOf(evidence.proved->GetStoredLists())) {
@@ -173,7 +149,7 @@ Ref<SExpression> LoadLists(const Evidence& evidence, SExpression*) {
   for (const std::string& text : texts) {
     const Ref<CrlSequence> list(new CrlSequence(nullptr));
     const Buffer buffer = WrapBytes(text);
-    if (list->Import(buffer.get()) == 0) InsertShared(*lists, list.get());
+    if (list->Import(buffer.get()) == 0) Append(*lists, *list);
   }
   return lists;
 }

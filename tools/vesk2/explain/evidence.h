@@ -70,19 +70,13 @@ std::string CertName(const Evidence& evidence, size_t index);
 std::string EntryName(const EntryEvidence& entry);
 // Whether a subject is a key, names it by its digest or counts it among its k-of-n.
 bool Names(ZvVesk2::Subject* subject, DExpression* key);
-// The tag of the lists that a certificate's revocation element names; null without one.
-Ref<SExpression> RevocationSource(const ZvVesk2::Cert& cert);
 // The last entry of exactly that tag, which decides whose lists count; null without one.
 const EntryEvidence* Voucher(const Evidence& evidence, SExpression* source);
 // Fresh copies of the lists, the stored ones first, then a manifest's own: which of them count is
-// for these entries to say (CrlSequence::VerifySelf).
-Ref<SExpression> LoadLists(const Evidence& evidence, SExpression* entries);
+// for the entries to say (CrlSequence::VerifySelf).
+Ref<SExpression> LoadLists(const Evidence& evidence);
 // (acl ENTRY...) of the evidence.
-Ref<SExpression> EntryList(const std::vector<ZvVesk2::AclEntry*>& entries);
-std::vector<ZvVesk2::AclEntry*> AllEntries(const Evidence& evidence);
-
-// Adds a reference of the list's own.
-void InsertShared(SExpression& list, DExpression* item);
+Ref<SExpression> AllEntries(const Evidence& evidence);
 
 }  // namespace vesk2_command
 

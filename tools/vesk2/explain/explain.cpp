@@ -33,9 +33,7 @@ void Ask(Explanation& explanation, const Question& question, int code) {
                              directory.empty() ? nullptr : directory.c_str()),
         "explaining");
   const Request& request = *question.request;
-  Ref<SExpression> members(new SExpression(nullptr));
-  for (const auto& member : request.members) InsertShared(*members, member.tag.get());
-  Check(explanation.Explain(*question.proved, code, request.tag.get(), members.get()),
+  Check(explanation.Explain(*question.proved, code, request.tag.get(), MemberList(request).get()),
         "explaining");
 }
 

@@ -70,7 +70,7 @@ void EditMaker::FreshList(std::vector<Edit>& edits, size_t index) const {
   const std::string file = FileNameOf(text);
   std::vector<std::string> issue = {"vesk2",           "crl",   "issue", "--key",
                                     KeyWord(*revoker), "--tag", text};
-  const Ref<SExpression> entries = EntryList(AllEntries(evidence_));
+  const Ref<SExpression> entries = AllEntries(evidence_);
   if (stored && stored->VerifySelf(entries.get()) == 0) {
     issue.insert(issue.end(), {"--items-of", stored->GetFileName()});
   }

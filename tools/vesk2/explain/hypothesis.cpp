@@ -94,10 +94,10 @@ class World {
       if (!each.inStore) others.push_back(each.entry.get());
     }
     for (const auto& [file, entry] : hypothesis_.entries) store[file] = entry;
-    std::vector<AclEntry*> entries;
+    std::vector<DExpression*> entries;
     for (const auto& [file, entry] : store) entries.push_back(entry);
     entries.insert(entries.end(), others.begin(), others.end());
-    changed_.SetEntries(EntryList(entries).get());
+    changed_.SetEntries(ListOf(entries, "acl").get());
   }
 
   const Evidence& evidence_;

@@ -12,9 +12,7 @@ using ZvVesk2::Subject;
 using ZvVesk2::ThresholdSubject;
 
 Policy::Policy(const Question& question, const Evidence& evidence)
-    : evidence_(evidence),
-      entries_(EntryList(AllEntries(evidence))),
-      lists_(LoadLists(evidence, entries_.get())) {
+    : evidence_(evidence), entries_(AllEntries(evidence)), lists_(LoadLists(evidence)) {
   for (const CertEvidence& each : evidence.certs) {
     if (IsListed(each)) revoked_.push_back(each.cert->GetSubject());
   }

@@ -94,6 +94,12 @@ Request ParseRequest(const std::string& text) {
   return request;
 }
 
+Ref<SExpression> MemberList(const Request& request) {
+  std::vector<DExpression*> tags;
+  for (const Request::Member& member : request.members) tags.push_back(member.tag.get());
+  return ListOf(tags);
+}
+
 void NoteMeantRequest(const Request& request) {
   const std::string why = WhyNotOneList(*request.tag, request.text);
   if (!why.empty()) Note(why);

@@ -27,6 +27,9 @@ struct Request {
 // member. Trouble for more than 64 members.
 Request ParseRequest(const std::string& text);
 
+// The members as a list.
+Ref<SExpression> MemberList(const Request& request);
+
 // NoteMeantRequest notes, beside a no, what was probably meant by a tag without its parentheses.
 void NoteMeantRequest(const Request& request);
 
