@@ -1,11 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 // cert_install.cpp: vesk2 cert install.
-#include <filesystem>
-#include <set>
-
 #include "tools/vesk2/audit/chain_state.h"
 #include "tools/vesk2/commands/command.h"
 #include "tools/vesk2/commands/describe.h"
+#include "tools/vesk2/files/stores.h"
 #include "tools/vesk2/stores/acl_store.h"
 #include "tools/vesk2/stores/cert_store.h"
 
@@ -18,12 +16,6 @@ struct Options {
   WriteFlags flags;
 };
 
-std::string ChainName(const Options& options, const std::string& path) {
-  if (!options.name.empty()) return options.name;
-  if (path == kStandard) throw Trouble("a chain from standard input needs a --name", "usage");
-  return std::filesystem::path(path).stem().string();
-}
-
 // What is refused now is of no use in the store; cert verify explains it.
 ExitCode Refuse(const std::string& path, const ChainState& state) {
   if (state.proved().GetEntries() == nullptr) ThrowNoStore(VESK2_ERR_ACL_ENTRY_NOT_FOUND);
@@ -33,28 +25,20 @@ ExitCode Refuse(const std::string& path, const ChainState& state) {
 }
 
 ExitCode Run(const Options& options) {
-  if (!options.name.empty() && options.files.size() > 1) {
-    throw Trouble("--name is for one chain", "usage");
-  }
+  const std::vector<std::string> names = StoreNames(options.files, options.name, ".cert");
   // All are verified, and their names free, before the first is written.
   std::vector<CertChain> chains;
-  std::set<std::string> names;
   Result()["chains"] = Json::array();
-  for (const std::string& path : options.files) {
-    chains.push_back(ReadCertChain(path));
-    const ChainState state(chains.back(), path);
-    if (state.code() != 0) return Refuse(path, state);
-    const std::string name = ChainName(options, path);
-    if (!names.insert(ChainPath(name)).second) {
-      throw Trouble("two chains " + Escape(name), "usage");
-    }
-    if (!IsStored(*chains.back(), name)) RefuseExisting(ChainPath(name), options.flags.force);
+  for (size_t i = 0; i < names.size(); ++i) {
+    chains.push_back(ReadCertChain(options.files[i]));
+    const ChainState state(chains[i], options.files[i]);
+    if (state.code() != 0) return Refuse(options.files[i], state);
+    if (!IsStored(*chains[i], names[i])) RefuseExisting(ChainPath(names[i]), options.flags.force);
   }
-  for (size_t i = 0; i < chains.size(); ++i) {
-    const std::string name = ChainName(options, options.files[i]);
-    StoreChain(*chains[i], name, options.flags);
+  for (size_t i = 0; i < names.size(); ++i) {
+    StoreChain(*chains[i], names[i], options.flags);
     Json said = DescribeChain(ChainLinks(chains[i], options.files[i])).members();
-    said["file"] = Escape(ChainPath(name));
+    said["file"] = Escape(ChainPath(names[i]));
     Result()["chains"].push_back(std::move(said));
   }
   return kYes;

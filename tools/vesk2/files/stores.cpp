@@ -86,4 +86,21 @@ std::vector<std::string> StoreFilesOf(const std::string& directory, const std::s
   return exists ? FilesOf(directory, extension) : std::vector<std::string>();
 }
 
+std::vector<std::string> StoreNames(const std::vector<std::string>& files, const std::string& name,
+                                    const std::string& extension) {
+  if (!name.empty() && files.size() > 1) throw Trouble("--name is for one file", "usage");
+  if (!name.empty()) return {name};
+  std::vector<std::string> names;
+  for (const std::string& path : files) {
+    if (path == kStandard) throw Trouble("standard input has no name: --name gives one", "usage");
+    std::string own = std::filesystem::path(path).stem().string();
+    while (own.ends_with(extension)) own.resize(own.size() - extension.size());
+    if (std::find(names.begin(), names.end(), own) != names.end()) {
+      throw Trouble("two files would be " + Escape(own), "usage");
+    }
+    names.push_back(std::move(own));
+  }
+  return names;
+}
+
 }  // namespace vesk2_command

@@ -38,6 +38,10 @@ std::string AclDirectory();
 std::vector<std::string> FilesOf(const std::string& directory, const std::string& extension);
 // The same of a store's directory, which need not be there.
 std::vector<std::string> StoreFilesOf(const std::string& directory, const std::string& extension);
+// The names that files get in a store: `name`, which can be that of one, or each file's own without
+// its extension. Trouble for two alike.
+std::vector<std::string> StoreNames(const std::vector<std::string>& files, const std::string& name,
+                                    const std::string& extension);
 
 }  // namespace vesk2_command
 
