@@ -1,5 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-// Signature checks. The answer is "not valid" until libcrypto says otherwise, in one place.
+// Signature checks. The answer is "not valid" until libcrypto says otherwise, in one place. Its own
+// check of the whole signature is the only one that makes it good: no arithmetic of ours and no
+// look of ours at a block ever does, however much time that would save. Ours can only refuse.
 //
 // libcrypto answers a bad signature and a lack of memory alike, with "no". Taken for "not valid",
 // the second would leave a revocation list unread, and the keys on it in use. So a key or signature
