@@ -90,8 +90,8 @@ ExitCode Run(const Options& options) {
                  ParseIssuedTag(options.tag), ParsePeriod(options.period), options.comment});
   const bool issuer = !options.issuerOf.empty();
   CheckGrant(*entry, issuer ? options.issuerOf : options.subjectOf, issuer, options.strict);
-  GrantEntry(*entry, {name, options.flags});
-  Result()["entry"] = DescribeEntry(*entry, name + ".acl").members();
+  const std::string file = GrantEntry(*entry, {name, options.flags});
+  Result()["entry"] = DescribeEntry(*entry, file).members();
   // The lists of a revocation source are believed without it.
   if (!options.propagate && !IsRevocationTag(entry->GetTag())) {
     Note(

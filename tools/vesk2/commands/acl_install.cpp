@@ -26,8 +26,8 @@ ExitCode Run(const Options& options) {
     RefuseTaken(*entries[i], {names[i], options.flags});
   }
   for (size_t i = 0; i < names.size(); ++i) {
-    GrantEntry(*entries[i], {names[i], options.flags});
-    Result()["entries"].push_back(DescribeEntry(*entries[i], names[i] + ".acl").members());
+    const std::string file = GrantEntry(*entries[i], {names[i], options.flags});
+    Result()["entries"].push_back(DescribeEntry(*entries[i], file).members());
   }
   return kYes;
 }

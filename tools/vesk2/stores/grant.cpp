@@ -66,12 +66,16 @@ std::string FreeEntryName(AclEntry& entry, const std::string& name) {
   return result;
 }
 
-void GrantEntry(AclEntry& entry, const EntryPlace& place) {
+std::string GrantEntry(AclEntry& entry, const EntryPlace& place) {
   const std::string path = PathOf(place.name);
   const std::string bytes = Canonical(entry);
-  if (IsAlready(path, bytes)) return Note(Escape(path) + " says so already");
-  RefuseTaken(entry, place);
-  WriteFile(path, bytes, {.flags = place.flags, .check = ReadBack, .inStore = true});
+  if (IsAlready(path, bytes)) {
+    Note(Escape(path) + " says so already");
+  } else {
+    RefuseTaken(entry, place);
+    WriteFile(path, bytes, {.flags = place.flags, .check = ReadBack, .inStore = true});
+  }
+  return std::filesystem::path(path).filename().string();
 }
 
 void RefuseTaken(AclEntry& entry, const EntryPlace& place) {

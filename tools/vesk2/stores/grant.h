@@ -27,8 +27,8 @@ struct EntryPlace {
 std::string FreeEntryName(ZvVesk2::AclEntry& entry, const std::string& name);
 
 // GrantEntry checks an entry and writes it into the machine's store, which it makes if need be. An
-// equal entry of that name stays as it is.
-void GrantEntry(ZvVesk2::AclEntry& entry, const EntryPlace& place);
+// equal entry of that name stays as it is. Returns the name of its file.
+std::string GrantEntry(ZvVesk2::AclEntry& entry, const EntryPlace& place);
 // RefuseTaken is Trouble where GrantEntry would not replace another entry.
 void RefuseTaken(ZvVesk2::AclEntry& entry, const EntryPlace& place);
 
