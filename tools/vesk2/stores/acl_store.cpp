@@ -59,6 +59,7 @@ bool HasNoStore(const std::string& extraDirectory) {
 
 void ThrowNoStore(int code) {
   for (const std::string& reason : ExplainStore()) Note(reason);
+  if (HasNoStore("")) TellHowToTrust();
   Trouble trouble("the ACL store cannot be loaded; nothing is trusted (" + CodeName(code) + ")",
                   "no-acl-store");
   trouble.code = code;

@@ -24,8 +24,8 @@ bool HasNoStore(const std::string& extraDirectory);
 // entries noted, where there is none; else ThrowNoStore.
 Ref<SExpression> NoEntries(const std::string& extraDirectory, int code);
 void TellHowToTrust();
-// Notes why there is no entry, and throws the Trouble for a store without which nothing can be
-// answered.
+// Notes why there is no entry, and how to make one where there is none, and throws the Trouble for
+// a store without which nothing can be answered.
 [[noreturn]] void ThrowNoStore(int code);
 
 }  // namespace vesk2_command
