@@ -60,7 +60,21 @@ double TimeOf(const std::vector<std::string>& words) {
   return Spent() - before;
 }
 
-// What starting and answering takes above a program that does nothing, over what the peer takes.
+// What starting and answering takes above a program that does nothing, over what another takes.
+Outcome Start(const Effort& effort, const std::vector<std::string>& ours,
+              const std::vector<std::string>& other) {
+  double least[3] = {1e9, 1e9, 1e9};
+  for (int round = 0; round < effort.rounds; ++round) {
+    const std::vector<std::string> programs[3] = {{"/bin/true"}, ours, other};
+    for (int i = 0; i < 3; ++i) {
+      const double taken = TimeOf(programs[i]);
+      if (taken < 0) return Failed(programs[i][0]);
+      least[i] = std::min(least[i], taken);
+    }
+  }
+  return {Outcome::kMeasured, (least[1] - least[0]) / (least[2] - least[0]), {}};
+}
+
 Outcome StartAgainstPeer(const Effort& effort, const std::vector<std::string>& ours) {
   const std::string peer = FindProgram("minisign");
   if (peer.empty()) return NotInstalled("minisign");
@@ -69,17 +83,7 @@ Outcome StartAgainstPeer(const Effort& effort, const std::vector<std::string>& o
   const std::string keys[] = {place.Path() + "/peer.pub", place.Path() + "/peer.key"};
   Run({peer, "-G", "-W", "-f", "-p", keys[0], "-s", keys[1]});
   Run({peer, "-S", "-s", keys[1], "-m", file});
-  double least[3] = {1e9, 1e9, 1e9};
-  for (int round = 0; round < effort.rounds; ++round) {
-    const std::vector<std::string> programs[3] = {
-        {"/bin/true"}, ours, {peer, "-V", "-p", keys[0], "-m", file}};
-    for (int i = 0; i < 3; ++i) {
-      const double taken = TimeOf(programs[i]);
-      if (taken < 0) return Failed(programs[i][0]);
-      least[i] = std::min(least[i], taken);
-    }
-  }
-  return {Outcome::kMeasured, (least[1] - least[0]) / (least[2] - least[0]), {}};
+  return Start(effort, ours, {peer, "-V", "-p", keys[0], "-m", file});
 }
 
 }  // namespace
@@ -97,6 +101,14 @@ Figures CommandFigures() {
        }},
       {"U1b", "vesk2 manifest verify of one file, above it", "the same", 5,
        [](const Effort& effort) { return StartAgainstPeer(effort, TheTree(1, 64).Command()); }},
+      {"U2a", "vesk2 version, above /bin/true", "loading libcrypto and the C++ runtime", 1.5,
+       [](const Effort& effort) {
+         return Start(effort, {VESK2_COMMAND, "version"}, {VESK2_FLOOR_START});
+       }},
+      {"U2b", "vesk2 manifest verify of one file, above it", "that, and fetching SHA-256", 2,
+       [](const Effort& effort) {
+         return Start(effort, TheTree(1, 64).Command(), {VESK2_FLOOR_START, "fetch"});
+       }},
   };
 }
 
