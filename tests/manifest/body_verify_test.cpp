@@ -26,10 +26,6 @@ namespace fs = std::filesystem;
 
 namespace {
 
-constexpr int kDiffers = VESK2_ERR_HASH_MISMATCH;
-constexpr int kMissing = VESK2_ERR_FILE_NOT_FOUND;
-constexpr int kExtra = VESK2_ERR_EXTRA_FILES;
-
 // Changes what is on disk at `path`: "+" writes a file, "-" removes, "P" puts a FIFO there, "S" a
 // socket, "D" a directory, "L" a dangling link; "M" moves it elsewhere and leaves a link.
 void Change(const TempDir& dir, char what, const std::string& path) {

@@ -28,10 +28,6 @@ namespace fs = std::filesystem;
 
 namespace {
 
-constexpr int kDiffers = VESK2_ERR_HASH_MISMATCH;
-constexpr int kMissing = VESK2_ERR_FILE_NOT_FOUND;
-constexpr int kExtra = VESK2_ERR_EXTRA_FILES;
-
 // The findings about a tree, behind the code.
 std::string Ask(const TempDir& dir, const std::string& body,
                 const Vesk2FileCallbacks* callbacks = nullptr) {

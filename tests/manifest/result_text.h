@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// The findings of a manifest as one line of text, and names to ignore from one, for tables of
-// cases.
+// What is found about a tree, for tables of cases: its codes, the findings of a manifest as one
+// line of text, and names to ignore from one.
 #ifndef VESK2_TESTS_MANIFEST_RESULT_TEXT_H
 #define VESK2_TESTS_MANIFEST_RESULT_TEXT_H
 
@@ -12,6 +12,10 @@
 #include <vesk2/manifest.h>
 
 namespace vesk2test {
+
+inline constexpr int kDiffers = VESK2_ERR_HASH_MISMATCH;
+inline constexpr int kMissing = VESK2_ERR_FILE_NOT_FOUND;
+inline constexpr int kExtra = VESK2_ERR_EXTRA_FILES;
 
 // "V:sub/ sub/f a I: M: X:b": the four lists in their order, paths without `prefix`, directories
 // with a "/" behind them.
