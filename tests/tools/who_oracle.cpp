@@ -374,7 +374,7 @@ class Comparison {
 
   bool AgreeOnKeys(int tick) {
     for (int key = 0; key < kSigners; ++key) {
-      const Ref<PublicKey> known = search_.FindKey(Fingerprint(*PublicOf(key)));
+      const Ref<PublicKey> known = search_.keys().FindKey(Fingerprint(*PublicOf(key)));
       const Signers signers = known ? OneKey(known) : OneKey(PublicOf(key));
       if (!Compare("key " + std::to_string(key), signers, tick,
                    [&](int at) { return model_.MaySign({key}, at); })) {

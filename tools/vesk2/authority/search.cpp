@@ -7,13 +7,10 @@
 #include "tools/vesk2/authority/search.h"
 
 #include <algorithm>
-#include <deque>
 #include <set>
 #include <utility>
 
 #include "tools/vesk2/explain/effort.h"
-#include "tools/vesk2/objects/texts.h"
-#include "tools/vesk2/say/report.h"
 
 namespace vesk2_command {
 namespace {
@@ -23,25 +20,8 @@ using ZvVesk2::Cert;
 using ZvVesk2::Hash;
 using ZvVesk2::Principal;
 using ZvVesk2::Subject;
-using ZvVesk2::ThresholdSubject;
 
 constexpr const char* kWhat = "looking for who may sign";
-
-std::vector<PublicKey*> MembersOf(ThresholdSubject& several) {
-  Ref<SExpression> members;
-  Check(several.GetSubjects(members.Out()), kWhat);
-  std::vector<PublicKey*> keys;
-  for (auto it = members->Begin(); it; it.Next()) {
-    auto* const key = dynamic_cast<PublicKey*>(it.Value());
-    if (key != nullptr) keys.push_back(key);
-  }
-  return keys;  // borrowed from `several`, which shares them
-}
-
-// How subjects can name a key.
-std::vector<std::string> NamesOf(PublicKey& key) {
-  return {Fingerprint(key), SubjectText(*HashOf(key, ZVCLM_HASH_SHA1, true))};
-}
 
 Ref<Cert> NewCert(Principal& issuer, Subject& subject, bool propagate) {
   Ref<Cert> cert(new Cert(nullptr));
@@ -59,125 +39,13 @@ void AddTo(ZvVesk2::Evidence& evidence, Cert& cert, ZvVesk2::Signature* signatur
 
 }  // namespace
 
-// ---- Keys ----
-
 Search::Search(const Holdings& holdings, const Request& request, const Supposition& supposition)
     : holdings_(holdings),
       request_(request),
       supposition_(supposition),
-      entries_(supposition.Entries(holdings.entries.get())) {
-  for (auto it = entries_->Begin(); it; it.Next()) {
-    auto* const entry = dynamic_cast<AclEntry*>(it.Value());
-    if (entry == nullptr) continue;  // the keyword
-    AddSubject(entry->GetSubject(), entryList_.size(), entriesFor_);
-    entryList_.push_back(entry);
-  }
-  for (size_t i = 0; i < holdings_.certs.size(); ++i) {
-    const Cert& cert = *holdings_.certs[i].cert;
-    AddSubject(cert.GetSubject(), i, certsFor_);
-    AddKey(cert.GetIssuer());
-    covers_.push_back(Covers(cert.GetTag()));
-  }
-}
-
-void Search::AddKey(DExpression* subject) {
-  auto* const key = dynamic_cast<PublicKey*>(subject);
-  if (key != nullptr) keys_.emplace(Fingerprint(*key), Ref<PublicKey>::Share(key));
-}
-
-void Search::AddSubject(Subject* subject, size_t number, Named& named) {
-  auto* const several = dynamic_cast<ThresholdSubject*>(subject);
-  if (several == nullptr) {
-    AddKey(subject);
-    named[SubjectText(*subject)].push_back(number);
-    return;
-  }
-  Signers group{{}, several->GetK()};
-  for (PublicKey* const member : MembersOf(*several)) {
-    AddKey(member);
-    named[Fingerprint(*member)].push_back(number);
-    group.keys.push_back(Ref<PublicKey>::Share(member));
-  }
-  if (group.IsGroup()) groups_.emplace(SubjectText(*subject), std::move(group));
-}
-
-std::vector<Signers> Search::Candidates() const {
-  std::vector<Signers> candidates;
-  for (const auto& [fingerprint, key] : keys_) {
-    if (Numbers(entriesFor_, *key).empty() && Numbers(certsFor_, *key).empty()) continue;
-    candidates.push_back(OneKey(key));
-  }
-  for (const auto& [text, group] : groups_) {
-    Signers copy{{}, group.k};
-    for (const auto& key : group.keys) copy.keys.push_back(Ref<PublicKey>::Share(key.get()));
-    candidates.push_back(std::move(copy));
-  }
-  return candidates;
-}
-
-Signers OneKey(const Ref<PublicKey>& key) {
-  Signers one;
-  one.keys.push_back(Ref<PublicKey>::Share(key.get()));
-  return one;
-}
-
-Ref<PublicKey> Search::FindKey(const std::string& fingerprint) const {
-  const auto found = keys_.find(fingerprint);
-  return found != keys_.end() ? Ref<PublicKey>::Share(found->second.get()) : Ref<PublicKey>();
-}
-
-bool Search::IsInGroup(PublicKey& key) const {
-  return std::any_of(groups_.begin(), groups_.end(), [&](const auto& each) {
-    const auto& keys = each.second.keys;
-    return std::any_of(keys.begin(), keys.end(),
-                       [&](const auto& member) { return member->IsEqual(&key); });
-  });
-}
-
-std::vector<size_t> Search::Numbers(const Named& named, PublicKey& key) {
-  std::vector<size_t> numbers;
-  for (const std::string& name : NamesOf(key)) {
-    const auto found = named.find(name);
-    if (found == named.end()) continue;
-    numbers.insert(numbers.end(), found->second.begin(), found->second.end());
-  }
-  return numbers;
-}
-
-// ---- What may lead to them ----
-
-// The nearest first.
-std::vector<size_t> Search::Reach(const std::vector<PublicKey*>& keys) const {
-  std::vector<size_t> reached;
-  std::set<std::string> seen;
-  std::set<size_t> taken;
-  std::deque<PublicKey*> next(keys.begin(), keys.end());
-  for (; !next.empty(); next.pop_front()) {
-    if (!seen.insert(Fingerprint(*next.front())).second) continue;
-    for (const size_t number : Numbers(certsFor_, *next.front())) {
-      if (!taken.insert(number).second) continue;
-      reached.push_back(number);
-      auto* const issuer = dynamic_cast<PublicKey*>(CertOf(number).GetIssuer());
-      if (issuer != nullptr) next.push_back(issuer);
-    }
-  }
-  return reached;
-}
-
-// In the order of the store.
-std::vector<AclEntry*> Search::EntriesFor(const std::vector<PublicKey*>& keys,
-                                          const std::vector<size_t>& reached) const {
-  std::set<size_t> numbers;
-  const auto add = [&](PublicKey* key) {
-    if (key == nullptr) return;
-    const std::vector<size_t> named = Numbers(entriesFor_, *key);
-    numbers.insert(named.begin(), named.end());
-  };
-  for (PublicKey* const key : keys) add(key);
-  for (const size_t cert : reached) add(dynamic_cast<PublicKey*>(CertOf(cert).GetIssuer()));
-  std::vector<AclEntry*> entries;
-  for (const size_t number : numbers) entries.push_back(entryList_[number]);
-  return entries;
+      entries_(supposition.Entries(holdings.entries.get())),
+      keys_(holdings, *entries_) {
+  for (const HeldCert& each : holdings_.certs) covers_.push_back(Covers(each.cert->GetTag()));
 }
 
 bool Search::Covers(SExpression* tag) const {
@@ -192,7 +60,7 @@ bool Search::Covers(SExpression* tag) const {
 std::vector<size_t> Search::OwnCerts(PublicKey& signer, const std::vector<size_t>& reached) const {
   std::vector<size_t> own;
   for (const size_t number : reached) {
-    if (CertOf(number).GetSubject()->IsEqual(&signer)) own.push_back(number);
+    if (keys_.CertOf(number).GetSubject()->IsEqual(&signer)) own.push_back(number);
   }
   own.push_back(Way::kSelf);
   return own;
@@ -205,7 +73,7 @@ void Search::MakeEvidence(const Way& way, TimeStamp* at, ZvVesk2::Evidence& evid
   const Ref<Hash> content = Content();
   AddTo(evidence, *NewCert(*way.signer, *content, false));
   const auto add = [&](size_t number) {
-    AddTo(evidence, CertOf(number), holdings_.certs[number].signature.get());
+    AddTo(evidence, keys_.CertOf(number), holdings_.certs[number].signature.get());
   };
   if (way.own == Way::kSelf) AddTo(evidence, *NewCert(*way.signer, *way.signer, true));
   if (way.own != Way::kSelf) add(way.own);
@@ -259,8 +127,8 @@ bool Search::IsRevoked(PublicKey& key, TimeStamp* at) const {
 void Search::Shorten(Way& way, TimeStamp* at, bool alone) const {
   std::vector<size_t> order = way.rest;
   std::stable_sort(order.begin(), order.end(), [&](size_t a, size_t b) {
-    const TimeStamp* const end = CertOf(a).GetNotAfter();
-    const TimeStamp* const other = CertOf(b).GetNotAfter();
+    const TimeStamp* const end = keys_.CertOf(a).GetNotAfter();
+    const TimeStamp* const other = keys_.CertOf(b).GetNotAfter();
     return end != nullptr && (other == nullptr || end->IsBefore(other));
   });
   for (const size_t number : order) {
@@ -272,11 +140,11 @@ void Search::Shorten(Way& way, TimeStamp* at, bool alone) const {
 
 void Search::FindFor(const std::vector<PublicKey*>& keys, TimeStamp* at, size_t most,
                      std::vector<Way>& ways) const {
-  const std::vector<size_t> reached = Reach(keys);
+  const std::vector<size_t> reached = keys_.Reach(keys);
   std::vector<size_t> covering;
   std::copy_if(reached.begin(), reached.end(), std::back_inserter(covering),
                [&](size_t number) { return covers_[number]; });
-  std::vector<AclEntry*> entries = EntriesFor(keys, reached);
+  std::vector<AclEntry*> entries = keys_.EntriesFor(keys, reached);
   std::erase_if(entries, [&](const AclEntry* each) { return !Covers(each->GetTag()); });
   std::set<std::pair<AclEntry*, std::set<size_t>>> found;
   // Adds a way, unless it is none when all entries are there.
@@ -369,10 +237,10 @@ Signers Search::Agreeing(const Signers& signers, TimeStamp* at) const {
 Moments Search::MomentsOf(const Signers& signers) const {
   std::vector<PublicKey*> keys;
   for (const auto& key : signers.keys) keys.push_back(key.get());
-  const std::vector<size_t> reached = Reach(keys);
+  const std::vector<size_t> reached = keys_.Reach(keys);
   Moments moments;
-  for (const size_t number : reached) moments.AddCert(CertOf(number));
-  for (const AclEntry* entry : EntriesFor(keys, reached)) {
+  for (const size_t number : reached) moments.AddCert(keys_.CertOf(number));
+  for (const AclEntry* entry : keys_.EntriesFor(keys, reached)) {
     moments.AddPeriod(entry->GetNotBefore(), entry->GetNotAfter());
   }
   moments.AddLists(holdings_.lists.get());

@@ -8,12 +8,11 @@
 #define VESK2_TOOLS_SEARCH_H
 
 #include <functional>
-#include <map>
 #include <string>
 #include <vector>
 
 #include "tools/vesk2/authority/change.h"
-#include "tools/vesk2/authority/holdings.h"
+#include "tools/vesk2/authority/named_keys.h"
 #include "tools/vesk2/authority/supposition.h"
 #include "tools/vesk2/objects/request.h"
 #include "tools/vesk2/objects/times.h"
@@ -22,15 +21,6 @@
 #include <vesk2/evidence.h>
 
 namespace vesk2_command {
-
-// Who may sign: one key, or k of several that must agree.
-struct Signers {
-  std::vector<Ref<PublicKey>> keys;
-  size_t k = 1;
-
-  bool IsGroup() const { return k > 1; }
-};
-Signers OneKey(const Ref<PublicKey>& key);
 
 // What a manifest would carry beside the certificates for its content.
 struct Way {
@@ -50,14 +40,6 @@ class Search {
   // All must outlive it.
   Search(const Holdings& holdings, const Request& request, const Supposition& supposition);
 
-  // Every key that an entry or a certificate names, and every k-of-n.
-  std::vector<Signers> Candidates() const;
-  // A key that is named anywhere; null for none.
-  Ref<PublicKey> FindKey(const std::string& fingerprint) const;
-
-  // Whether a k-of-n names it.
-  bool IsInGroup(PublicKey& key) const;
-
   // The ways that are good at a moment: of a key one for each entry and certificate of its own,
   // `most` at most; of a group those of as many members as must agree.
   std::vector<Way> FindWays(const Signers& signers, TimeStamp* at, size_t most) const;
@@ -76,22 +58,11 @@ class Search {
   std::vector<const HeldCert*> Carried(const Way& way) const;
   std::vector<std::string> Places(const Way& way) const;
 
-  SExpression* entries() const { return entries_.get(); }
-  const Holdings& holdings() const { return holdings_; }
+  const NamedKeys& keys() const { return keys_; }
   const Request& request() const { return request_; }
 
  private:
-  // By how a subject names a key: numbers of entries or certificates.
-  using Named = std::map<std::string, std::vector<size_t>>;
-
-  void AddKey(DExpression* subject);
-  void AddSubject(ZvVesk2::Subject* subject, size_t number, Named& named);
-  static std::vector<size_t> Numbers(const Named& named, PublicKey& key);
-  ZvVesk2::Cert& CertOf(size_t number) const { return *holdings_.certs[number].cert; }
   bool Covers(SExpression* tag) const;
-  std::vector<size_t> Reach(const std::vector<PublicKey*>& keys) const;
-  std::vector<ZvVesk2::AclEntry*> EntriesFor(const std::vector<PublicKey*>& keys,
-                                             const std::vector<size_t>& reached) const;
   std::vector<size_t> OwnCerts(PublicKey& signer, const std::vector<size_t>& reached) const;
   bool IsRevoked(PublicKey& key, TimeStamp* at) const;
   void Shorten(Way& way, TimeStamp* at, bool alone) const;
@@ -105,11 +76,7 @@ class Search {
   const Request& request_;
   const Supposition& supposition_;
   Ref<SExpression> entries_;
-  std::vector<ZvVesk2::AclEntry*> entryList_;
-  std::map<std::string, Ref<PublicKey>> keys_;  // by fingerprint
-  std::map<std::string, Signers> groups_;       // by how they are told
-  Named entriesFor_;
-  Named certsFor_;
+  NamedKeys keys_;
   std::vector<bool> covers_;  // of each certificate: all that is asked
 };
 

@@ -44,13 +44,13 @@ class KeySubject : public Subject {
     const Ref<ZvVesk2::Hash> fingerprint = ParseFingerprint(options.what);
     name_ = options.what;
     if (fingerprint) {
-      key = search_.FindKey(options.what);
+      key = search_.keys().FindKey(options.what);
     } else {
       key = ReadPublicKey(options.what);
       name_ = Fingerprint(*key);
     }
     if (key) key_ = OneKey(key);
-    if (key && search_.IsInGroup(*key)) {
+    if (key && search_.keys().IsInGroup(*key)) {
       Note("note: it is one of several keys that must agree; who tells what they may do together");
     }
   }

@@ -49,7 +49,7 @@ void AddUntil(Json& json, const Until& until) {
 class Answer {
  public:
   Answer(const Search& search, Ref<TimeStamp> at) : search_(search), at_(std::move(at)) {
-    for (Signers& candidate : search.Candidates()) {
+    for (Signers& candidate : search.keys().Candidates()) {
       std::vector<Way> ways = search.FindWays(candidate, at_.get(), kMostWays);
       if (ways.empty()) continue;
       if (candidate.IsGroup()) candidate = search.Agreeing(candidate, at_.get());
