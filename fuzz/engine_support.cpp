@@ -14,6 +14,10 @@ constexpr spki_allocator kAllocator = {Allocate, Release, nullptr};
 
 EngineRun::EngineRun() { FUZZ_CHECK(spki_engine_start(&state_, &kAllocator) == 0); }
 
+EngineRun::EngineRun(uint32_t units) : EngineRun() {
+  state_.budget.comparisons = ZvVesk2::Limits::kMaxComparisons - units;
+}
+
 EngineRun::~EngineRun() {
   for (spki_elem* list : lists_) spki_elem_release(&state_, list);
   size_t free_records = 0;

@@ -19,6 +19,9 @@ class EngineRun {
  public:
   EngineRun();
   EngineRun(const EngineRun&) = delete;
+  // With `units` left of the work that a reduction may spend, so that inputs which only multiply
+  // take no time from the others.
+  explicit EngineRun(uint32_t units);
   // Every record must be back on its free list.
   ~EngineRun();
 
