@@ -47,6 +47,17 @@ TEST_F(Parsing, MalformedListsHaveTheirCodes) {
   }
 }
 
+TEST_F(Parsing, NothingIsReadWithoutAPlaceForIt) {
+  const auto* text = reinterpret_cast<const unsigned char*>("3:abc");
+  spki_input input = {text, text, text + 5};
+  uint32_t length = 7;
+  EXPECT_EQ(SPKI_ERR_NULL_PARAM, spki_parse_length(nullptr, &input));
+  EXPECT_EQ(SPKI_ERR_NULL_PARAM, spki_parse_length(&length, nullptr));
+  EXPECT_EQ(SPKI_ERR_NULL_PARAM, spki_parse_atom(&engine_, nullptr, &input));
+  EXPECT_EQ(7u, length);
+  EXPECT_EQ(text, input.position);
+}
+
 TEST_F(Parsing, KindsAndExtents) {
   const spki_elem* list = Parse("(1:a2:bc(3:foo)[1:h]3:acl)trailing");
   EXPECT_EQ(SPKI_ELEM_KEYWORD, list->kind);

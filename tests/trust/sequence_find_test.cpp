@@ -63,6 +63,20 @@ TEST_F(SequenceFind, RefusesWhatIsMissingOrInUse) {
   Signature* signature = nullptr;
   EXPECT_EQ(CertSequence::GetFirstPair(buffer, cert, signature, names, nullptr, true, {}),
             kInvalid);
+  // An output that is left over from another walk is not overwritten, as nobody would free it.
+  const std::string path = other.Write("x.cert", "(8:sequence" + Triple("") + ")");
+  const BufferPtr oldBuffer = Wrap("x");
+  const Ref<ZvVesk2::Cert> oldCert(new ZvVesk2::Cert(nullptr));
+  const Ref<Signature> oldSignature(new Signature(nullptr));
+  for (int held = 0; held < 3; ++held) {
+    buffer = held == 0 ? oldBuffer.get() : nullptr;
+    cert = held == 1 ? oldCert.get() : nullptr;
+    signature = held == 2 ? oldSignature.get() : nullptr;
+    const std::tuple before(buffer, cert, signature);
+    EXPECT_EQ(CertSequence::GetFirstPair(buffer, cert, signature, names, path.c_str(), true, {}),
+              kInvalid);
+    EXPECT_EQ(std::tuple(buffer, cert, signature), before);
+  }
 }
 
 TEST_F(SequenceFind, Pairs) {
