@@ -239,7 +239,7 @@
  *   VESK2_ERR_BUFFER_OVERFLOW         (30) no room, a text that ends too early, or lists nested
  *                                     too deeply to be written
  *   VESK2_ERR_RANDOM_TOKEN            (33) a manifest's random token is not of 4 bytes
- *   VESK2_ERR_TIME_STAMP              (34) not a time, or one that has no text
+ *   VESK2_ERR_TIME_STAMP              (34) not a time, one without a text, or no clock
  *   VESK2_ERR_AUTH_TAG_MISSING        (35) there is no tag to compare
  *   VESK2_ERR_MANIFEST_VERSION        (56) a manifest version other than 1
  *   VESK2_ERR_MANIFEST_TYPE           (57) a manifest type other than plain

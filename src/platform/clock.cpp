@@ -32,10 +32,12 @@ constexpr int64_t FloorDivide(int64_t a, int64_t b) {
 
 }  // namespace
 
-// Whole seconds, rounded down: "now" is never a moment that has not come.
+// Whole seconds, rounded down: "now" is never a moment that has not come. Asked of the system
+// itself, as the C++ runtime's clock has no way to say that it failed: it gives whatever stood in
+// its memory, and an entry that has expired would hold at such a moment.
 long zv_time(long* out) {
-  const long now =
-      static_cast<long>(floor<seconds>(system_clock::now()).time_since_epoch().count());
+  timespec clock{};
+  const long now = clock_gettime(CLOCK_REALTIME, &clock) == 0 ? clock.tv_sec : kNoTime;
   if (out != nullptr) *out = now;
   return now;
 }

@@ -7,7 +7,10 @@
 
 namespace ZVsysutil {
 
-// The current time in seconds since the epoch; also stored in *out when it is not null.
+// In place of the current time when the clock cannot be read. No clock shows it.
+inline constexpr long kNoTime = -1;
+
+// The current time in seconds since the epoch, or kNoTime; also stored in *out when it is not null.
 long zv_time(long* out);
 // Splits `seconds` into UTC fields. 0, or -1 for a year outside 0 to 9999 (four digits of text).
 [[nodiscard]] int zv_gmtime(std::tm* out, const long* seconds);

@@ -42,7 +42,9 @@ int MakeStamp(Ref<TimeStamp>& out, long seconds, Vesk2ContextStruct* ctx) {
 }
 
 int MakeNow(Ref<TimeStamp>& out, Vesk2ContextStruct* ctx) {
-  return MakeStamp(out, ZVsysutil::zv_time(nullptr), ctx);
+  const long now = ZVsysutil::zv_time(nullptr);
+  VESK2_REQUIRE(now != ZVsysutil::kNoTime, VESK2_ERR_TIME_STAMP);
+  return MakeStamp(out, now, ctx);
 }
 
 }  // namespace ZvVesk2

@@ -27,7 +27,7 @@ using TextPtr = std::unique_ptr<char[]>;
 bool EndsInRevoke(SExpression* tag);
 
 // MakeStamp makes a stamp of a moment; VESK2_ERR_TIME_STAMP for a year that has no text. MakeNow
-// makes one of the current time.
+// makes one of the current time; the same code when the clock cannot be read.
 [[nodiscard]] int MakeStamp(Ref<TimeStamp>& out, long seconds, Vesk2ContextStruct* ctx);
 [[nodiscard]] int MakeNow(Ref<TimeStamp>& out, Vesk2ContextStruct* ctx);
 

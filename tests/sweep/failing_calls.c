@@ -14,6 +14,7 @@
 #include <string.h>
 #include <sys/stat.h>
 #include <sys/syscall.h>
+#include <time.h>
 #include <unistd.h>
 
 static struct {
@@ -207,3 +208,9 @@ FAILING(kStat, path, -1, -1, int, faccessat, (int fd, const char* path, int mode
 FAILING(kStat, path, -1, -1, ssize_t, readlink, (const char* path, char* out, size_t size),
         (path, out, size))
 FAILING(kStat, path, -1, NULL, char*, realpath, (const char* path, char* out), (path, out))
+
+// ---- The clock ---------------------------------------------------------------------------------
+
+FAILING(kClock, NULL, -1, -1, int, clock_gettime, (clockid_t clock, struct timespec* out),
+        (clock, out))
+FAILING(kClock, NULL, -1, -1, time_t, time, (time_t * out), (out))

@@ -15,6 +15,7 @@ enum FailingCall {
   kRead,
   kScan,  // readdir
   kStat,  // stat and its kin, access, readlink, realpath
+  kClock,
 };
 
 // In place of an errno, for kRead: half of what was asked for, and an end of file.

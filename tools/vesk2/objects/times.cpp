@@ -22,12 +22,19 @@ std::string AsStamp(std::string text) {
   return text;
 }
 
+// No moment stands in for that of a clock that cannot be read: what has expired held at some.
+long Now() {
+  const std::time_t now = std::time(nullptr);
+  if (now == -1) throw Trouble("the time of this machine cannot be read", "io");
+  return static_cast<long>(now);
+}
+
 }  // namespace
 
 Ref<TimeStamp> ParseTime(const std::string& text, bool endOfPeriod) {
   Ref<TimeStamp> stamp(new TimeStamp(nullptr));
-  const int code = text == "now" ? stamp->Set(static_cast<long>(std::time(nullptr)))
-                                 : stamp->Set(AsStamp(text).c_str(), endOfPeriod);
+  const int code =
+      text == "now" ? stamp->Set(Now()) : stamp->Set(AsStamp(text).c_str(), endOfPeriod);
   if (code != 0) {
     throw Trouble("time \"" + Escape(text) +
                       "\": not \"now\", a year from 1970 on, or more of YYYY-MM-DD_hh:mm:ss",
