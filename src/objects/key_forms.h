@@ -16,18 +16,17 @@ template <typename Record>
 struct KeyNumber {
   const char* name;
   ZVCLMBigInt* Record::*field;
+  size_t place;  // among the numbers of a record; the first one's bits are the length of the key
 };
 
-// kLength is the number whose bits are the length of the key. e before n in expressions, n before e
-// in records: the table says both.
+// e before n in expressions, n before e in records: the table says both.
 struct RsaForm {
   using Record = ZVCLMRSAKeyData;
   static constexpr const char* kName = "rsa";
   static constexpr int kType = ZVCLM_KEY_RSA;
   static constexpr int kDataId = ZVCLM_DATA_RSA;
   static constexpr std::array<KeyNumber<Record>, 2> kNumbers{
-      {{"e", &Record::e}, {"n", &Record::n}}};
-  static constexpr ZVCLMBigInt* Record::*kLength = &Record::n;
+      {{"e", &Record::e, 1}, {"n", &Record::n, 0}}};
   [[nodiscard]] static int Init(Record* record) { return zvclm_RSAKeyStructInit(kDataId, record); }
   static void Wipe(Record* record) {
     static_cast<void>(zvclm_RSAKeyStructZeroize(kDataId, record));
@@ -41,8 +40,7 @@ struct DsaForm {
   static constexpr int kDataId = ZVCLM_DATA_DSA;
   // g before q: stored keys and their digests rely on this order.
   static constexpr std::array<KeyNumber<Record>, 4> kNumbers{
-      {{"p", &Record::p}, {"g", &Record::g}, {"q", &Record::q}, {"y", &Record::y}}};
-  static constexpr ZVCLMBigInt* Record::*kLength = &Record::p;
+      {{"p", &Record::p, 0}, {"g", &Record::g, 2}, {"q", &Record::q, 1}, {"y", &Record::y, 3}}};
   // The mark that the record of this kind has.
   static constexpr uint32_t kParameterSize = 48;
   [[nodiscard]] static int Init(Record* record) {

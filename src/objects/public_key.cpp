@@ -5,11 +5,11 @@
 // call them).
 #include <vesk2/public_key.h>
 
-#include <algorithm>
-#include <bit>
+#include <array>
 
 #include "src/objects/build.h"
 #include "src/objects/key_forms.h"
+#include "src/platform/crypto.h"
 #include "src/sexpr/storage.h"
 
 namespace ZvVesk2 {
@@ -29,17 +29,6 @@ namespace {
   VESK2_REQUIRE(out, VESK2_ERR_MEM_ALLOC);
   (void)bytes.release();
   return 0;
-}
-
-// The bits of a number, leading zeros not counted. Of the text, which may have leading zeros: they
-// make another principal and the same length.
-uint32_t BitLength(const ByteString& number) {
-  const unsigned char* const end = number.GetData() + number.GetLength();
-  const unsigned char* const first =
-      std::find_if(number.GetData(), end, [](unsigned char byte) { return byte != 0; });
-  if (first == end) return 0;
-  const auto bytes = static_cast<uint32_t>(end - first);
-  return 8 * (bytes - 1) + static_cast<uint32_t>(std::bit_width(unsigned{*first}));
 }
 
 }  // namespace
@@ -108,25 +97,20 @@ int PublicKey::ImportNumbers(ZvBuffer* buffer) {
   VESK2_TRY(Insert("public-key"));
   SExpression* numbers = nullptr;
   VESK2_TRY(AppendHead(this, Form::kName, numbers));
-  KeyRecord<Form> record;
-  VESK2_TRY(record.Init());
-  uint32_t length = 0;
+  std::array<ZVsysutil::ZvBytes, Form::kNumbers.size()> bytes;  // of the texts in the list
   for (const auto& number : Form::kNumbers) {
     VESK2_TRY(buffer->Expect("(1:"));
     VESK2_TRY(buffer->Expect(number.name));
     Ref<ByteString> text;
     VESK2_TRY(ImportNew(text, buffer, GetContext()));
     VESK2_TRY(buffer->Expect(")"));
-    // By the text rather than by libcrypto, before the text is handed to the list.
-    if (number.field == Form::kLength) length = BitLength(*text);
-    VESK2_TRY(InOwnWords(
-        zvclm_BigIntFromBuffer(&record.Number(number), text->GetData(), text->GetLength())));
+    bytes[number.place] = {text->GetData(), text->GetLength()};
     VESK2_TRY(AppendPair(numbers, number.name, std::move(text)));
   }
-  // Set with the last number: a key that is half read has no length.
-  keyLength = length;
-  return InOwnWords(
-      zvclm_PublicKeyDefine(&key, Form::kType, Form::kDataId, record.get(), 0, CryptoHandle()));
+  // Set with the last number: a key that is half read has no length. The texts may have leading
+  // zeros: they make another principal and the same length.
+  keyLength = static_cast<uint32_t>(ZVsysutil::CountBits(ZVsysutil::WithoutZeros(bytes[0])));
+  return InOwnWords(zvclm_PublicKeyOfNumbers(&key, Form::kType, bytes));
 }
 
 ZVCLMPublicKeyData* PublicKey::GetKey() const { return key; }

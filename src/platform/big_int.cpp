@@ -3,10 +3,15 @@
 // empty byte string could not be read back everywhere. Numbers are taken as they come, of any size
 // that fits an int: what is too large to verify with is refused where it would be used
 // (verify.cpp).
+#include <openssl/crypto.h>
+
+#include <algorithm>
 #include <climits>
 #include <new>
 
 #include "src/platform/key.h"
+
+ZVCLMBigInt::~ZVCLMBigInt() { OPENSSL_cleanse(bytes.get(), length); }
 
 // An output that is not null is refused: overwriting it would lose a number.
 int zvclm_BigIntFromBuffer(ZVCLMBigInt** number, const unsigned char* data, uint32_t length) {
@@ -14,26 +19,29 @@ int zvclm_BigIntFromBuffer(ZVCLMBigInt** number, const unsigned char* data, uint
   if (data == nullptr && length > 0) return ZVCLM_ERR_NULL_PARAM;
   // libcrypto counts in ints.
   if (length > INT_MAX) return ZVCLM_ERR_NO_MEM;
-  const ZVsysutil::ErrorMark mark;
+  const ZVsysutil::ZvBytes bytes = ZVsysutil::WithoutZeros({data, length});
   std::unique_ptr<ZVCLMBigInt> made(new (std::nothrow) ZVCLMBigInt);
   if (made == nullptr) return ZVCLM_ERR_NO_MEM;
-  made->value.reset(BN_bin2bn(data, static_cast<int>(length), nullptr));
-  if (made->value == nullptr) return ZVCLM_ERR_NO_MEM;
+  made->bytes.reset(new (std::nothrow) unsigned char[bytes.size()]);
+  if (made->bytes == nullptr) return ZVCLM_ERR_NO_MEM;
+  std::ranges::copy(bytes, made->bytes.get());
+  made->length = bytes.size();
   *number = made.release();
   return 0;
 }
 
 int zvclm_BigIntGetBufferSize(const ZVCLMBigInt* number) {
   if (number == nullptr) return -1;
-  return BN_is_zero(number->value.get()) ? 1 : BN_num_bytes(number->value.get());
+  return static_cast<int>(std::max<size_t>(1, number->length));
 }
 
-// Padded to the length that was told, so that the two calls cannot disagree.
+// As long as was told, so that the two calls cannot disagree.
 int zvclm_BigIntToBuffer(const ZVCLMBigInt* number, unsigned char* out, uint32_t* size) {
   if (number == nullptr || out == nullptr || size == nullptr) return ZVCLM_ERR_NULL_PARAM;
-  const int wanted = zvclm_BigIntGetBufferSize(number);
-  if (*size < static_cast<uint32_t>(wanted)) return ZVCLM_ERR_BUFFER_TOO_SMALL;
-  BN_bn2binpad(number->value.get(), out, wanted);
-  *size = static_cast<uint32_t>(wanted);
+  const auto wanted = static_cast<uint32_t>(zvclm_BigIntGetBufferSize(number));
+  if (*size < wanted) return ZVCLM_ERR_BUFFER_TOO_SMALL;
+  out[0] = 0;
+  std::ranges::copy(number->get(), out);
+  *size = wanted;
   return 0;
 }

@@ -6,11 +6,31 @@
 #ifndef VESK2_SRC_PLATFORM_CRYPTO_H
 #define VESK2_SRC_PLATFORM_CRYPTO_H
 
+#include <bit>
 #include <cstddef>
 #include <cstdint>
 #include <cstring>
+#include <span>
 
 #include <vesk2/platform.h>
+
+namespace ZVsysutil {
+
+using ZvBytes = std::span<const unsigned char>;
+
+// The number without zeros before it.
+inline ZvBytes WithoutZeros(ZvBytes number) {
+  while (!number.empty() && number.front() == 0) number = number.subspan(1);
+  return number;
+}
+// The bits of a number that has no zeros before it.
+inline size_t CountBits(ZvBytes number) {
+  return number.empty() ? 0
+                        : 8 * (number.size() - 1) +
+                              static_cast<size_t>(std::bit_width(unsigned{number.front()}));
+}
+
+}  // namespace ZVsysutil
 
 struct evp_md_st;
 struct evp_md_ctx_st;
@@ -96,6 +116,11 @@ void zvclm_HashFree(ZVCLMHashContextData* context, uint32_t handle);
                                                  uint32_t handle);
 
 }  // extern "C"
+
+// zvclm_PublicKeyOfNumbers makes a key without a record: of the numbers, big-endian, in the order
+// of the record of its type. They are copied. 0, or ZVCLM_ERR_NO_MEM.
+[[nodiscard]] int zvclm_PublicKeyOfNumbers(ZVCLMPublicKeyData** key, int type,
+                                           std::span<const ZVsysutil::ZvBytes> numbers);
 
 // zvclm_HashUpdate feeds `length` bytes. 0, ZVCLM_ERR_NULL_PARAM, ZVCLM_ERR_NO_MEM or
 // ZVCLM_ERR_FAILURE.

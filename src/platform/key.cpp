@@ -9,6 +9,7 @@
 #include <openssl/params.h>
 #include <algorithm>
 #include <array>
+#include <bit>
 #include <memory>
 #include <new>
 #include <span>
@@ -68,13 +69,6 @@ Fields FieldsOf(int id, void* record) {
   return 0;
 }
 
-ZVCLMBigInt* CopyNumber(const BIGNUM* number) {
-  std::unique_ptr<ZVCLMBigInt> copy(new (std::nothrow) ZVCLMBigInt);
-  if (copy == nullptr) return nullptr;
-  copy->value.reset(BN_dup(number));
-  return copy->value != nullptr ? copy.release() : nullptr;
-}
-
 // A key's numbers in the order of ZVCLMPublicKeyData, as libcrypto takes them: each in the order of
 // the machine, one behind the other.
 class Parameters {
@@ -87,13 +81,18 @@ class Parameters {
     const std::span<const char* const> names =
         key.type == ZVCLM_KEY_RSA ? std::span<const char* const>(kRsaNames) : kDsaNames;
     size_t size = 0;
-    for (size_t i = 0; i < names.size(); ++i) size += SizeOf(key.number(i));
+    for (size_t i = 0; i < names.size(); ++i) size += SizeOf(key.numbers[i]);
     bytes_.reset(new (std::nothrow) unsigned char[size]);
     if (bytes_ == nullptr) return false;
     unsigned char* at = bytes_.get();
     for (size_t i = 0; i < names.size(); ++i) {
-      const size_t length = SizeOf(key.number(i));
-      BN_bn2nativepad(key.number(i), at, static_cast<int>(length));
+      const size_t length = SizeOf(key.numbers[i]);
+      *at = 0;
+      if constexpr (std::endian::native == std::endian::little) {
+        std::ranges::reverse_copy(key.numbers[i], at);
+      } else {
+        std::ranges::copy(key.numbers[i], at);
+      }
       parameters_[i] = OSSL_PARAM_construct_BN(names[i], at, length);
       at += length;
     }
@@ -103,9 +102,7 @@ class Parameters {
   OSSL_PARAM* get() { return parameters_.data(); }
 
  private:
-  static size_t SizeOf(const BIGNUM* number) {  // 0 has a byte, too
-    return std::max<size_t>(1, static_cast<size_t>(BN_num_bytes(number)));
-  }
+  static size_t SizeOf(ZvBytes number) { return std::max<size_t>(1, number.size()); }
 
   std::unique_ptr<unsigned char[]> bytes_;
   std::array<OSSL_PARAM, ZVCLMPublicKeyData::kMaxNumbers + 1> parameters_;
@@ -160,24 +157,37 @@ int zvclm_DSSKeyStructZeroize(int id, ZVCLMDSSKeyData* record) {
   return id == ZVCLM_DATA_DSA ? Zeroize(id, record) : ZVCLM_ERR_KEY_TYPE;
 }
 
+int zvclm_PublicKeyOfNumbers(ZVCLMPublicKeyData** key, int type, std::span<const ZvBytes> numbers) {
+  std::unique_ptr<ZVCLMPublicKeyData> made(new (std::nothrow) ZVCLMPublicKeyData);
+  if (made == nullptr) return ZVCLM_ERR_NO_MEM;
+  size_t size = 0;
+  for (const ZvBytes number : numbers) size += number.size();
+  made->type = type;
+  made->bytes.reset(new (std::nothrow) unsigned char[size]);
+  if (made->bytes == nullptr) return ZVCLM_ERR_NO_MEM;
+  unsigned char* at = made->bytes.get();
+  for (size_t i = 0; i < numbers.size(); ++i) {
+    const ZvBytes number = WithoutZeros(numbers[i]);
+    made->numbers[i] = {at, number.size()};
+    at = std::ranges::copy(number, at).out;
+  }
+  *key = made.release();
+  return 0;
+}
+
 // Copied, so that the caller's record can go at once.
 int zvclm_PublicKeyDefine(ZVCLMPublicKeyData** key, int type, int id, const void* record,
                           uint32_t /*parameters*/, uint32_t /*handle*/) {
   if (key == nullptr || *key != nullptr || record == nullptr) return ZVCLM_ERR_NULL_PARAM;
   const Fields fields = FieldsOf(id, const_cast<void*>(record));
   if (fields.count == 0 || fields.type != type) return ZVCLM_ERR_KEY_TYPE;
-  const ErrorMark mark;
-  std::unique_ptr<ZVCLMPublicKeyData> made(new (std::nothrow) ZVCLMPublicKeyData);
-  if (made == nullptr) return ZVCLM_ERR_NO_MEM;
-  made->type = type;
+  std::array<ZvBytes, ZVCLMPublicKeyData::kMaxNumbers> numbers;
   for (size_t i = 0; i < fields.count; ++i) {
     const ZVCLMBigInt* number = *fields.numbers[i];
     if (number == nullptr) return ZVCLM_ERR_NULL_PARAM;
-    made->numbers[i].reset(BN_dup(number->value.get()));
-    if (made->numbers[i] == nullptr) return ZVCLM_ERR_NO_MEM;
+    numbers[i] = number->get();
   }
-  *key = made.release();
-  return 0;
+  return zvclm_PublicKeyOfNumbers(key, type, std::span(numbers).first(fields.count));
 }
 
 // All copies are made before a number is replaced: the record changes whole or not at all.
@@ -186,18 +196,21 @@ int zvclm_PublicKeyGetData(const ZVCLMPublicKeyData* key, int id, void* record,
   if (key == nullptr || record == nullptr) return ZVCLM_ERR_NULL_PARAM;
   const Fields fields = FieldsOf(id, record);
   if (fields.count == 0 || fields.type != key->type) return ZVCLM_ERR_KEY_TYPE;
-  const ErrorMark mark;
   std::array<std::unique_ptr<ZVCLMBigInt>, ZVCLMPublicKeyData::kMaxNumbers> copies;
   for (size_t i = 0; i < fields.count; ++i) {
-    copies[i].reset(CopyNumber(key->number(i)));
-    if (copies[i] == nullptr) return ZVCLM_ERR_NO_MEM;
+    const ZvBytes number = key->numbers[i];
+    ZVCLMBigInt* copy = nullptr;
+    const int code =
+        zvclm_BigIntFromBuffer(&copy, number.data(), static_cast<uint32_t>(number.size()));
+    if (code) return code;
+    copies[i].reset(copy);
   }
   for (size_t i = 0; i < fields.count; ++i) {
     delete *fields.numbers[i];
     *fields.numbers[i] = copies[i].release();
   }
   // The length of n or of p, each the first of its key's numbers.
-  *fields.keyLength = static_cast<uint32_t>(BN_num_bits(key->number(0)));
+  *fields.keyLength = static_cast<uint32_t>(CountBits(key->numbers[0]));
   return 0;
 }
 

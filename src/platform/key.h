@@ -3,29 +3,35 @@
 #ifndef VESK2_SRC_PLATFORM_KEY_H
 #define VESK2_SRC_PLATFORM_KEY_H
 
-#include <openssl/bn.h>
 #include <openssl/evp.h>
 
 #include <array>
+#include <memory>
 
 #include <vesk2/platform.h>
 
+#include "src/platform/crypto.h"
 #include "src/platform/openssl.h"
 
-// A number, in libcrypto's form, cleared when it goes.
+// A number as its bytes, the first of which is not 0; cleared when it goes.
 struct ZVCLMBigInt {
-  ZVsysutil::Evp<BIGNUM, BN_clear_free> value;
+  ~ZVCLMBigInt();
+  ZVsysutil::ZvBytes get() const { return {bytes.get(), length}; }
+
+  std::unique_ptr<unsigned char[]> bytes;
+  size_t length = 0;
 };
 
-// A key is its numbers, in the order of its record: n, e for RSA and p, q, g, y for DSA. What
-// libcrypto makes of them is found out when they are used: a key is an identity first, and one odd
-// key in a store must not keep the others from being read.
+// A key is its numbers, in the order of its record: n, e for RSA and p, q, g, y for DSA. They stay
+// bytes, the first of which is not 0: most keys of a store are never verified with. What libcrypto
+// makes of them is found out when they are used: a key is an identity first, and one odd key in a
+// store must not keep the others from being read.
 struct ZVCLMPublicKeyData {
   static constexpr size_t kMaxNumbers = 4;
-  const BIGNUM* number(size_t index) const { return numbers[index].get(); }
 
   int type = ZVCLM_KEY_RSA;
-  std::array<ZVsysutil::Evp<BIGNUM, BN_clear_free>, kMaxNumbers> numbers;
+  std::array<ZVsysutil::ZvBytes, kMaxNumbers> numbers;
+  std::unique_ptr<unsigned char[]> bytes;  // of all numbers
 };
 
 namespace ZVsysutil {

@@ -5,6 +5,7 @@
 // where a string is four bytes of length (big-endian) and its bytes, and an mpint is a string with
 // the fewest bytes that show the number as positive.
 #include <openssl/x509.h>
+#include <algorithm>
 #include <cstring>
 #include <new>
 #include <span>
@@ -43,9 +44,8 @@ struct Encoding {
 constexpr size_t kLengthBytes = 4;
 
 // Zero has no bytes at all in this form.
-size_t MpintLength(const BIGNUM* number) {
-  const auto bits = static_cast<size_t>(BN_num_bits(number));
-  return bits > 0 ? bits / 8 + 1 : 0;  // room for a sign bit of 0
+size_t MpintLength(ZvBytes number) {
+  return number.empty() ? 0 : CountBits(number) / 8 + 1;  // room for a sign bit of 0
 }
 
 unsigned char* WriteLength(unsigned char* at, size_t length) {
@@ -62,17 +62,17 @@ unsigned char* WriteLength(unsigned char* at, size_t length) {
   const std::span<const size_t> order = rsa ? std::span<const size_t>(kRsaOrder) : kDsaOrder;
 
   size_t total = kLengthBytes + name.size();
-  for (const size_t index : order) total += kLengthBytes + MpintLength(key.number(index));
+  for (const size_t index : order) total += kLengthBytes + MpintLength(key.numbers[index]);
   if (const int code = Allocate(out, total)) return code;
 
   unsigned char* at = WriteLength(out->bytes.get(), name.size());
   std::memcpy(at, name.data(), name.size());
   at += name.size();
   for (const size_t index : order) {
-    const size_t length = MpintLength(key.number(index));
+    const size_t length = MpintLength(key.numbers[index]);
     at = WriteLength(at, length);
-    BN_bn2binpad(key.number(index), at, static_cast<int>(length));
-    at += length;
+    if (length > key.numbers[index].size()) *at++ = 0;
+    at = std::ranges::copy(key.numbers[index], at).out;
   }
   return 0;
 }

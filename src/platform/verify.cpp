@@ -28,9 +28,16 @@ namespace Limits = ZvVesk2::Limits;
 
 namespace {
 
-using Bytes = std::span<const unsigned char>;
+using Bytes = ZvBytes;
 using PkeyContext = Evp<EVP_PKEY_CTX, EVP_PKEY_CTX_free>;
 using Number = Evp<BIGNUM, BN_free>;
+
+// Numbers as bytes, without zeros before them.
+bool IsOdd(Bytes number) { return !number.empty() && number.back() % 2 != 0; }
+bool IsLess(Bytes a, Bytes b) {
+  return a.size() != b.size() ? a.size() < b.size() : std::ranges::lexicographical_compare(a, b);
+}
+bool IsAboveOne(Bytes number) { return CountBits(number) > 1; }
 
 // ---- What a "no" of libcrypto means ----
 
@@ -110,19 +117,16 @@ constexpr size_t kMaxModulus = Limits::kMaxRsaModulusBits / 8;
 // An even modulus or exponent, or an exponent of 1, has no signature that means anything: with 1
 // the "signature" is the block itself, and anybody could write one.
 bool WithinRsaLimits(const ZVCLMPublicKeyData& key) {
-  const BIGNUM* n = key.number(kRsaN);
-  const BIGNUM* e = key.number(kRsaE);
-  return BN_num_bits(n) <= Limits::kMaxRsaModulusBits && BN_is_odd(n) && BN_is_odd(e) &&
-         !BN_is_one(e) && BN_num_bits(e) <= Limits::kMaxRsaExponentBits && BN_cmp(e, n) < 0;
+  const Bytes n = key.numbers[kRsaN];
+  const Bytes e = key.numbers[kRsaE];
+  return CountBits(n) <= Limits::kMaxRsaModulusBits && IsOdd(n) && IsOdd(e) && IsAboveOne(e) &&
+         CountBits(e) <= Limits::kMaxRsaExponentBits && IsLess(e, n);
 }
 
 // Whether it is as long as n and smaller: a bare number of that range. A longer one, with zeros
 // before it, would be a second text of the same signature.
-bool FitsModulus(Bytes signature, const BIGNUM* n) {
-  std::array<unsigned char, kMaxModulus> modulus;
-  const auto length = static_cast<size_t>(BN_bn2bin(n, modulus.data()));
-  return signature.size() == length &&
-         std::ranges::lexicographical_compare(signature, Bytes(modulus).first(length));
+bool FitsModulus(Bytes signature, Bytes n) {
+  return signature.size() == n.size() && IsLess(signature, n);
 }
 
 // ---- RSA: blocks of PKCS #1 version 1.5 ----
@@ -197,7 +201,7 @@ bool SetRsaScheme(EVP_PKEY_CTX* context, int scheme, const EVP_MD* hash) {
                             const ZVCLMRSAParameters& parameters, Bytes digest, Bytes signature) {
   const uint32_t hashId = parameters.words[3];
   if (!WithinRsaLimits(key) || digest.empty() || digest.size() != HashLength(hashId)) return 0;
-  if (!FitsModulus(signature, key.number(kRsaN))) return 0;
+  if (!FitsModulus(signature, key.numbers[kRsaN])) return 0;
   const EVP_MD* const hash = HashAlgorithm(hashId);
   const PkeyContext context = StartVerify(key);
   if (hash == nullptr || context == nullptr) return ZVCLM_ERR_NO_MEM;
@@ -212,12 +216,12 @@ bool SetRsaScheme(EVP_PKEY_CTX* context, int scheme, const EVP_MD* hash) {
 // The lengths of q that the format knows. g and y of 0 or 1 would make every signature good or
 // none.
 bool WithinDsaLimits(const ZVCLMPublicKeyData& key) {
-  const BIGNUM* p = key.number(kDsaP);
-  const int qBits = BN_num_bits(key.number(kDsaQ));
-  if (BN_num_bits(p) > Limits::kMaxDsaPrimeBits || !BN_is_odd(p)) return false;
+  const Bytes p = key.numbers[kDsaP];
+  const size_t qBits = CountBits(key.numbers[kDsaQ]);
+  if (CountBits(p) > Limits::kMaxDsaPrimeBits || !IsOdd(p)) return false;
   if (qBits != 160 && qBits != 224 && qBits != 256) return false;
-  for (const BIGNUM* element : {key.number(kDsaG), key.number(kDsaY)}) {
-    if (BN_cmp(element, BN_value_one()) <= 0 || BN_cmp(element, p) >= 0) return false;
+  for (const Bytes element : {key.numbers[kDsaG], key.numbers[kDsaY]}) {
+    if (!IsAboveOne(element) || !IsLess(element, p)) return false;
   }
   return true;
 }
@@ -243,7 +247,7 @@ bool ToDer(DerSignature* out, Number r, Number s) {
 [[nodiscard]] int VerifyDsa(bool* good, const ZVCLMPublicKeyData& key, Bytes digest,
                             Bytes signature) {
   if (!WithinDsaLimits(key) || digest.size() != HashLength(ZVCLM_HASH_SHA1)) return 0;
-  const int half = BN_num_bytes(key.number(kDsaQ));
+  const auto half = static_cast<int>(key.numbers[kDsaQ].size());
   if (signature.size() != 2 * static_cast<size_t>(half)) return 0;
   Number r(BN_bin2bn(signature.data(), half, nullptr));
   Number s(BN_bin2bn(signature.data() + half, half, nullptr));

@@ -356,6 +356,19 @@ TEST(KeyTest, LeavesTheCallersErrors) {
   EXPECT_EQ(ERR_pop_to_mark(), 0);
 }
 
+// r and s are numbers of q's length: with zeros before them, and with a first bit that is no sign.
+TEST(KeyTest, TakesDsaNumbersOfAnyLength) {
+  const Key key = Define(NumbersOf(false));
+  bool small = false, large = false;
+  for (int i = 0; !small || !large; ++i) {
+    const std::string digest = Digest(std::to_string(i), "sha1");
+    const std::string signature = Pair(false).SignDigest(digest, "dsa-sha1", "sha1");
+    ASSERT_TRUE(Valid(key, ZVCLM_SCHEME_DSA, 0, digest, signature)) << i;
+    small = small || signature[0] == '\0' || signature[signature.size() / 2] == '\0';
+    large = large || signature[0] < 0;
+  }
+}
+
 // The first of each kind would be good by arithmetic alone, the others only have to be harmless.
 TEST(KeyTest, RefusesKeysOutsideTheLimits) {
   const std::string digest = Digest("object");
