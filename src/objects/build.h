@@ -15,6 +15,7 @@
 
 #include "src/frame/check.h"
 #include "src/frame/handles.h"
+#include "src/sexpr/value_blocks.h"
 
 namespace ZvVesk2 {
 
@@ -49,6 +50,15 @@ template <typename T>
 [[nodiscard]] inline int AppendHead(SExpression* list, const char* name, SExpression*& head) {
   Ref<SExpression> made;
   VESK2_TRY(SExpression::Create(made.Out(), name, list->GetContext()));
+  return Append(list, std::move(made), head);
+}
+
+// The same, cut from a reader's blocks.
+[[nodiscard]] inline int AppendHead(ValueBlocks& blocks, SExpression* list, const char* name,
+                                    SExpression*& head) {
+  Ref<SExpression> made(blocks.NewList());
+  VESK2_REQUIRE(made, VESK2_ERR_MEM_ALLOC);
+  VESK2_TRY(blocks.Insert(*made, name));
   return Append(list, std::move(made), head);
 }
 

@@ -94,18 +94,23 @@ int PublicKey::ImportNumbers(ZvBuffer* buffer) {
   algorithmName = Form::kName;
   keyType = Form::kType;
   VESK2_TRY(buffer->Expect(Form::kName));
-  VESK2_TRY(Insert("public-key"));
+  constexpr size_t kNumbers = Form::kNumbers.size();
+  ValueBlocks blocks(GetContext(), 1 + kNumbers, 2 + 2 * kNumbers);
+  VESK2_TRY(blocks.Insert(*this, "public-key"));
   SExpression* numbers = nullptr;
-  VESK2_TRY(AppendHead(this, Form::kName, numbers));
-  std::array<ZVsysutil::ZvBytes, Form::kNumbers.size()> bytes;  // of the texts in the list
+  VESK2_TRY(AppendHead(blocks, this, Form::kName, numbers));
+  std::array<ZVsysutil::ZvBytes, kNumbers> bytes;  // of the texts in the list
   for (const auto& number : Form::kNumbers) {
     VESK2_TRY(buffer->Expect("(1:"));
     VESK2_TRY(buffer->Expect(number.name));
-    Ref<ByteString> text;
-    VESK2_TRY(ImportNew(text, buffer, GetContext()));
+    Ref<ByteString> text(blocks.NewString());
+    VESK2_REQUIRE(text, VESK2_ERR_MEM_ALLOC);
+    VESK2_TRY(text->Import(buffer));
     VESK2_TRY(buffer->Expect(")"));
     bytes[number.place] = {text->GetData(), text->GetLength()};
-    VESK2_TRY(AppendPair(numbers, number.name, std::move(text)));
+    SExpression* pair = nullptr;
+    VESK2_TRY(AppendHead(blocks, numbers, number.name, pair));
+    VESK2_TRY(Append(pair, std::move(text)));
   }
   // Set with the last number: a key that is half read has no length. The texts may have leading
   // zeros: they make another principal and the same length.

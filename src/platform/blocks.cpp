@@ -10,11 +10,10 @@
 namespace ZVsysutil {
 namespace {
 
-// The first block holds a short list, and each is twice as large as the one before. Where the
-// memory that is not used yet has not been touched either, it is four times. The largest is a size
-// that the C library keeps for what is read next rather than giving it back to the system at once;
-// a single thing that stays keeps no more than that.
-constexpr size_t kFirst = 512;
+// Each block is twice as large as the one before. Where the memory that is not used yet has not
+// been touched either, it is four times. The largest is a size that the C library keeps for what is
+// read next rather than giving it back to the system at once; a single thing that stays keeps no
+// more than that.
 constexpr size_t kTouched = size_t{64} << 10;
 constexpr size_t kLargest = size_t{4} << 20;
 
@@ -30,9 +29,7 @@ unsigned char* Allocate(size_t size, bool large) {
   return memory;
 }
 
-size_t Grown(size_t size) {
-  return std::clamp(size < kTouched ? 2 * size : 4 * size, kFirst, kLargest);
-}
+size_t Grown(size_t size) { return std::min(size < kTouched ? 2 * size : 4 * size, kLargest); }
 
 // Stands for the things that are still to be made.
 constexpr uint32_t kUnfinished = uint32_t{1} << 30;
@@ -52,13 +49,15 @@ void ZvBlock::Drop(uint32_t count) {
 
 bool ZvBlocks::Open(size_t size) {
   Close();
-  const bool large = grown_ >= kLargest;
-  grown_ = std::max(size + sizeof(ZvBlock), Grown(grown_));
-  unsigned char* const memory = Allocate(grown_, large);
+  const bool large = opened_ >= kLargest;
+  const size_t whole = std::max(size + sizeof(ZvBlock), following_);
+  unsigned char* const memory = Allocate(whole, large);
   if (memory == nullptr) return false;
   block_ = new (memory) ZvBlock{kUnfinished, large};
   next_ = memory + sizeof(ZvBlock);
-  end_ = memory + grown_;
+  end_ = memory + whole;
+  opened_ = whole;
+  following_ = Grown(whole);
   return true;
 }
 

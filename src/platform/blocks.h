@@ -31,7 +31,10 @@ struct alignas(16) ZvBlock {
 // Makes things. Their memory is aligned to 8 bytes.
 class ZvBlocks {
  public:
-  ZvBlocks() = default;
+  // Of a short list. A maker that knows how much it will cut asks for that, and kBlockHead more.
+  static constexpr size_t kFirst = 512;
+  static constexpr size_t kBlockHead = sizeof(ZvBlock);
+  explicit ZvBlocks(size_t first = kFirst) : following_(first) {}
   ~ZvBlocks() { Close(); }
   ZvBlocks(const ZvBlocks&) = delete;
   ZvBlocks& operator=(const ZvBlocks&) = delete;
@@ -56,7 +59,8 @@ class ZvBlocks {
   unsigned char* next_ = nullptr;
   unsigned char* end_ = nullptr;
   uint32_t count_ = 0;  // of what was cut from the block
-  size_t grown_ = 0;    // the size of the block
+  size_t opened_ = 0;   // the size of the last block
+  size_t following_;    // and of the next one
 };
 
 // Drops things of one block together, as most that go one after the other are.

@@ -13,7 +13,7 @@
 #include <utility>
 
 #include "src/frame/check.h"
-#include "src/platform/blocks.h"
+#include "src/sexpr/value_blocks.h"
 
 namespace ZvVesk2 {
 
@@ -49,13 +49,15 @@ void SExpression::DeleteNode(Node* node, ZvDrops& drops) {
 
 // ---- Building ----
 
-// The value is inserted last, so a failure leaves its reference with the caller.
+// The list and its tag share a block. The value is inserted last, so a failure leaves its reference
+// with the caller.
 int SExpression::Create(SExpression*& out, const char* tag, ByteString* value,
                         Vesk2ContextStruct* context) {
   out = nullptr;
-  Ref<SExpression> list(TryNew<SExpression>(context));
+  ValueBlocks blocks(context, 1, 1);
+  Ref<SExpression> list(blocks.NewList());
   VESK2_REQUIRE(list, VESK2_ERR_MEM_ALLOC);
-  VESK2_TRY(list->Insert(tag));
+  VESK2_TRY(blocks.Insert(*list, tag));
   if (value != nullptr) VESK2_TRY(list->Insert(value));
   out = list.Release();
   return 0;

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// Values and nodes for readers of whole expressions, which make them by the thousand: cut from
-// blocks. To whoever holds one it is a value like any other.
+// Values and nodes for readers, which make them by the thousand: cut from blocks. To whoever holds
+// one it is a value like any other.
 //
 // Where a value lies is known by its `place`, the distance to its block's start, 0 for memory of
 // its own; DExpression::Free and SExpression::DeleteNode give it back accordingly. The blocks
@@ -13,6 +13,7 @@
 #include <new>
 
 #include <vesk2/expression.h>
+#include <vesk2/ref.h>
 
 #include "src/frame/check.h"
 #include "src/platform/blocks.h"
@@ -23,6 +24,11 @@ namespace ZvVesk2 {
 class ValueBlocks {
  public:
   explicit ValueBlocks(Vesk2ContextStruct* context) : context_(context) {}
+  // With room for that many lists and strings in the first block.
+  ValueBlocks(Vesk2ContextStruct* context, size_t lists, size_t strings)
+      : context_(context),
+        blocks_(ZVsysutil::ZvBlocks::kBlockHead + lists * sizeof(SExpression) +
+                strings * sizeof(ByteString)) {}
 
   // Null without memory; else a value with one reference, the caller's, released by Free like all
   // others.
@@ -68,6 +74,15 @@ class ValueBlocks {
       node = ::new (memory) SExpression::Node{nullptr, value, place};
     }
     list.Link(node);
+    return 0;
+  }
+  [[nodiscard]] int Insert(SExpression& list, const char* text) {
+    VESK2_REQUIRE(text != nullptr, VESK2_ERR_INVALID_PARAM);
+    Ref<ByteString> value(NewString());
+    VESK2_REQUIRE(value, VESK2_ERR_MEM_ALLOC);
+    VESK2_TRY(value->Set(text, ByteString::BsNone));
+    VESK2_TRY(Insert(list, value.get()));
+    (void)value.Release();  // the list's now
     return 0;
   }
 

@@ -62,17 +62,19 @@ template <typename Atom>
 
 // The one writer of the list. Fields are set to what the list holds, as each part is appended.
 int AclEntry::Build(Parts&& parts) {
-  VESK2_TRY(Insert("entry"));
+  ValueBlocks blocks(GetContext());
+  VESK2_TRY(blocks.Insert(*this, "entry"));
   // Always the "1" that was matched: no entry says another version.
   if (parts.version) {
-    Ref<SExpression> pair;
-    VESK2_TRY(SExpression::Create(pair.Out(), "version", "1", GetContext()));
-    VESK2_TRY(Append(this, std::move(pair), version));
+    VESK2_TRY(AppendHead(blocks, this, "version", version));
+    VESK2_TRY(blocks.Insert(*version, "1"));
   }
-  VESK2_TRY(AppendPair(this, "subject", std::move(parts.subject), subject));
+  SExpression* pair = nullptr;
+  VESK2_TRY(AppendHead(blocks, this, "subject", pair));
+  VESK2_TRY(Append(pair, std::move(parts.subject), subject));
   if (parts.propagate) {
     SExpression* flag = nullptr;
-    VESK2_TRY(AppendHead(this, "propagate", flag));
+    VESK2_TRY(AppendHead(blocks, this, "propagate", flag));
     propagate = true;
   }
   VESK2_TRY(Append(this, std::move(parts.tag), tag));
