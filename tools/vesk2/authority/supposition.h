@@ -11,7 +11,6 @@
 #include "tools/vesk2/objects/objects.h"
 #include "tools/vesk2/objects/times.h"
 #include "tools/vesk2/options/options.h"
-#include "tools/vesk2/say/report.h"
 
 #include <vesk2/evidence.h>
 

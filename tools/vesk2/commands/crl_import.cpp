@@ -7,7 +7,6 @@
 #include "tools/vesk2/commands/describe.h"
 #include "tools/vesk2/files/files.h"
 #include "tools/vesk2/files/stores.h"
-#include "tools/vesk2/objects/texts.h"
 #include "tools/vesk2/stores/acl_store.h"
 #include "tools/vesk2/stores/crl_compare.h"
 #include "tools/vesk2/stores/crl_store.h"

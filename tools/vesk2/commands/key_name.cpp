@@ -3,7 +3,6 @@
 #include <algorithm>
 
 #include "tools/vesk2/commands/command.h"
-#include "tools/vesk2/files/files.h"
 #include "tools/vesk2/keys/key_reference.h"
 #include "tools/vesk2/stores/key_names.h"
 

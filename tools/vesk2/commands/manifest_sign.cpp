@@ -7,7 +7,6 @@
 #include "tools/vesk2/files/files.h"
 #include "tools/vesk2/keys/issue.h"
 #include "tools/vesk2/keys/key_reference.h"
-#include "tools/vesk2/keys/key_source.h"
 #include "tools/vesk2/objects/crl_file.h"
 #include "tools/vesk2/objects/manifest_file.h"
 #include "tools/vesk2/objects/tag_bounds.h"

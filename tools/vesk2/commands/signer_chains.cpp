@@ -2,8 +2,6 @@
 // signer_chains.cpp: the certificates of a key that signs a manifest.
 #include "tools/vesk2/commands/signer_chains.h"
 
-#include <algorithm>
-
 #include "tools/vesk2/files/files.h"
 #include "tools/vesk2/keys/key_source.h"
 #include "tools/vesk2/objects/join.h"

@@ -4,7 +4,6 @@
 #ifndef VESK2_TOOLS_EVIDENCE_H
 #define VESK2_TOOLS_EVIDENCE_H
 
-#include <optional>
 #include <string>
 #include <vector>
 

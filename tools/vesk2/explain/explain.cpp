@@ -10,7 +10,6 @@
 #include "tools/vesk2/explain/tell_facts.h"
 #include "tools/vesk2/explain/tell_remedies.h"
 #include "tools/vesk2/files/files.h"
-#include "tools/vesk2/files/stores.h"
 #include "tools/vesk2/objects/shapes.h"
 #include "tools/vesk2/objects/texts.h"
 #include "tools/vesk2/say/report.h"

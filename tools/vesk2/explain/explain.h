@@ -7,9 +7,6 @@
 #ifndef VESK2_TOOLS_EXPLAIN_H
 #define VESK2_TOOLS_EXPLAIN_H
 
-#include <string>
-#include <vector>
-
 #include "tools/vesk2/explain/evidence.h"
 
 namespace vesk2_command {

@@ -2,8 +2,6 @@
 // hypothesis.cpp: asking the library about a world that differs in a few objects.
 #include "tools/vesk2/explain/hypothesis.h"
 
-#include <algorithm>
-
 #include "tools/vesk2/explain/effort.h"
 
 namespace vesk2_command {

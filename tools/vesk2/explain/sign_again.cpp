@@ -2,8 +2,6 @@
 // sign_again.cpp: a manifest signed anew.
 #include "tools/vesk2/explain/sign_again.h"
 
-#include <algorithm>
-
 #include "tools/vesk2/explain/edits.h"
 
 namespace vesk2_command {

@@ -5,8 +5,8 @@
 
 #include <optional>
 
-#include "tools/vesk2/files/files.h"
 #include "tools/vesk2/install/source.h"
+#include "tools/vesk2/say/report.h"
 
 namespace vesk2_command {
 namespace {

@@ -4,7 +4,6 @@
 #define VESK2_TOOLS_FILL_H
 
 #include <cstdint>
-#include <functional>
 #include <map>
 #include <optional>
 #include <string>

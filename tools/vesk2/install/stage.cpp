@@ -18,7 +18,6 @@
 #include "tools/vesk2/files/files.h"
 #include "tools/vesk2/files/leftovers.h"
 #include "tools/vesk2/install/below.h"
-#include "tools/vesk2/say/report.h"
 #include "tools/vesk2/tree/names.h"
 
 namespace vesk2_command {

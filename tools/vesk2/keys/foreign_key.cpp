@@ -7,12 +7,9 @@
 #include <openssl/pem.h>
 #include <openssl/x509.h>
 
-#include <vector>
-
 #include "tools/vesk2/files/files.h"
 #include "tools/vesk2/keys/openssh_key.h"
 #include "tools/vesk2/keys/ssh_wire.h"
-#include "tools/vesk2/say/report.h"
 
 namespace vesk2_command {
 namespace {

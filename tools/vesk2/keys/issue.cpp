@@ -5,7 +5,6 @@
 #include "tools/vesk2/keys/external_key.h"
 #include "tools/vesk2/keys/key_reference.h"
 #include "tools/vesk2/objects/tag_bounds.h"
-#include "tools/vesk2/say/report.h"
 
 namespace vesk2_command {
 

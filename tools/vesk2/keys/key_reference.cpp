@@ -12,7 +12,6 @@
 #include "tools/vesk2/keys/ssh_agent.h"
 #include "tools/vesk2/keys/token_key.h"
 #include "tools/vesk2/keys/token_uri.h"
-#include "tools/vesk2/say/report.h"
 
 namespace vesk2_command {
 namespace {

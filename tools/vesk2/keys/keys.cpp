@@ -5,7 +5,6 @@
 #include <openssl/pem.h>
 #include <openssl/rsa.h>
 
-#include "tools/vesk2/files/files.h"
 #include "tools/vesk2/say/report.h"
 
 #include <vesk2/hash.h>

@@ -5,7 +5,6 @@
 #include <algorithm>
 
 #include "tools/vesk2/files/files.h"
-#include "tools/vesk2/say/report.h"
 
 namespace vesk2_command {
 

@@ -2,8 +2,6 @@
 // splice.cpp: finding certificates in a file's text.
 #include "tools/vesk2/objects/splice.h"
 
-#include "tools/vesk2/say/report.h"
-
 namespace vesk2_command {
 
 std::string PairText(const SignedCert& each) {
