@@ -1,6 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
-// What the lists of one call say, against an oracle that asks them one by one; and how much work a
-// stranger's certificates and lists make.
+// What the lists of one call say, against an oracle that asks them one by one; how much work a
+// stranger's certificates and lists make; and a store that changes while they are proved.
+#include <vesk2/cert_sequence.h>
+
+#include <functional>
 #include <random>
 #include <vector>
 
@@ -11,6 +14,7 @@
 
 // The linker leads the library's calls here (--wrap).
 static size_t proofs = 0, digests = 0;
+static std::function<void()> onProof = [] {};
 extern "C" {
 decltype(zvclm_HashStart) __real_zvclm_HashStart, __wrap_zvclm_HashStart;
 decltype(zvclm_PublicKeyVerifySignature) __real_zvclm_PublicKeyVerifySignature,
@@ -24,6 +28,7 @@ int __wrap_zvclm_PublicKeyVerifySignature(const ZVCLMPublicKeyData* key, int sch
                                           uint32_t digestLength, const unsigned char* signature,
                                           uint32_t signatureLength, int* valid, uint32_t handle) {
   ++proofs;
+  onProof();
   return __real_zvclm_PublicKeyVerifySignature(key, scheme, parameters, digest, digestLength,
                                                signature, signatureLength, valid, handle);
 }
@@ -239,6 +244,67 @@ TEST(RevocationLists, StoredAsOneByOne) {
     }
     EXPECT_EQ(stored[0], stored[1]) << round;
   }
+}
+
+// The stages of one verification read the entries one after the other. What is gone or spoiled at
+// the second counts as such, whatever the first had read.
+class ChangingStore : public TrustTest {
+ protected:
+  int VerifyWhile(const std::function<void()>& change) {
+    std::filesystem::remove_all(global.File("acl"));
+    WriteAcl("a", AclEntryText(KeyText(5), Tag("(web)")));
+    WriteAcl("root", AclEntryText(KeyText(0), Tag("(ftp)")));
+    WriteAcl("source", AclEntryText(KeyText(4), source_));
+    proofs = 0;
+    // The chain has one signature, which is looked at before any entry is read.
+    onProof = [&] { proofs == 2 ? change() : void(); };
+    const Ref<SExpression> tag = Parse(Tag("(ftp)"));
+    const int code = chain_->Verify(nullptr, tag.get(), nullptr, nullptr);
+    onProof = [] {};
+    EXPECT_EQ(proofs, 2u);
+    return code;
+  }
+  void SetUp() override {
+    const std::string list = CrlSequenceText(4, source_, CrlText(Item(HashOf("x")), ""));
+    global.Write("cert/" + kSources[0] + ".crl", list);
+    CertText text{.issuer = KeyText(0), .subject = KeyText(1), .tag = Tag("(ftp)")};
+    text.revocation = Tag(kSources[0]).replace(0, 6, "(10:revocation");
+    const std::string cert = Cert(text);
+    const auto buffer =
+        Wrap(List({Str("sequence"), cert + TestKey::Rsa(0).Sign(cert) + "(5:owner2:me)"}));
+    ASSERT_EQ(CertSequence::Import(chain_.Out(), buffer.get(), nullptr), 0);
+  }
+
+  const std::string source_ = Tag(kSources[0]);
+  Ref<CertSequence> chain_;
+};
+
+TEST_F(ChangingStore, IsReadAfreshByEachStage) {
+  constexpr int kNone = VESK2_ERR_NOT_AUTHORIZED;
+  const std::string root = AclEntryText(KeyText(0), Tag("(ftp)"));
+  const auto remove = [&](const char* name) {
+    std::filesystem::remove(global.File(std::string("acl/") + name + ".acl"));
+  };
+  const std::tuple<const char*, std::function<void()>, int> cases[] = {
+      {"nothing", [] {}, 0},
+      {"another tag", [&] { WriteAcl("root", AclEntryText(KeyText(0), Tag("(ftq)"))); }, kNone},
+      {"another key", [&] { WriteAcl("root", AclEntryText(KeyText(3), Tag("(ftp)"))); }, kNone},
+      {"a longer file", [&] { WriteAcl("root", root + " "); }, 0},
+      {"a spoiled file", [&] { WriteAcl("root", root.substr(0, 40)); }, kNone},
+      {"a spoiled last file", [&] { WriteAcl("source", "("); }, kNoEntry},
+      {"another name", [&] { remove("root"), WriteAcl("z", root); }, 0},
+      {"contents that changed places",
+       [&] {
+         const std::string a = global.Read("acl/a.acl");
+         WriteAcl("a", root), WriteAcl("root", a);
+       },
+       0},
+      {"no root", [&] { remove("root"); }, kNone},
+      {"one less before it", [&] { remove("a"); }, 0},
+      {"one more before it", [&] { WriteAcl("b", AclEntryText(KeyText(3), Tag("(ftp)"))); }, 0},
+      {"no store", [&] { std::filesystem::remove_all(global.File("acl")); }, kNoEntry},
+  };
+  for (const auto& [name, change, code] : cases) EXPECT_EQ(VerifyWhile(change), code) << name;
 }
 
 TEST(AclStoreWork, InstallingHashesEachTagOnce) {
