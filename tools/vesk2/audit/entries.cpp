@@ -74,9 +74,7 @@ class EntryKeys {
     Subject* const subject = each.object->GetSubject();
     auto* threshold = dynamic_cast<ThresholdSubject*>(subject);
     if (threshold == nullptr) return Add(each.path, subject);
-    Ref<SExpression> members;
-    Check(threshold->GetSubjects(members.Out()), "reading a subject");
-    for (auto it = members->Begin(); it; it.Next()) Add(each.path, it.Value());
+    for (Subject* const member : MembersOf(*threshold)) Add(each.path, member);
   }
 
   // The library is asked about subjects of certificates: this one says nothing else.

@@ -30,9 +30,7 @@ class FileStrength {
       return NameDigest(*hash, "names a key or content");
     auto* threshold = dynamic_cast<ThresholdSubject*>(subject);
     if (threshold == nullptr) return;
-    Ref<SExpression> members;
-    Check(threshold->GetSubjects(members.Out()), "reading a subject");
-    for (auto it = members->Begin(); it; it.Next()) Name(it.Value());
+    for (ZvVesk2::Subject* const member : MembersOf(*threshold)) Name(member);
   }
   void NameSignature(const Signature* signature) {
     if (signature != nullptr && signature->GetHash() != nullptr) {

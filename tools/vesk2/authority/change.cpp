@@ -25,9 +25,8 @@ std::optional<long> SecondOf(const TimeStamp* stamp) {
 
 // The dates of certificates that a list announces: a revoked key is revoked always.
 void AddItems(const SExpression& items, Moments& moments) {
-  for (auto it = items.Begin(); it; it.Next()) {
-    const auto* const item = dynamic_cast<SExpression*>(it.Value());
-    if (item != nullptr) moments.AddPeriod(dynamic_cast<TimeStamp*>(item->Last()), nullptr);
+  for (const SExpression* const item : ItemsOf<SExpression>(&items)) {
+    moments.AddPeriod(dynamic_cast<TimeStamp*>(item->Last()), nullptr);
   }
 }
 
@@ -107,18 +106,14 @@ void Moments::AddCert(const ZvVesk2::Cert& cert) {
 }
 
 void Moments::AddEntries(const SExpression* entries) {
-  if (entries == nullptr) return;
-  for (auto it = entries->Begin(); it; it.Next()) {
-    const auto* const entry = dynamic_cast<AclEntry*>(it.Value());
-    if (entry != nullptr) AddPeriod(entry->GetNotBefore(), entry->GetNotAfter());
+  for (const AclEntry* const entry : ItemsOf<AclEntry>(entries)) {
+    AddPeriod(entry->GetNotBefore(), entry->GetNotAfter());
   }
 }
 
 void Moments::AddLists(const SExpression* lists) {
-  if (lists == nullptr) return;
-  for (auto it = lists->Begin(); it; it.Next()) {
-    const auto* const list = dynamic_cast<CrlSequence*>(it.Value());
-    if (list == nullptr || list->First() == nullptr) continue;
+  for (const CrlSequence* const list : ItemsOf<CrlSequence>(lists)) {
+    if (list->First() == nullptr) continue;
     AddPeriod(nullptr, list->GetCert()->GetNotAfter());
     AddItems(*list->GetCrl()->GetList1(), *this);
   }

@@ -16,17 +16,6 @@ using ZvVesk2::Cert;
 using ZvVesk2::Subject;
 using ZvVesk2::ThresholdSubject;
 
-std::vector<PublicKey*> MembersOf(ThresholdSubject& several) {
-  Ref<SExpression> members;
-  Check(several.GetSubjects(members.Out()), "reading a subject");
-  std::vector<PublicKey*> keys;
-  for (auto it = members->Begin(); it; it.Next()) {
-    auto* const key = dynamic_cast<PublicKey*>(it.Value());
-    if (key != nullptr) keys.push_back(key);
-  }
-  return keys;  // borrowed from `several`, which shares them
-}
-
 // How subjects can name a key.
 std::vector<std::string> NamesOf(PublicKey& key) {
   return {Fingerprint(key), SubjectText(*HashOf(key, ZVCLM_HASH_SHA1, true))};
@@ -34,12 +23,10 @@ std::vector<std::string> NamesOf(PublicKey& key) {
 
 }  // namespace
 
-NamedKeys::NamedKeys(const Holdings& holdings, const SExpression& entries) : holdings_(holdings) {
-  for (auto it = entries.Begin(); it; it.Next()) {
-    auto* const entry = dynamic_cast<AclEntry*>(it.Value());
-    if (entry == nullptr) continue;  // the keyword
-    AddSubject(entry->GetSubject(), entryList_.size(), entriesFor_);
-    entryList_.push_back(entry);
+NamedKeys::NamedKeys(const Holdings& holdings, const SExpression& entries)
+    : holdings_(holdings), entryList_(ItemsOf<AclEntry>(&entries)) {
+  for (size_t i = 0; i < entryList_.size(); ++i) {
+    AddSubject(entryList_[i]->GetSubject(), i, entriesFor_);
   }
   for (size_t i = 0; i < holdings_.certs.size(); ++i) {
     const Cert& cert = *holdings_.certs[i].cert;
@@ -61,10 +48,12 @@ void NamedKeys::AddSubject(Subject* subject, size_t number, Named& named) {
     return;
   }
   Signers group{{}, several->GetK()};
-  for (PublicKey* const member : MembersOf(*several)) {
-    AddKey(member);
-    named[Fingerprint(*member)].push_back(number);
-    group.keys.push_back(Ref<PublicKey>::Share(member));
+  for (Subject* const member : MembersOf(*several)) {
+    auto* const key = dynamic_cast<PublicKey*>(member);
+    if (key == nullptr) continue;
+    AddKey(key);
+    named[Fingerprint(*key)].push_back(number);
+    group.keys.push_back(Ref<PublicKey>::Share(key));
   }
   if (group.IsGroup()) groups_.emplace(SubjectText(*subject), std::move(group));
 }

@@ -127,15 +127,13 @@ Ref<SExpression> Supposition::Entries(SExpression* entries) const {
   if (without_.empty() || entries == nullptr) return Ref<SExpression>::Share(entries);
   std::vector<DExpression*> left;
   std::vector<bool> found(without_.size());
-  for (auto it = entries->Begin(); it; it.Next()) {
-    const auto* const entry = dynamic_cast<AclEntry*>(it.Value());
-    if (entry == nullptr) continue;  // the keyword
+  for (AclEntry* const entry : ItemsOf<AclEntry>(entries)) {
     bool gone = false;
     for (size_t i = 0; i < without_.size(); ++i) {
       if (!IsCalled(*entry, without_[i])) continue;
       found[i] = gone = true;
     }
-    if (!gone) left.push_back(it.Value());
+    if (!gone) left.push_back(entry);
   }
   const auto missing = std::find(found.begin(), found.end(), false);
   if (missing != found.end()) {

@@ -85,11 +85,9 @@ Sheet DescribeSubject(Subject& subject) {
   }
   sheet.Add("k", threshold->GetK(), std::to_string(threshold->GetK()));
   sheet.Add("n", threshold->GetN(), std::to_string(threshold->GetN()));
-  Ref<SExpression> members;
-  Check(threshold->GetSubjects(members.Out()), "reading a subject");
   Json keys = Json::array();
-  for (auto it = members->Begin(); it; it.Next()) {
-    keys.push_back(Fingerprint(*it.Value()));
+  for (Subject* const member : MembersOf(*threshold)) {
+    keys.push_back(Fingerprint(*member));
     sheet.AddRow("member", keys.back());
   }
   sheet.AddMember("members", std::move(keys));

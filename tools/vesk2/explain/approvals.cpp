@@ -26,15 +26,12 @@ class Finder {
 
   Approvals Find(const EntryEvidence& entry, ThresholdSubject& several) const {
     Approvals found{&entry, several.GetK(), several.GetN()};
-    Ref<SExpression> members;
-    Check(several.GetSubjects(members.Out()), "reading a subject");
-    for (auto it = members->Begin(); it; it.Next()) {
-      auto& member = dynamic_cast<Subject&>(*it.Value());
-      std::string name = Fingerprint(member);
+    for (Subject* const member : MembersOf(several)) {
+      std::string name = Fingerprint(*member);
       // Who issued nothing has approved nothing.
-      if (issuers_.count(name) != 0 && Approves(*entry.entry, member)) {
+      if (issuers_.count(name) != 0 && Approves(*entry.entry, *member)) {
         found.approved.push_back(std::move(name));
-      } else if (policy_.IsRevoked(&member)) {
+      } else if (policy_.IsRevoked(member)) {
         found.revoked.push_back(std::move(name));
       } else {
         found.awaited.push_back(std::move(name));

@@ -8,6 +8,7 @@
 namespace vesk2_command {
 
 using ZvVesk2::Cert;
+using ZvVesk2::Subject;
 using ZvVesk2::ThresholdSubject;
 
 void EditMaker::CoSign(std::vector<Edit>& edits) const {
@@ -21,24 +22,23 @@ void EditMaker::CoSign(std::vector<Edit>& edits) const {
 
 // The members of a k-of-n that certify whom the certificate at an index certifies, the others, and
 // the certificate: the first that a member issued for that subject.
-void EditMaker::CoSign(std::vector<Edit>& edits, ZvVesk2::Subject* subject) const {
+void EditMaker::CoSign(std::vector<Edit>& edits, Subject* subject) const {
   auto* several = dynamic_cast<ThresholdSubject*>(subject);
   if (several == nullptr || several->GetK() < 2) return;
-  Ref<SExpression> members;
-  Check(several->GetSubjects(members.Out()), "reading a subject");
+  const std::vector<Subject*> members = MembersOf(*several);
   const size_t first = question_.manifest ? 1 : 0;  // a manifest's first is for its content
   for (size_t i = first; i < evidence_.certs.size(); ++i) {
     const Cert& cert = *evidence_.certs[i].cert;
     if (!several->HasMember(cert.GetIssuer()) || policy_.IsRevoked(cert.GetSubject())) continue;
     size_t agreed = 0;
     std::vector<Ref<PublicKey>> others;
-    for (auto it = members->Begin(); it; it.Next()) {
+    for (Subject* const member : members) {
       const bool certified = std::any_of(
           evidence_.certs.begin(), evidence_.certs.end(), [&](const CertEvidence& each) {
-            return each.cert->GetIssuer()->IsEqual(it.Value()) &&
+            return each.cert->GetIssuer()->IsEqual(member) &&
                    each.cert->GetSubject()->IsEqual(cert.GetSubject());
           });
-      auto* key = dynamic_cast<PublicKey*>(it.Value());
+      auto* key = dynamic_cast<PublicKey*>(member);
       agreed += certified ? 1 : 0;
       if (!certified && key != nullptr && !policy_.IsRevoked(key)) {
         others.push_back(Ref<PublicKey>::Share(key));
@@ -60,11 +60,9 @@ void EditMaker::Approve(std::vector<Edit>& edits, const Approvals& approvals) co
   edit.target = "co-signers";
   edit.cost = 10;  // behind renewals: the certificates are taken as they are then
   edit.remedy = {"approve", "have another of the keys that must agree approve this manifest:"};
-  Ref<SExpression> members;
-  Check(several->GetSubjects(members.Out()), "reading a subject");
-  for (auto it = members->Begin(); it; it.Next()) {
-    auto* key = dynamic_cast<PublicKey*>(it.Value());
-    const std::string name = Fingerprint(*it.Value());
+  for (Subject* const member : MembersOf(*several)) {
+    auto* key = dynamic_cast<PublicKey*>(member);
+    const std::string name = Fingerprint(*member);
     if (key == nullptr || asked.count(name) == 0) continue;
     edit.remedy.text += " " + name;
     edit.remedy.keys.push_back(name);

@@ -47,17 +47,14 @@ std::set<const DExpression*> RelevantEntries(const ZvVesk2::Evidence& proved) {
   Ref<SExpression> list;
   Check(proved.RelevantEntries(list.Out()), "looking at the ACL entries");
   std::set<const DExpression*> relevant;
-  for (auto it = list->Begin(); it; it.Next()) relevant.insert(it.Value());
+  for (const AclEntry* const entry : ItemsOf<AclEntry>(list.get())) relevant.insert(entry);
   return relevant;
 }
 
 void TakeEntries(Evidence& evidence) {
-  const SExpression* acls = evidence.proved->GetEntries();
-  if (acls == nullptr) return;
+  if (evidence.proved->GetEntries() == nullptr) return;
   const std::set<const DExpression*> relevant = RelevantEntries(*evidence.proved);
-  for (auto it = acls->Begin(); it; it.Next()) {
-    auto* entry = dynamic_cast<AclEntry*>(it.Value());
-    if (entry == nullptr) continue;
+  for (AclEntry* const entry : ItemsOf<AclEntry>(evidence.proved->GetEntries())) {
     const std::filesystem::path path(entry->GetFileName() != nullptr ? entry->GetFileName() : "");
     const bool inStore = path.parent_path() == std::filesystem::path(AclDirectory());
     evidence.entries.push_back({Ref<AclEntry>::Share(entry),
@@ -67,12 +64,8 @@ void TakeEntries(Evidence& evidence) {
 }
 
 std::vector<CrlSequence*> ListsOf(const SExpression* lists) {
-  std::vector<CrlSequence*> found;
-  if (lists == nullptr) return found;
-  for (auto it = lists->Begin(); it; it.Next()) {
-    auto* list = dynamic_cast<CrlSequence*>(it.Value());
-    if (list != nullptr && list->First() != nullptr) found.push_back(list);
-  }
+  std::vector<CrlSequence*> found = ItemsOf<CrlSequence>(lists);
+  std::erase_if(found, [](const CrlSequence* list) { return list->First() == nullptr; });
   return found;
 }
 

@@ -13,11 +13,8 @@ namespace {
 
 // The stored list of a source, as the verification loaded it.
 Ref<CrlSequence> StoredList(const Evidence& evidence, SExpression* source) {
-  const SExpression* lists = evidence.proved->GetStoredLists();
-  if (lists == nullptr) return {};
-  for (auto it = lists->Begin(); it; it.Next()) {
-    auto* list = dynamic_cast<CrlSequence*>(it.Value());
-    SExpression* tag = list != nullptr ? list->GetCert()->GetTag() : nullptr;
+  for (auto* const list : ItemsOf<CrlSequence>(evidence.proved->GetStoredLists())) {
+    SExpression* const tag = list->GetCert()->GetTag();
     if (tag != nullptr && tag->IsEqual(source)) return Ref<CrlSequence>::Share(list);
   }
   return {};

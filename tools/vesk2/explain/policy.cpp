@@ -48,13 +48,9 @@ bool Policy::IsRevoked(Subject* subject) const {
   });
   auto* several = dynamic_cast<ThresholdSubject*>(subject);
   if (listed || several == nullptr) return listed;
-  Ref<SExpression> members;
-  Check(several->GetSubjects(members.Out()), "reading a subject");
-  for (auto it = members->Begin(); it; it.Next()) {
-    auto* member = dynamic_cast<Subject*>(it.Value());
-    if (member == nullptr || IsRevoked(member)) return true;
-  }
-  return false;
+  const std::vector<Subject*> members = MembersOf(*several);
+  return std::any_of(members.begin(), members.end(),
+                     [&](Subject* member) { return IsRevoked(member); });
 }
 
 bool Policy::IsOutermost(Principal* key) const {

@@ -32,9 +32,8 @@ std::string Short(const std::string& fingerprints) {
 const TimeStamp* MadeAt(const CrlSequence& list, const TimeStamp& now) {
   const TimeStamp* made = list.GetCert()->GetNotBefore();
   for (const SExpression* items : {list.GetCrl()->GetList1(), list.GetCrl()->GetList2()}) {
-    for (auto it = items->Begin(); it; it.Next()) {
-      const auto* item = dynamic_cast<SExpression*>(it.Value());
-      const auto* date = item != nullptr ? dynamic_cast<TimeStamp*>(item->Last()) : nullptr;
+    for (const SExpression* const item : ItemsOf<SExpression>(items)) {
+      const auto* date = dynamic_cast<TimeStamp*>(item->Last());
       if (date == nullptr || date->IsAfter(&now)) continue;
       if (made == nullptr || date->IsAfter(made)) made = date;
     }

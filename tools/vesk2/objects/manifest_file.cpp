@@ -59,10 +59,8 @@ void AddParts(SignatureBlock& block, const Evidence& evidence) {
     block.certs.push_back(
         {Ref<Cert>::Share(evidence.GetCert(i)), Ref<Signature>::Share(evidence.GetSignature(i))});
   }
-  const SExpression* const lists = evidence.GetCarriedLists();
-  if (lists == nullptr) return;
-  for (auto it = lists->Begin(); it; it.Next()) {
-    block.crls.push_back(Ref<CrlSequence>::Share(static_cast<CrlSequence*>(it.Value())));
+  for (CrlSequence* const list : ItemsOf<CrlSequence>(evidence.GetCarriedLists())) {
+    block.crls.push_back(Ref<CrlSequence>::Share(list));
   }
 }
 

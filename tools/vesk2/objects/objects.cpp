@@ -108,6 +108,12 @@ Ref<SExpression> ListOf(const std::vector<DExpression*>& items, const char* keyw
   return list;
 }
 
+std::vector<ZvVesk2::Subject*> MembersOf(ZvVesk2::ThresholdSubject& several) {
+  Ref<SExpression> members;
+  Check(several.GetSubjects(members.Out()), "reading a subject");
+  return ItemsOf<ZvVesk2::Subject>(members.get());
+}
+
 std::string Written(const std::function<int(FILE*)>& write) {
   char* data = nullptr;
   size_t size = 0;

@@ -16,6 +16,7 @@
 #include <vesk2/hash.h>
 #include <vesk2/public_key.h>
 #include <vesk2/ref.h>
+#include <vesk2/subject.h>
 
 namespace vesk2_command {
 
@@ -58,6 +59,18 @@ char* NewText(const std::string& text);
 // one.
 void Append(SExpression& list, DExpression& item);
 Ref<SExpression> ListOf(const std::vector<DExpression*>& items, const char* keyword = nullptr);
+// ItemsOf are the items of a list that are of one class; none of null. They stay the list's.
+template <typename Class>
+std::vector<Class*> ItemsOf(const SExpression* list) {
+  std::vector<Class*> items;
+  if (list == nullptr) return items;
+  for (auto it = list->Begin(); it; it.Next()) {
+    if (auto* const item = dynamic_cast<Class*>(it.Value())) items.push_back(item);
+  }
+  return items;
+}
+// Those whom a k-of-n counts; they stay its own.
+std::vector<ZvVesk2::Subject*> MembersOf(ZvVesk2::ThresholdSubject& several);
 
 // What a writer of the library writes.
 std::string Written(const std::function<int(FILE*)>& write);

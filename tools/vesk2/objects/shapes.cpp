@@ -52,10 +52,8 @@ const char* SubjectKind(const Subject& subject) {
 Json ThresholdJson(Subject& subject) {
   auto* threshold = dynamic_cast<ThresholdSubject*>(&subject);
   if (threshold == nullptr) return {};
-  Ref<SExpression> members;
-  Check(threshold->GetSubjects(members.Out()), "reading a subject");
   Json keys = Json::array();
-  for (auto it = members->Begin(); it; it.Next()) keys.push_back(Fingerprint(*it.Value()));
+  for (Subject* const member : MembersOf(*threshold)) keys.push_back(Fingerprint(*member));
   return {{"k", threshold->GetK()}, {"n", threshold->GetN()}, {"members", keys}};
 }
 

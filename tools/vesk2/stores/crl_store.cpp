@@ -76,10 +76,8 @@ std::string ListDirectory() {
 }
 
 Sources::Sources(SExpression* acls) {
-  if (acls == nullptr) return;
-  for (auto it = acls->Begin(); it; it.Next()) {
-    auto* entry = dynamic_cast<AclEntry*>(it.Value());
-    if (entry == nullptr || !IsRevocationTag(entry->GetTag())) continue;
+  for (AclEntry* const entry : ItemsOf<AclEntry>(acls)) {
+    if (!IsRevocationTag(entry->GetTag())) continue;
     last_[Fingerprint(*entry->GetTag())] = Ref<AclEntry>::Share(entry);
   }
 }
@@ -91,10 +89,8 @@ Ref<SExpression> Sources::AclsFor(SExpression* tag) const {
 
 std::map<std::string, CrlSequence*> ListsBySource(const SExpression* lists) {
   std::map<std::string, CrlSequence*> found;
-  if (lists == nullptr) return found;
-  for (auto it = lists->Begin(); it; it.Next()) {
-    auto* list = dynamic_cast<CrlSequence*>(it.Value());
-    SExpression* tag = list != nullptr ? list->GetCert()->GetTag() : nullptr;
+  for (CrlSequence* const list : ItemsOf<CrlSequence>(lists)) {
+    SExpression* const tag = list->GetCert()->GetTag();
     if (tag != nullptr) found[Canonical(*tag)] = list;
   }
   return found;

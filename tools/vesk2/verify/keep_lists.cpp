@@ -35,13 +35,11 @@ bool IsWanted(CrlSequence& carried, CrlSequence& stored, bool yes) {
 }  // namespace
 
 void KeepLists(const ZvVesk2::Evidence& proved, bool yes, const std::set<std::string>& broken) {
-  const SExpression* carried = proved.GetCarriedLists();
-  if (carried == nullptr || proved.GetEntries() == nullptr) return;
+  if (proved.GetEntries() == nullptr) return;
   std::map<std::string, CrlSequence*> stored = ListsBySource(proved.GetStoredLists());
   const Ref<TimeStamp> now = ParseTime("now", false);
-  for (auto it = carried->Begin(); it; it.Next()) {
-    auto* list = dynamic_cast<CrlSequence*>(it.Value());
-    SExpression* tag = list != nullptr ? list->GetCert()->GetTag() : nullptr;
+  for (CrlSequence* const list : ItemsOf<CrlSequence>(proved.GetCarriedLists())) {
+    SExpression* const tag = list->GetCert()->GetTag();
     if (tag == nullptr || !IsRevocationTag(tag)) continue;
     const std::string source = Canonical(*tag);
     if (broken.count(source) != 0 || list->VerifySelf(proved.GetEntries()) != 0) continue;
