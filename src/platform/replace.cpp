@@ -32,7 +32,8 @@ constexpr size_t kSuffix = kMarkLength + 2 * kRandomBytes;
 // The longest name that a file system takes.
 constexpr size_t kMaxFileName = 255;
 // Names drawn before giving up. Each is new; a second one is needed only when somebody who removes
-// leftovers comes between the making of a file and its locking, again and again on a busy disk.
+// leftovers comes between the making of a file and its locking. What is lost so comes in runs:
+// making the file lets go on who waited for the directory, on a busy machine in the maker's place.
 constexpr int kAttempts = 100;
 
 // By the form of the name alone, so that the file of another program is hardly ever meant; who has

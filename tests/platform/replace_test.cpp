@@ -8,13 +8,27 @@
 #include <unistd.h>
 
 #include <atomic>
+#include <functional>
 #include <set>
 #include <string>
 #include <thread>
+#include <utility>
+#include <vector>
 
 #include <vesk2.h>
 
 #include "tests/support/temp_dir.h"
+
+// The linker sends calls of flock here: what happens between the making of a file and its locking.
+std::function<void(int)> beforeLock;
+extern "C" int __real_flock(int fd, int operation);
+extern "C" int __wrap_flock(int fd, int operation) {
+  if (const auto hook = std::exchange(beforeLock, nullptr)) {
+    hook(fd);
+    beforeLock = hook;
+  }
+  return __real_flock(fd, operation);
+}
 
 namespace ZVsysutil {
 namespace {
@@ -95,6 +109,40 @@ TEST(ReplaceTest, RemovesWhatDeadWritersLeft) {
   zv_remove_leftovers(dir.Path().c_str());
   EXPECT_FALSE(fs::exists(dir.File(held)));
   zv_remove_leftovers(dir.File("none").c_str());
+}
+
+// Who removes leftovers comes before the lock, and is gone, or still has the lock: as often as that
+// goes on the file is made anew, and in the end nothing is left of any.
+TEST(ReplaceTest, RemoversComeBeforeTheLock) {
+  const struct {
+    bool stays;
+    int times;
+    int code;
+  } cases[] = {{false, 50, 0},
+               {true, 50, 0},
+               {false, 100'000, VESK2_ERR_FILE_OPEN},
+               {true, 100'000, VESK2_ERR_FILE_OPEN}};
+  for (const auto& row : cases) {
+    const TempDir dir;
+    dir.Write("x", "old");
+    std::vector<int> removers;
+    std::set<std::string> names;
+    int left = row.times;
+    beforeLock = [&](int fd) {
+      if (left-- <= 0) return;
+      names.insert(Names(dir));
+      if (!row.stays) return zv_remove_leftovers(dir.Path().c_str());
+      removers.push_back(open(("/proc/self/fd/" + std::to_string(fd)).c_str(), O_RDONLY));
+      ASSERT_EQ(__real_flock(removers.back(), LOCK_EX | LOCK_NB), 0);
+    };
+    EXPECT_EQ(Write(dir.File("x"), "new"), row.code);
+    beforeLock = nullptr;
+    EXPECT_EQ(dir.Read("x"), row.code == 0 ? "new" : "old");
+    EXPECT_TRUE(row.code != 0 || names.size() == 50U) << "each under a name of its own";
+    for (const int fd : removers) close(fd);
+    zv_remove_leftovers(dir.Path().c_str());
+    EXPECT_EQ(Names(dir), "<x>");
+  }
 }
 
 // Who removes leftovers never takes a writer's file away, at whatever moment it looks.
