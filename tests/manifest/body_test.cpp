@@ -116,6 +116,9 @@ TEST(BodyParse, RefusesWhatIsNoBody) {
       {Body("(4:file1;a0:" + digest + ")"), VESK2_ERR_PARSE_FILE},
       {"(4:body(12:random-token4:abcd)(4:file5:abcd", VESK2_ERR_PARSE_FILE},
       {"(4:body(12:random-token4:abcd)(4:file5", VESK2_ERR_PARSE_FILE},
+      // Nor is a string that is cut off one of no bytes.
+      {"(4:body(12:random-token4:abcd)(4:file1:a9:xyz", VESK2_ERR_PARSE_FILE},
+      {"(4:body(12:random-token4:abcd)(4:file1:a0:32:xyz", VESK2_ERR_PARSE_FILE},
       {sized(20), VESK2_ERR_UNKNOWN_HASH_ID},
       {sized(31), VESK2_ERR_UNKNOWN_HASH_ID},
       {sized(33), VESK2_ERR_UNKNOWN_HASH_ID},
