@@ -124,6 +124,33 @@ TEST(Readers, ExpectComparesFromThePositionOnward) {
   }
 }
 
+// One token, and one list of typed text, at a place, which moves behind them: programs walk so.
+TEST(Readers, ReadAtAPlace) {
+  const std::tuple<std::string, unsigned, int, std::string, unsigned> tokens[] = {
+      {"--3:abc1:x", 2, 0, "3:abc", 7},
+      {"0:", 0, 0, "0:", 2},
+      {"3:ab", 0, VESK2_ERR_BUFFER_OVERFLOW, "", 0},
+      {"4294967299:abc", 0, VESK2_ERR_BUFFER_OVERFLOW, "", 0},
+      {"1:a", 3, VESK2_ERR_BUFFER_OVERFLOW, "", 0},
+      {"1:a", 0xffffffff, VESK2_ERR_BUFFER_OVERFLOW, "", 0}};
+  for (const auto& [text, from, code, expected, to] : tokens) {
+    Input input(text);
+    DExpression* out = nullptr;
+    unsigned pos = from;
+    EXPECT_EQ(ByteString::ParseCanonical(out, input.data(), input.Size(), pos, nullptr), code);
+    const Ref<DExpression> owned(out);
+    EXPECT_EQ(owned ? Canonical(owned) : "", expected) << text;
+    EXPECT_TRUE(code != 0 || pos == to) << text << pos;
+  }
+  DExpression* list = nullptr;
+  unsigned pos = 3;
+  ASSERT_EQ(SExpression::ParseAdvanced(list, "(a)(b (c)) x", pos, nullptr), 0);
+  const Ref<DExpression> owned(list);
+  EXPECT_EQ(Canonical(owned), "(1:b(1:c))");
+  EXPECT_EQ(pos, 10U);
+  EXPECT_EQ(SExpression::ParseAdvanced(list, "(a)", pos, nullptr), VESK2_ERR_INVALID_PARAM);
+}
+
 TEST(Readers, AByteStringIsEmptyAfterAFailure) {
   const Ref<ByteString> string(new ByteString(nullptr));
   for (const char* input : {"[foo]1:a", "99999:", "3:ab", "3"}) {

@@ -120,6 +120,22 @@ TEST_F(Chain, StoresAreReadEachTime) {
   EXPECT_EQ(sequence->Verify2(unused, unused, used), VESK2_ERR_INVALID_PARAM);
 }
 
+// The lists of a caller that takes the stages one by one.
+TEST_F(Chain, ListsLoseWhatIsRevoked) {
+  Revoke("", Item(HashOf(KeyText(5))));
+  const Ref<CertSequence> sequence = Import(Link(2, 3) + Link(0, 5) + Link(1, 2));
+  Ref<SExpression> certs(new SExpression(nullptr)), extras(new SExpression(nullptr));
+  ASSERT_EQ(sequence->VerifySignatures2(certs.get(), extras.get()), 0);
+  SExpression *goodCerts = certs.Release(), *goodExtras = extras.Release(), *none = nullptr;
+  EXPECT_EQ(sequence->VerifyRevocations2(goodCerts, none), VESK2_ERR_PARAM_NULL);
+  EXPECT_EQ(goodCerts->Count(), 3U);
+  EXPECT_EQ(sequence->VerifyRevocations2(goodCerts, goodExtras), 0);
+  certs.Reset(goodCerts);
+  extras.Reset(goodExtras);
+  EXPECT_EQ(Canonical(certs), List({Grant(2, KeyText(3)), Grant(1, KeyText(2))}));
+  EXPECT_EQ(extras->Count(), 2U);
+}
+
 // Sequences put together by hand: c a certificate, s its signature, b a bad one, x anything else.
 TEST_F(Chain, ItemsOfEveryKind) {
   const std::string cert = Grant(0, KeyText(1));
