@@ -364,6 +364,13 @@ TEST_F(ManifestTest, EvidenceReadsOnAndJudgesChanges) {
     ASSERT_EQ(other.AssumeRevoked(digest.get()), 0);
     EXPECT_EQ(other.Judge(manifest.GetTag()), code);
   }
+  mend();
+  for (const auto& [object, code] : revoked) {  // none takes the place of an earlier one
+    const Ref<ZvVesk2::Hash> digest(new ZvVesk2::Hash(nullptr));
+    ASSERT_EQ(digest->Import(Wrap(HashOf(object)).get()), 0);
+    ASSERT_EQ(other.AssumeRevoked(digest.get()), 0);
+    EXPECT_EQ(other.Judge(manifest.GetTag()), revoked[0].second) << code;
+  }
   EXPECT_EQ(other.AssumeRevoked(nullptr), VESK2_ERR_PARAM_NULL);
   // The original is as it was, and a list that other entries proved is proved again.
   mend();

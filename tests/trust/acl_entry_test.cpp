@@ -105,6 +105,17 @@ TEST_F(AclStore, Import) {
   EXPECT_EQ(Load(extra), Loaded("x"));
 }
 
+// A name with a "/" is a path, which needs no store and never leads out of one.
+TEST_F(AclStore, AnEntryByItsPath) {
+  const std::string text = AclEntryText(KeyText(0), Tag("(ftp)"));
+  const std::string path = other.Write("x.acl", text);
+  VeskConf::SetGlobalDirectory("");
+  const Ref<AclEntry> entry(new AclEntry(nullptr));
+  ASSERT_EQ(entry->Import(path.c_str()), 0);
+  EXPECT_EQ(Canonical(entry), text);
+  EXPECT_EQ(entry->GetStorageType(), StoragePath);
+}
+
 TEST_F(AclStore, InstallAddsWhatIsMissing) {
   WriteAcl("a", Named('a'));
   other.Write("a.acl", Named('n'));     // the name is another trust root's
