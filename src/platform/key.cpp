@@ -87,6 +87,7 @@ class Parameters {
     unsigned char* at = bytes_.get();
     for (size_t i = 0; i < names.size(); ++i) {
       const size_t length = SizeOf(key.numbers[i]);
+      // NOLINTNEXTLINE(clang-analyzer-cplusplus.NewDelete): each number has a byte
       *at = 0;
       if constexpr (std::endian::native == std::endian::little) {
         std::ranges::reverse_copy(key.numbers[i], at);
