@@ -138,7 +138,8 @@ TEST(Order, BytesAndPaddedBytes) {
   }
   const std::string text = "x";
   EXPECT_EQ(3, spki_cmp_bytes(nullptr, 0, nullptr, 0));
-  for (const unsigned char pad : {'x', '0'}) {  // what is left of the other may be nothing
+  constexpr unsigned char kPads[] = {'x', '0'};
+  for (const unsigned char pad : kPads) {  // what is left of the other may be nothing
     EXPECT_EQ(3, spki_cmp_padded(nullptr, 0, Bytes(text), 1, pad));
     EXPECT_EQ(3, spki_cmp_padded(Bytes(text), 1, nullptr, 0, pad));
   }

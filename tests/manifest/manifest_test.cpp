@@ -339,7 +339,7 @@ TEST_F(ManifestTest, EvidenceReadsOnAndJudgesChanges) {
   const auto mend = [&] {
     EXPECT_EQ(other.Copy(evidence), 0);
     other.RemoveCerts();
-    for (const size_t i : {0, 1}) EXPECT_EQ(other.AddCert(evidence.GetCert(i), nullptr, 0), 0);
+    for (const size_t i : {0U, 1U}) EXPECT_EQ(other.AddCert(evidence.GetCert(i), nullptr, 0), 0);
     EXPECT_EQ(other.Judge(manifest.GetTag()), 0);
   };
   mend();

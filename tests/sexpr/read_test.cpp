@@ -180,7 +180,7 @@ TEST(Readers, EveryTruncationAndBitFlip) {
 // order and in another thread, and lists are edited like those that were built.
 TEST(Readers, PartsLiveAsLongAsTheyAreHeld) {
   std::string text = "(4:many";
-  for (int i = 0; i < 2000; ++i) text += "(1:a" + Str(std::string(i % 40, 'x')) + "(0:)1:b)";
+  for (size_t i = 0; i < 2000; ++i) text += "(1:a" + Str(std::string(i % 40, 'x')) + "(0:)1:b)";
   text += ")";
   for (const Reader read : {kMemory, kBuffer}) {
     Ref<SExpression> list;

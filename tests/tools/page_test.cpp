@@ -41,7 +41,7 @@ TEST(Page, NoTextIsMarkup) {
   for (int i = 0; i < 20000; ++i) {
     std::string text(random() % 8, '\0');
     for (char& c : text)
-      c = static_cast<char>(random() % 2 ? random() : "<>&\"'\\;#x0"[random() % 10]);
+      c = random() % 2 ? static_cast<char>(random()) : "<>&\"'\\;#x0"[random() % 10];
     EXPECT_TRUE(IsData(MarkupText(text))) << Hex(text);
   }
 }

@@ -163,7 +163,8 @@ TEST(RevocationLists, AnswerAsOneByOne) {
       auto* const cert = dynamic_cast<CertObject*>(it.Value());
       if (cert == nullptr) continue;
       const int32_t status = cert->GetRevocationStatus();
-      EXPECT_EQ(status, Expected(chosen, certs[number], number, from)) << round << "/" << number;
+      const CertModel& model = certs[static_cast<size_t>(number)];
+      EXPECT_EQ(status, Expected(chosen, model, number, from)) << round << "/" << number;
       bool revoked = false;  // alone it is told the same
       const int code = cert->IsRevoked(revoked, acls.get(), store.get(), stamp.get(), nullptr);
       EXPECT_EQ(cert->GetRevocationStatus(), status);

@@ -12,7 +12,6 @@
 #include <cstdio>
 #include <cstring>
 #include <filesystem>
-#include <ranges>
 #include <vector>
 
 #include "tools/vesk2/files/files.h"
@@ -145,11 +144,11 @@ void Stage::Finish(const Wanted& wanted) {
   const auto finish = [&](int file, const std::string& path) {
     if (fchmod(file, Mode(0755)) != 0 || fsync(file) != 0) Fail(path);
   };
-  for (const auto& [path, kind] : std::views::reverse(wanted.entries())) {
-    if (kind != EntryKind::kDirectory) continue;
-    const Descriptor directory(OpenBelow(directory_.file(), path, kDirectory));
-    if (directory.get() < 0) Fail(path);
-    finish(directory.get(), path);
+  for (auto entry = wanted.entries().rbegin(); entry != wanted.entries().rend(); ++entry) {
+    if (entry->second != EntryKind::kDirectory) continue;
+    const Descriptor directory(OpenBelow(directory_.file(), entry->first, kDirectory));
+    if (directory.get() < 0) Fail(entry->first);
+    finish(directory.get(), entry->first);
   }
   finish(directory_.file(), "");
 }
