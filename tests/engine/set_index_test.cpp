@@ -84,8 +84,8 @@ class LargeSets : public EngineTest {
 
 TEST_F(LargeSets, AreIntersectedAsByComparing) {
   size_t indexed = 0;
-  for (const size_t a : {1, 100, 129, 400}) {
-    for (const size_t b : {1, 128, 129, 400}) {
+  for (const size_t a : {1U, 100U, 129U, 400U}) {
+    for (const size_t b : {1U, 128U, 129U, 400U}) {
       for (int round = 0; round < 4 && !HasFailure(); ++round) {
         spki_elem* const left = Set(a);
         spki_elem* const right = Set(b);

@@ -204,7 +204,7 @@ TEST(SExpression, NestingThatACallerBuildsIsRefusedNotFollowed) {
       EXPECT_FALSE(equal);
     }
     EXPECT_EQ(std::unique_ptr<char[]>(list->ExportTag(nullptr)) != nullptr, expected == 0);
-    list->PrintAdvanced([](const char*, unsigned, void*) { return 0; }, nullptr, 0);
+    (void)list->PrintAdvanced([](const char*, unsigned, void*) { return 0; }, nullptr, 0);
   }  // freed here, however deep
 }
 

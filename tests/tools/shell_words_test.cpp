@@ -29,8 +29,7 @@ constexpr const char* kHostile[] = {
     "\033[2J!!%s%n\\033",
     "two\nlines",
     "\nx'$(touch pwned)'\n\033",
-    "Gr\xc3\xb6\xc3\x9f"
-    "e",
+    "Gr\xc3\xb6\xc3\x9f-e",
     "\xff\xfe'\\'`touch pwned`",
     "\xe2\x80\xae';touch pwned;'",
     "~root",

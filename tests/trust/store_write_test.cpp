@@ -82,7 +82,7 @@ TEST_F(StoreWrite, WritersOfOneNumberDoNotMeet) {
 TEST_F(StoreWrite, TheGlobalStoreIsReadableByAll) {
   const Ref<AclEntry> entry = Read<AclEntry>(AclEntryText(KeyText(1), Tag("other")));
   other.Write("root.acl", Root());
-  for (const mode_t mask : {0000, 0077}) {
+  for (const mode_t mask : {0000U, 0077U}) {
     const mode_t old = umask(mask);
     EXPECT_EQ(AclEntry::InstallAcls(other.Path().c_str(), nullptr), 0);
     EXPECT_EQ(Offer(Sequence(1, "a")), 0);
