@@ -300,8 +300,8 @@ typedef struct Vesk2ContextStruct {
 /* One file or directory name in a chain: results of a manifest comparison, names to ignore,
  * names found in a store. A program may make records of its own for SetIgnoredEntries, with any
  * allocator: they are copied. Chains that the library hands out are freed with FreeFileItemList;
- * those of a manifest context stay its own. Names are bytes that strangers chose: see
- * Vesk2Escape. */
+ * those of a manifest context stay its own, and so do their names. Names are bytes that strangers
+ * chose: see Vesk2Escape. */
 typedef struct FileItem {
   char* name;   /* the name, platform form; owned */
   char* name2;  /* null in every record that the library makes */

@@ -10,7 +10,6 @@
 
 #include <sys/stat.h>
 
-#include <algorithm>
 #include <cstring>
 #include <utility>
 

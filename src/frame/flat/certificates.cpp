@@ -8,7 +8,6 @@
 #include <memory>
 
 #include "src/frame/check.h"
-#include "src/frame/file_item.h"
 #include "src/frame/flat/ascii_text.h"
 #include "src/frame/flat/explanations.h"
 #include "src/manifest/ignore.h"
@@ -102,6 +101,19 @@ int Vesk2CertVerifyFileA(const char* path, const char* tagText, time_t notBefore
 
 // ---- Listing ----
 
+namespace {
+
+// A record of one name; null without memory. The name is the record's, or goes. It has memory of
+// its own, as the chain is its caller's, who may keep the name.
+FileItem* MakeItem(const char* name) {
+  std::unique_ptr<char[]> copy(ZVsysutil::zv_fstrdup(name));
+  FileItem* const item = copy ? FileItemCreate(copy.get(), nullptr) : nullptr;
+  if (item != nullptr) static_cast<void>(copy.release());  // the record's now
+  return item;
+}
+
+}  // namespace
+
 // Bare names, since a program joins them with the directory that it asked about, or hands them to
 // what looks into the home store.
 FileItem* CertFind(const char* directory) {
@@ -115,7 +127,7 @@ FileItem* CertFind(const char* directory) {
   FileItemList chain;
   FileItem* last = nullptr;
   while (scan.Next()) {
-    FileItem* const item = FileItemOfPath(nullptr, BareName(scan.Path()));
+    FileItem* const item = MakeItem(BareName(scan.Path()));
     if (item == nullptr) return nullptr;
     if (last == nullptr) {
       chain.reset(item);

@@ -5,6 +5,7 @@
 
 #include <cstdlib>
 #include <cstring>
+#include <utility>
 
 #include "tests/frame/flat/chain_text.h"
 
@@ -155,6 +156,11 @@ TEST_F(Certificates, FindListsBareNames) {
     std::string text;
     for (const FileItem* item = found; item != nullptr; item = item->next) {
       text += "<" + std::string(item->name) + "|" + item->nameA + ">";
+    }
+    // The chain is its caller's, who may take a name out of it.
+    if (found != nullptr) {
+      found->nameA = nullptr;
+      Vesk2Free(std::exchange(found->name, nullptr));
     }
     FreeFileItemList(found);
     return text;
